@@ -1,0 +1,19 @@
+/** @file dsp.h
+ *  The whole public interface of wavkit. */
+#ifndef WAVKIT_DSP_H
+#define WAVKIT_DSP_H
+
+#include "binary.h"
+#include "file.h"
+#include "layout.h"
+#include "library.h"
+#include "math.h"
+#include "measure.h"
+#include "polynomial.h"
+#include "record.h"
+#include "statistics.h"
+#include "transform.h"
+#include "types.h"
+#include "window.h"
+
+#endif

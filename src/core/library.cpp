@@ -1,0 +1,26 @@
+// The library as a whole: version, start-up, release of its caches.
+#include "precision.hpp"
+#include "spectral/tables.hpp"
+#include "window/generate.hpp"
+
+namespace wavkit {
+namespace {
+
+constexpr int version = 201;  // major * 100 + minor
+
+template <Record R>
+int free_caches() {
+    return status(bitrev_free_tables<R>() || fft_free_tables<R>() || window_free_cache<R>());
+}
+
+}  // namespace
+}  // namespace wavkit
+
+int dsp_lib_init() { return 0; }
+int dspf_lib_init() { return 0; }
+
+int dsp_version() { return wavkit::version; }
+int dspf_version() { return wavkit::version; }
+
+int dsp_free_internal() { return wavkit::free_caches<dsp>(); }
+int dspf_free_internal() { return wavkit::free_caches<dspf>(); }

@@ -1,0 +1,263 @@
+// Records: buffers owned and borrowed, copies, ranges, comparison, hooks.
+#include <climits>
+
+#include "support/failing_allocator.hpp"
+#include "support/signals.hpp"
+
+namespace wavkit::test {
+namespace {
+
+template <class R>
+class RecordTest : public ::testing::Test {};
+TYPED_TEST_SUITE(RecordTest, Precisions);
+
+TYPED_TEST(RecordTest, StartsAndEndsWithDefaults) {
+    using R = TypeParam;
+    R x{7, nullptr, 3, 4, 1, 99};
+    EXPECT_EQ(dsp_init(&x), 0);
+    for (int round = 0; round < 2; ++round) {
+        EXPECT_EQ(x.delta, 1);
+        EXPECT_EQ(x.data, nullptr);
+        EXPECT_EQ(x.alloc, 0);
+        EXPECT_EQ(x.points, 0);
+        EXPECT_EQ(x.complex, 0);
+        EXPECT_EQ(x.extra, 0u);
+        x = R{2, nullptr, 0, 8, 1, 5};
+        EXPECT_EQ(dsp_alloc(&x), 0);
+        EXPECT_EQ(dsp_destroy(&x), 0);
+    }
+}
+
+TYPED_TEST(RecordTest, CapacityOnlyGrows) {
+    using R = TypeParam;
+    Signal<R> x;
+    x->points = 5;
+    x->complex = 1;
+    ASSERT_EQ(dsp_alloc(x), 0);
+    EXPECT_EQ(x->alloc, 10);
+    const auto* block = x->data;
+    x->points = 4;
+    ASSERT_EQ(dsp_alloc(x), 0);
+    EXPECT_EQ(x->alloc, 10);
+    EXPECT_EQ(x->data, block);
+    x->points = -3;
+    EXPECT_EQ(dsp_alloc(x), 0);
+    EXPECT_EQ(x->alloc, 10);
+}
+
+TYPED_TEST(RecordTest, BorrowedBufferIsNeverTouchedByGrowth) {
+    using R = TypeParam;
+    Borrowed<R> x(real<R>({1, 2, 3}));
+    const auto before = x.host;
+    x->points = 5;
+    ASSERT_EQ(dsp_realloc(x, 3, 0), 0);
+    EXPECT_NE(x->data, x.host.data());
+    EXPECT_EQ(x->alloc, 5);
+    x->data[0] = 42;
+    EXPECT_EQ(x->data[2], 3);
+    EXPECT_EQ(x.host, before);
+
+    Borrowed<R> y(real<R>({1, 2, 3}));
+    ASSERT_EQ(dsp_alloc(y), 0);
+    EXPECT_NE(y->data, y.host.data());
+    EXPECT_EQ(y->alloc, 3);
+
+    Borrowed<R> z(real<R>({1, 2}));
+    z->alloc = -7;
+    ASSERT_EQ(dspi_rtoc(z), 0);
+    EXPECT_TRUE(is_complex<R>(z, {1, 2}));
+    EXPECT_EQ(z->alloc, 4);
+}
+
+TYPED_TEST(RecordTest, NeedBeyondTheLargestBlockFails) {
+    using R = TypeParam;
+    auto x = real<R>({1});
+    x->complex = 1;
+    x->points = INT_MAX / 2 + 1;
+    EXPECT_EQ(dsp_alloc(x), -1);
+    EXPECT_EQ(x->data, nullptr);
+    EXPECT_EQ(x->alloc, 0);
+    EXPECT_EQ(x->points, INT_MAX / 2 + 1);
+
+    Borrowed<R> y(real<R>({1}));
+    y->points = INT_MAX;
+    EXPECT_EQ(dspi_rtoc(y), -1);
+    EXPECT_EQ(y->data, nullptr);
+    EXPECT_EQ(y->complex, 1);
+}
+
+TYPED_TEST(RecordTest, RangesAreClippedToTheSource) {
+    using R = TypeParam;
+    auto x = real<R>({0, 1, 2, 3, 4, 5, 6, 7, 8, 9}, 0.5);
+    x->extra = 17;
+    Signal<R> y;
+    y->extra = 4;
+    ASSERT_EQ(dspu_subvec(x, y, -3, 4), 0);
+    EXPECT_TRUE(is_real<R>(y, {0, 1, 2, 3}));
+    EXPECT_EQ(y->delta, scalar<R>(0.5));
+    EXPECT_EQ(y->extra, 4u);
+    ASSERT_EQ(dspu_subvec(x, y, 8, 5), 0);
+    EXPECT_TRUE(is_real<R>(y, {8, 9}));
+    ASSERT_EQ(dspu_subvec(x, y, 12, 1), 0);
+    EXPECT_EQ(y->points, 0);
+    ASSERT_EQ(dspu_subvec(x, y, 5, INT_MAX), 0);
+    EXPECT_TRUE(is_real<R>(y, {5, 6, 7, 8, 9}));
+    ASSERT_EQ(dspu_subvec(x, y, INT_MIN, INT_MIN), 0);
+    EXPECT_EQ(y->points, 0);
+    ASSERT_EQ(dsp_copy_at_most(y, complex<R>({{1, 2}, {3, 4}}, 3), -1), 0);
+    EXPECT_TRUE(is_complex<R>(y, {}));
+    EXPECT_EQ(y->delta, 3);
+    ASSERT_EQ(dsp_copy_at_most(y, x, 99), 0);
+    EXPECT_TRUE(matches<R>(y, x));
+}
+
+TYPED_TEST(RecordTest, RangeInPlace) {
+    using R = TypeParam;
+    auto x = complex<R>({{1, 2}, {3, 4}, {5, 6}, {7, 8}});
+    const auto* block = x->data;
+    ASSERT_EQ(dspu_subvec(x, x, 1, 2), 0);
+    EXPECT_TRUE(is_complex<R>(x, {{3, 4}, {5, 6}}));
+    EXPECT_EQ(x->data, block);
+    ASSERT_EQ(dspu_subvec(x, x, 0, 1), 0);
+    EXPECT_TRUE(is_complex<R>(x, {{3, 4}}));
+
+    Borrowed<R> y(real<R>({1, 2, 3, 4}));
+    const auto before = y.host;
+    ASSERT_EQ(dspu_subvec(y, y, 2, 9), 0);
+    EXPECT_TRUE(is_real<R>(y, {3, 4}));
+    EXPECT_EQ(y->alloc, 2);
+    EXPECT_EQ(y.host, before);
+
+    // Two records over one buffer, the destination owning it.
+    auto owner = real<R>({1, 2, 3, 4});
+    R view = *owner.get();
+    view.alloc = 0;
+    ASSERT_EQ(dspu_subvec(&view, owner, 1, 3), 0);
+    EXPECT_TRUE(is_real<R>(owner, {2, 3, 4}));
+}
+
+TYPED_TEST(RecordTest, AppendPromotesAndNeverDemotes) {
+    using R = TypeParam;
+    auto x = real<R>({1, 2, 3}, 0.25);
+    ASSERT_EQ(dsp_append(x, complex<R>({{4, 5}}, 9)), 0);
+    EXPECT_TRUE(is_complex<R>(x, {1, 2, 3, {4, 5}}));
+    ASSERT_EQ(dsp_append(x, real<R>({6})), 0);
+    EXPECT_TRUE(is_complex<R>(x, {1, 2, 3, {4, 5}, 6}));
+    EXPECT_EQ(x->delta, scalar<R>(0.25));
+
+    Borrowed<R> y(real<R>({1, 2}));
+    ASSERT_EQ(dsp_append(y, real<R>({3})), 0);
+    EXPECT_TRUE(is_real<R>(y, {1, 2, 3}));
+    EXPECT_EQ(y.host[0], 1);
+
+    auto huge = real<R>({1});
+    R endless = *huge.get();
+    endless.alloc = 0;
+    endless.points = INT_MAX;
+    EXPECT_EQ(dsp_append(huge, &endless), -1);
+}
+
+TYPED_TEST(RecordTest, ComparisonFollowsDeltaThenSamples) {
+    using R = TypeParam;
+    const auto nan = std::numeric_limits<long double>::quiet_NaN();
+    int result = 5;
+    EXPECT_EQ(dsp_cmp(real<R>({1}), real<R>({1, 2}), 0, &result), -1);
+    EXPECT_EQ(result, 5);
+
+    const auto compared = [](const Signal<R>& a, const Signal<R>& b, scalar<R> tolerance) {
+        int sign = 5;
+        EXPECT_EQ(dsp_cmp(a, b, tolerance, &sign), 0);
+        return sign;
+    };
+    EXPECT_EQ(compared(real<R>({9}, 1.0), real<R>({1}, 1.5), scalar<R>(0.1)), -1);
+    EXPECT_EQ(compared(real<R>({1, 5}), real<R>({1, 3}), 1), 1);
+    EXPECT_EQ(compared(real<R>({1, 5}), real<R>({1, 3}), 2), 0);
+    EXPECT_EQ(compared(real<R>({nan, 1}), real<R>({0, 2}), 0), -1);
+    EXPECT_EQ(compared(complex<R>({1, 2}), real<R>({1, 2}), 0), 0);
+    EXPECT_EQ(compared(complex<R>({{1, 0.5L}}), real<R>({1}), 0), 1);
+    EXPECT_EQ(compared(real<R>({1}), complex<R>({{1, 0.5L}}), 0), -1);
+    EXPECT_EQ(compared(real<R>({1}), complex<R>({{1, -0.5L}}), 0), 1);
+    EXPECT_EQ(compared(complex<R>({{1, 2}}), complex<R>({{1, 3}}), 0), -1);
+}
+
+TYPED_TEST(RecordTest, EveryFailingGrowthIsReported) {
+    using R = TypeParam;
+    const auto source = complex<R>({{1, 2}, {3, 4}});
+    const auto one = real<R>({1});
+    EXPECT_EQ(fail_each_growth<R>([&] {
+                  Signal<R> y;
+                  return dsp_copy(y, source);
+              }),
+              1);
+    EXPECT_EQ(fail_each_growth<R>([&] {
+                  Borrowed<R> y(one);
+                  return dsp_append(y, source);
+              }),
+              2);
+}
+
+// The hooks see the old capacity and block, and the borrowed case arrives with a null block.
+struct Seen {
+    static inline int releases, old_points, old_complex;
+    static inline const void* block;
+};
+
+TYPED_TEST(RecordTest, HooksServeTheirPrecisionAndChain) {
+    using R = TypeParam;
+    const auto allocate = +[](R* x) {
+        Seen::block = x->data;
+        x->data = static_cast<scalar<R>*>(std::malloc(used(x) * sizeof(scalar<R>)));
+    };
+    const auto reallocate = +[](R* x, int points, int is_complex) {
+        Seen::block = x->data;
+        Seen::old_points = points;
+        Seen::old_complex = is_complex;
+        x->data = static_cast<scalar<R>*>(std::realloc(x->data, used(x) * sizeof(scalar<R>)));
+    };
+    const auto release = +[](R* x) {
+        ++Seen::releases;
+        std::free(x->data);
+    };
+    decltype(+allocate) old_alloc = allocate;
+    decltype(+release) old_free = nullptr;
+    EXPECT_EQ(dsp_lib_alloc(allocate, &old_alloc), 0);
+    EXPECT_EQ(old_alloc, nullptr);
+    dsp_lib_realloc(reallocate, nullptr);
+    dsp_lib_free(release, nullptr);
+
+    Seen::block = &Seen::releases;
+    R x;
+    dsp_init(&x);
+    x.points = 2;
+    EXPECT_EQ(dsp_alloc(&x), 0);
+    EXPECT_EQ(Seen::block, nullptr);
+    x.data[0] = 1;
+    x.data[1] = 2;
+    R view{1, x.data, 0, 2, 0, 0};
+    EXPECT_EQ(dspi_rtoc(&view), 0);
+    EXPECT_EQ(Seen::block, nullptr);
+    EXPECT_EQ(Seen::old_points, 2);
+    EXPECT_EQ(Seen::old_complex, 0);
+    EXPECT_TRUE(is_complex<R>(&view, {1, 2}));
+    Seen::releases = 0;
+    dsp_destroy(&view);
+    dsp_destroy(&x);
+    EXPECT_EQ(Seen::releases, 2);
+
+    dsp_lib_alloc(nullptr, &old_alloc);
+    EXPECT_EQ(old_alloc, +allocate);
+    dsp_lib_realloc(decltype(+reallocate){}, nullptr);
+    dsp_lib_free(nullptr, &old_free);
+    EXPECT_EQ(old_free, +release);
+}
+
+TEST(Library, VersionAndFrame) {
+    EXPECT_EQ(dsp_version(), 201);
+    EXPECT_EQ(dspf_version(), 201);
+    EXPECT_EQ(dsp_lib_init() || dspf_lib_init(), 0);
+    EXPECT_EQ(dsp_free_internal() || dsp_free_internal(), 0);
+    EXPECT_EQ(dspf_free_internal() || dspf_free_internal(), 0);
+}
+
+}  // namespace
+}  // namespace wavkit::test
