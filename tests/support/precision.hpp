@@ -24,6 +24,16 @@ using Precisions = ::testing::Types<dsp, dspf>;
 template <Record R>
 inline constexpr scalar<R> epsilon = std::numeric_limits<scalar<R>>::epsilon();
 
+/// The one of two twins that works on this record type, for names that have no overload.
+template <Record R, class Double, class Single>
+constexpr auto pick(Double* double_twin, Single* single_twin) {
+    if constexpr (std::same_as<R, dsp>) {
+        return double_twin;
+    } else {
+        return single_twin;
+    }
+}
+
 template <Record R>
 int free_internal() {
     if constexpr (std::same_as<R, dsp>) {
