@@ -9,7 +9,7 @@
 namespace wavkit {
 namespace {
 
-constexpr int keep_amplitude = 0, keep_power = 1, unscaled = 2, scale_bits = 3;
+constexpr int keep_power = 1, unscaled = 2, scale_bits = 3;  // 0 keeps the amplitude
 constexpr int at_start = 0x000, in_middle = 0x100, at_end = 0x200, split = 0x300,
               placement_bits = 0x700;
 
@@ -40,7 +40,7 @@ std::optional<T> scale_factor(int mode, std::size_t old_count, std::size_t new_c
     if (kept == scale_bits) return std::nullopt;
     if (kept == unscaled || old_count == 0 || new_count == 0) return T(1);
     const double ratio = double(new_count) / double(old_count);
-    return T(kept == keep_amplitude ? ratio : std::sqrt(ratio));
+    return T(kept == keep_power ? std::sqrt(ratio) : ratio);
 }
 
 template <Record R>
