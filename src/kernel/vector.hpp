@@ -1,0 +1,153 @@
+// Short vectors of samples, one type for every width, on the compiler's vector extension.
+//
+// Everything here has internal linkage: the files that use it are compiled for different
+// instruction sets, and no function of one may be taken for that of another.
+#pragma once
+
+#include <cstddef>
+#include <utility>
+
+namespace wavkit::kernel {
+namespace {
+
+template <class T, int V>
+struct VectorType {
+    typedef T type __attribute__((vector_size(V * sizeof(T))));
+};
+
+template <class T, int V>
+using Vec = typename VectorType<T, V>::type;
+
+template <class T, int V>
+inline Vec<T, V> load(const T* p) {
+    Vec<T, V> v;
+    __builtin_memcpy(&v, p, sizeof v);
+    return v;
+}
+
+template <class T, int V>
+inline void store(T* p, Vec<T, V> v) {
+    __builtin_memcpy(p, &v, sizeof v);
+}
+
+/// V complex samples, real and imaginary parts apart.
+template <class T, int V>
+struct Complexes {
+    Vec<T, V> re, im;
+
+    friend inline Complexes operator+(Complexes a, Complexes b) {
+        return {a.re + b.re, a.im + b.im};
+    }
+    friend inline Complexes operator-(Complexes a, Complexes b) {
+        return {a.re - b.re, a.im - b.im};
+    }
+    friend inline Complexes operator*(Complexes a, Complexes b) {
+        return {a.re * b.re - a.im * b.im, a.re * b.im + a.im * b.re};
+    }
+    friend inline Complexes operator*(Complexes a, T factor) {
+        return {a.re * factor, a.im * factor};
+    }
+};
+
+/// i * z
+template <class T, int V>
+inline Complexes<T, V> times_i(Complexes<T, V> z) {
+    return {-z.im, z.re};
+}
+
+template <class T, int V>
+inline Complexes<T, V> conj(Complexes<T, V> z) {
+    return {z.re, -z.im};
+}
+
+/// Lane i of the result is lane Pick::lane(i) of the 2V lanes of a and b together.
+template <class Pick, class Vector, std::size_t... I>
+inline Vector shuffle(Vector a, Vector b, std::index_sequence<I...>) {
+    return __builtin_shufflevector(a, b, Pick::lane(int(I))...);
+}
+
+template <int V, class Pick, class Vector>
+inline Vector shuffle(Vector a, Vector b) {
+    return shuffle<Pick>(a, b, std::make_index_sequence<std::size_t(V)>{});
+}
+
+/// a and b taken in turn, `Block` lanes at a time; the first or the second half of the result.
+template <int V, int Block, bool SecondHalf>
+struct InTurn {
+    static constexpr int lane(int i) {
+        const int j = i + (SecondHalf ? V : 0);
+        return (j / Block % 2 ? V : 0) + j / (2 * Block) * Block + j % Block;
+    }
+};
+
+/// The even or the odd lanes of a followed by those of b.
+template <bool Odd>
+struct EveryOther {
+    static constexpr int lane(int i) { return 2 * i + (Odd ? 1 : 0); }
+};
+
+template <int V>
+struct Backwards {
+    static constexpr int lane(int i) { return V - 1 - i; }
+};
+
+template <int V, int Block, class Vector>
+inline Vector first_in_turn(Vector a, Vector b) {
+    return shuffle<V, InTurn<V, Block, false>>(a, b);
+}
+
+template <int V, int Block, class Vector>
+inline Vector second_in_turn(Vector a, Vector b) {
+    return shuffle<V, InTurn<V, Block, true>>(a, b);
+}
+
+template <class T, int V>
+inline Vec<T, V> reversed(Vec<T, V> v) {
+    return shuffle<V, Backwards<V>>(v, v);
+}
+
+/// How complex samples lie in memory: in pairs (re, im), in pairs read or written as (im, re), or
+/// V real parts followed by V imaginary parts. Sample i begins at the same place in all of them
+/// wherever i is a multiple of V.
+enum class Layout { pairs, swapped_pairs, blocks };
+
+template <class T, int V, Layout L>
+inline Complexes<T, V> load_complex(const T* p) {
+    const auto a = load<T, V>(p), b = load<T, V>(p + V);
+    if constexpr (L == Layout::blocks) {
+        return {a, b};
+    } else {
+        const auto even = shuffle<V, EveryOther<false>>(a, b);
+        const auto odd = shuffle<V, EveryOther<true>>(a, b);
+        if constexpr (L == Layout::pairs) return {even, odd};
+        return {odd, even};
+    }
+}
+
+template <class T, int V, Layout L>
+inline void store_complex(T* p, Complexes<T, V> z) {
+    if constexpr (L == Layout::blocks) {
+        store<T, V>(p, z.re);
+        store<T, V>(p + V, z.im);
+    } else {
+        const auto even = L == Layout::pairs ? z.re : z.im, odd = L == Layout::pairs ? z.im : z.re;
+        store<T, V>(p, first_in_turn<V, 1>(even, odd));
+        store<T, V>(p + V, second_in_turn<V, 1>(even, odd));
+    }
+}
+
+/// Transposes V vectors of V lanes in place.
+template <class T, int V>
+inline void transpose(Vec<T, V>* rows) {
+    Vec<T, V> turned[V];
+    for (int span = V; span > 1; span /= 2) {
+        for (int i = 0; i < V / 2; ++i) {
+            turned[2 * i] = first_in_turn<V, 1>(rows[i], rows[i + V / 2]);
+            turned[2 * i + 1] = second_in_turn<V, 1>(rows[i], rows[i + V / 2]);
+        }
+        for (int i = 0; i < V; ++i) rows[i] = turned[i];
+    }
+}
+
+}  // namespace
+}  // namespace wavkit::kernel
