@@ -11,7 +11,7 @@ int fft(R* x, int inverse) {
     const int n = x->points;
     if (!is_power_of_two(n)) return -1;
     if (n > 1) {
-        if (dspi_rtoc(x)) return -1;
+        if (!x->complex && dspi_rtoc(x)) return -1;
         const auto* transform = find_fft<R>(exponent_of(n));
         if (!transform) return -1;
         transform->run(x->data, inverse != 0, inverse ? T(1) : T(1.0 / n));

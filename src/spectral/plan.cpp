@@ -26,6 +26,7 @@ struct Plans {
     std::array<Fft<scalar<R>>, exponents> ffts{};
     std::array<bool, exponents> ready{};
     TableCache<scalar<R>> tables, split_roots;
+    const kernel::FftKernels<scalar<R>>* chosen = nullptr;
     scalar<R>* work = nullptr;
     std::size_t work_scalars = 0;
 };
@@ -150,7 +151,7 @@ template <Record R>
 bool build(int exponent) {
     using T = scalar<R>;
     auto& fft = plans<R>.ffts[std::size_t(exponent)];
-    fft.kernels = &kernel::fft_kernels<T>();
+    fft.kernels = plans<R>.chosen ? plans<R>.chosen : &kernel::fft_kernels<T>();
     FftPlan<T> plan{.points = std::size_t(1) << exponent};
     if (plan.points >= 16) {
         const T* twiddle_table;
@@ -208,11 +209,19 @@ void free_plans() {
     all.work_scalars = 0;
 }
 
+template <Record R>
+void use_kernels(const kernel::FftKernels<scalar<R>>* kernels) {
+    free_plans<R>();
+    plans<R>.chosen = kernels;
+}
+
 template const Fft<double>* find_fft<dsp>(int);
 template const Fft<float>* find_fft<dspf>(int);
 template const double* find_split_roots<dsp>(int);
 template const float* find_split_roots<dspf>(int);
 template void free_plans<dsp>();
 template void free_plans<dspf>();
+template void use_kernels<dsp>(const kernel::FftKernels<double>*);
+template void use_kernels<dspf>(const kernel::FftKernels<float>*);
 
 }  // namespace wavkit

@@ -28,7 +28,13 @@ const Fft<scalar<R>>* find_fft(int exponent);
 template <Record R>
 const scalar<R>* find_split_roots(int exponent);
 
+/// Drops all plans and workspace.
 template <Record R>
 void free_plans();
+
+/// Drops all plans and lays out later ones for these kernels, or with null for those that suit the
+/// processor best: a way to run every set of kernels on one machine.
+template <Record R>
+void use_kernels(const kernel::FftKernels<scalar<R>>* kernels);
 
 }  // namespace wavkit
