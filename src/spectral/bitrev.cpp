@@ -126,6 +126,10 @@ int bitrev_free_tables() {
     return 0;
 }
 
+template int bitrev_swap_table<dsp>(int, const std::uint32_t**);
+template int bitrev_swap_table<dspf>(int, const std::uint32_t**);
+template int bitrev_fixed_table<dsp>(int, const std::uint32_t**);
+template int bitrev_fixed_table<dspf>(int, const std::uint32_t**);
 template int bitrev_free_tables<dsp>();
 template int bitrev_free_tables<dspf>();
 

@@ -243,5 +243,31 @@ TYPED_TEST(RealFftTest, InverseTakesWhatARealSignalCanHave) {
     EXPECT_EQ(host.host, before);
 }
 
+TYPED_TEST(RealFftTest, ReconstructionMirrorsAndConjugates) {
+    using R = TypeParam;
+    auto x = real<R>({1, 2, 3, 4}, 5);
+    ASSERT_EQ(dspi_orecon(x, 0), 0);
+    EXPECT_TRUE(is_real<R>(x, {1, 2, 3, 4, 3, 2}));
+    EXPECT_EQ(x->delta, 5);
+    auto z = complex<R>({{1, 2}, {3, 4}, {5, 6}});
+    ASSERT_EQ(dspi_orecon(z, 1), 0);
+    EXPECT_TRUE(is_complex<R>(z, {{1, 2}, {3, 4}, {5, 6}, {5, -6}, {3, -4}}));
+    for (const int odd : {0, 1}) {
+        auto shortest = real<R>({7});
+        ASSERT_EQ(dspi_orecon(shortest, odd), 0);
+        EXPECT_TRUE(is_real<R>(shortest, {7}));
+        auto two = real<R>({7, 8});
+        ASSERT_EQ(dspi_orecon(two, odd), 0);
+        EXPECT_EQ(two->points, odd ? 3 : 2);
+    }
+    Borrowed<R> host(real<R>({1, 2, 3}));
+    ASSERT_EQ(dspi_orecon(host, 0), 0);
+    EXPECT_TRUE(is_real<R>(host, {1, 2, 3, 2}));
+    EXPECT_EQ(host.host.size(), 3u);
+    Signal<R> huge;
+    huge->points = (1 << 30) + 2;
+    EXPECT_EQ(dspi_orecon(huge, 0), -1);
+}
+
 }  // namespace
 }  // namespace wavkit::test
