@@ -53,7 +53,12 @@ struct Bin {
 
     friend constexpr Bin operator+(Bin a, Bin b) { return {a.re + b.re, a.im + b.im}; }
     friend constexpr Bin operator-(Bin a, Bin b) { return {a.re - b.re, a.im - b.im}; }
+    friend constexpr Bin operator+(Bin a, T b) { return {a.re + b, a.im}; }
+    friend constexpr Bin operator+(T a, Bin b) { return {a + b.re, b.im}; }
+    friend constexpr Bin operator-(Bin a, T b) { return {a.re - b, a.im}; }
+    friend constexpr Bin operator-(T a, Bin b) { return {a - b.re, -b.im}; }
     friend constexpr Bin operator*(Bin a, T factor) { return {a.re * factor, a.im * factor}; }
+    friend constexpr Bin operator*(T factor, Bin a) { return a * factor; }
     friend constexpr Bin operator*(Bin a, Bin b) {
         return {a.re * b.re - a.im * b.im, a.re * b.im + a.im * b.re};
     }
@@ -71,28 +76,34 @@ constexpr T magnitude_squared(Bin<T> z) {
     return z.re * z.re + z.im * z.im;
 }
 
-/// A value or part outside [-big, big] counts as out of range; a NaN does not.
+/// A value or part outside [-big, big] counts as out of range; a NaN does not. (One comparison a
+/// part, here and below: loops that saturate stay vectorisable.)
 template <Record R>
-constexpr bool out_of_range(scalar<R> value) {
-    return value > limits<R>::big || value < -limits<R>::big;
+bool out_of_range(scalar<R> value) {
+    return std::fabs(value) > limits<R>::big;
 }
 
 template <Record R>
-constexpr bool out_of_range(Bin<scalar<R>> z) {
+bool out_of_range(Bin<scalar<R>> z) {
     return out_of_range<R>(z.re) || out_of_range<R>(z.im);
 }
 
 /// The nearest value within [-big, big]; a NaN stays one.
 template <Record R>
-constexpr scalar<R> saturated(scalar<R> value) {
-    return value > limits<R>::big    ? limits<R>::big
-           : value < -limits<R>::big ? -limits<R>::big
-                                     : value;
+scalar<R> saturated(scalar<R> value) {
+    return out_of_range<R>(value) ? std::copysign(limits<R>::big, value) : value;
 }
 
 template <Record R>
-constexpr Bin<scalar<R>> saturated(Bin<scalar<R>> z) {
+Bin<scalar<R>> saturated(Bin<scalar<R>> z) {
     return {saturated<R>(z.re), saturated<R>(z.im)};
+}
+
+/// re^2 + im^2, or the large value when a part is out of range: such a point then ranks below one
+/// whose squares exceed the large value, which hosts rely on.
+template <Record R>
+scalar<R> capped_magnitude_squared(Bin<scalar<R>> z) {
+    return out_of_range<R>(z) ? limits<R>::big : magnitude_squared(z);
 }
 
 /// Scalars a sample takes.
@@ -204,9 +215,6 @@ inline int dspi_bitrev(dspf* x) { return dspfi_bitrev(x); }
 inline int dspi_fft(dspf* x, int inverse) { return dspfi_fft(x, inverse); }
 inline int dspi_rfft(dspf* x) { return dspfi_rfft(x); }
 inline int dspi_irfft(dspf* x) { return dspfi_irfft(x); }
-inline int dspi_dft(dspf* x, int inverse) { return dspfi_dft(x, inverse); }
-inline int dspi_rdft(dspf* x) { return dspfi_rdft(x); }
-inline int dspi_irdft(dspf* x, int odd) { return dspfi_irdft(x, odd); }
 inline int dspi_orecon(dspf* x, int odd) { return dspfi_orecon(x, odd); }
 
 inline int dspi_window2(dspf* x, int window, int scale_type, float win_length) {
