@@ -215,6 +215,9 @@ inline int dspi_bitrev(dspf* x) { return dspfi_bitrev(x); }
 inline int dspi_fft(dspf* x, int inverse) { return dspfi_fft(x, inverse); }
 inline int dspi_rfft(dspf* x) { return dspfi_rfft(x); }
 inline int dspi_irfft(dspf* x) { return dspfi_irfft(x); }
+inline int dspi_dft(dspf* x, int inverse) { return dspfi_dft(x, inverse); }
+inline int dspi_rdft(dspf* x) { return dspfi_rdft(x); }
+inline int dspi_irdft(dspf* x, int odd) { return dspfi_irdft(x, odd); }
 inline int dspi_orecon(dspf* x, int odd) { return dspfi_orecon(x, odd); }
 
 inline int dspi_window2(dspf* x, int window, int scale_type, float win_length) {

@@ -1,5 +1,5 @@
 /** @file transform.h
- *  Fourier transforms of power-of-two lengths, complex and real, and bit-reversed order.
+ *  Fourier and cosine transforms, analytic signal and Hilbert transform, bit-reversed order.
  *
  *  The convention is that of a measuring instrument. A forward transform is scaled by 1/N, so that
  *  every bin shows the amplitude of its complex exponential (a real sinusoid of amplitude A shows
@@ -13,8 +13,10 @@
  *  stays one.
  *
  *  All functions work in place and return 0, or -1 on failure. The first transform of a length
- *  builds tables that later ones of that length read; dsp_free_internal() releases them. Transforms
- *  of one precision must not run at the same time, nor while that function does.
+ *  builds tables that later ones of that length read: those of powers of two are kept for every
+ *  length, those of other lengths and of cosine transforms for the last one. dsp_free_internal()
+ *  releases them. Transforms of one precision must not run at the same time, nor while that
+ *  function does.
  *
  *  The passes are those of the autosort transform (Cochran, Cooley, Favin et al., "What is the fast
  *  Fourier transform?", 1967); long signals are transformed as a matrix (Bailey, "FFTs in external
@@ -53,6 +55,66 @@ WAVKIT_API int dspfi_rfft(dspf *x);
  *          points) or memory runs out */
 WAVKIT_API int dspi_irfft(dsp *x);
 WAVKIT_API int dspfi_irfft(dspf *x);
+
+/** Transforms a signal of any length N; a real one becomes complex first.
+ *  Fewer than two points are left as they are (a real record stays real), but for `delta`. Powers
+ * of two go through dspi_fft(); other lengths are a convolution with a chirp (Bluestein, "A linear
+ *  filtering approach to the computation of discrete Fourier transform", 1970), for which the
+ * record grows to 2^m >= 2N - 2 complex points; it keeps that capacity, and `points` is N again.
+ *  The relative error in the L2 norm stays below 10 epsilon log2(N).
+ *  @param inverse  0 forward, anything else inverse
+ *  @return 0, or -1 when memory runs out or N exceeds 2^29 + 1 */
+WAVKIT_API int dspi_dft(dsp *x, int inverse);
+WAVKIT_API int dspfi_dft(dspf *x, int inverse);
+
+/** Transforms a real signal of any length N into its bins 0 .. N/2 (integer division), forward.
+ *  The record becomes complex with N/2 + 1 points; one real point stays one real point. An empty
+ *  record only changes its `delta`.
+ *  @return 0; -1 for a complex record (then untouched) or when memory runs out */
+WAVKIT_API int dspi_rdft(dsp *x);
+WAVKIT_API int dspfi_rdft(dspf *x);
+
+/** Transforms the bins 0 .. N/2 of a real signal back into its N samples: 2 points - 2 of them, or
+ *  2 points - 1 for the spectrum of an odd length. The inverse of dspi_rdft().
+ *  @param odd  0 for an even number of samples, anything else for an odd one
+ *  @return 0, or -1 when memory runs out */
+WAVKIT_API int dspi_irdft(dsp *x, int odd);
+WAVKIT_API int dspfi_irdft(dspf *x, int odd);
+
+/** Cosine transform of a real signal of any length N, and its inverse (Makhoul, "A fast cosine
+ *  transform in one and two dimensions", 1980).
+ *
+ *      forward (type 2)  y[k] = 1/N sum x[n] cos(pi k (2n + 1) / (2N)), for k > 0
+ *                        y[0] = 1/N sum x[n]
+ *      inverse (type 3)  x[n] = y[0] + 2 sum y[k] cos(pi k (2n + 1) / (2N)), k = 1 .. N - 1
+ *
+ *  Normalised, y[0] is multiplied by sqrt 2 and the others by 2. Forward and then inverse with the
+ *  same scaling give the signal and its `delta` back. `delta` becomes 1 / (2 N delta), and half of
+ *  the large value where it was 0.0; for an empty record 1 / (2 delta), and the large value itself
+ *  where it was 0.0.
+ *  @param flags  bit 0 inverse, bit 1 normalised
+ *  @return 0; -1 for a complex record (then untouched) or when memory runs out */
+WAVKIT_API int dspi_dct(dsp *x, int flags);
+WAVKIT_API int dspfi_dct(dspf *x, int flags);
+
+/** Replaces a signal by its analytic signal: the signal plus i times its Hilbert transform, whose
+ *  magnitude is the envelope. The spectrum keeps bins 0 and N/2, doubles the positive frequencies
+ *  and drops the negative ones (Marple, "Computing the discrete-time analytic signal via FFT",
+ *  1999).
+ *  The record becomes complex, but for one real point, which stays; `points` and, to rounding,
+ *  `delta` do not change (a `delta` of 0.0 comes back as 1e-100 / N, in single precision as the
+ *  nearest there is to 1e-15 / N).
+ *  @return 0, or -1 when memory runs out */
+WAVKIT_API int dspi_analytic(dsp *x);
+WAVKIT_API int dspfi_analytic(dspf *x);
+
+/** Replaces a signal by its Hilbert transform: every positive frequency is multiplied by -i, every
+ *  negative one by i, the mean and (even N) the component at half the sampling rate by 0, so that
+ *  cos becomes sin.
+ *  A real record stays real, a complex one complex; `points` and `delta` as dspi_analytic().
+ *  @return 0, or -1 when memory runs out */
+WAVKIT_API int dspi_hilbert(dsp *x);
+WAVKIT_API int dspfi_hilbert(dspf *x);
 
 /** Puts N = 2^m points into bit-reversed order: point k trades places with the point whose index
  *  has the m bits of k backwards. Complex points move whole; `delta` does not change.

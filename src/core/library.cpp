@@ -1,5 +1,6 @@
 // The library as a whole: version, start-up, release of its caches.
 #include "precision.hpp"
+#include "spectral/caches.hpp"
 #include "spectral/tables.hpp"
 #include "window/generate.hpp"
 
@@ -10,7 +11,8 @@ constexpr int version = 201;  // major * 100 + minor
 
 template <Record R>
 int free_caches() {
-    return status(bitrev_free_tables<R>() || fft_free_tables<R>() || window_free_cache<R>());
+    return status(bitrev_free_tables<R>() || dct_free_tables<R>() || dft_free_tables<R>() ||
+                  fft_free_tables<R>() || window_free_cache<R>());
 }
 
 }  // namespace

@@ -41,6 +41,9 @@ struct FftKernels {
 
     /// The way back: Z[k] = X[k] + conj X[half - k] + i conj(w^k) (X[k] - conj X[half - k]).
     void (*join)(T* data, std::size_t half, const T* roots);
+
+    /// a[k] *= b[k] for `count` samples, a multiple of four, in pairs: spectra of a convolution.
+    void (*multiply)(T* a, const T* b, std::size_t count);
 };
 
 /// The smallest length that fills the widest vectors in every pass.

@@ -375,9 +375,17 @@ void join(T* data, std::size_t half, const T* roots) {
     combine_halves<false, T, V>(data, half, roots);
 }
 
+template <class T, int V>
+void multiply(T* a, const T* b, std::size_t count) {
+    for (std::size_t i = 0; i < 2 * count; i += 2 * V) {
+        store_complex<T, V, Layout::pairs>(a + i, load_complex<T, V, Layout::pairs>(a + i) *
+                                                      load_complex<T, V, Layout::pairs>(b + i));
+    }
+}
+
 template <class T, int Narrow, int Wide>
-constexpr FftKernels<T> kernels{Narrow, Wide, transform<T, Narrow, Wide>, split<T, Wide>,
-                                join<T, Wide>};
+constexpr FftKernels<T> kernels{Narrow,         Wide,          transform<T, Narrow, Wide>,
+                                split<T, Wide>, join<T, Wide>, multiply<T, Narrow>};
 
 }  // namespace
 }  // namespace wavkit::kernel

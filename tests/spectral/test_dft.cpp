@@ -1,0 +1,234 @@
+// Transforms of any length, cosine transforms, analytic signals: direct sums and closed forms.
+#include <cmath>
+
+#include "support/failing_allocator.hpp"
+#include "support/oracles.hpp"
+
+inline int dspi_dct(dspf* x, int flags) { return dspfi_dct(x, flags); }
+inline int dspi_analytic(dspf* x) { return dspfi_analytic(x); }
+inline int dspi_hilbert(dspf* x) { return dspfi_hilbert(x); }
+
+namespace wavkit::test {
+namespace {
+
+template <class R>
+class DftTest : public ::testing::Test {};
+TYPED_TEST_SUITE(DftTest, Precisions);
+
+/// 10 epsilon log2(n), what any transform may lose.
+template <class R>
+long double bound(int n) {
+    return 10 * static_cast<long double>(epsilon<R>) * std::log2(static_cast<long double>(n));
+}
+
+/// The error over `checked` bins spread over the spectrum, relative to the norm of those bins.
+template <class R>
+long double error_at_some_bins(const R* spectrum, const Samples& x, int checked, Noise& noise) {
+    const auto n = std::int64_t(x.size());
+    Samples roots(x.size());
+    for (std::int64_t k = 0; k < n; ++k) roots[std::size_t(k)] = unit_root(-k, n);
+    long double difference = 0, norm = 0;
+    for (int c = 0; c < checked; ++c) {
+        const auto k = checked == n ? c : std::int64_t((noise() + 1) / 2 * n);
+        std::complex<long double> sum = 0;
+        for (std::int64_t i = 0, at = 0; i < n; ++i, at = at + k < n ? at + k : at + k - n) {
+            const auto& a = x[std::size_t(i)];
+            const auto& w = roots[std::size_t(at)];
+            sum += std::complex<long double>(a.real() * w.real() - a.imag() * w.imag(),
+                                             a.real() * w.imag() + a.imag() * w.real());
+        }
+        sum /= static_cast<long double>(n);
+        const auto bin = bins(spectrum)[std::size_t(k)];
+        difference += std::norm(sum - std::complex<long double>(bin.re, bin.im));
+        norm += std::norm(sum);
+    }
+    return std::sqrt(difference / norm);
+}
+
+TYPED_TEST(DftTest, EveryLengthMeetsTheErrorBound) {
+    using R = TypeParam;
+    Noise noise;
+    for (int n = 2; n <= 2048; ++n) {
+        auto x = noise.complex<R>(n);
+        const Samples samples = samples_of<R>(x);
+        ASSERT_EQ(dspi_dft(x, 0), 0);
+        ASSERT_EQ(x->points, n);
+        ASSERT_LT(error_at_some_bins<R>(x, samples, n <= 256 ? n : 24, noise), bound<R>(n)) << n;
+        ASSERT_EQ(dspi_dft(x, 1), 0);
+        ASSERT_LT(relative_error<R>(x, samples), bound<R>(n)) << n;
+    }
+}
+
+TYPED_TEST(DftTest, DirectionsAndLengthsMayAlternate) {
+    using R = TypeParam;
+    Noise noise;
+    // Direction changes, length changes, both, and a fresh start, over the one cached chirp.
+    const int steps[][2] = {{6, 0},  {6, 1}, {6, 1},  {6, 0},  {7, 0}, {5, 1}, {5, 0},
+                            {12, 1}, {0, 0}, {12, 1}, {12, 0}, {0, 0}, {3, 0}};
+    for (const auto& [n, inverse] : steps) {
+        if (n == 0) {
+            ASSERT_EQ(free_internal<R>(), 0);
+            continue;
+        }
+        for (const auto& x : {noise.real<R>(n), noise.complex<R>(n)}) {
+            Signal<R> y = x;
+            const Samples samples = samples_of<R>(y);
+            ASSERT_EQ(dspi_dft(y, inverse), 0);
+            const Samples expected = inverse ? direct_sum(samples, 1) : forward_transform(samples);
+            EXPECT_LT(relative_error<R>(y, expected), bound<R>(n)) << n << ' ' << inverse;
+        }
+    }
+}
+
+TYPED_TEST(DftTest, SpacingAndCapacity) {
+    using R = TypeParam;
+    auto x = Noise().real<R>(6);
+    x->delta = scalar<R>(0.25);
+    ASSERT_EQ(dspi_dft(x, 0), 0);
+    EXPECT_EQ(x->delta, scalar<R>(1 / 1.5));
+    EXPECT_EQ(x->alloc, 2 * 16);  // the convolution's room stays
+    x->delta = 0;
+    ASSERT_EQ(dspi_dft(x, 0), 0);
+    EXPECT_EQ(x->delta, limits<R>::big);
+
+    auto one = real<R>({5}, 4);
+    ASSERT_EQ(dspi_dft(one, 0), 0);
+    EXPECT_TRUE(is_real<R>(one, {5}));
+    EXPECT_EQ(one->delta, scalar<R>(0.25));
+    Signal<R> none;
+    none->delta = 0;
+    ASSERT_EQ(dspi_dft(none, 1) || dspi_rdft(none), 0);
+    EXPECT_EQ(none->delta, 1 / limits<R>::big);
+
+    auto eight = Noise().complex<R>(8), same = eight;
+    ASSERT_EQ(dspi_dft(eight, 0) || dspi_fft(same, 0), 0);
+    EXPECT_TRUE(matches<R>(eight, same));
+
+    Signal<R> huge;
+    huge->points = (1 << 29) + 3;
+    EXPECT_EQ(dspi_dft(huge, 0), -1);
+
+    Borrowed<R> host(complex<R>({1, 2, 3}));
+    const auto before = host.host;
+    ASSERT_EQ(dspi_dft(host, 0), 0);
+    EXPECT_EQ(host.host, before);
+}
+
+TYPED_TEST(DftTest, HalfSpectraOfRealSignals) {
+    using R = TypeParam;
+    for (const int n : {1, 2, 3, 4, 5, 6, 7, 12, 16, 31, 100}) {
+        const auto x = Noise().real<R>(n);
+        Samples expected = forward_transform(samples_of<R>(x.operator->()));
+        expected.resize(std::size_t(n) / 2 + 1);
+        Signal<R> y = x;
+        y->delta = scalar<R>(0.5);
+        ASSERT_EQ(dspi_rdft(y), 0);
+        EXPECT_EQ(bool(y->complex), n > 1);
+        EXPECT_LT(relative_error<R>(y, expected), bound<R>(n + 1)) << n;
+        ASSERT_EQ(dspi_irdft(y, n % 2), 0);
+        EXPECT_TRUE(matches<R>(y, x, 20)) << n;
+        EXPECT_NEAR(y->delta, 0.5, epsilon<R>);
+    }
+    auto refused = complex<R>({1, 2, 3});
+    EXPECT_EQ(dspi_rdft(refused) && dspi_dct(refused, 0), true);
+    EXPECT_TRUE(is_complex<R>(refused, {1, 2, 3}));
+}
+
+TYPED_TEST(DftTest, CosineTransformByItsDefinition) {
+    using R = TypeParam;
+    const long double root_two = std::sqrt(2.0L);
+    for (const int n : {1, 2, 3, 4, 5, 8, 9, 30, 30, 64, 17}) {
+        for (const int normalised : {0, 2}) {
+            const auto x = Noise().real<R>(n);
+            std::vector<long double> expected;
+            for (int k = 0; k < n; ++k) {
+                long double sum = 0;
+                for (int i = 0; i < n; ++i) {
+                    sum += x[i] * unit_root(std::int64_t(k) * (2 * i + 1), 4 * n).real();
+                }
+                const long double scale = !normalised ? 1 : k == 0 ? root_two : 2;
+                expected.push_back(sum / n * scale);
+            }
+            Signal<R> y = x;
+            y->delta = scalar<R>(0.125);
+            ASSERT_EQ(dspi_dct(y, normalised), 0);
+            EXPECT_TRUE(is_real<R>(y, expected, 16)) << n;
+            EXPECT_NEAR(y->delta, 4.0 / n, 8 * epsilon<R>);
+            ASSERT_EQ(dspi_dct(y, normalised | 1), 0);
+            EXPECT_TRUE(matches<R>(y, x, 32)) << n;
+            EXPECT_NEAR(y->delta, 0.125, epsilon<R>);
+        }
+    }
+    Signal<R> none;
+    none->delta = 4;
+    ASSERT_EQ(dspi_dct(none, 1), 0);
+    EXPECT_EQ(none->delta, scalar<R>(0.125));
+    none->delta = 0;
+    ASSERT_EQ(dspi_dct(none, 0), 0);
+    EXPECT_EQ(none->delta, limits<R>::big);
+    auto still = real<R>({1, 2, 3}, 0);
+    ASSERT_EQ(dspi_dct(still, 0), 0);
+    EXPECT_EQ(still->delta, limits<R>::big / 2);
+}
+
+/// cos and sin of a cosine's bin, for every bin strictly between 0 and N/2.
+TYPED_TEST(DftTest, AnalyticSignalsOfCosines) {
+    using R = TypeParam;
+    for (const int n : {7, 8, 9, 16, 50}) {
+        for (int f = 1; 2 * f < n; ++f) {
+            Samples turning;
+            std::vector<long double> cosine, sine, wave;
+            for (int i = 0; i < n; ++i) {
+                turning.push_back(unit_root(std::int64_t(f) * i, n) * 3.0L);
+                cosine.push_back(turning.back().real());
+                sine.push_back(turning.back().imag());
+                wave.push_back(cosine.back() + 5 + (n % 2 == 0 && i % 2 == 0 ? 1 : 0));
+            }
+            auto x = real<R>(cosine, 0.5);
+            ASSERT_EQ(dspi_analytic(x), 0);
+            EXPECT_TRUE(is_complex<R>(x, turning, 24)) << n << ' ' << f;
+            EXPECT_NEAR(x->delta, 0.5, epsilon<R>);
+            auto y = real<R>(wave);  // with a mean and a component at half the sampling rate
+            ASSERT_EQ(dspi_hilbert(y), 0);
+            EXPECT_TRUE(is_real<R>(y, sine, 48)) << n << ' ' << f;
+            Signal<R> z(turning);
+            ASSERT_EQ(dspi_hilbert(z), 0);
+            for (auto& sample : turning) sample *= std::complex<long double>(0, -1);
+            EXPECT_TRUE(is_complex<R>(z, turning, 24));
+        }
+    }
+    auto one = real<R>({3}), hilbert_of_one = one;
+    ASSERT_EQ(dspi_analytic(one) || dspi_hilbert(hilbert_of_one), 0);
+    EXPECT_TRUE(is_real<R>(one, {3}));
+    EXPECT_TRUE(is_real<R>(hilbert_of_one, {0}));
+    Signal<R> none;
+    EXPECT_EQ(dspi_analytic(none) || dspi_hilbert(none), 0);
+    auto constant = real<R>({2, 2, 2, 2, 2}, 0);
+    ASSERT_EQ(dspi_analytic(constant), 0);
+    EXPECT_TRUE(is_complex<R>(constant, {2, 2, 2, 2, 2}, 8));
+    EXPECT_NEAR(double(constant->delta) * double(limits<R>::big) * 5, 1, 1e-5);
+}
+
+TYPED_TEST(DftTest, FailingGrowthIsReportedAndLeavesNoHalfBuiltTable) {
+    using R = TypeParam;
+    const auto x = Noise().real<R>(11);
+    const auto growths = [&](auto transform) {
+        return fail_each_growth<R>([&] {
+            free_internal<R>();
+            Borrowed<R> y(x);
+            return transform(y);
+        });
+    };
+    EXPECT_EQ(growths([](R* y) { return dspi_dft(y, 0); }), 3);  // chirp, filter, signal
+    EXPECT_EQ(growths([](R* y) { return dspi_dct(y, 0); }), 4);  // and the scratch record
+
+    FailingAllocator<R> memory(1);  // the filter
+    Borrowed<R> y(x), z(x);
+    free_internal<R>();
+    EXPECT_EQ(dspi_dft(y, 0), -1);
+    EXPECT_EQ(dspi_dft(z, 0), 0);
+    EXPECT_LT(relative_error<R>(z, forward_transform(samples_of<R>(x.operator->()))), bound<R>(11));
+}
+
+}  // namespace
+}  // namespace wavkit::test
