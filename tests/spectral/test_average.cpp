@@ -1,0 +1,181 @@
+// Running averages and sliding correlation.
+#include <cmath>
+
+#include "support/failing_allocator.hpp"
+#include "support/oracles.hpp"
+
+inline int dsph_avg(dspf* input, dspf* avg, dspf* scratch, int flags, int count, int every,
+                    float weight, float limit) {
+    return dspfh_avg(input, avg, scratch, flags, count, every, weight, limit);
+}
+inline int dsph_corr(const dspf* a, const dspf* b, dspf* out, dspf* scratch, int m, int half) {
+    return dspfh_corr(a, b, out, scratch, m, half);
+}
+inline int dspb_corr(const dspf* a, const dspf* b, dspf* out, dspf* scratch, int m) {
+    return dspfb_corr(a, b, out, scratch, m);
+}
+
+namespace wavkit::test {
+namespace {
+
+template <class R>
+constexpr R* null = nullptr;
+
+template <class R>
+class AverageTest : public ::testing::Test {};
+TYPED_TEST_SUITE(AverageTest, Precisions);
+
+TYPED_TEST(AverageTest, TheFirstSpectrumStartsEveryAverage) {
+    using R = TypeParam;
+    for (int type = 0; type < 16; ++type) {
+        for (const int count : {1, 0, -3}) {
+            auto x = complex<R>({{1, 2}, {3, 4}}, 0.5);
+            auto avg = real<R>({9});
+            ASSERT_EQ(dsph_avg(x.get(), avg.get(), null<R>, type, count, 0, -1, 0), 0);
+            EXPECT_TRUE(is_complex<R>(avg, {{1, 2}, {3, 4}}));
+            EXPECT_EQ(avg->delta, scalar<R>(0.5));
+        }
+    }
+}
+
+TYPED_TEST(AverageTest, EachTypeByHand) {
+    using R = TypeParam;
+    const struct {
+        int flags, count, every;
+        double weight, limit;
+        std::vector<long double> expected;  // of the spectrum {2, 8} and the average {4, 2}
+    } cases[] = {
+        {0, 5, 0, 0.25, 0, {2, 8}},
+        {1, 4, 0, -1, 0, {3.5L, 3.5L}},     // 1/4
+        {1, 4, 0, 0.5, 0, {3, 5}},          // the caller's share
+        {1, 4, 0, 0, 0, {4, 2}},            // none of it
+        {0x11, 10, 0, -1, 2, {3, 5}},       // 1/2 from the second spectrum on
+        {0x11, 4, 0, -1, 5, {3.5L, 3.5L}},  // not yet
+        {0x01, 4, 0, -1, 2, {3.5L, 3.5L}},  // not asked for
+        {2, 3, 0, -1, 0, {4, 8}},
+        {3, 3, 0, -1, 0, {2, 2}},
+        {4, 2, 0, -1, 0, {8 / 3.0L, 16 / 5.0L}},
+        {5, 2, 0, -1, 0, {std::sqrt(8.0L), 4}},
+        {6, 4, 3, -1, 0, {2, 8}},  // counts 1, 4, 7, ...
+        {6, 5, 3, -1, 0, {4, 2}},
+        {6, 5, 1, -1, 0, {2, 8}},
+        {6, 5, 0, -1, 0, {4, 2}},
+        {7, 5, 1, 1, 0, {4, 2}},
+        {15, 5, 1, 1, 0, {4, 2}},
+        {0x21, 4, 0, 0.5, 0, {4, 33}},  // |x|^2 is averaged
+    };
+    for (const auto& c : cases) {
+        for (const bool with_scratch : {false, true}) {
+            auto x = real<R>({2, 8});
+            auto avg = real<R>({4, 2});
+            Signal<R> scratch;
+            ASSERT_EQ(dsph_avg(x.get(), avg.get(), with_scratch ? scratch.get() : null<R>, c.flags,
+                               c.count, c.every, scalar<R>(c.weight), scalar<R>(c.limit)),
+                      0);
+            EXPECT_TRUE(is_real<R>(avg, c.expected, 8)) << c.flags << ' ' << c.count;
+            EXPECT_TRUE(is_real<R>(x, {2, 8}));
+        }
+    }
+}
+
+TYPED_TEST(AverageTest, TheInputMayServeAsScratch) {
+    using R = TypeParam;
+    auto x = complex<R>({{3, 4}, {0, 2}});
+    auto avg = real<R>({5, 0});
+    ASSERT_EQ(dsph_avg(x.get(), avg.get(), x.get(), 0x21, 2, 0, -1, 0), 0);
+    EXPECT_TRUE(is_real<R>(avg, {15, 2}));
+    auto y = real<R>({2, 8});
+    auto harmonic = real<R>({4, 2});
+    ASSERT_EQ(dsph_avg(y.get(), harmonic.get(), y.get(), 4, 2, 0, -1, 0), 0);
+    EXPECT_TRUE(is_real<R>(harmonic, {8 / 3.0L, 16 / 5.0L}, 4));
+}
+
+TYPED_TEST(AverageTest, FailureLeavesTheAverageAsItWas) {
+    using R = TypeParam;
+    for (const int flags : {1, 2, 4, 5, 0x21}) {
+        auto x = real<R>({2, 8});
+        auto avg = real<R>({4, 2, 1});
+        EXPECT_EQ(dsph_avg(x.get(), avg.get(), null<R>, flags, 2, 0, -1, 0), -1);
+        EXPECT_TRUE(is_real<R>(avg, {4, 2, 1}, 4)) << flags;
+    }
+    for (const int flags : {4, 5, 0x21, 0x24}) {
+        auto x = real<R>({2, 8});
+        auto avg = real<R>({4, 2});
+        fail_each_growth<R>([&] {
+            const int result = dsph_avg(x.get(), avg.get(), null<R>, flags, 2, 0, 0, 0);
+            EXPECT_NEAR(avg[0], 4, 16 * epsilon<R>) << flags;
+            EXPECT_NEAR(avg[1], 2, 16 * epsilon<R>) << flags;
+            return result;
+        });
+    }
+}
+
+/// (1/m) sum of conj(a[n]) b[n + k]
+Samples correlation(const Samples& a, const Samples& b, std::size_t m) {
+    Samples sums(b.size() - m + 1);
+    for (std::size_t k = 0; k < sums.size(); ++k) {
+        for (std::size_t n = 0; n < m; ++n) sums[k] += std::conj(a[n]) * b[n + k];
+        sums[k] /= static_cast<long double>(m);
+    }
+    return sums;
+}
+
+TYPED_TEST(AverageTest, CorrelationBySlidingSums) {
+    using R = TypeParam;
+    Noise noise;
+    for (const auto& [points, m] : {std::pair{1, 1}, {2, 1}, {5, 5}, {8, 3}, {100, 37}, {129, 1}}) {
+        for (const int kinds : {0, 1, 2, 3}) {
+            auto a = kinds & 1 ? noise.complex<R>(m + 2) : noise.real<R>(m + 2);
+            auto b = kinds & 2 ? noise.complex<R>(points) : noise.real<R>(points);
+            a->delta = 1;
+            b->delta = 2;
+            const Samples expected =
+                correlation(samples_of<R>(a), samples_of<R>(b), std::size_t(m));
+            const auto check = [&](R* out, const char* what) {
+                EXPECT_EQ(bool(out->complex), kinds != 0) << what;
+                ASSERT_EQ(out->points, points - m + 1);
+                EXPECT_EQ(out->delta, scalar<R>(1.5));
+                const Samples got = samples_of<R>(out);
+                for (std::size_t k = 0; k < got.size(); ++k) {
+                    EXPECT_LT(std::abs(got[k] - expected[k]), 16 * epsilon<R>) << what << points;
+                }
+            };
+            Signal<R> out, scratch;
+            ASSERT_EQ(dspb_corr(a.get(), b.get(), out.get(), scratch.get(), m), 0);
+            check(out, "apart");
+            // The output, or the scratch record, may be any of the operands.
+            const Signal<R> first = a, second = b;
+            ASSERT_EQ(dspb_corr(a.get(), b.get(), a.get(), null<R>, m), 0);
+            check(a, "over a");
+            a = first;
+            ASSERT_EQ(dspb_corr(a.get(), b.get(), b.get(), a.get(), m), 0);
+            check(b, "over b");
+            EXPECT_TRUE(matches<R>(a, first));
+            b = second;
+            Borrowed<R> host(b);
+            ASSERT_EQ(dspb_corr(a.get(), host.operator->(), host, host, m), 0);
+            check(host, "over a host's array");
+            EXPECT_EQ(host.host, scalars<R>(second));
+        }
+    }
+}
+
+TYPED_TEST(AverageTest, CorrelationLimits) {
+    using R = TypeParam;
+    auto a = real<R>({1, 2, 3}), b = real<R>({4, 5});
+    Signal<R> out;
+    for (const int m : {0, -1, 3})
+        EXPECT_EQ(dsph_corr(a.get(), b.get(), out.get(), null<R>, m, 0), -1);
+    EXPECT_EQ(dsph_corr(b.get(), a.get(), out.get(), null<R>, 3, 0), -1);
+    EXPECT_EQ(out->points, 0);
+    ASSERT_EQ(dsph_corr(a.get(), b.get(), out.get(), null<R>, 2, 1), 0);
+    EXPECT_TRUE(is_real<R>(out, {3.5L}, 2));
+    EXPECT_GE(fail_each_growth<R>([&] {
+                  Signal<R> result;
+                  return dsph_corr(a.get(), b.get(), result.get(), null<R>, 1, 0);
+              }),
+              2);
+}
+
+}  // namespace
+}  // namespace wavkit::test
