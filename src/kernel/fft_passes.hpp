@@ -174,6 +174,15 @@ void direct(const FftPlan<T>& plan, T* data, T* work, T scale) {
     last_pass<T, V, Outside>(from, data, n, stride, stride, stride, scale);
 }
 
+/// A transform of 16 or 32 points: two passes with everything known to the compiler, which keeps
+/// what lies between them in registers.
+template <class T, int V, std::size_t Points, Layout Outside>
+void short_direct(const FftPlan<T>& plan, T* data, T scale) {
+    alignas(64) T between[2 * Points];
+    short_pass<T, V, 1, Outside>(data, between, Points, plan.twiddles);
+    last_pass<T, V, Outside>(between, data, Points / 4, 4, 4, 4, scale);
+}
+
 /// The columns of a strip of a matrix, all but the last pass of their transforms.
 template <class T>
 struct Strip {
@@ -304,8 +313,10 @@ template <class T, int Narrow, int Wide, Layout Outside>
 inline void one_direction(const FftPlan<T>& plan, T* data, T* work, T scale) {
     if (plan.points < 16) {
         tiny<T, Outside>(plan.points, data, scale);
-    } else if (plan.points < wide_from) {
-        direct<T, Narrow, Outside>(plan, data, work, scale);
+    } else if (plan.points == 16) {
+        short_direct<T, Narrow, 16, Outside>(plan, data, scale);
+    } else if (plan.points == 32) {
+        short_direct<T, Narrow, 32, Outside>(plan, data, scale);
     } else if (plan.points <= direct_limit<T>) {
         direct<T, Wide, Outside>(plan, data, work, scale);
     } else {
