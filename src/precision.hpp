@@ -227,6 +227,8 @@ inline int dspi_window(dspf* x, int window, int scale_type) {
     return dspfi_window(x, window, scale_type);
 }
 
+inline int dspc_line(dspf* x, float slope, float offset) { return dspfc_line(x, slope, offset); }
+
 inline int dsps_sum(const dspf* x, dspf* out) { return dspfs_sum(x, out); }
 inline int dsps_mean(const dspf* x, dspf* out) { return dspfs_mean(x, out); }
 inline int dsps_rms(const dspf* x, dspf* out) { return dspfs_rms(x, out); }

@@ -5,6 +5,8 @@
 
 #include "binary.h"
 #include "file.h"
+#include "filter.h"
+#include "generate.h"
 #include "layout.h"
 #include "library.h"
 #include "math.h"

@@ -162,6 +162,14 @@ WAVKIT_API int dspfi_edge(dspf *x, int direction, float level);
 WAVKIT_API int dspi_pdiffer(dsp *x);
 WAVKIT_API int dspfi_pdiffer(dspf *x);
 
+/** Puts the points into random order, every order being equally likely; complex points stay whole.
+ *  Draws from the same source of random numbers as dspc_rand().
+ *
+ *  R. Durstenfeld, "Algorithm 235: Random permutation", 1964.
+ *  @return 0 */
+WAVKIT_API int dspi_shuffle(dsp *x);
+WAVKIT_API int dspfi_shuffle(dspf *x);
+
 WAVKIT_API int dspu_mag(const dsp *source, dsp *destination);
 WAVKIT_API int dspfu_mag(const dspf *source, dspf *destination);
 

@@ -1,0 +1,73 @@
+/** @file generate.h
+ *  Test and reference signals: cosines, complex exponentials, straight lines, random samples.
+ *
+ *  A generator fills a record that says what is wanted: the caller sets `points`, `complex` and
+ *  `delta`, the function makes room with dsp_alloc() (a borrowed buffer is replaced, never written)
+ *  and overwrites every sample. Sample n lies at the time n delta, so that frequencies are in
+ *  hertz where `delta` is in seconds. `points` and `delta` do not change; no points or a negative
+ *  number of them is no error. On a failed allocation the record is left empty. */
+#ifndef WAVKIT_GENERATE_H
+#define WAVKIT_GENERATE_H
+
+#include "types.h"
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+/** Cosine: x[n] = cos(2 pi freq delta n + phase).
+ *  The phase of every 256th sample is computed afresh, in double and without the rounding error of
+ *  freq delta n growing with n: long signals stay in phase in both precisions. A complex record
+ *  gets imaginary parts 0.
+ *  @param freq   frequency in cycles per unit of `delta`; may be negative
+ *  @param phase  phase of sample 0 in radians
+ *  @return 0, or -1 when memory runs out */
+WAVKIT_API int dspc_cos(dsp *x, double freq, double phase);
+WAVKIT_API int dspfc_cos(dspf *x, float freq, float phase);
+
+/** Complex exponential: x[n] = cos(a) + i sin(a) with a = 2 pi freq delta n + phase. A real record
+ *  gets the real parts, as from dspc_cos().
+ *  @return 0, or -1 when memory runs out */
+WAVKIT_API int dspc_cexp(dsp *x, double freq, double phase);
+WAVKIT_API int dspfc_cexp(dspf *x, float freq, float phase);
+
+/** Adds a cosine to the samples of a record, to the real parts of a complex one:
+ *  x[n] += amplitude cos(2 pi freq delta n + phase). Works in place, in a borrowed buffer too.
+ *  @return 0 */
+WAVKIT_API int dspi_addcos(dsp *x, double amplitude, double freq, double phase);
+WAVKIT_API int dspfi_addcos(dspf *x, float amplitude, float freq, float phase);
+
+/** Straight line: x[n] = offset + n slope delta, in the record's precision, every sample being the
+ *  one before plus slope delta. A complex record gets imaginary parts 0.
+ *  @param slope   rise per unit of `delta`
+ *  @param offset  value of sample 0
+ *  @return 0, or -1 when memory runs out */
+WAVKIT_API int dspc_line(dsp *x, double slope, double offset);
+WAVKIT_API int dspfc_line(dspf *x, float slope, float offset);
+
+/** Random samples of one of four distributions:
+ *
+ *  | type | real record                                  | complex record                         |
+ *  |------|----------------------------------------------|----------------------------------------|
+ *  | 0    | uniform from -1 up to, not including, 1      | uniform over the unit disc without rim |
+ *  | 1    | standard normal                              | both parts standard normal             |
+ *  | 2    | exponential with mean 1                      | fails                                  |
+ *  | 3    | Laplace: exponential with a random sign      | fails                                  |
+ *
+ *  Random bits come from the C runtime's rand(), 15 of each call. The first draw in a precision
+ *  seeds it with srand(), differently in every process; a host that wants reproducible samples
+ * calls srand() after a first draw. Normal samples come in pairs: a real record that takes one of a
+ * pair leaves the other one to the next real record of the precision.
+ *
+ *  Normal samples follow G. Marsaglia's polar method (Marsaglia and Bray, 1964) in a real record,
+ *  G. E. P. Box and M. E. Muller (1958) in a complex one.
+ *  @return 0; -1 for another type, for types 2 and 3 with a complex record (its samples are then
+ *          not set), or when memory runs out */
+WAVKIT_API int dspc_rand(dsp *x, int type);
+WAVKIT_API int dspfc_rand(dspf *x, int type);
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif
