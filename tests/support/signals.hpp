@@ -152,6 +152,14 @@ template <Record R>
     return matches<R>(x, want, units);
 }
 
+/// Whether an in-place call succeeds and turns a copy of `x` into `expected`.
+template <Record R>
+::testing::AssertionResult turns(std::type_identity_t<int (*)(R*)> call, Signal<R> x,
+                                 const Signal<R>& expected, double units = 0) {
+    if (call(x)) return ::testing::AssertionFailure() << "the call failed";
+    return matches<R>(x, expected, units);
+}
+
 /// Reproducible values in [-1, 1), without touching the runtime's generator.
 class Noise {
   public:
