@@ -33,7 +33,10 @@ int differentiate_polynomial(R* x) {
     using T = scalar<R>;
     const std::size_t w = width(x), n = used(x);
     T* v = x->data;
-    for (std::size_t i = w; i < n; ++i) v[i - w] = T(i / w) * v[i];
+    for (std::size_t i = w; i < n; ++i) {
+        const std::size_t power = i / w;
+        v[i - w] = T(power) * v[i];
+    }
     x->points = length(x) > 1 ? x->points - 1 : 0;
     return 0;
 }

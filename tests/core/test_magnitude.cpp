@@ -143,7 +143,8 @@ TYPED_TEST(MagnitudeTest, CompanionsLeaveTheSourceInEveryAliasing) {
             }
             EXPECT_EQ(host.host, scalars<R>(source));
             dsp_destroy(&over_host);
-            EXPECT_EQ(fail_each_growth<R>([&] { return apart(source, Signal<R>()); }), 1);
+            EXPECT_EQ(fail_each_growth<R>([&, call = apart] { return call(source, Signal<R>()); }),
+                      1);
         }
     }
 }
