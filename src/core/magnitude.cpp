@@ -95,11 +95,8 @@ scalar<R> square(scalar<R> v) {
 
 template <Record R>
 int take_magnitude_squared(const R* from, R* to) {
-    using T = scalar<R>;
     if (from->complex) {
-        fold_each(from, to, [](Bin<T> z) {
-            return out_of_range<R>(z) ? limits<R>::big : magnitude_squared(z);
-        });
+        fold_each(from, to, [](auto z) { return capped_magnitude_squared<R>(z); });
     } else {
         map(from, to, square<R>);
     }
