@@ -80,8 +80,10 @@ TYPED_TEST(FunctionsTest, AgreeWithTheExactFunctions) {
 TYPED_TEST(FunctionsTest, ComplexLogarithmsClampTheirOwnWay) {
     using R = TypeParam;
     const auto db = [](R* x) { return pick<R>(dspi_db, dspfi_db)(x, 10); };
-    const long double big = limits<R>::big, lowest = std::log((long double)limits<R>::floor);
-    const auto in = complex<R>({0, {-1, -0.0L}, {3, -4}, {2 * big, big / 2}, {-inf, inf}});
+    const long double big = limits<R>::big, floor = limits<R>::floor;
+    const long double lowest = std::log(floor), tiny = std::sqrt(floor) / 2;
+    const auto in =
+        complex<R>({{-tiny, tiny}, {-1, -0.0L}, {3, -4}, {2 * big, big / 2}, {-inf, inf}});
     // Out of range the natural logarithm takes |z|^2 = big, the decimal one the clamped square.
     std::vector<Complex> expected = {lowest,
                                      {0, -pi_exact},
