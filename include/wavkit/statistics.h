@@ -1,5 +1,19 @@
 /** @file statistics.h
- *  A signal reduced to a value, a histogram or a peak. */
+ *  A signal reduced to one value, to a histogram or to a peak.
+ *
+ *  The input is read only and its `delta` is not used. The functions down to dsps_hmean() size
+ *  `out` as one point, real unless said otherwise, and leave its `delta` alone. `out` may be the
+ *  input or a record over its buffer. N is the number of points; the value for an empty record is
+ *  0 except where another one is named, and an empty record is no error.
+ *
+ *  B stands for the large value, 1e100 in double and 1e15 in single precision: values beyond +-B
+ *  count as +-B in the sums of powers and deviations, and B marks a ratio whose denominator is 0.
+ *  Long signals are summed in blocks of 2048 points, which bounds the rounding error; the
+ *  single-precision functions add in single precision. NaN goes through the sums, and loses every
+ *  comparison.
+ *
+ *  Every function returns 0 on success and -1 on failure: when `out` cannot be sized (it then has
+ *  no memory, but its new `points` and `complex`), and where said. */
 #ifndef WAVKIT_STATISTICS_H
 #define WAVKIT_STATISTICS_H
 
@@ -9,54 +23,138 @@
 extern "C" {
 #endif
 
+/** Sum of all points; complex for a complex signal. Not held within B.
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_sum(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_sum(const dspf *x, dspf *out);
 
+/** Arithmetic mean, the sum divided by N; complex for a complex signal.
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_mean(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_mean(const dspf *x, dspf *out);
 
+/** Smallest and largest value, or the point of smallest and largest squared magnitude of a complex
+ *  signal; the first of equal ones. The result of a complex signal is the point as it stands.
+ *
+ *  The search starts from B (dsps_min()) or -B (dsps_max()), and NaN never wins: where no value
+ *  lies beyond the start, the start is the result. A complex point with a part beyond +-B ranks as
+ *  the squared magnitude B. The smallest such point is never taken: where there is no other, the
+ *  result is (B, B). A complex signal of NaN alone has the largest point (0, 0).
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_min(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_min(const dspf *x, dspf *out);
 
 WAVKIT_API int dsps_max(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_max(const dspf *x, dspf *out);
 
+/** Median: the middle point in the order of dspi_sort(), for an even N the mean of the two middle
+ *  ones; complex for a complex signal.
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_median(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_median(const dspf *x, dspf *out);
 
+/** Energy: the sum of |x[n]|^2. A point with a part beyond +-B contributes B.
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_magsq_sum(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_magsq_sum(const dspf *x, dspf *out);
 
+/** Root mean square: sqrt(energy / N), with the energy of dsps_magsq_sum().
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_rms(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_rms(const dspf *x, dspf *out);
 
+/** Variance of a population: the mean of |x[n] - mean|^2, in one pass about a shift taken from
+ *  three samples. Rounding may leave a constant signal a variance just below 0.
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_pop_var(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_pop_var(const dspf *x, dspf *out);
 
+/** Variance estimated from a sample: N / (N - 1) times the population's; that of one point is the
+ *  population's.
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_samp_var(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_samp_var(const dspf *x, dspf *out);
 
+/** Standard deviations: the square roots of the variances, NaN for one just below 0.
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_pop_stddev(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_pop_stddev(const dspf *x, dspf *out);
 
 WAVKIT_API int dsps_samp_stddev(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_samp_stddev(const dspf *x, dspf *out);
 
+/** Skewness of a real signal: its third central moment over the 3/2 power of its variance. With a
+ *  vanishing variance it is 0, or B where the third moment remains.
+ *  @return 0, or -1 for a complex signal (`out` is then untouched) or when memory runs out */
 WAVKIT_API int dsps_skew(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_skew(const dspf *x, dspf *out);
 
+/** Excess kurtosis of a real signal: its fourth central moment over the square of its variance,
+ *  less 3. With a vanishing variance it is -3, or B where the fourth moment remains; -3 for an
+ *  empty record.
+ *  @return 0, or -1 for a complex signal (`out` is then untouched) or when memory runs out */
 WAVKIT_API int dsps_excess(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_excess(const dspf *x, dspf *out);
 
+/** Geometric mean: the N-th root of the product of all points, for a complex signal the principal
+ *  root. The product is formed as it stands; 0 when it is negative or lies below the smallest
+ *  normal number (for a complex signal, when its squared magnitude does).
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_gmean(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_gmean(const dspf *x, dspf *out);
 
+/** Harmonic mean: N over the sum of 1 / x[n]; complex for a complex signal.
+ *
+ *  A real signal with a zero gives 0, one whose reciprocals cancel gives B. The parts of complex
+ *  points are held within +-B, and 1 / |z|^2 is B for a vanishing |z|^2, for the points as for
+ * their sum.
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_hmean(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_hmean(const dspf *x, dspf *out);
 
+/** Histogram: counts the values, or the magnitudes of a complex signal, in bins of equal width.
+ *
+ *  A value v counts in bin floor((v - lo) / width). The upper edge lo + nbins * width, and what
+ * lies within ten rounding steps above it, counts in the last bin; other values outside and NaN are
+ *  dropped. With a width of 0 only values equal to `lo` count, in bin 0. A complex point with a
+ * part beyond +-1e100 (1e15 in single precision) has that magnitude.
+ *  @param x      real or complex signal
+ *  @param out    `nbins` real points, the counts; `delta` is the bin width. May be x
+ *  @param lo     lower edge of the first bin
+ *  @param width  width of a bin
+ *  @param nbins  number of bins; a negative one is 0
+ *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_hist(const dsp *x, dsp *out, double lo, double width, int nbins);
 WAVKIT_API int dspfs_hist(const dspf *x, dspf *out, float lo, float width, int nbins);
 
+/** Finds the largest point of a signal and refines its height and position between the samples. A
+ *  complex signal is measured by its squared magnitude |x[n]|^2.
+ *
+ *  Bits of `flags`; the others are ignored:
+ *  - 0x1000: take the point at `index` (held within the record) instead of searching
+ *  - 0x2000: search for the smallest point instead of the largest
+ *
+ *  and one of four interpolations, with y[k] the point that was taken:
+ *  - 0x000: none
+ *  - 0x100: the vertex of the parabola through y[k - 1], y[k] and y[k + 1]; none at either end. Not
+ *    guarded against three points in a line.
+ *  - 0x200: a bell curve through y[k] and its larger neighbour, from the logarithm of their ratio.
+ *    From the lower j of the two, the position is j + d with
+ *    d = ln(y[j + 1] / y[j]) / (4 c) + 1/2 and the height exp(c d^2) y[j], c = 0.315563649157834.
+ *    d is held within [-0.5, 1.5]; where it had to be, the call returns -1 with the result written.
+ *    None for a record of one point.
+ *  - 0x300: the same, with d' = d - 1/2 replaced by d' (1 - 0.02036 (d'^2 - 1/4))
+ *
+ *  The search takes the first of equal points and passes over NaN and over values beyond +-1e100
+ *  (1e15 in single precision) on the far side; where nothing is found it takes the first point. A
+ *  complex point with a part beyond that ranks as the squared magnitude 1e100 (1e15).
+ *  @param x      real or complex signal
+ *  @param out    two real points: the height, and the position in samples (`delta` is not applied);
+ *                0 and 0 for an empty record. `delta` is kept, but becomes 1 when out is x.
+ *  @param flags  see above
+ *  @param index  the point to take with 0x1000
+ *  @return 0, or -1 when memory runs out, d was held or the interpolation is none of these (the
+ *          result is then 0 and 0) */
 WAVKIT_API int dsps_peak(const dsp *x, dsp *out, unsigned flags, int index);
 WAVKIT_API int dspfs_peak(const dspf *x, dspf *out, unsigned flags, int index);
 

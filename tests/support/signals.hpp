@@ -160,6 +160,22 @@ template <Record R>
     return matches<R>(x, expected, units);
 }
 
+/// Calls `use(in, out)` on outputs that share the input's buffer in every way: not at all, as the
+/// same record, as the same record over a host's array, and as the owner of what the input views.
+template <Record R, class Use>
+void in_every_place(const Signal<R>& x, Use use) {
+    Signal<R> apart, in_place = x, owner = x;
+    Borrowed<R> borrowed(x);
+    R view = *owner.get(), host = borrowed.record;
+    view.alloc = 0;
+    const R* source = x;
+    use(source, apart.get());
+    use(in_place.get(), in_place.get());
+    use(&borrowed.record, &borrowed.record);
+    use(&view, owner.get());
+    EXPECT_TRUE(matches<R>(&host, x)) << "the host's array was written";
+}
+
 /// Reproducible values in [-1, 1), without touching the runtime's generator.
 class Noise {
   public:

@@ -1,0 +1,67 @@
+// Histogram of values or magnitudes.
+#include <algorithm>
+
+#include "precision.hpp"
+
+namespace wavkit {
+namespace {
+
+/// The position of a value in units of the bin width. A width of 0 has room for `lo` itself alone.
+template <Record R>
+scalar<R> position(scalar<R> above_lo, scalar<R> width) {
+    if (width != 0) return above_lo / width;
+    return above_lo == 0 ? scalar<R>(0) : limits<R>::big;
+}
+
+template <Record R, class Value>
+void count(const R* x, R* out, scalar<R> lo, scalar<R> width, Value value) {
+    using T = scalar<R>;
+    const auto counts = values(out);
+    const T top = T(counts.size());
+    const T above_top = top * (1 + 10 * std::numeric_limits<T>::epsilon());
+    for (std::size_t i = 0; i < length(x); ++i) {
+        const T at = position<R>(value(i) - lo, width);
+        if (at >= 0 && at < top) {
+            ++counts[std::size_t(at)];
+        } else if (at >= top && at < above_top) {
+            ++counts.back();  // the upper edge, as exactly as division finds it
+        }
+    }
+}
+
+template <Record R>
+scalar<R> magnitude(Bin<scalar<R>> z) {
+    return out_of_range<R>(z) ? limits<R>::big : std::sqrt(magnitude_squared(z));
+}
+
+template <Record R>
+int histogram_apart(const R* x, R* out, scalar<R> lo, scalar<R> width, int bin_count) {
+    out->delta = width;
+    out->points = std::max(bin_count, 0);
+    out->complex = 0;
+    if (dsp_alloc(out)) return -1;
+    std::ranges::fill(values(out), scalar<R>(0));
+    if (x->complex) {
+        count(x, out, lo, width, [z = bins(x)](std::size_t i) { return magnitude<R>(z[i]); });
+    } else {
+        count(x, out, lo, width, [v = values(x)](std::size_t i) { return v[i]; });
+    }
+    return 0;
+}
+
+template <Record R>
+int histogram(const R* x, R* out, scalar<R> lo, scalar<R> width, int bin_count) {
+    if (out != x && out->data != x->data) return histogram_apart(x, out, lo, width, bin_count);
+    Temporary<R> counts;
+    return status(histogram_apart<R>(x, counts, lo, width, bin_count) || dsp_copy(out, counts));
+}
+
+}  // namespace
+}  // namespace wavkit
+
+int dsps_hist(const dsp* x, dsp* out, double lo, double width, int nbins) {
+    return wavkit::histogram(x, out, lo, width, nbins);
+}
+int dspfs_hist(const dspf* x, dspf* out, float lo, float width, int nbins) {
+    return wavkit::histogram(x, out, lo, width, nbins);
+}
