@@ -1,0 +1,104 @@
+// Windows that are sums of cosines, the uniform one among them.
+#include <algorithm>
+#include <numeric>
+
+#include "core/tolerance.hpp"
+#include "window/generate.hpp"
+
+namespace wavkit {
+namespace {
+
+/// Sum of a[k] cos(k phi) at phi = 2 pi * position / period, position within half a period, by
+/// Clenshaw's recurrence. Reinsch's form of it, which carries 2 cos(phi) - 2 in the half of the
+/// window next to the centre and 2 cos(phi) + 2 in the outer one, does not lose digits where the
+/// cosine is flat.
+template <class T>
+T cosine_sum(std::span<const T> a, double position, double period) {
+    const bool inner = 4 * position <= period;
+    const double from_extremum = inner ? position : period / 2 - position;
+    const double half_sine = std::sin(pi<double> * from_extremum / period);
+    const T sign = inner ? 1 : -1;
+    const T step = -sign * T(4 * half_sine * half_sine);
+    T b = 0, d = 0;
+    for (std::size_t k = a.size(); k-- > 1;) {
+        d = a[k] + step * b + sign * d;
+        b = d + sign * b;
+    }
+    return a[0] + sign * d + step / 2 * b;
+}
+
+}  // namespace
+
+template <Record R>
+int cosine_sum_fill(R* w, std::span<const scalar<R>> a, int scale_type, scalar<R> win_length) {
+    using T = scalar<R>;
+    if (w->complex || scale_type & DSP_SCALE_SYMMETRIC) return -1;
+    if (w->points < 1) return 0;
+    if (a.empty()) return dspi_zero(w);
+
+    const int n = w->points;
+    const bool has_width = scale_type & DSP_SCALE_WIDTH;
+    const bool narrow = has_width && !(win_length > T(n)) && !tol_equal(win_length, T(n));
+    const double period = has_width ? double(win_length) : n;
+    const int pairs = has_width ? std::min(tol_floor(win_length) / 2, (n - 1) / 2) : (n - 1) / 2;
+    T* const centre = w->data + n / 2;
+
+    std::fill(w->data, centre - pairs, T(0));
+    std::fill(centre + pairs + 1, w->data + n, T(0));
+    centre[0] = std::accumulate(a.begin(), a.end(), T(0));
+    for (int j = 1; j <= pairs; ++j) centre[j] = centre[-j] = cosine_sum(a, j, period);
+
+    if (narrow) {
+        // An even width is periodic like an even window: its first sample has no partner.
+        const int whole = tol_floor(win_length);
+        if (whole % 2 == 0 && tol_equal(win_length, T(whole))) centre[pairs] = 0;
+    } else if (n % 2 == 0) {
+        w->data[0] = cosine_sum(a, pairs + 1, period);
+    }
+    return 0;
+}
+
+template <Record R>
+int uniform_fill(R* w, std::span<const scalar<R>> a, int scale_type, scalar<R> win_length) {
+    using T = scalar<R>;
+    if (w->complex || scale_type & DSP_SCALE_SYMMETRIC || a.size() > 1) return -1;
+    const int n = int(length(w));
+    const int covered = scale_type & DSP_SCALE_WIDTH ? std::min(tol_ceil(win_length), n) : n;
+    std::fill_n(w->data, covered, a.empty() ? T(0) : a[0]);
+    std::fill(w->data + covered, w->data + n, T(0));
+    return 0;
+}
+
+template <Record R>
+scalar<R> aliasing_correction(std::span<const scalar<R>> a, int mode, int n) {
+    using T = scalar<R>;
+    const int terms = int(a.size());
+    if (mode == DSP_SCALE_MEAN && n < terms) {
+        T mean = 0;
+        for (int k = 0; k < terms; k += n) mean += a[k];
+        return a[0] / mean;
+    }
+    if (mode == DSP_SCALE_RMS && n < 2 * terms - 1) {
+        // cos(j phi) cos(k phi) = (cos((k - j) phi) + cos((k + j) phi)) / 2, and over n samples a
+        // cosine of a multiple of n has the mean 1 instead of 0.
+        const auto seen_as_constant = [n](int k) { return T(k % n == 0); };
+        T mean_square = 1;
+        for (int j = 0; j < terms; ++j) {
+            if (j > 0) mean_square += a[j] * a[j] / 2 * seen_as_constant(2 * j);
+            for (int k = j + 1; k < terms; ++k) {
+                mean_square += a[j] * a[k] * (seen_as_constant(k - j) + seen_as_constant(k + j));
+            }
+        }
+        return 1 / std::sqrt(mean_square);
+    }
+    return 1;
+}
+
+template int cosine_sum_fill(dsp*, std::span<const double>, int, double);
+template int cosine_sum_fill(dspf*, std::span<const float>, int, float);
+template int uniform_fill(dsp*, std::span<const double>, int, double);
+template int uniform_fill(dspf*, std::span<const float>, int, float);
+template double aliasing_correction<dsp>(std::span<const double>, int, int);
+template float aliasing_correction<dspf>(std::span<const float>, int, int);
+
+}  // namespace wavkit
