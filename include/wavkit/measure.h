@@ -1,5 +1,12 @@
 /** @file measure.h
- *  Measurement spectra. */
+ *  Measurement spectra: amplitudes of a windowed signal, running averages, sliding correlation.
+ *
+ *  These functions put those of the other headers together in the order that a measurement needs:
+ *  dsph_fft() windows a time record, pads it to a power of two and transforms it so that a sine of
+ *  amplitude A shows A in its bin; dsph_avg() folds spectrum after spectrum into an average.
+ *
+ *  They use the windows and tables that transforms and windows keep, so no two of one precision may
+ *  run at the same time. A step that fails ends the call with -1 and leaves the output part-way. */
 #ifndef WAVKIT_MEASURE_H
 #define WAVKIT_MEASURE_H
 
@@ -9,6 +16,54 @@
 extern "C" {
 #endif
 
+/** What `flags` of dsph_fft() is put together from. */
+enum {
+    DSP_SPECTRUM_INVERSE = 0x01,        /**< from the spectrum to the time record */
+    DSP_SPECTRUM_TWO_SIDED = 0x02,      /**< all frequencies, 0 in the middle; no factor 2 */
+    DSP_SPECTRUM_SUM = 0x04,            /**< sum over the points instead of mean; rotates */
+    DSP_SPECTRUM_NO_WINDOW = 0x08,      /**< rotate as the window would, but leave it out */
+    DSP_SPECTRUM_ROTATED = 0x10,        /**< rotate under the uniform window too */
+    DSP_SPECTRUM_FROM_TWO_SIDED = 0x20, /**< inverse: two-sided input, scaled as a one-sided one */
+    DSP_SPECTRUM_RAW = 0x80             /**< the complex transform and nothing else */
+};
+
+/** Turns a time record into its amplitude spectrum, or back.
+ *
+ *  **Forward.** The transform has L points, the smallest power of two that holds `npts` (or the
+ *  points of the input, when it is below 1). Of the input, the first W = `fraction` * L points
+ *  count, or all when there are fewer: P points, W rounded up. They are multiplied by a window W
+ *  samples wide and of mean 1 (dspi_window2()), padded with zeros and transformed. A real input
+ *  gives
+ *
+ *      X[k] = (2/P) sum w[n] x[n] e^(-2 pi i n k / L),  k = 0 .. L/2
+ *
+ *  where the 2 stands for the negative frequencies. DSP_SPECTRUM_TWO_SIDED asks for all L bins
+ *  with the factor 1/P instead, and the zero frequency at index L/2. A complex input always
+ *  gives all L bins, but by itself keeps the 2. With DSP_SPECTRUM_SUM the factor is 1.
+ *
+ *  A window other than the uniform one is rotated, and the zeros go between its halves, so that n
+ *  counts from the centre of the measured points. DSP_SPECTRUM_SUM does the same under every
+ *  window; DSP_SPECTRUM_ROTATED does, too, but leaves the zeros at the end under the uniform one.
+ *  Windows that know no width (Bartlett, Kaiser, Gauss, Riemann) are refused unless only their
+ *  rotation is asked for. DSP_SPECTRUM_RAW pads with zeros at the end and transforms.
+ *
+ *  **Inverse.** Takes a spectrum back to the first W points, rounded up, of a record of L points.
+ *  With the same `window` and `flags` it undoes the scaling, the padding and the rotation of the
+ *  forward direction, but not the window itself. L is the smallest power of two that holds
+ *  `npts`; when that is below 1, the number of bins of a two-sided spectrum and 2 bins - 2 of a
+ *  one-sided one. Missing bins are zeros, those beyond L are dropped. One-sided spectra give a
+ *  real record.
+ *
+ *  @param in        real or complex
+ *  @param out       the result; `delta` = 1 / (L delta). May be in, or share its buffer.
+ *  @param npts      points that the transform is to hold; taken as 0 with DSP_SPECTRUM_SUM,
+ *                   DSP_SPECTRUM_ROTATED and DSP_SPECTRUM_RAW
+ *  @param fraction  share of the transform that is measured; taken as 1 when it lies outside
+ *                   0 < fraction <= 1, and with the same three flags
+ *  @param window    identifier, see window.h
+ *  @param flags     DSP_SPECTRUM_... constants
+ *  @return 0; -1 for a null record, a window that is unknown or refuses the width, a transform
+ *          beyond 2^30 points, or when memory runs out */
 WAVKIT_API int dsph_fft(const dsp *in, dsp *out, int npts, double fraction, int window, int flags);
 WAVKIT_API int dspfh_fft(const dspf *in, dspf *out, int npts, float fraction, int window,
                          int flags);
@@ -28,8 +83,8 @@ WAVKIT_API int dspfh_fft(const dspf *in, dspf *out, int npts, float fraction, in
  *
  *  A `weight` that is not negative is w itself. With a negative one w is 1 / count, a true mean of
  *  all spectra so far; with 0x10 in `flags`, and 0 < limit <= count, it is 1 / limit, an
- * exponential average that forgets. With 0x20 the squared magnitudes of the input are averaged in
- * its place. With a `count` of 1 or less the input starts the average, whatever the type.
+ *  exponential average that forgets. With 0x20 the squared magnitudes of the input are averaged in
+ *  its place. With a `count` of 1 or less the input starts the average, whatever the type.
  *
  *  @param input    the new spectrum, only read unless it is also `scratch`
  *  @param avg      the average; delta = mean of both where they are combined, else the input's
