@@ -61,7 +61,7 @@ WAVKIT_API int dspfu_subvec(const dspf *source, dspf *destination, int start, in
 
 /** Appends the points of `source` to `destination`, which becomes complex when `source` is and
  *  stays complex when it was. `delta` and `extra` of the destination do not change. The two must
- *  be different records.
+ *  be different records, which may share a buffer.
  *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsp_append(dsp *destination, const dsp *source);
 WAVKIT_API int dspf_append(dspf *destination, const dspf *source);

@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <cstdlib>
 #include <cstring>
+#include <functional>
 
 #include "precision.hpp"
 
@@ -127,22 +128,32 @@ int subvec(const R* source, R* destination, int start, int count) {
     return 0;
 }
 
+/// Whether the samples of `x` lie in the block that `owner` may move or write to as it grows.
+template <Record R>
+bool lies_within(const R* x, const R* owner) {
+    const std::less<> before;
+    return owner->alloc > 0 && !before(x->data, owner->data) &&
+           before(x->data, owner->data + owner->alloc);
+}
+
 template <Record R>
 int append(R* destination, const R* source) {
+    if (lies_within(source, destination)) {
+        Temporary<R> copy;
+        return status(dsp_copy(copy, source) || append<R>(destination, copy));
+    }
     if (source->complex && !destination->complex && dspi_rtoc(destination)) return -1;
     const int old = int(length(destination));
     const int added = int(length(source));
-    const bool shared = source->data == destination->data;
     if (added > std::numeric_limits<int>::max() - old) return without_memory(destination);
     destination->points = old + added;
     if (dsp_realloc(destination, old, destination->complex)) return -1;
 
-    const scalar<R>* from = shared ? destination->data : source->data;
     if (destination->complex && !source->complex) {
         const auto tail = bins(destination).subspan(old);
-        for (int i = 0; i < added; ++i) tail[i] = {from[i], 0};
+        for (int i = 0; i < added; ++i) tail[i] = {source->data[i], 0};
     } else if (added > 0) {
-        std::memcpy(destination->data + std::size_t(old) * width(destination), from,
+        std::memcpy(destination->data + std::size_t(old) * width(destination), source->data,
                     used(source) * sizeof(scalar<R>));
     }
     return 0;

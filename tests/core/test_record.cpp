@@ -154,7 +154,36 @@ TYPED_TEST(RecordTest, AppendPromotesAndNeverDemotes) {
     R endless = *huge.get();
     endless.alloc = 0;
     endless.points = INT_MAX;
-    EXPECT_EQ(dsp_append(huge, &endless), -1);
+    auto* const block = huge->data;
+    EXPECT_EQ(dsp_append(&endless, huge), -1);
+    EXPECT_EQ(endless.data, nullptr);
+    EXPECT_EQ(block[0], 1);
+}
+
+TYPED_TEST(RecordTest, AppendsWhatSharesItsBuffer) {
+    using R = TypeParam;
+    for (const bool borrowing : {false, true}) {
+        for (const bool is_complex : {false, true}) {
+            auto owner = real<R>({1, 2, 3, 4});
+            R view = *owner.get();
+            view.alloc = 0;
+            view.complex = is_complex;
+            view.points = is_complex ? 1 : 3;
+            view.data += is_complex;
+            owner->points = 2;
+            R* const grown = borrowing ? &view : owner.get();
+            ASSERT_EQ(dsp_append(grown, borrowing ? owner.get() : &view), 0);
+            if (borrowing) {
+                EXPECT_TRUE(is_complex ? test::is_complex<R>(grown, {{2, 3}, 1, 2})
+                                       : is_real<R>(grown, {1, 2, 3, 1, 2}));
+                EXPECT_TRUE(is_real<R>(owner, {1, 2}));
+                dsp_destroy(grown);
+            } else {
+                EXPECT_TRUE(is_complex ? test::is_complex<R>(grown, {1, 2, {2, 3}})
+                                       : is_real<R>(grown, {1, 2, 1, 2, 3}));
+            }
+        }
+    }
 }
 
 TYPED_TEST(RecordTest, ComparisonFollowsDeltaThenSamples) {
