@@ -3,7 +3,8 @@
  *
  *  These functions put those of the other headers together in the order that a measurement needs:
  *  dsph_fft() windows a time record, pads it to a power of two and transforms it so that a sine of
- *  amplitude A shows A in its bin; dsph_avg() folds spectrum after spectrum into an average.
+ *  amplitude A shows A in its bin; dsph_dft() does so at the record's own length; dsph_avg() folds
+ *  spectrum after spectrum into an average; dsph_corr() slides one signal along another.
  *
  *  They use the windows and tables that transforms and windows keep, so no two of one precision may
  *  run at the same time. A step that fails ends the call with -1 and leaves the output part-way. */
@@ -16,7 +17,7 @@
 extern "C" {
 #endif
 
-/** What `flags` of dsph_fft() is put together from. */
+/** What `flags` of dsph_fft() and dsph_dft() is put together from. */
 enum {
     DSP_SPECTRUM_INVERSE = 0x01,        /**< from the spectrum to the time record */
     DSP_SPECTRUM_TWO_SIDED = 0x02,      /**< all frequencies, 0 in the middle; no factor 2 */
@@ -24,6 +25,7 @@ enum {
     DSP_SPECTRUM_NO_WINDOW = 0x08,      /**< rotate as the window would, but leave it out */
     DSP_SPECTRUM_ROTATED = 0x10,        /**< rotate under the uniform window too */
     DSP_SPECTRUM_FROM_TWO_SIDED = 0x20, /**< inverse: two-sided input, scaled as a one-sided one */
+    DSP_SPECTRUM_ODD = 0x40,            /**< dsph_dft() inverse: half spectrum of an odd length */
     DSP_SPECTRUM_RAW = 0x80             /**< the complex transform and nothing else */
 };
 
@@ -67,6 +69,31 @@ enum {
 WAVKIT_API int dsph_fft(const dsp *in, dsp *out, int npts, double fraction, int window, int flags);
 WAVKIT_API int dspfh_fft(const dspf *in, dspf *out, int npts, float fraction, int window,
                          int flags);
+
+/** Turns a time record of any length N into its amplitude spectrum, or back, without padding.
+ *
+ *  **Forward.** The record is multiplied by a window of mean 1 over all its points (dspi_window()),
+ *  every window of the catalogue included, and transformed. A real input gives
+ *
+ *      X[k] = (2/N) sum w[n] x[n] e^(-2 pi i n k / N),  k = 0 .. N/2
+ *
+ *  and with DSP_SPECTRUM_TWO_SIDED, or for a complex input, all N bins with the zero frequency at
+ *  index N/2, scaled as dsph_fft() does; DSP_SPECTRUM_SUM makes the factor 1. n counts from the
+ *  centre of the record unless the window is the uniform one, which rotates with DSP_SPECTRUM_SUM
+ *  or DSP_SPECTRUM_ROTATED only. Under DSP_SPECTRUM_NO_WINDOW any identifier but 0 rotates, a
+ *  negative one too. DSP_SPECTRUM_RAW transforms the record as it is.
+ *
+ *  **Inverse.** Undoes the transform, the rotation and the scaling of the same `window` and
+ * `flags`, not the window itself. A half spectrum of M bins gives a real record of 2M - 2 points,
+ * or of 2M - 1 with DSP_SPECTRUM_ODD.
+ *
+ *  @param in      real or complex
+ *  @param out     the result; `delta` = 1 / (N delta). May be in, or share its buffer.
+ *  @param window  identifier, see window.h
+ *  @param flags   DSP_SPECTRUM_... constants
+ *  @return 0; -1 for a null record, an unknown window, or when memory runs out */
+WAVKIT_API int dsph_dft(const dsp *in, dsp *out, int window, int flags);
+WAVKIT_API int dspfh_dft(const dspf *in, dspf *out, int window, int flags);
 
 /** Folds a spectrum into a running average.
  *

@@ -213,6 +213,43 @@ WAVKIT_API int dspfi_window_kaiser(dspf *x, float beta, int scale_type);
 WAVKIT_API int dspi_window_sinc(dsp *x, double x0, double p, int scale_type);
 WAVKIT_API int dspfi_window_sinc(dspf *x, float x0, float p, int scale_type);
 
+/** What the samples of a window in scale mode 2 (centre 1) must be multiplied by for the scale mode
+ *  of `scale_type`: 1 / mean, also called 1 / coherent gain, or 1 / rms; 1 in scale mode 2 and for
+ *  n < 1, whatever the window.
+ *
+ *  For sums of cosines the factor is exact, and takes the flat windows to the mean a[0] of their
+ *  definition; Bartlett windows have closed forms; the others, and every window with
+ *  DSP_SCALE_WIDTH, are generated and measured. No signal is touched and no cache used.
+ *  @param scale       receives the factor
+ *  @param window      identifier
+ *  @param scale_type  scale mode, DSP_SCALE_SYMMETRIC, DSP_SCALE_WIDTH; others are ignored
+ *  @param n           points of the window
+ *  @return 0; -1 for DSP_SCALE_WIDTH, scale mode 3, an unknown window, or when memory runs out */
+WAVKIT_API int dsp_window_scale(double *scale, int window, int scale_type, int n);
+WAVKIT_API int dspf_window_scale(float *scale, int window, int scale_type, int n);
+
+/** dsp_window_scale() of a window that is `win_length` samples wide where `scale_type` has
+ *  DSP_SCALE_WIDTH; the mean is then that over all n points.
+ *  @return 0; -1 also for a window that refuses the width or the layout */
+WAVKIT_API int dsp_window2_scale(double *scale, int window, int scale_type, int n,
+                                 double win_length);
+WAVKIT_API int dspf_window2_scale(float *scale, int window, int scale_type, int n,
+                                  float win_length);
+
+/** Equivalent noise bandwidth of a window of n points, in bins: mean(w^2) / mean(w)^2, the width of
+ *  a rectangular filter of the same gain that lets as much white noise through (Harris, 1978).
+ *  @param enbw  receives the bandwidth
+ *  @return 0; -1 for a null `enbw`, an unknown window, or when memory runs out (nothing is then
+ *          written) */
+WAVKIT_API int dsp_window_enbw(double *enbw, int window, int n);
+WAVKIT_API int dspf_window_enbw(float *enbw, int window, int n);
+
+/** Equivalent noise bandwidth of a window `win_length` samples wide within n points, in bins of
+ *  those n points. Windows that know no width (Bartlett, Kaiser, Gauss, Riemann) are refused.
+ *  @return 0, or -1 as above or for such a window */
+WAVKIT_API int dsp_window2_enbw(double *enbw, int window, int n, double win_length);
+WAVKIT_API int dspf_window2_enbw(float *enbw, int window, int n, float win_length);
+
 #ifdef __cplusplus
 }
 #endif

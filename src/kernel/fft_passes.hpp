@@ -168,8 +168,9 @@ void direct(const FftPlan<T>& plan, T* data, T* work, T scale) {
         twiddles = short_pass<T, V, 4, Layout::blocks>(from, to, plan.points, twiddles);
         advance();
     }
-    for (; n > 8; advance()) {
+    while (n > 8) {
         twiddles = pass<T, V, Layout::blocks>(from, stride, to, n, stride, twiddles);
+        advance();
     }
     last_pass<T, V, Outside>(from, data, n, stride, stride, stride, scale);
 }

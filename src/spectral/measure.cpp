@@ -120,6 +120,43 @@ int measure(const R* in, R* out, int npts, scalar<R> fraction, int window, int f
                                         : to_spectrum(in, out, npts, fraction, window, flags);
 }
 
+/// The same at the length of the record: nothing is padded.
+template <Record R>
+int to_spectrum_of_length(const R* in, R* out, int window, int flags) {
+    const bool full = in->complex || flags & DSP_SPECTRUM_TWO_SIDED;
+    if (dsp_copy(out, in)) return -1;
+    if (flags & DSP_SPECTRUM_RAW) return dspi_dft(out, 0);
+    const bool rotates = window != 0 || flags & rotated;
+    const int rotate_uniform = flags & rotated ? DSP_SCALE_ROTATE_UNIFORM : 0;
+    if (!(flags & DSP_SPECTRUM_NO_WINDOW) ? dspi_window(out, window, rotate_uniform)
+                                          : rotates && dspi_swap_halves2(out)) {
+        return -1;
+    }
+    const int n = int(length(out));
+    if (scale(out, forward_factor(out, n, flags))) return -1;
+    return full ? status(dspi_dft(out, 0) || dspi_swap_halves(out)) : dspi_rdft(out);
+}
+
+template <Record R>
+int to_time_of_length(const R* in, R* out, int window, int flags) {
+    if (dsp_copy(out, in)) return -1;
+    if (flags & DSP_SPECTRUM_RAW) return dspi_dft(out, 1);
+    const bool half = !(flags & (DSP_SPECTRUM_TWO_SIDED | DSP_SPECTRUM_FROM_TWO_SIDED));
+    if (half ? dspi_irdft(out, flags & DSP_SPECTRUM_ODD)
+             : dspi_swap_halves2(out) || dspi_dft(out, 1)) {
+        return -1;
+    }
+    if ((window != 0 || flags & rotated) && dspi_swap_halves(out)) return -1;
+    return out->points > 0 ? scale(out, inverse_factor(out, out->points, flags)) : 0;
+}
+
+template <Record R>
+int measure_of_length(const R* in, R* out, int window, int flags) {
+    if (!in || !out) return -1;
+    return flags & DSP_SPECTRUM_INVERSE ? to_time_of_length(in, out, window, flags)
+                                        : to_spectrum_of_length(in, out, window, flags);
+}
+
 }  // namespace
 }  // namespace wavkit
 
@@ -128,4 +165,11 @@ int dsph_fft(const dsp* in, dsp* out, int npts, double fraction, int window, int
 }
 int dspfh_fft(const dspf* in, dspf* out, int npts, float fraction, int window, int flags) {
     return wavkit::measure(in, out, npts, fraction, window, flags);
+}
+
+int dsph_dft(const dsp* in, dsp* out, int window, int flags) {
+    return wavkit::measure_of_length(in, out, window, flags);
+}
+int dspfh_dft(const dspf* in, dspf* out, int window, int flags) {
+    return wavkit::measure_of_length(in, out, window, flags);
 }

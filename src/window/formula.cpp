@@ -64,16 +64,19 @@ int normalise(R* w, int mode, scalar<R> mean) {
     return 0;
 }
 
+double bartlett_peak(int mode, int n) {
+    const double n_squared = double(n) * n;
+    if (mode == DSP_SCALE_RMS) return std::sqrt(3 * n_squared / (n_squared + 2));
+    if (mode != DSP_SCALE_MEAN) return 1;
+    return n % 2 ? 2 * n_squared / (n_squared + 1) : 2;
+}
+
 template <Record R>
 int bartlett_fill(R* w, int scale_type) {
     using T = scalar<R>;
     if (w->complex || scale_type & (DSP_SCALE_SYMMETRIC | DSP_SCALE_WIDTH)) return -1;
     if (w->points < 1) return 0;
-    const int mode = scale_mode(scale_type);
-    const double n = w->points, n_squared = n * n;
-    double peak = 1;
-    if (mode == DSP_SCALE_MEAN) peak = w->points % 2 ? 2 * n_squared / (n_squared + 1) : 2;
-    if (mode == DSP_SCALE_RMS) peak = std::sqrt(3 * n_squared / (n_squared + 2));
+    const double n = w->points, peak = bartlett_peak(scale_mode(scale_type), w->points);
     fill_outward(w, false, T(peak), [=](double t) { return T(peak * (n - 2 * t) / n); });
     return 0;
 }

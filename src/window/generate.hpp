@@ -38,6 +38,10 @@ int gauss_fill(R* w, scalar<R> sigma, int scale_type);
 template <Record R>
 int sinc_fill(R* w, scalar<R> x0, scalar<R> p, int scale_type);
 
+/// The centre of the triangle of n points that has the mean 1 (scale mode 0), the mean square 1
+/// (scale mode 1), or else the height 1.
+double bartlett_peak(int mode, int n);
+
 /// Scales a window to a given mean (scale mode 0) or to the mean square 1 (scale mode 1).
 template <Record R>
 int normalise(R* w, int mode, scalar<R> mean = 1);

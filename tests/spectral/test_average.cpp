@@ -4,22 +4,17 @@
 #include "support/failing_allocator.hpp"
 #include "support/oracles.hpp"
 
-inline int dsph_avg(dspf* input, dspf* avg, dspf* scratch, int flags, int count, int every,
-                    float weight, float limit) {
-    return dspfh_avg(input, avg, scratch, flags, count, every, weight, limit);
-}
-inline int dsph_corr(const dspf* a, const dspf* b, dspf* out, dspf* scratch, int m, int half) {
-    return dspfh_corr(a, b, out, scratch, m, half);
-}
-inline int dspb_corr(const dspf* a, const dspf* b, dspf* out, dspf* scratch, int m) {
-    return dspfb_corr(a, b, out, scratch, m);
-}
-
 namespace wavkit::test {
 namespace {
 
 template <class R>
 constexpr R* null = nullptr;
+template <class R>
+constexpr auto average = pick<R>(dsph_avg, dspfh_avg);
+template <class R>
+constexpr auto slide = pick<R>(dsph_corr, dspfh_corr);
+template <class R>
+constexpr auto correlate = pick<R>(dspb_corr, dspfb_corr);
 
 template <class R>
 class AverageTest : public ::testing::Test {};
@@ -31,7 +26,7 @@ TYPED_TEST(AverageTest, TheFirstSpectrumStartsEveryAverage) {
         for (const int count : {1, 0, -3}) {
             auto x = complex<R>({{1, 2}, {3, 4}}, 0.5);
             auto avg = real<R>({9});
-            ASSERT_EQ(dsph_avg(x.get(), avg.get(), null<R>, type, count, 0, -1, 0), 0);
+            ASSERT_EQ(average<R>(x, avg, null<R>, type, count, 0, -1, 0), 0);
             EXPECT_TRUE(is_complex<R>(avg, {{1, 2}, {3, 4}}));
             EXPECT_EQ(avg->delta, scalar<R>(0.5));
         }
@@ -69,8 +64,8 @@ TYPED_TEST(AverageTest, EachTypeByHand) {
             auto x = real<R>({2, 8});
             auto avg = real<R>({4, 2});
             Signal<R> scratch;
-            ASSERT_EQ(dsph_avg(x.get(), avg.get(), with_scratch ? scratch.get() : null<R>, c.flags,
-                               c.count, c.every, scalar<R>(c.weight), scalar<R>(c.limit)),
+            ASSERT_EQ(average<R>(x, avg, with_scratch ? scratch.get() : null<R>, c.flags, c.count,
+                                 c.every, scalar<R>(c.weight), scalar<R>(c.limit)),
                       0);
             EXPECT_TRUE(is_real<R>(avg, c.expected, 8)) << c.flags << ' ' << c.count;
             EXPECT_TRUE(is_real<R>(x, {2, 8}));
@@ -82,11 +77,11 @@ TYPED_TEST(AverageTest, TheInputMayServeAsScratch) {
     using R = TypeParam;
     auto x = complex<R>({{3, 4}, {0, 2}});
     auto avg = real<R>({5, 0});
-    ASSERT_EQ(dsph_avg(x.get(), avg.get(), x.get(), 0x21, 2, 0, -1, 0), 0);
+    ASSERT_EQ(average<R>(x, avg, x, 0x21, 2, 0, -1, 0), 0);
     EXPECT_TRUE(is_real<R>(avg, {15, 2}));
     auto y = real<R>({2, 8});
     auto harmonic = real<R>({4, 2});
-    ASSERT_EQ(dsph_avg(y.get(), harmonic.get(), y.get(), 4, 2, 0, -1, 0), 0);
+    ASSERT_EQ(average<R>(y, harmonic, y, 4, 2, 0, -1, 0), 0);
     EXPECT_TRUE(is_real<R>(harmonic, {8 / 3.0L, 16 / 5.0L}, 4));
 }
 
@@ -95,14 +90,14 @@ TYPED_TEST(AverageTest, FailureLeavesTheAverageAsItWas) {
     for (const int flags : {1, 2, 4, 5, 0x21}) {
         auto x = real<R>({2, 8});
         auto avg = real<R>({4, 2, 1});
-        EXPECT_EQ(dsph_avg(x.get(), avg.get(), null<R>, flags, 2, 0, -1, 0), -1);
+        EXPECT_EQ(average<R>(x, avg, null<R>, flags, 2, 0, -1, 0), -1);
         EXPECT_TRUE(is_real<R>(avg, {4, 2, 1}, 4)) << flags;
     }
     for (const int flags : {4, 5, 0x21, 0x24}) {
         auto x = real<R>({2, 8});
         auto avg = real<R>({4, 2});
         fail_each_growth<R>([&] {
-            const int result = dsph_avg(x.get(), avg.get(), null<R>, flags, 2, 0, 0, 0);
+            const int result = average<R>(x, avg, null<R>, flags, 2, 0, 0, 0);
             EXPECT_NEAR(avg[0], 4, 16 * epsilon<R>) << flags;
             EXPECT_NEAR(avg[1], 2, 16 * epsilon<R>) << flags;
             return result;
@@ -141,19 +136,19 @@ TYPED_TEST(AverageTest, CorrelationBySlidingSums) {
                 }
             };
             Signal<R> out, scratch;
-            ASSERT_EQ(dspb_corr(a.get(), b.get(), out.get(), scratch.get(), m), 0);
+            ASSERT_EQ(correlate<R>(a, b, out, scratch, m), 0);
             check(out, "apart");
             // The output, or the scratch record, may be any of the operands.
             const Signal<R> first = a, second = b;
-            ASSERT_EQ(dspb_corr(a.get(), b.get(), a.get(), null<R>, m), 0);
+            ASSERT_EQ(correlate<R>(a, b, a, null<R>, m), 0);
             check(a, "over a");
             a = first;
-            ASSERT_EQ(dspb_corr(a.get(), b.get(), b.get(), a.get(), m), 0);
+            ASSERT_EQ(correlate<R>(a, b, b, a, m), 0);
             check(b, "over b");
             EXPECT_TRUE(matches<R>(a, first));
             b = second;
             Borrowed<R> host(b);
-            ASSERT_EQ(dspb_corr(a.get(), host.operator->(), host, host, m), 0);
+            ASSERT_EQ(correlate<R>(a, host, host, host, m), 0);
             check(host, "over a host's array");
             EXPECT_EQ(host.host, scalars<R>(second));
         }
@@ -164,15 +159,14 @@ TYPED_TEST(AverageTest, CorrelationLimits) {
     using R = TypeParam;
     auto a = real<R>({1, 2, 3}), b = real<R>({4, 5});
     Signal<R> out;
-    for (const int m : {0, -1, 3})
-        EXPECT_EQ(dsph_corr(a.get(), b.get(), out.get(), null<R>, m, 0), -1);
-    EXPECT_EQ(dsph_corr(b.get(), a.get(), out.get(), null<R>, 3, 0), -1);
+    for (const int m : {0, -1, 3}) EXPECT_EQ(slide<R>(a, b, out, null<R>, m, 0), -1);
+    EXPECT_EQ(slide<R>(b, a, out, null<R>, 3, 0), -1);
     EXPECT_EQ(out->points, 0);
-    ASSERT_EQ(dsph_corr(a.get(), b.get(), out.get(), null<R>, 2, 1), 0);
+    ASSERT_EQ(slide<R>(a, b, out, null<R>, 2, 1), 0);
     EXPECT_TRUE(is_real<R>(out, {3.5L}, 2));
     EXPECT_GE(fail_each_growth<R>([&] {
                   Signal<R> result;
-                  return dsph_corr(a.get(), b.get(), result.get(), null<R>, 1, 0);
+                  return slide<R>(a, b, result, null<R>, 1, 0);
               }),
               2);
 }
