@@ -50,8 +50,8 @@
  *
  *  A number is what scanf's `%lg` takes in the C locale: decimal with an optional exponent, of any
  *  length and rounded correctly, "inf", "infinity", "nan" or "nan(...)" in upper or lower case;
- *  too large a number becomes infinite, too small a one 0. One that begins like a 0 and goes on
- * with "x" is a hexadecimal integer of 32 bits, taken as signed and then negated where a "-" stands
+ *  too large a number becomes infinite, too small a one 0. What begins like a 0 and goes on with
+ *  "x" is a hexadecimal integer of 32 bits, taken as signed and then negated where a "-" stands
  *  before it: 0x1F is 31, -0x10 is -16, 0xFFFFFFFF is -1. */
 #ifndef WAVKIT_FILE_H
 #define WAVKIT_FILE_H
@@ -84,9 +84,9 @@ WAVKIT_API int dspff_fclose(FILE *stream);
  *  the record borrowed is replaced and never written.
  *
  *  A text signal that declares its points ends after the last of them: the next character that is
- *  not white space stays in the stream. (One that declares none ends there once its points, complex
- *  and delta lines were read.) Where a complex one has an odd number of values, the last imaginary
- *  part is 0.
+ *  not white space stays in the stream, a "#" too. (One that declares 0 points takes "#" lines
+ * until it has its points, complex and delta.) Where a complex one has an odd number of values, the
+ * last imaginary part is 0.
  *
  *  One signal may be read at a time from a stream. Threads that convert between the precisions
  *  keep 64 KiB each until they end.
