@@ -13,15 +13,15 @@ namespace {
 /// `peak` there.
 template <Record R, class Value>
 void fill_outward(R* w, bool symmetric, scalar<R> peak, Value value) {
-    const int n = w->points;
-    scalar<R>* const centre = w->data + n / 2;
+    const int n = w->points, half = n / 2;
+    scalar<R>* const centre = w->data + half;
     if (symmetric && n % 2 == 0) {
-        for (int i = 0; i < n / 2; ++i) centre[i] = centre[-1 - i] = value(i + 0.5);
+        for (int i = 0; i < half; ++i) centre[i] = centre[-1 - i] = value(i + 0.5);
         return;
     }
     centre[0] = peak;
     for (int j = 1; j <= (n - 1) / 2; ++j) centre[j] = centre[-j] = value(j);
-    if (n % 2 == 0) w->data[0] = value(n / 2);
+    if (n % 2 == 0) w->data[0] = value(half);
 }
 
 /// Normalisation of the shapes whose centre is 1.

@@ -71,24 +71,15 @@ Samples spectrum(const Signal<R>& in, Setting s) {
 
 TYPED_TEST(MeasurementSpectrum, FollowsItsDefinition) {
     using R = TypeParam;
-    const double nan = std::nan("");
+    // npts, fraction, window, flags
+    const double settings[][4] = {
+        {0, 1, 0, 0},       {0, std::nan(""), 2, 0}, {100, 1, 9, 0},     {32, 0.7, 6, 2},
+        {-4, 0.5, 0, 2},    {100, 0.3, 3, 8},        {7, 1.5, 14, 8},    {9, 0, 0, 8},
+        {99, 0.1, 2, 4},    {99, 0.1, 0, 4},         {99, 0.1, 0, 0x0e}, {99, 0.1, 4, 0x10},
+        {99, 0.1, 0, 0x10}, {99, 0.1, 0, 0x1a},      {99, 0.1, 2, 0x80}, {1, 1, 2, 0x82}};
     for (int n : {2, 37, 64}) {
-        for (Setting s : {Setting{n, 0, 1, 0, 0},
-                          {n, 0, nan, 2, 0},
-                          {n, 100, 1, 9, 0},
-                          {n, 32, 0.7, 6, 2},
-                          {n, -4, 0.5, 0, 2},
-                          {n, 100, 0.3, 3, 8},
-                          {n, 7, 1.5, 14, 8},
-                          {n, 9, 0, 0, 8},
-                          {n, 99, 0.1, 2, 4},
-                          {n, 99, 0.1, 0, 4},
-                          {n, 99, 0.1, 0, 6 | 8},
-                          {n, 99, 0.1, 4, 0x10},
-                          {n, 99, 0.1, 0, 0x10},
-                          {n, 99, 0.1, 0, 0x1a},
-                          {n, 99, 0.1, 2, 0x80},
-                          {n, 1, 1, 2, 0x82}}) {
+        for (auto& [npts, fraction, window, flags] : settings) {
+            const Setting s{n, int(npts), fraction, int(window), int(flags)};
             for (const auto& in : {Noise(5).real<R>(n), Noise(6).complex<R>(n)}) {
                 expect_measured(in, s, spectrum(in, s));
             }
@@ -113,17 +104,13 @@ TYPED_TEST(MeasurementSpectrum, ASineReadsItsAmplitude) {
 
 TYPED_TEST(MeasurementSpectrum, InverseReturnsTheRecord) {
     using R = TypeParam;
-    for (Setting s : {Setting{64, 0, 1, 0, 8},
-                      {64, 0, 1, 2, 8},
-                      {64, 0, 1, 0, 0x0c},
-                      {64, 0, 1, 0, 0x18},
-                      {64, 0, 1, 5, 0x0a},
-                      {64, 0, 1, 0, 0x80},
-                      {40, 64, 0.625, 0, 8},
-                      {39, 64, 0.6, 3, 8},
-                      {48, 128, 0.375, 3, 0x0a},
-                      {1, 0, 1, 0, 8},
-                      {2, 2, 1, 2, 8}}) {
+    // points, npts, fraction, window, flags
+    const double settings[][5] = {
+        {64, 0, 1, 0, 8},          {64, 0, 1, 2, 8},    {64, 0, 1, 0, 0x0c},   {64, 0, 1, 0, 0x18},
+        {64, 0, 1, 5, 0x0a},       {64, 0, 1, 0, 0x80}, {40, 64, 0.625, 0, 8}, {39, 64, 0.6, 3, 8},
+        {48, 128, 0.375, 3, 0x0a}, {1, 0, 1, 0, 8},     {2, 2, 1, 2, 8}};
+    for (auto& [points, npts, fraction, window, flags] : settings) {
+        const Setting s{int(points), int(npts), fraction, int(window), int(flags)};
         for (auto x : {Noise(5).real<R>(s.points), Noise(6).complex<R>(s.points)}) {
             const auto original = samples_of<R>(x);
             const int back = s.flags | (x->complex && !(s.flags & 2) ? 0x21 : 0x01);

@@ -22,27 +22,28 @@ struct Named {
     Named { #name, DSP_WINDOW_##name, id }
 
 TYPED_TEST(WindowNames, EveryNameInAnyCaseAndTheFirstOneBack) {
+    const Named windows[] = {NAMED(UNIFORM, 0),    NAMED(RECTANGULAR, 0),
+                             NAMED(NONE, 0),       NAMED(P000, 0),
+                             NAMED(BARTLETT, 1),   NAMED(TRIANGULAR, 1),
+                             NAMED(HANN, 2),       NAMED(P110, 2),
+                             NAMED(HAMMING, 3),    NAMED(P100, 3),
+                             NAMED(BLACKMAN, 4),   NAMED(BLACKMAN_HARRIS3, 5),
+                             NAMED(P200, 5),       NAMED(BLACKMAN_HARRIS4, 6),
+                             NAMED(P310, 6),       NAMED(LOWLEAK, 6),
+                             NAMED(GAUSSTOP, 7),   NAMED(P400, 7),
+                             NAMED(FLAT4, 8),      NAMED(P301, 8),
+                             NAMED(FLATTOP, 9),    NAMED(FLAT5, 9),
+                             NAMED(P401, 9),       NAMED(FLAT6, 10),
+                             NAMED(P511, 10),      NAMED(FLAT7, 11),
+                             NAMED(P611, 11),      NAMED(P501, 12),
+                             NAMED(P601, 13),      NAMED(KAISER70, 14),
+                             NAMED(KAISER80, 15),  NAMED(KAISER90, 16),
+                             NAMED(KAISER100, 17), NAMED(KAISER110, 18),
+                             NAMED(KAISER120, 19), NAMED(GAUSS60, 20),
+                             NAMED(GAUSS70, 21),   NAMED(GAUSS80, 22),
+                             NAMED(RIEMANN, 23),   NAMED(SINC_LOBE, 23)};
     int next = 0;
-    for (const Named& window : {NAMED(UNIFORM, 0),    NAMED(RECTANGULAR, 0),
-                                NAMED(NONE, 0),       NAMED(P000, 0),
-                                NAMED(BARTLETT, 1),   NAMED(TRIANGULAR, 1),
-                                NAMED(HANN, 2),       NAMED(P110, 2),
-                                NAMED(HAMMING, 3),    NAMED(P100, 3),
-                                NAMED(BLACKMAN, 4),   NAMED(BLACKMAN_HARRIS3, 5),
-                                NAMED(P200, 5),       NAMED(BLACKMAN_HARRIS4, 6),
-                                NAMED(P310, 6),       NAMED(LOWLEAK, 6),
-                                NAMED(GAUSSTOP, 7),   NAMED(P400, 7),
-                                NAMED(FLAT4, 8),      NAMED(P301, 8),
-                                NAMED(FLATTOP, 9),    NAMED(FLAT5, 9),
-                                NAMED(P401, 9),       NAMED(FLAT6, 10),
-                                NAMED(P511, 10),      NAMED(FLAT7, 11),
-                                NAMED(P611, 11),      NAMED(P501, 12),
-                                NAMED(P601, 13),      NAMED(KAISER70, 14),
-                                NAMED(KAISER80, 15),  NAMED(KAISER90, 16),
-                                NAMED(KAISER100, 17), NAMED(KAISER110, 18),
-                                NAMED(KAISER120, 19), NAMED(GAUSS60, 20),
-                                NAMED(GAUSS70, 21),   NAMED(GAUSS80, 22),
-                                NAMED(RIEMANN, 23),   NAMED(SINC_LOBE, 23)}) {
+    for (const Named& window : windows) {
         EXPECT_EQ(window.constant, window.id) << window.name;
         for (std::string text : {window.name, "DSP_WINDOW_" + window.name}) {
             for (int lower : {0, 1}) {

@@ -1,7 +1,4 @@
 // Windows against their formulas, in every layout, width and normalisation.
-#include <algorithm>
-#include <array>
-
 #include "support/signals.hpp"
 
 namespace wavkit::test {
@@ -26,14 +23,6 @@ Signal<R> window(int n, int id, int scale_type, scalar<R> width = 0) {
     return made<R>(n, [=](R* x) { return dspi_window2(x, id, scale_type | 32, width); });
 }
 
-/// The identifiers, each with the symmetric flag too where it is allowed.
-std::vector<std::pair<int, int>> layouts() {
-    std::vector<std::pair<int, int>> all;
-    for (int id = 0; id < 24; ++id) all.emplace_back(id, 0);
-    for (int id = 14; id < 24; ++id) all.emplace_back(id, DSP_SCALE_SYMMETRIC);
-    return all;
-}
-
 long double sum_of_cosines(const Values& a, long double t, long double period) {
     long double sum = 0, step = two_pi<long double> * t / period;
     for (std::size_t k = 0; k < a.size(); ++k) sum += a[k] * std::cos(k * step);
@@ -47,13 +36,7 @@ long double bessel(long double x) {
 }
 
 /// The sums of cosines whose coefficients every textbook has.
-const Values known[] = {{1},
-                        {},
-                        {0.5L, 0.5L},
-                        {0.54L, 0.46L},
-                        {0.42L, 0.5L, 0.08L},
-                        {},
-                        {0.355768L, 0.487396L, 0.144232L, 0.012604L}};
+const Values hann = {0.5L, 0.5L}, nuttall = {0.355768L, 0.487396L, 0.144232L, 0.012604L};
 
 /// Value at t samples from the centre, 0 for a window that is not known here.
 long double shape(int id, long double t, long double n, long double m) {
@@ -62,8 +45,11 @@ long double shape(int id, long double t, long double n, long double m) {
                                         14.505082414495599L, 15.73795091271457L};
     static const long double sigmas[] = {0.1583722L, 0.1442161L, 0.1328102L};
     if (id == 1) return 1 - 2 * std::fabs(t) / n;
-    if (id < 7) return sum_of_cosines(known[id], t, n);
-    if (id < 14) return 0;
+    if (id == 2) return sum_of_cosines(hann, t, n);
+    if (id == 3) return sum_of_cosines({0.54L, 0.46L}, t, n);
+    if (id == 4) return sum_of_cosines({0.42L, 0.5L, 0.08L}, t, n);
+    if (id == 6) return sum_of_cosines(nuttall, t, n);
+    if (id < 14) return id == 0;
     if (id < 20) {
         const long double beta = betas[id - 14], u = m > 0 ? 2 * t / m : 0;
         return bessel(beta * std::sqrt(1 - u * u)) / bessel(beta);
@@ -71,22 +57,6 @@ long double shape(int id, long double t, long double n, long double m) {
     if (id < 23) return std::exp(-0.5L * std::pow(t / n / sigmas[id - 20], 2.0L));
     const long double x = two_pi<long double> * t / n;
     return t == 0 ? 1 : std::sin(x) / x;
-}
-
-TYPED_TEST(WindowShapes, FollowTheirFormulaInBothLayouts) {
-    using R = TypeParam;
-    for (int n : {1, 2, 3, 4, 5, 8, 9, 16, 100, 1001, 4096}) {
-        for (auto [id, symmetric] : layouts()) {
-            Values expected;
-            for (int i = 0; i < n; ++i) {
-                const long double t = symmetric ? i - (n - 1) / 2.0L : i - n / 2;
-                expected.push_back(shape(id, t, n, symmetric ? n - 1 : n));
-            }
-            if (*std::ranges::max_element(expected) == 0) continue;
-            const auto w = window<R>(n, id, DSP_SCALE_PEAK | symmetric);
-            EXPECT_TRUE(is_real<R>(w, expected, 16)) << id << ", " << n << " points";
-        }
-    }
 }
 
 template <Record R>
@@ -107,22 +77,29 @@ long double mean_of(int id) {
     return id < 8 || id > 13 ? 1 : flat[id - 8];
 }
 
-TYPED_TEST(WindowShapes, MeanMeanSquareAndBandwidth) {
+TYPED_TEST(WindowShapes, FormulaMeanMeanSquareAndBandwidth) {
     using R = TypeParam;
     // Equivalent noise bandwidths in bins, as they are published.
     static const double enbw[] = {1.0000, 1.3333, 1.5000, 1.3628, 1.7268, 1.7037, 2.0212, 2.2153,
                                   3.4279, 3.8221, 4.2316, 4.5500, 4.1794, 4.5124, 1.7995, 1.9084,
                                   2.0103, 2.1065, 2.1979, 2.2851, 1.7869, 1.9581, 2.1248, 1.2990};
-    for (int n : {1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16, 999, 5000}) {
-        for (auto [id, symmetric] : layouts()) {
+    for (int n : {1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16, 999, 4096}) {
+        for (int kind = 0; kind < 34; ++kind) {
+            const int id = kind < 24 ? kind : kind - 10, symmetric = kind < 24 ? 0 : 4;
             auto peak = window<R>(n, id, DSP_SCALE_PEAK | symmetric);
             const auto mean = window<R>(n, id, DSP_SCALE_MEAN | symmetric);
             const auto rms = window<R>(n, id, DSP_SCALE_RMS | symmetric);
+            Values expected;
+            for (int i = 0; i < n; ++i) {
+                const long double t = symmetric ? i - (n - 1) / 2.0L : i - n / 2;
+                expected.push_back(shape(id, t, n, symmetric ? n - 1 : n));
+            }
+            EXPECT_TRUE(expected[n / 2] == 0 || is_real<R>(peak, expected, 16)) << id << " " << n;
             EXPECT_NEAR(Measured(mean).mean, mean_of(id), 100 * epsilon<R>) << id << " " << n;
             EXPECT_NEAR(Measured(rms).square, 1, 200 * epsilon<R>) << id << " " << n;
-            if (n == 5000 && !symmetric) {
-                EXPECT_NEAR(std::pow(mean_of(id), 2) / Measured(mean).square, 1 / enbw[id], 2e-5)
-                    << id;
+            const double bandwidth = double(Measured(mean).square / std::pow(mean_of(id), 2));
+            if (n == 4096) {
+                EXPECT_NEAR(bandwidth, enbw[id], symmetric ? 1e-3 : 1e-4) << id;
             }
             // The modes differ by a factor only.
             dspi_scale(peak, scalar<R>(mean_of(id) / Measured(peak).mean));
@@ -136,34 +113,37 @@ TYPED_TEST(WindowShapes, MeanMeanSquareAndBandwidth) {
 TYPED_TEST(WindowShapes, WidthsInsideTheSignal) {
     using R = TypeParam;
     using T = scalar<R>;
-    const T eps = epsilon<R>, inf = std::numeric_limits<T>::infinity();
-    struct Width {
-        T given;
-        long double meant;
-    };
+    const long double eps = epsilon<R>, inf = std::numeric_limits<T>::infinity();
     for (int n : {1, 2, 9, 16}) {
-        for (auto [width, w] : {Width{0, 0},
-                                {-3, 0.5L},
-                                {std::nan(""), 0.5L},
-                                {0.5f, 0.5L},
-                                {1, 1},
-                                {2, 2},
-                                {5, 5},
-                                {6, 6},
-                                {6.5f, 6.5L},
-                                {7.5f, 7.5L},
-                                {6 * (1 - 16 * eps), 6},
-                                {6 * (1 + 16 * eps), 6},
-                                {n * (1 - 4 * eps), T(n)},
-                                {T(n + 4), T(n + 4)},
-                                {inf, 1e30L}}) {
+        // Widths asked for, and those that result; at last a width just beyond the tolerance.
+        const Values asked = {0,
+                              -3,
+                              std::nan(""),
+                              0.5L,
+                              1,
+                              2,
+                              5,
+                              6,
+                              6.5L,
+                              7.5L,
+                              6 - 96 * eps,
+                              6 + 96 * eps,
+                              n - 4 * n * eps,
+                              n + 4.5L,
+                              inf,
+                              6 + 192 * eps};
+        const Values widths = {0,    0.5L, 0.5L, 0.5L, 1,        2,        5,     6,
+                               6.5L, 7.5L, 6,    6,    1.0L * n, n + 4.5L, 1e30L, 6 + 192 * eps};
+        for (std::size_t k = 0; k < asked.size(); ++k) {
+            const T width = T(asked[k]);
+            const long double w = widths[k];
             Values two, four, uniform;
             for (int i = 0; i < n; ++i) {
                 const int t = i - n / 2;
                 const bool inside = w >= n || (std::fmod(w, 2) == 0 ? -w / 2 <= t && t < w / 2
                                                                     : std::abs(t) <= int(w) / 2);
-                two.push_back(inside ? sum_of_cosines(known[2], t, w) : 0);
-                four.push_back(inside ? sum_of_cosines(known[6], t, w) : 0);
+                two.push_back(inside ? sum_of_cosines(hann, t, w) : 0);
+                four.push_back(inside ? sum_of_cosines(nuttall, t, w) : 0);
                 uniform.push_back(width > 0 && i < w);
             }
             EXPECT_TRUE(is_real<R>(window<R>(n, 2, 10, width), two, 80)) << n << " " << width;
@@ -177,7 +157,6 @@ TYPED_TEST(WindowShapes, WidthsInsideTheSignal) {
             }
         }
     }
-    EXPECT_FALSE(matches<R>(window<R>(16, 0, 10, 6 * (1 + 32 * eps)), window<R>(16, 0, 10, 6)));
 }
 
 TYPED_TEST(WindowShapes, SumsOfAnyCosines) {
@@ -238,12 +217,12 @@ TYPED_TEST(WindowShapes, FreeParameters) {
     }
     // Beyond the first zero of the sinc, at 4, 8 and 12.
     const long double s4 = std::sin(4.0L) / 4, s8 = std::sin(8.0L) / 8, s12 = std::sin(12.0L) / 12;
-    using Powers = std::array<long double, 4>;
-    for (auto [p, at4, at8, at12] : {Powers{0, 1, 1, 1},
+    const long double powers[][4] = {{0, 1, 1, 1},
                                      {1, s4, s8, s12},
                                      {2, s4 * s4, s8 * s8, s12 * s12},
                                      {0.5L, 0, std::sqrt(s8), 0},
-                                     {-1, 0, 1 / s8, 0}}) {
+                                     {-1, 0, 1 / s8, 0}};
+    for (auto& [p, at4, at8, at12] : powers) {
         EXPECT_TRUE(is_real<R>(sinc<R>(6, 12, p, 34), {at12, at8, at4, 1, at4, at8}, 8)) << p;
         EXPECT_TRUE(is_real<R>(sinc<R>(5, 10, p, 38), {at8, at4, 1, at4, at8}, 8)) << p;
         EXPECT_TRUE(is_real<R>(sinc<R>(2, 8, p, 38), {at4, at4}, 8)) << p;
