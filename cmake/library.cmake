@@ -63,5 +63,7 @@ write_basic_package_version_file(${PROJECT_BINARY_DIR}/wavkit-config-version.cma
 install(FILES ${PROJECT_BINARY_DIR}/wavkit-config.cmake
               ${PROJECT_BINARY_DIR}/wavkit-config-version.cmake
         DESTINATION ${CMAKE_INSTALL_LIBDIR}/cmake/wavkit)
+# Relative to where it lies, so that any --prefix will do.
+file(RELATIVE_PATH WAVKIT_PC_TO_PREFIX /prefix/${CMAKE_INSTALL_LIBDIR}/pkgconfig /prefix)
 configure_file(${PROJECT_SOURCE_DIR}/cmake/wavkit.pc.in ${PROJECT_BINARY_DIR}/wavkit.pc @ONLY)
 install(FILES ${PROJECT_BINARY_DIR}/wavkit.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
