@@ -1,0 +1,12 @@
+// The subcommands; each declares its own options and does its work when it is chosen.
+#pragma once
+
+#include <CLI/CLI.hpp>
+
+namespace wavkit::tool {
+
+void add_info(CLI::App& program);
+void add_convert(CLI::App& program);
+void add_spectrum(CLI::App& program);
+
+}  // namespace wavkit::tool

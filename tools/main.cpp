@@ -1,0 +1,65 @@
+// wavkit: signals from the command line.
+#include <wavkit/dsp.h>
+
+#include <cstdio>
+#include <exception>
+#include <string>
+
+#include "commands.hpp"
+#include "error.hpp"
+
+namespace {
+
+constexpr int bad_input = 1, bad_usage = 2;
+
+/// One line on standard error.
+int complain(const std::string& who, const std::string& what, int status) {
+    std::fprintf(stderr, "%s: %s\n", who.c_str(), what.c_str());
+    return status;
+}
+
+/// The subcommand in use, as a user writes it.
+std::string invoked(const CLI::App& program) {
+    const auto chosen = program.get_subcommands();
+    return chosen.empty() ? "wavkit" : "wavkit " + chosen.front()->get_name();
+}
+
+std::string version() {
+    const int number = dsp_version();
+    return "wavkit " + std::to_string(number / 100) + "." + std::to_string(number % 100);
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    CLI::App program("Looks at sampled signals, converts them and measures their spectra.",
+                     "wavkit");
+    program.set_version_flag("--version", version());
+    program.require_subcommand(1);
+    program.footer(
+        "A file named - is standard input or output, so commands pipe:\n"
+        "  wavkit convert tone.wav - | wavkit spectrum - --peaks 3\n\n"
+        "Exit status: 0 done, 1 bad input or output, 2 bad usage.\n"
+        "wavkit COMMAND --help explains a command.");
+    program.get_formatter()->column_width(36);
+    wavkit::tool::add_info(program);
+    wavkit::tool::add_convert(program);
+    wavkit::tool::add_spectrum(program);
+    try {
+        program.parse(argc, argv);
+        return 0;
+    } catch (const CLI::Success& asked) {
+        return program.exit(asked);
+    } catch (const CLI::RuntimeError& told) {
+        return told.get_exit_code();
+    } catch (const CLI::ParseError& error) {
+        const auto who = invoked(program);
+        return complain(who, std::string(error.what()) + " (" + who + " --help)", bad_usage);
+    } catch (const wavkit::tool::UsageError& error) {
+        return complain(invoked(program), error.what(), bad_usage);
+    } catch (const std::bad_alloc&) {
+        return complain("wavkit", "out of memory", bad_input);
+    } catch (const std::exception& error) {
+        return complain("wavkit", error.what(), bad_input);
+    }
+}

@@ -1,0 +1,208 @@
+#include "plot.hpp"
+
+#include <spawn.h>
+#include <sys/ioctl.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <cmath>
+#include <cstring>
+#include <filesystem>
+#include <memory>
+
+#include "csv.hpp"
+#include "error.hpp"
+#include "output.hpp"
+#include "progress.hpp"
+
+extern char** environ;
+
+namespace wavkit::tool {
+namespace {
+
+using Stream = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
+
+Stream scratch() {
+    Stream file(std::tmpfile(), std::fclose);
+    if (!file) throw Error(std::string("cannot make a temporary file: ") + std::strerror(errno));
+    return file;
+}
+
+std::string quoted(const std::string& text) {
+    std::string result = "\"";
+    for (const char c : text) {
+        if (c == '"' || c == '\\') result += '\\';
+        result += c;
+    }
+    return result + "\"";
+}
+
+/// The last line that gnuplot complained with.
+std::string complaint(std::FILE* errors) {
+    std::rewind(errors);
+    std::array<char, 512> line{};
+    std::string last;
+    while (std::fgets(line.data(), int(line.size()), errors)) {
+        std::string text(line.data());
+        while (!text.empty() && std::isspace(static_cast<unsigned char>(text.back()))) {
+            text.pop_back();
+        }
+        if (!text.empty()) last = text;
+    }
+    return last;
+}
+
+/// Runs gnuplot on a script; what it draws goes to `to`.
+void run_gnuplot(std::FILE* script, std::FILE* to) {
+    const auto errors = scratch();
+    std::fflush(script);
+    lseek(fileno(script), 0, SEEK_SET);
+    posix_spawn_file_actions_t streams;
+    posix_spawn_file_actions_init(&streams);
+    posix_spawn_file_actions_adddup2(&streams, fileno(script), STDIN_FILENO);
+    posix_spawn_file_actions_adddup2(&streams, fileno(to), STDOUT_FILENO);
+    posix_spawn_file_actions_adddup2(&streams, fileno(errors.get()), STDERR_FILENO);
+    std::string program = "gnuplot", option = "-d";  // no start-up files of the user's
+    std::array<char*, 3> arguments{program.data(), option.data(), nullptr};
+    pid_t child;
+    const int failure =
+        posix_spawnp(&child, program.c_str(), &streams, nullptr, arguments.data(), environ);
+    posix_spawn_file_actions_destroy(&streams);
+    if (failure == ENOENT) {
+        throw Error("pictures need gnuplot, which is not installed (Debian: gnuplot-nox)");
+    }
+    if (failure != 0) throw Error(std::string("cannot run gnuplot: ") + std::strerror(failure));
+    int status = 0;
+    while (waitpid(child, &status, 0) < 0 && errno == EINTR) {
+    }
+    if (status != 0) throw Error("gnuplot failed: " + complaint(errors.get()));
+}
+
+/// The terminal's width and height in characters.
+std::pair<int, int> terminal_size() {
+    winsize size{};
+    if (ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) != 0 || size.ws_col < 40 || size.ws_row < 12) {
+        return {100, 28};
+    }
+    return {size.ws_col, std::min<int>(size.ws_row - 1, 40)};
+}
+
+/// At most `columns` steps, each with its lowest and highest value in the order in which they
+/// come, so that no peak is lost.
+std::vector<std::pair<double, double>> thinned(const Curve& curve, std::size_t columns) {
+    std::vector<std::pair<double, double>> points;
+    const std::size_t n = curve.x.size();
+    const std::size_t step = n > 2 * columns ? (n + columns - 1) / columns : 1;
+    for (std::size_t start = 0; start < n; start += step) {
+        const auto first = curve.y.begin() + std::ptrdiff_t(start);
+        const auto last = curve.y.begin() + std::ptrdiff_t(std::min(n, start + step));
+        auto [low, high] = std::minmax_element(first, last);
+        if (high < low) std::swap(low, high);
+        for (const auto at : {low, high}) {
+            points.emplace_back(curve.x[std::size_t(at - curve.y.begin())], *at);
+            if (low == high) break;
+        }
+    }
+    return points;
+}
+
+void write_data(std::FILE* script, const Curve& curve, std::size_t columns) {
+    std::fputs("$curve << EOD\n", script);
+    for (const auto& [x, y] : thinned(curve, columns)) {
+        std::fprintf(script, "%s %s\n", number(x).c_str(), number(y).c_str());
+    }
+    std::fputs("EOD\n", script);
+}
+
+/// The range of the height axis: what is far below the highest value is not worth paper.
+void write_range(std::FILE* script, const Curve& curve) {
+    const double top = *std::ranges::max_element(curve.y);
+    if (!curve.decibels) {
+        std::fprintf(script, "set yrange [0:%s]\n", number(top > 0 ? 1.15 * top : 1).c_str());
+        return;
+    }
+    constexpr double deepest = 150;
+    const double low = std::max(*std::ranges::min_element(curve.y), top - deepest);
+    std::fprintf(script, "set yrange [%s:%s]\n", number(std::floor(low / 10) * 10).c_str(),
+                 number(std::ceil((top + 5) / 10) * 10).c_str());
+}
+
+std::string peak_label(const Curve& curve, const Peak& peak) {
+    std::array<char, 96> text;
+    std::snprintf(text.data(), text.size(), "%.4g (%.4g%s%s)", peak.frequency,
+                  1 / std::fabs(peak.frequency), curve.unit.empty() ? "" : " ", curve.unit.c_str());
+    return text.data();
+}
+
+void write_labels(std::FILE* script, const Curve& curve, bool characters) {
+    const double right_part = curve.x.front() + 0.75 * (curve.x.back() - curve.x.front());
+    for (const auto& peak : curve.marked) {
+        const double height = curve.decibels ? 20 * std::log10(peak.amplitude) : peak.amplitude;
+        const bool left = peak.frequency < right_part;
+        const std::string aside = characters ? "1,0" : "0.8,0.3";
+        std::fprintf(
+            script, "set label %s at %s,%s %s offset %s%s front%s\n",
+            quoted(peak_label(curve, peak)).c_str(), number(peak.frequency).c_str(),
+            number(height).c_str(), left ? "left" : "right", left ? "" : "-", aside.c_str(),
+            characters ? "" : " point pt 7 ps 0.7 lc rgb '#c0392b' textcolor rgb '#333333'");
+    }
+}
+
+void write_script(std::FILE* script, const Curve& curve, Picture picture) {
+    const bool characters = picture == Picture::terminal;
+    std::fputs("set encoding utf8\nset key off\nset tics nomirror out\nset border 3\n", script);
+    if (characters) {
+        const auto [width, height] = terminal_size();
+        std::fprintf(script, "set terminal dumb noenhanced size %d,%d\n", width, height);
+    } else {
+        std::fputs(picture == Picture::png
+                       ? "set terminal pngcairo noenhanced size 1000,560 font 'Sans,11'\n"
+                       : "set terminal svg noenhanced size 1000,560 font 'Sans,13' background "
+                         "'#ffffff'\n",
+                   script);
+        std::fputs("set grid lc rgb '#e0e0e0' lt 1\nset border lc rgb '#555555'\n", script);
+    }
+    std::fprintf(script, "set title %s\nset xlabel %s\nset ylabel %s\n",
+                 quoted(curve.title).c_str(), quoted(curve.x_label).c_str(),
+                 quoted(curve.y_label).c_str());
+    std::fprintf(script, "set xrange [%s:%s]\n", number(curve.x.front()).c_str(),
+                 number(curve.x.back()).c_str());
+    write_range(script, curve);
+    write_labels(script, curve, characters);
+    write_data(script, curve, characters ? 200 : 4000);
+    std::fputs("plot ", script);
+    if (!curve.decibels && !characters) {
+        std::fputs("$curve with filledcurves y=0 fc rgb '#1f5fa8' fs transparent solid 0.15, ",
+                   script);
+    }
+    std::fputs(characters ? "$curve with lines\n" : "$curve with lines lw 1.4 lc rgb '#1f5fa8'\n",
+               script);
+}
+
+}  // namespace
+
+Picture picture_of_name(const std::string& path) {
+    if (path == "-") return Picture::terminal;
+    const auto extension = std::filesystem::path(path).extension();
+    if (extension == ".png") return Picture::png;
+    if (extension == ".svg") return Picture::svg;
+    throw UsageError("a picture's name ends in .png or .svg, or is - for the terminal, not '" +
+                     path + "'");
+}
+
+void draw(const Curve& curve, const std::string& path) {
+    if (curve.x.size() < 2) throw Error("there are too few frequencies to draw");
+    OutputFile picture(path);
+    {
+        Progress progress("drawing");
+        const auto script = scratch();
+        write_script(script.get(), curve, picture_of_name(path));
+        run_gnuplot(script.get(), picture.stream());
+    }
+    picture.commit();
+}
+
+}  // namespace wavkit::tool

@@ -1,0 +1,29 @@
+// Pictures of spectra, drawn by gnuplot.
+#pragma once
+
+#include <optional>
+#include <span>
+#include <string>
+#include <vector>
+
+#include "peaks.hpp"
+
+namespace wavkit::tool {
+
+struct Curve {
+    std::string title, x_label, y_label;
+    std::vector<double> x, y;
+    bool decibels = false;
+    std::string unit;          // of the period, for the labels of the peaks
+    std::vector<Peak> marked;  // peaks to label
+};
+
+/// The format of a picture by its name: "-" is a drawing in characters. Throws for others than
+/// .png and .svg.
+enum class Picture { png, svg, terminal };
+Picture picture_of_name(const std::string& path);
+
+/// Draws a curve into a file, completely or not at all; "-" is standard output.
+void draw(const Curve& curve, const std::string& path);
+
+}  // namespace wavkit::tool

@@ -1,0 +1,164 @@
+#include "recording.hpp"
+
+#include <wavkit/dsp.h>
+
+#include <algorithm>
+#include <array>
+
+#include "error.hpp"
+#include "input.hpp"
+#include "options.hpp"
+#include "output.hpp"
+#include "progress.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+Format format_of_contents(InputFile& input) {
+    const auto head = input.head(4096);
+    static constexpr std::array<unsigned char, 2> binary_starts{0xEB, 0xBE};
+    if (looks_like_sound(head)) return Format::wav;
+    if (!head.empty() && std::ranges::count(binary_starts, static_cast<unsigned char>(head[0]))) {
+        return Format::binary;
+    }
+    if (head.starts_with("#DSP")) return Format::text;
+    if (format_of_name(input.name()) == Format::csv || looks_like_csv(head)) return Format::csv;
+    return Format::text;
+}
+
+std::vector<Signal> read_signal_file(InputFile& input) {
+    Progress progress("reading " + input.name());
+    std::vector<Signal> signals;
+    while (true) {
+        Signal x;
+        const int result = dspf_fread(x, input.stream());
+        if (result == 0) return signals;
+        if (result < 0) {
+            throw Error("cannot read " + input.name() + ": signal " +
+                        std::to_string(signals.size() + 1) + " is damaged or no signal at all");
+        }
+        signals.push_back(std::move(x));
+    }
+}
+
+/// The same signal in the other record; a record may borrow, so no copy of the header is needed.
+class Narrowed {
+  public:
+    explicit Narrowed(const Signal& x) : samples_(x.values().begin(), x.values().end()) {
+        dspf_init(&record_);
+        record_.delta = float(x->delta);
+        record_.points = x->points;
+        record_.complex = x->complex;
+        record_.data = samples_.data();
+    }
+    const dspf* get() const { return &record_; }
+
+  private:
+    std::vector<float> samples_;
+    dspf record_;
+};
+
+void write_signal_file(std::FILE* to, std::span<const Signal> signals, Format format, bool single) {
+    Progress progress("writing");
+    const int flags = format == Format::text ? 1 : 0;
+    for (const auto& x : signals) {
+        const int result =
+            single ? dspff_fwrite2(Narrowed(x).get(), to, flags) : dspf_fwrite2(x, to, flags);
+        if (result != 0) return;  // the stream remembers why
+    }
+}
+
+}  // namespace
+
+void ReadOptions::declare(CLI::App& command) {
+    const char* const group = "Reading";
+    add_choice(command, "--from", format, formats(), "format of IN (default: by its contents)")
+        ->group(group);
+    auto* const spacing = command.add_option("--delta", delta, "sample spacing, whatever IN says")
+                              ->check(CLI::PositiveNumber)
+                              ->type_name("STEP")
+                              ->group(group);
+    command.add_option("--rate", rate, "sampling rate: a spacing of 1/RATE")
+        ->check(CLI::PositiveNumber)
+        ->type_name("RATE")
+        ->excludes(spacing)
+        ->group(group);
+    command.add_flag("--time", csv.time, "CSV: the first column is the time of each sample")
+        ->group(group);
+    command
+        .add_option_function<std::string>(
+            "--column",
+            [this](const std::string& list) { csv.columns = CLI::detail::split(list, ','); },
+            "CSV: column to read, by number from 1 or name; two (2,3) are re,im")
+        ->check([](const std::string& list) {
+            const auto count = std::ranges::count(list, ',') + 1;
+            return count > 2 ? "one column or two, as in 2,3" : "";
+        })
+        ->type_name("COLUMN")
+        ->group(group);
+    command.add_option("--channel", channel, "sound: channel to read, from 1")
+        ->check(CLI::PositiveNumber)
+        ->type_name("N")
+        ->group(group);
+    command.add_option("--signal", signal, "signal to take of several in a file, from 1")
+        ->check(CLI::PositiveNumber)
+        ->type_name("N")
+        ->group(group);
+}
+
+Format WriteOptions::format_for(const std::string& path) const {
+    if (format) return *format;
+    if (path == "-") return Format::binary;
+    const auto named = format_of_name(path);
+    if (!named) throw UsageError("cannot tell a format from the name '" + path + "'; say --to");
+    return *named;
+}
+
+Recording read_recording(const std::string& path, const ReadOptions& options) {
+    InputFile input(path);
+    const auto format = options.format.value_or(format_of_contents(input));
+    Recording recording;
+    if (is_sound(format)) {
+        auto sound = read_sound(input, options.channel);
+        recording = {std::move(sound.description), true, std::move(sound.channels)};
+    } else if (format == Format::csv) {
+        recording = {"CSV", false, read_csv(input, options.csv)};
+    } else {
+        const char* const kind =
+            format == Format::binary ? "binary signal file" : "text signal file";
+        recording = {kind, false, read_signal_file(input)};
+    }
+
+    auto& signals = recording.signals;
+    if (signals.empty()) throw Error("there is no signal in " + input.name());
+    if (options.signal) {
+        if (std::size_t(*options.signal) > signals.size()) {
+            throw Error(input.name() + " holds " + std::to_string(signals.size()) +
+                        " signals, no signal " + std::to_string(*options.signal));
+        }
+        std::swap(signals[0], signals[std::size_t(*options.signal) - 1]);
+        signals.resize(1);
+    }
+    for (auto& x : signals) {
+        if (options.delta) x->delta = *options.delta;
+        if (options.rate) x->delta = 1 / *options.rate;
+    }
+    return recording;
+}
+
+void write_recording(const std::string& path, std::span<const Signal> signals,
+                     const WriteOptions& options) {
+    const auto format = options.format_for(path);
+    OutputFile output(path);
+    if (is_sound(format)) {
+        const auto usual = format == Format::flac ? SampleType::pcm24 : SampleType::float32;
+        write_sound(output.stream(), signals, format, options.samples.value_or(usual));
+    } else if (format == Format::csv) {
+        write_csv(output.stream(), signals, options.time);
+    } else {
+        write_signal_file(output.stream(), signals, format, options.single.value_or(false));
+    }
+    output.commit();
+}
+
+}  // namespace wavkit::tool

@@ -1,0 +1,53 @@
+// Signals in and out, whatever the file format.
+#pragma once
+
+#include <CLI/CLI.hpp>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "csv.hpp"
+#include "format.hpp"
+#include "signal.hpp"
+#include "sound.hpp"
+
+namespace wavkit::tool {
+
+/// How a source is to be read.
+struct ReadOptions {
+    std::optional<Format> format;  // otherwise told from the contents
+    std::optional<double> delta, rate;
+    CsvLayout csv;
+    std::optional<int> channel;  // of a sound file, from 1
+    std::optional<int> signal;   // the only one wanted, from 1
+
+    /// Adds the options to a subcommand.
+    void declare(CLI::App& command);
+};
+
+/// How a result is to be written.
+struct WriteOptions {
+    std::optional<Format> format;  // otherwise told from the name
+    bool time = false;
+    std::optional<bool> single;  // signal files in single precision
+    std::optional<SampleType> samples;
+
+    /// The format for this name; throws where neither name nor option tells.
+    Format format_for(const std::string& path) const;
+};
+
+/// What a source held.
+struct Recording {
+    std::string description;
+    bool sound = false;  // its spacing is in seconds
+    std::vector<Signal> signals;
+};
+
+/// Reads every signal that was asked for; at least one, or it throws.
+Recording read_recording(const std::string& path, const ReadOptions& options);
+
+/// Writes signals under a name, completely or not at all.
+void write_recording(const std::string& path, std::span<const Signal> signals,
+                     const WriteOptions& options);
+
+}  // namespace wavkit::tool

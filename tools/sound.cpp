@@ -1,0 +1,188 @@
+#include "sound.hpp"
+
+#include <sndfile.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <limits>
+#include <memory>
+
+#include "csv.hpp"
+#include "error.hpp"
+#include "progress.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+constexpr std::size_t block_frames = 1 << 14;
+
+using Handle = std::unique_ptr<SNDFILE, int (*)(SNDFILE*)>;
+
+/// libsndfile on the descriptor of a stream whose buffer holds nothing yet.
+Handle open_sound(std::FILE* stream, int mode, SF_INFO& info, const std::string& what) {
+    const int file = fileno(stream);
+    lseek(file, 0, SEEK_SET);
+    Handle handle(sf_open_fd(file, mode, &info, SF_FALSE), sf_close);
+    if (!handle) {
+        std::string reason = sf_strerror(nullptr);
+        while (!reason.empty() && (reason.back() == '\n' || reason.back() == '.')) {
+            reason.pop_back();
+        }
+        throw Error(what + ": " + reason);
+    }
+    return handle;
+}
+
+std::string format_name(int command, int format) {
+    SF_FORMAT_INFO info{};
+    info.format = format;
+    return sf_command(nullptr, command, &info, sizeof info) == 0 && info.name ? info.name : "sound";
+}
+
+/// The sampling rate of a file for signals of this spacing.
+int whole_rate(double delta) {
+    const double exact = 1 / delta, rate = std::round(exact);
+    if (!(rate >= 1) || !(rate <= std::numeric_limits<int>::max()) ||
+        std::fabs(exact - rate) > 1e-3 * rate) {
+        throw Error("a sound file needs a whole number of samples a second, not " + number(exact) +
+                    "; give --rate or --delta");
+    }
+    if (std::fabs(exact - rate) > 1e-6 * rate) {
+        std::fprintf(stderr, "wavkit: the sampling rate %s is stored as %.0f\n",
+                     number(exact).c_str(), rate);
+    }
+    return int(rate);
+}
+
+/// One channel of a file: a real signal, or one part of a complex one.
+struct Channel {
+    const double* first;
+    std::size_t step;
+};
+
+std::vector<Channel> channels_of(std::span<const Signal> signals) {
+    std::vector<Channel> channels;
+    for (const auto& x : signals) {
+        if (x->points != signals[0]->points || x->delta != signals[0]->delta) {
+            throw Error(
+                "signals of different lengths or spacings do not fit one sound file; choose "
+                "one with --signal");
+        }
+        const std::size_t width = x->complex ? 2 : 1;
+        for (std::size_t part = 0; part < width; ++part)
+            channels.push_back({x->data + part, width});
+    }
+    return channels;
+}
+
+int samples_of(SampleType type) {
+    switch (type) {
+        case SampleType::pcm16:
+            return SF_FORMAT_PCM_16;
+        case SampleType::pcm24:
+            return SF_FORMAT_PCM_24;
+        case SampleType::float32:
+            break;
+    }
+    return SF_FORMAT_FLOAT;
+}
+
+/// A plain WAV file ends at 4 GiB; RF64 is what takes over there.
+int container_of(Format format, double scalars) {
+    if (format == Format::flac) return SF_FORMAT_FLAC;
+    return 4 * scalars < 4.0e9 ? SF_FORMAT_WAV : SF_FORMAT_RF64;
+}
+
+}  // namespace
+
+bool looks_like_sound(const std::string& head) {
+    static constexpr std::array magics{"RIFF", "RIFX", "RF64", "fLaC",
+                                       "OggS", "FORM", ".snd", "caff"};
+    return std::ranges::any_of(magics, [&](const char* magic) { return head.starts_with(magic); });
+}
+
+Sound read_sound(InputFile& input, std::optional<int> channel) {
+    SF_INFO info{};
+    const auto file = open_sound(input.stream(), SFM_READ, info, "cannot read " + input.name());
+    const auto channels = std::size_t(info.channels);
+    if (channel && (*channel < 1 || *channel > info.channels)) {
+        throw Error(input.name() + " has " + std::to_string(info.channels) + " channel" +
+                    (info.channels == 1 ? "" : "s") + ", no channel " + std::to_string(*channel));
+    }
+    Sound sound;
+    sound.format =
+        (info.format & SF_FORMAT_TYPEMASK) == SF_FORMAT_FLAC ? Format::flac : Format::wav;
+    sound.description = format_name(SFC_GET_FORMAT_INFO, info.format & SF_FORMAT_TYPEMASK) + ", " +
+                        format_name(SFC_GET_FORMAT_INFO, info.format & SF_FORMAT_SUBMASK);
+    const std::size_t first = channel ? std::size_t(*channel - 1) : 0;
+    const std::size_t count = channel ? 1 : channels;
+    for (std::size_t c = 0; c < count; ++c) sound.channels.emplace_back(1.0 / info.samplerate);
+
+    Progress progress("reading " + input.name());
+    std::vector<double> frames(block_frames * channels), samples;
+    sf_count_t done = 0;
+    while (true) {
+        const auto got = sf_readf_double(file.get(), frames.data(), block_frames);
+        if (got <= 0) break;
+        for (std::size_t c = 0; c < count; ++c) {
+            samples.clear();
+            for (sf_count_t i = 0; i < got; ++i) {
+                samples.push_back(frames[std::size_t(i) * channels + first + c]);
+            }
+            sound.channels[c].append(samples);
+        }
+        done += got;
+        progress.done(double(done) / double(info.frames));
+    }
+    if (sf_error(file.get()) != SF_ERR_NO_ERROR) {
+        throw Error("cannot read " + input.name() + ": " + sf_strerror(file.get()));
+    }
+    return sound;
+}
+
+void write_sound(std::FILE* to, std::span<const Signal> signals, Format format, SampleType type) {
+    if (signals.empty()) throw Error("there is no signal to write");
+    if (format == Format::flac && type == SampleType::float32) {
+        throw UsageError("FLAC holds whole numbers only: use --bits 16 or 24");
+    }
+    const auto channels = channels_of(signals);
+    const auto points = std::size_t(signals[0]->points);
+    SF_INFO info{};
+    info.samplerate = whole_rate(signals[0]->delta);
+    info.channels = int(channels.size());
+    info.format = container_of(format, double(points * channels.size())) | samples_of(type);
+    auto file = open_sound(to, SFM_WRITE, info, "cannot write this sound file");
+    sf_command(file.get(), SFC_SET_CLIPPING, nullptr, SF_TRUE);
+
+    Progress progress("writing");
+    std::size_t clipped = 0;
+    std::vector<double> frames;
+    for (std::size_t start = 0; start < points; start += block_frames) {
+        const auto count = std::min(block_frames, points - start);
+        frames.clear();
+        for (std::size_t i = start; i < start + count; ++i) {
+            for (const auto& channel : channels) {
+                const double sample = channel.first[i * channel.step];
+                if (type != SampleType::float32 && std::isnan(sample)) {
+                    throw Error("sample " + std::to_string(i) +
+                                " is not a number; only --bits float can hold it");
+                }
+                clipped += std::fabs(sample) > 1 ? 1 : 0;
+                frames.push_back(sample);
+            }
+        }
+        if (sf_writef_double(file.get(), frames.data(), sf_count_t(count)) != sf_count_t(count)) {
+            throw Error(std::string("cannot write this sound file: ") + sf_strerror(file.get()));
+        }
+        progress.done(double(start) / double(points));
+    }
+    if (sf_close(file.release()) != 0) throw Error("cannot write this sound file");
+    if (type != SampleType::float32 && clipped > 0) {
+        std::fprintf(stderr, "wavkit: %zu sample%s beyond -1 to 1 clipped\n", clipped,
+                     clipped == 1 ? "" : "s");
+    }
+}
+
+}  // namespace wavkit::tool

@@ -1,0 +1,36 @@
+// Sound files through libsndfile: one real signal a channel.
+#pragma once
+
+#include <cstdio>
+#include <optional>
+#include <span>
+#include <string>
+#include <vector>
+
+#include "format.hpp"
+#include "input.hpp"
+#include "signal.hpp"
+
+namespace wavkit::tool {
+
+enum class SampleType { pcm16, pcm24, float32 };
+
+/// Whether contents begin like one of the usual sound files.
+bool looks_like_sound(const std::string& head);
+
+/// What a sound file is: "WAV (Microsoft), 16 bit PCM, 44100 Hz".
+struct Sound {
+    std::string description;
+    Format format;
+    std::vector<Signal> channels;
+};
+
+/// Reads all channels, or the one given (from 1).
+Sound read_sound(InputFile& input, std::optional<int> channel);
+
+/// Writes signals of one length and spacing as the channels of one file; a complex signal takes two
+/// channels, re and im. The spacing becomes the nearest whole sampling rate; what was lost on the
+/// way (clipped samples, a rate that is no whole number) is told on standard error.
+void write_sound(std::FILE* to, std::span<const Signal> signals, Format format, SampleType type);
+
+}  // namespace wavkit::tool
