@@ -43,7 +43,6 @@ WAVKIT_API int dspfs_mean(const dspf *x, dspf *out);
  *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_min(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_min(const dspf *x, dspf *out);
-
 WAVKIT_API int dsps_max(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_max(const dspf *x, dspf *out);
 
@@ -79,7 +78,6 @@ WAVKIT_API int dspfs_samp_var(const dspf *x, dspf *out);
  *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_pop_stddev(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_pop_stddev(const dspf *x, dspf *out);
-
 WAVKIT_API int dsps_samp_stddev(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_samp_stddev(const dspf *x, dspf *out);
 
