@@ -4,16 +4,20 @@ file(GLOB WAVKIT_HEADERS CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/include/wavkit/
 
 # The kernels' widths are the compiler's vector extension; x86 processors get them in three forms.
 set(kernels ${PROJECT_SOURCE_DIR}/src/kernel)
-set_source_files_properties(${kernels}/fft_baseline.cpp ${kernels}/fft_avx2.cpp
-  ${kernels}/fft_avx512.cpp PROPERTIES COMPILE_OPTIONS "-Wno-psabi;-ffp-contract=fast")
+foreach(family fft convolve)
+  set_source_files_properties(${kernels}/${family}_baseline.cpp ${kernels}/${family}_avx2.cpp
+    ${kernels}/${family}_avx512.cpp PROPERTIES COMPILE_OPTIONS "-Wno-psabi;-ffp-contract=fast")
+  if(CMAKE_SYSTEM_PROCESSOR MATCHES "x86_64|AMD64")
+    set_property(SOURCE ${kernels}/${family}_avx2.cpp APPEND PROPERTY COMPILE_OPTIONS -mavx2 -mfma)
+    set_property(SOURCE ${kernels}/${family}_avx512.cpp APPEND PROPERTY COMPILE_OPTIONS
+      -mavx512f -mavx512dq -mavx512vl -mfma)
+  endif()
+endforeach()
 if(CMAKE_SYSTEM_PROCESSOR MATCHES "x86_64|AMD64")
-  set_property(SOURCE ${kernels}/fft_avx2.cpp APPEND PROPERTY COMPILE_OPTIONS -mavx2 -mfma)
-  set_property(SOURCE ${kernels}/fft_avx512.cpp APPEND PROPERTY COMPILE_OPTIONS
-    -mavx512f -mavx512dq -mavx512vl -mfma)
   set_source_files_properties(${kernels}/dispatch.cpp PROPERTIES
     COMPILE_DEFINITIONS WAVKIT_X86_KERNELS)
 else()
-  list(FILTER WAVKIT_SOURCES EXCLUDE REGEX "fft_avx(2|512)\\.cpp$")
+  list(FILTER WAVKIT_SOURCES EXCLUDE REGEX "src/kernel/.*_avx(2|512)\\.cpp$")
 endif()
 
 add_library(wavkit_objects OBJECT ${WAVKIT_SOURCES})

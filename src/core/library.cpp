@@ -1,4 +1,5 @@
 // The library as a whole: version, start-up, release of its caches.
+#include "filter/convolution.hpp"
 #include "precision.hpp"
 #include "spectral/caches.hpp"
 #include "spectral/tables.hpp"
@@ -11,7 +12,8 @@ constexpr int version = 201;  // major * 100 + minor
 
 template <Record R>
 int free_caches() {
-    return status(bitrev_free_tables<R>() || dct_free_tables<R>() || dft_free_tables<R>() ||
+    return status(fir_free_cache<R>() || sfir_free_cache<R>() || bitrev_free_tables<R>() ||
+                  dct_free_tables<R>() || dft_free_tables<R>() || filter_free_scratch<R>() ||
                   fft_free_tables<R>() || window_free_cache<R>());
 }
 

@@ -1,4 +1,5 @@
 // Chooses the kernels for the processor at hand.
+#include "kernel/convolve_sets.hpp"
 #include "kernel/fft_sets.hpp"
 
 namespace wavkit::kernel {
@@ -34,7 +35,24 @@ const FftKernels<T>& fft_kernels() {
     }
 }
 
+template <class T>
+Convolve<T> convolve_kernel() {
+    switch (best_set()) {
+#if defined(WAVKIT_X86_KERNELS)
+        case Set::avx512:
+            return convolve_avx512<T>();
+        case Set::avx2:
+            return convolve_avx2<T>();
+#endif
+        default:
+            return convolve_baseline<T>();
+    }
+}
+
 template const FftKernels<double>& fft_kernels();
 template const FftKernels<float>& fft_kernels();
+
+template Convolve<double> convolve_kernel();
+template Convolve<float> convolve_kernel();
 
 }  // namespace wavkit::kernel
