@@ -29,8 +29,8 @@ WAVKIT_API int dspfi_window_fir(dspf *h, int window, float bw);
  *  Few taps are applied one by one; from 46 real taps on (36 with complex input) blocks of no fewer
  *  than M - 1 samples go through transforms, whose cost hardly grows with M, and whose spectrum of
  *  the taps is kept for the next call. Taps that differ from those of that call by no more than
- *  1.1e-15 of the first one then count as the same. The samples of a NaN or an infinity's
- *  neighbourhood that come out as NaN are more with transforms.
+ *  1.1e-15 of the first one then count as the same. A NaN or an infinity spoils the M outputs that
+ *  it takes part in; with transforms it spoils those around them as well.
  *
  *  Any of the records may be the same or share their buffers; the result is that of separate
  * copies. An output that is the state record holds the output in the end. The caches are shared by
