@@ -21,8 +21,9 @@ inline constexpr std::size_t lanes = 128 / sizeof(T);
 template <class Terms>
 using terms_of = std::remove_cvref_t<std::invoke_result_t<Terms, std::size_t>>;
 
+/// Out of line, where the lanes have all registers to themselves.
 template <class Terms>
-terms_of<Terms> sums_of_block(std::size_t begin, std::size_t end, Terms terms) {
+[[gnu::noinline]] terms_of<Terms> sums_of_block(std::size_t begin, std::size_t end, Terms terms) {
     using Sums = terms_of<Terms>;
     using T = typename Sums::value_type;
     constexpr std::size_t count = std::tuple_size_v<Sums>;

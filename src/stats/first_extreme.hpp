@@ -26,10 +26,11 @@ T winner_of_block(std::size_t begin, std::size_t end, T start, Key key, Beats be
 /// is none. A key that is NaN beats nothing.
 template <class T, class Key, class Beats>
 std::size_t first_extreme(std::size_t n, T start, Key key, Beats beats) {
+    constexpr std::size_t searched_points = 256;  // few: the last block is walked twice
     T best = start;
     std::size_t at = n;
-    for (std::size_t begin = 0; begin < n; begin += block_points) {
-        const std::size_t end = std::min(n, begin + block_points);
+    for (std::size_t begin = 0; begin < n; begin += searched_points) {
+        const std::size_t end = std::min(n, begin + searched_points);
         const T winner = winner_of_block(begin, end, best, key, beats);
         if (!beats(winner, best)) continue;
         best = winner;
