@@ -9,55 +9,52 @@ namespace {
 
 constexpr auto nan = std::numeric_limits<long double>::quiet_NaN();
 constexpr auto inf = std::numeric_limits<long double>::infinity();
+constexpr long double decay = 0.315563649157834L;
 
 template <class R>
-struct HistogramTest : ::testing::Test {
-    static constexpr auto hist = pick<R>(dsps_hist, dspfs_hist);
-};
+struct HistogramTest : ::testing::Test {};
 TYPED_TEST_SUITE(HistogramTest, Precisions);
 
 TYPED_TEST(HistogramTest, CountsWhereTheEdgesSay) {
     using R = TypeParam;
+    const auto hist = pick<R>(dsps_hist, dspfs_hist);
+    const auto r = [](const std::vector<long double>& x) { return real<R>(x); };
     const long double eps = epsilon<R>, B = limits<R>::big;
+    const auto pairs = complex<R>({{3, 4}, {-4, 3}, {0, -inf}, {nan, 0}, {0, 1}});
     const struct {
-        std::vector<long double> in;
-        double lo, width;
+        Signal<R> in;
+        long double lo, width;
         int bins;
-        std::vector<long double> want;
+        Signal<R> want;
     } cases[] = {
-        {{0, 0.5L, 1, 2}, 0, 1, 2, {2, 2}},
-        {{-0.1L, -0.5L, 3, nan, inf, -inf, B}, 0, 1, 2, {0, 0}},
-        {{-0.0L, 4 * (1 + 9 * eps), 4 * (1 + 11 * eps)}, 0, 1, 4, {1, 0, 0, 1}},
-        {{1, 2, 2.5L, 5, nan}, 2, 0, 3, {1, 0, 0}},
-        {{1, 0.9L, -1, 1.1L}, 1, -1, 2, {2, 1}},
-        {{1, 2}, 0, 1, INT_MIN, {}},
-        {{}, 0, 1, 2, {0, 0}},
+        {r({0, 0.5L, 1, 2}), 0, 1, 2, r({2, 2})},
+        {r({-0.1L, -0.5L, 3, nan, inf, -inf, B}), 0, 1, 2, r({0, 0})},
+        {r({-0.0L, 4 * (1 + 9 * eps), 4 * (1 + 11 * eps)}), 0, 1, 4, r({1, 0, 0, 1})},
+        {r({1, 2, 2.5L, 5, nan}), 2, 0, 3, r({1, 0, 0})},
+        {r({1, 0.9L, -1, 1.1L}), 1, -1, 2, r({2, 1})},
+        {r({1, 2}), 0, 1, INT_MIN, r({})},
+        {r({}), 0, 1, 2, r({0, 0})},
+        {pairs, 1, B / 4, 5, r({3, 0, 0, 0, 1})},
     };
     for (const auto& c : cases) {
-        in_every_place(real<R>(c.in), [&](const R* in, R* out) {
-            ASSERT_EQ(this->hist(in, out, scalar<R>(c.lo), scalar<R>(c.width), c.bins), 0);
-            EXPECT_TRUE(is_real<R>(out, c.want)) << &c - cases;
-            EXPECT_EQ(out->delta, scalar<R>(c.width));
+        const auto lo = scalar<R>(c.lo), width = scalar<R>(c.width);
+        in_every_place(c.in, [&](const R* in, R* out) {
+            ASSERT_EQ(hist(in, out, lo, width, c.bins), 0);
+            EXPECT_TRUE(matches<R>(out, c.want)) << &c - cases;
+            EXPECT_EQ(out->delta, width);
         });
     }
-}
-
-TYPED_TEST(HistogramTest, MagnitudesAndManyBins) {
-    using R = TypeParam;
-    Signal<R> out;
-    const auto z = complex<R>({{3, 4}, {-4, 3}, {0, -inf}, {nan, 0}, {0, 1}});
-    ASSERT_EQ(this->hist(z, out, 1, scalar<R>(limits<R>::big / 4), 5), 0);
-    EXPECT_TRUE(is_real<R>(out, {3, 0, 0, 0, 1}));
     // So many bins that the tolerance of the upper edge spans several in single precision.
     const int many = 5000000;
     const auto above = std::nextafter(scalar<R>(many), limits<R>::big);
-    ASSERT_EQ(this->hist(real<R>({many, above, many - 1}), out, 0, 1, many), 0);
+    Signal<R> out;
+    ASSERT_EQ(hist(r({many, above, many - 1}), out, 0, 1, many), 0);
     EXPECT_EQ(out[many - 1], 3);
-    const auto borrowed_in_place = [&] {
-        Borrowed<R> x(z);
-        return this->hist(x, x, 0, 1, 3);
-    };
-    EXPECT_EQ(fail_each_growth<R>(borrowed_in_place), 2);
+    EXPECT_EQ(fail_each_growth<R>([&] {
+                  Borrowed<R> x(pairs);
+                  return hist(x, x, 0, 1, 3);
+              }),
+              2);
 }
 
 template <class R>
@@ -68,50 +65,56 @@ TYPED_TEST_SUITE(PeakTest, Precisions);
 
 TYPED_TEST(PeakTest, SelectsAndInterpolates) {
     using R = TypeParam;
-    const long double B = limits<R>::big, far = std::exp(0.315563649157834L * 2.25L);
-    const long double near = std::exp(0.315563649157834L * 0.25L);
+    const auto r = [](const std::vector<long double>& x) { return real<R>(x, 0.5); };
+    const long double B = limits<R>::big, usual = 2 * std::sqrt(B);
+    const long double rise = std::exp(decay / 4), limit = std::exp(decay * 9 / 4);
+    const auto capped = complex<R>({{B, inf}, {0, usual}, {nan, 0}});
     const struct {
-        std::vector<long double> in;
+        Signal<R> in;
         unsigned flags;
         int index;
         long double height, position;
         int result = 0;
     } cases[] = {
-        {{1, 3, 3, 1}, 0xffffc8ff, 9, 3, 1},
-        {{1, 3, 3, 1}, 0x2000, 9, 1, 0},
-        {{5, nan, -1, 7}, 0, 0, 7, 3},
-        {{nan, -B, -inf}, 0, 0, nan, 0},
-        {{inf, 2 * B}, 0x2000, 0, inf, 0},
-        {{5, 4, 3, 2, 1}, 0x1000, 10, 1, 4},
-        {{5, 4, 3, 2, 1}, 0x3000, -10, 5, 0},
-        {{1, 4, 3}, 0x100, 0, 4.125L, 1.25L},
-        {{4, 1, 2}, 0x2100, 0, 0.875L, 1.25L},
-        {{9, 4, 3}, 0x100, 0, 9, 0},
-        {{3, 4, 9}, 0x100, 0, 9, 2},
-        {{1, 2, 3}, 0x1100, 1, -inf, -inf},
-        {{2, 2, 2}, 0x1100, 1, nan, nan},
-        {{6}, 0x300, 0, 6, 0},
-        {{2, 2}, 0x200, 0, 2 * near, 0.5L},
-        {{3, 5, 5, 3}, 0x300, 0, 5 * near, 1.5L},
-        {{1, 20}, 0x200, 0, far, 1.5L, -1},
-        {{20, 1}, 0x300, 0, 20 * near, -0.5L, -1},
-        {{-1, 1}, 0x200, 0, nan, nan},
-        {{1, 2}, 0x1700, 0, 0, 0, -1},
-        {{}, 0x1700, 3, 0, 0},
+        {r({1, 3, 3, 1}), 0xffffc8ff, 9, 3, 1},
+        {r({1, 3, 3, 1}), 0x2000, 9, 1, 0},
+        {r({5, nan, -1, 7}), 0, 0, 7, 3},
+        {r({nan, -B, -inf}), 0, 0, nan, 0},
+        {r({inf, 2 * B}), 0x2000, 0, inf, 0},
+        {complex<R>({{3, 4}, {0, 6}, {-5, 1}}), 0, 0, 36, 1},
+        {capped, 0, 0, usual * usual, 1},
+        {capped, 0x2000, 0, inf, 0},
+        {r({5, 4, 3, 2, 1}), 0x1000, 10, 1, 4},
+        {r({5, 4, 3, 2, 1}), 0x3000, -10, 5, 0},
+        {r({1, 4, 3}), 0x100, 0, 4.125L, 1.25L},
+        {r({4, 1, 2}), 0x2100, 0, 0.875L, 1.25L},
+        {r({9, 4, 3}), 0x100, 0, 9, 0},
+        {r({3, 4, 9}), 0x100, 0, 9, 2},
+        {r({1, 2, 3}), 0x1100, 1, -inf, -inf},
+        {r({2, 2, 2}), 0x1100, 1, nan, nan},
+        {r({6}), 0x300, 0, 6, 0},
+        {r({2, 2}), 0x200, 0, 2 * rise, 0.5L},
+        {r({3, 5, 5, 3}), 0x300, 0, 5 * rise, 1.5L},
+        {r({1, 20}), 0x200, 0, limit, 1.5L, -1},
+        {r({20, 1}), 0x300, 0, 20 * rise, -0.5L, -1},
+        {r({-1, 1}), 0x200, 0, nan, nan},
+        {r({1, 2}), 0x1700, 0, 0, 0, -1},
+        {r({}), 0x1700, 3, 0, 0},
     };
     for (const auto& c : cases) {
-        in_every_place(real<R>(c.in, 0.5), [&](const R* in, R* out) {
+        in_every_place(c.in, [&](const R* in, R* out) {
             const scalar<R> delta = out == in ? 1 : out->delta;
             EXPECT_EQ(this->peak(in, out, c.flags, c.index), c.result);
             EXPECT_TRUE(is_real<R>(out, {c.height, c.position}, 4)) << &c - cases;
             EXPECT_EQ(out->delta, delta);
         });
     }
+    EXPECT_EQ(fail_each_growth<R>([&] { return this->peak(capped, Signal<R>(), 0, 0); }), 1);
 }
 
 TYPED_TEST(PeakTest, BellCurveIsFoundBetweenItsSamples) {
     using R = TypeParam;
-    const auto amplitude = [](long double t) { return 2 * std::exp(-0.315563649157834L * t * t); };
+    const auto amplitude = [](long double t) { return 2 * std::exp(-decay * t * t); };
     const std::pair<long double, int> centres[] = {{0.1L, 0}, {1.5L, 1}, {2.8L, 2}, {4.75L, 4}};
     for (const auto& [centre, lower] : centres) {
         std::vector<std::complex<long double>> lobe;
@@ -124,18 +127,6 @@ TYPED_TEST(PeakTest, BellCurveIsFoundBetweenItsSamples) {
         const auto d = centre - lower - 0.5L;
         EXPECT_NEAR(out[1], centre - d * (d * d - 0.25L) * 0.02036L, 64 * epsilon<R>);
     }
-}
-
-TYPED_TEST(PeakTest, ComplexPointsCompareBySquaredMagnitude) {
-    using R = TypeParam;
-    Signal<R> out;
-    ASSERT_EQ(this->peak(complex<R>({{3, 4}, {0, 6}, {-5, 1}}), out, 0, 0), 0);
-    EXPECT_TRUE(is_real<R>(out, {36, 1}));
-    const long double root = std::sqrt((long double)limits<R>::big);
-    const auto x = complex<R>({{inf, 0}, {0, 2 * root}, {nan, 0}});
-    EXPECT_EQ(this->peak(x, out, 0, 0) || out[1] != 1, 0);
-    EXPECT_EQ(this->peak(x, out, 0x2000, 0) || out[1] != 0, 0);
-    EXPECT_EQ(fail_each_growth<R>([&] { return this->peak(x, Signal<R>(), 0, 0); }), 1);
 }
 
 }  // namespace

@@ -3,7 +3,7 @@
 #include <functional>
 
 #include "support/failing_allocator.hpp"
-#include "support/signals.hpp"
+#include "support/oracles.hpp"
 
 namespace wavkit::test {
 namespace {
@@ -12,7 +12,6 @@ constexpr auto nan = std::numeric_limits<long double>::quiet_NaN();
 constexpr auto inf = std::numeric_limits<long double>::infinity();
 
 using Exact = std::complex<long double>;
-using Samples = std::vector<Exact>;
 
 // The first seven give a complex result for a complex signal, the last two take none.
 enum { sum, mean, low, high, median, gmean, hmean, first_real, energy = first_real, rms };
@@ -91,14 +90,12 @@ TYPED_TEST(StatisticsTest, FollowTheirDefinitions) {
     Noise noise;
     for (const int n : {3, 40, 2049, 5000}) {
         for (auto x : {noise.real<R>(n), noise.complex<R>(n)}) {
-            Samples exact;
             for (int i = 0; i < n; ++i) {  // skewed, and of arguments that add up to little
                 auto* z = x->data + i * width<R>(x);
                 z[0] = scalar<R>(0.75) + z[0] * z[0] / 2;
                 if (x->complex) z[1] /= 8;
-                exact.emplace_back(z[0], x->complex ? z[1] : 0);
             }
-            this->each(x, [want = definitions(exact)](int k, const Signal<R>& in) {
+            this->each(x, [want = definitions(samples_of<R>(x))](int k, const Signal<R>& in) {
                 if (k == gmean && in->points > 40) return;  // its product vanishes
                 Signal<R> out;
                 out->delta = 5;
