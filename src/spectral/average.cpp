@@ -26,8 +26,8 @@ bool fails_into(R* scratch, int result) {
     return result != 0;
 }
 
-/// The weighted mean of what `forth` makes of the spectra, turned back by `back`. All steps run even
-/// after a failure: an average that has gone forth comes back.
+/// The weighted mean of what `forth` makes of the spectra, turned back by `back`. All steps run
+/// even after a failure: an average that has gone forth comes back.
 template <Record R, class Forth, class Back>
 int transformed_mean(const R* input, R* avg, R* scratch, scalar<R> weight, Forth forth, Back back) {
     bool failed = fails_into(scratch, dsp_copy(scratch, input));
@@ -44,10 +44,14 @@ int fold(const R* input, R* avg, R* scratch, int type, int count, int every, sca
     const auto logarithm = [](R* x) { return dspi_log(x); };
     const auto exponential = [](R* x) { return dspi_exp(x); };
     switch (type) {
-        case none: return dsp_copy(avg, input);
-        case linear: return dspb_avg_add(input, avg, avg, weight);
-        case maximum: return dspb_max(input, avg, avg);
-        case minimum: return dspb_min(input, avg, avg);
+        case none:
+            return dsp_copy(avg, input);
+        case linear:
+            return dspb_avg_add(input, avg, avg, weight);
+        case maximum:
+            return dspb_max(input, avg, avg);
+        case minimum:
+            return dspb_min(input, avg, avg);
         case harmonic:
             return transformed_mean(input, avg, scratch, weight, reciprocal, reciprocal);
         case logarithmic:
@@ -55,7 +59,8 @@ int fold(const R* input, R* avg, R* scratch, int type, int count, int every, sca
         case every_nth:
             if (every == 1 || (every > 0 && count % every == 1)) return dsp_copy(avg, input);
             return 0;
-        default: return 0;
+        default:
+            return 0;
     }
 }
 
