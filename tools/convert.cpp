@@ -30,6 +30,21 @@ void run(const ConvertOptions& options) {
     write_recording(options.out, recording.signals, options.writing);
 }
 
+constexpr const char* about_formats =
+    R"(Names ending in .dsp .sig .bin are binary signal files, .txt .dsa text ones, .csv .wav .flac
+what they say; - is binary unless --to says otherwise.
+
+Every channel of a sound file is a signal of its own; a complex signal becomes two channels.
+Several signals in one CSV file are separated by a blank line. CSV has one column, or two (re,im)
+of a complex signal; separators may be commas, semicolons, tabs or blanks, and lines without
+numbers at the top are a header.
+
+Examples:
+  wavkit convert tone.wav tone.csv --channel 1 --with-time
+  wavkit convert log.csv log.dsp --time --column 3
+  wavkit convert readings.txt readings.dsp --rate 360
+  wavkit convert log.dsp - --to csv | head)";
+
 }  // namespace
 
 void add_convert(CLI::App& program) {
@@ -52,22 +67,7 @@ void add_convert(CLI::App& program) {
     add_choice<bool>(*command, "--type", writing.single, {{"double", false}, {"float", true}},
                      "signal files: precision of the samples (default: double)");
     options->reading.declare(*command);
-    command->footer(
-        "Names ending in .dsp .sig .bin are binary signal files, .txt .dsa text ones, .csv .wav "
-        ".flac what\n"
-        "they say; - is binary unless --to says otherwise.\n\n"
-        "Every channel of a sound file is a signal of its own; a complex signal becomes two "
-        "channels.\n"
-        "Several signals in one CSV file are separated by a blank line. CSV has one column, or "
-        "two\n"
-        "(re,im) of a complex signal; separators may be commas, semicolons, tabs or blanks, and "
-        "lines\n"
-        "without numbers at the top are a header.\n\n"
-        "Examples:\n"
-        "  wavkit convert tone.wav tone.csv --channel 1 --with-time\n"
-        "  wavkit convert log.csv log.dsp --time --column 3\n"
-        "  wavkit convert readings.txt readings.dsp --rate 360\n"
-        "  wavkit convert log.dsp - --to csv | head");
+    command->footer(about_formats);
     command->callback([options] { run(*options); });
 }
 

@@ -144,8 +144,8 @@ std::vector<Peak> find_peaks(const Spectrum& spectrum, std::size_t count, const 
     std::vector<Peak> peaks;
     for (const int i : kept) {
         const auto peak = refine(spectrum, magnitudes, i);
-        const bool unmirrored = !spectrum.two_sided && i == last;
-        peaks.push_back({spectrum.frequency(peak.bin), peak.height * (unmirrored ? 0.5 : 1.0)});
+        const double share = spectrum.has_no_mirror(i) ? 0.5 : 1.0;
+        peaks.push_back({spectrum.frequency(peak.bin), share * peak.height});
     }
     std::ranges::stable_sort(peaks, std::greater(), &Peak::amplitude);
     return peaks;

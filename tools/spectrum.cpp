@@ -22,16 +22,17 @@ int transform_length(const Signal& x, int points) {
 
 /// The windows given by a formula fill the whole record, whatever its length: dsph_fft(), which
 /// windows in a width that need not be whole, has no use for them.
-bool takes_width(int window) { return window != 1 && window < 14; }
+bool takes_width(int window) {
+    return window != DSP_WINDOW_BARTLETT && window < DSP_WINDOW_KAISER70;
+}
 
 /// dsph_fft() for the other windows: the same samples, scale and layout.
-int fft_whole_record(const Signal& x, Signal& bins, const SpectrumSettings& settings, int length,
-                     int samples) {
+int fft_whole_record(const Signal& x, const Spectrum& shape, Signal& bins) {
     constexpr int scaled_split = 0x300;
-    if (dsp_copy_at_most(bins, x, samples) || dspi_window(bins, settings.window, 0)) return -1;
-    if (!settings.two_sided && dspi_scale(bins, 2.0)) return -1;
-    if (dspi_zpad2(bins, length, scaled_split)) return -1;
-    if (!settings.two_sided) return dspi_rfft(bins);
+    if (dsp_copy_at_most(bins, x, shape.samples) || dspi_window(bins, shape.window, 0)) return -1;
+    if (!shape.two_sided && dspi_scale(bins, 2.0)) return -1;
+    if (dspi_zpad2(bins, shape.length, scaled_split)) return -1;
+    if (!shape.two_sided) return dspi_rfft(bins);
     return dspi_fft(bins, 0) || dspi_swap_halves(bins) ? -1 : 0;
 }
 
@@ -67,17 +68,25 @@ Spectrum measure(const Signal& x, const SpectrumSettings& settings) {
         }
         ++i;
     }
-    auto used = settings;
-    used.two_sided = settings.two_sided || x->complex;
     const int length = transform_length(x, settings.points);
     const int samples = std::min(x->points, int(std::ceil(length * settings.fraction)));
+    const bool two_sided = settings.two_sided || x->complex;
+    Spectrum spectrum{{}, samples, length, settings.window, two_sided};
 
-    Spectrum spectrum{{}, samples, length, settings.window, used.two_sided};
-    check(takes_width(used.window)
-              ? dsph_fft(x, spectrum.bins, used.points, used.fraction, used.window,
-                         used.two_sided ? DSP_SPECTRUM_TWO_SIDED : 0)
-              : fft_whole_record(x, spectrum.bins, used, length, samples),
-          "computing the spectrum");
+    const int flags = two_sided ? DSP_SPECTRUM_TWO_SIDED : 0;
+    int status;
+    if (takes_width(settings.window)) {
+        status =
+            dsph_fft(x, spectrum.bins, settings.points, settings.fraction, settings.window, flags);
+    } else if (settings.points == 0 && settings.fraction == 1) {
+        spectrum.length = samples;
+        status = dsph_dft(x, spectrum.bins, settings.window, flags);
+    } else {
+        Signal bins;
+        status = fft_whole_record(x, spectrum, bins);
+        spectrum.bins = std::move(bins);
+    }
+    check(status, "computing the spectrum");
     return spectrum;
 }
 
@@ -89,9 +98,8 @@ Signal magnitudes(const Spectrum& spectrum) {
 
 Signal amplitudes(const Spectrum& spectrum) {
     auto result = magnitudes(spectrum);
-    if (!spectrum.two_sided) {
-        result.values().front() *= 0.5;
-        if (spectrum.length > 1) result.values().back() *= 0.5;
+    for (int i = 0; i < result->points; ++i) {
+        if (spectrum.has_no_mirror(i)) result->data[i] *= 0.5;
     }
     return result;
 }

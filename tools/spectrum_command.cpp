@@ -196,33 +196,44 @@ void run(SpectrumOptions& options) {
     if (options.out.empty() && options.peaks == 0 && options.plot.empty()) print_summary(result);
 }
 
-std::string footer() {
-    std::string windows;
-    for (const auto& name : window_names()) windows += (windows.empty() ? "" : " ") + name;
-    return "Without -o, --peaks or --plot a short summary is printed. -o writes "
-           "frequency,amplitude into\n"
-           ".csv, and the complex bins into a signal file (.dsp, .txt).\n\n"
-           "Amplitudes are those of the signal's sine components: a sine of amplitude 3 shows as "
-           "3. In a\n"
-           "one-sided spectrum a constant shows as itself; --complex and signal files hold the "
-           "bins as\n"
-           "dsph_fft() leaves them, with the first and the last one doubled like all others.\n\n"
-           "Windows (any name of the catalogue, in upper or lower case):\n  " +
-           windows +
-           "\n\nPeaks lie between bins. Most windows place them by a parabola through the "
-           "logarithms of three\n"
-           "bins: Hann to 0.02 bins and 4 %, Kaiser90 to 0.003 bins and 0.4 %. Gausstop has a rule "
-           "of its own:\n"
-           "0.000005 bins and 0.1 % (when no zeros are added). Flat windows read amplitudes to "
-           "0.06 % and\n"
-           "frequencies to 0.17 bins. docs/program.md has the figures of all.\n"
-           "\nWithout zeros means: as many samples as a power of two, as --points chooses.\n"
-           "\n\nExamples:\n"
-           "  wavkit spectrum tone.wav --peaks 5\n"
-           "  wavkit spectrum log.csv --time --detrend --db --plot log.png\n"
-           "  wavkit spectrum readings.txt --rate 360 --window Flattop -o spectrum.csv\n"
-           "  wavkit convert tone.wav - --channel 2 | wavkit spectrum - --plot -";
+/// The names of the windows in lines of a fair length.
+std::string window_list() {
+    std::string list = " ";
+    std::size_t line = 0;
+    for (const auto& name : window_names()) {
+        if (list.size() - line + name.size() > 90) {
+            list += "\n ";
+            line = list.size();
+        }
+        list += " " + name;
+    }
+    return list;
 }
+
+constexpr const char* about_results =
+    R"(Without -o, --peaks or --plot a short summary is printed. -o writes frequency,amplitude into
+.csv, and the complex bins into a signal file (.dsp, .txt).
+
+Amplitudes are those of sine components: a sine of amplitude 3 shows as 3. In a one-sided spectrum
+a constant shows as itself; --complex and signal files hold the bins as the library leaves them,
+with those at 0 and at half the sampling rate doubled as well.
+
+Windows, in upper or lower case; other names of the catalogue will do, too:
+)";
+
+constexpr const char* about_peaks = R"(
+
+Peaks lie between bins. Most windows place them by a parabola through the logarithms of three bins:
+Hann to 0.02 bins and 4 %, Kaiser90 to 0.003 bins and 0.4 %. Gausstop has a rule of its own, good
+to 0.000005 bins and 0.1 % where no zeros are added: for 2^n samples, or with --points below their
+number. Flat windows read amplitudes to 0.06 % and frequencies to 0.17 bins. docs/program.md has
+the figures for all.
+
+Examples:
+  wavkit spectrum tone.wav --peaks 5
+  wavkit spectrum log.csv --time --detrend --db --plot log.png
+  wavkit spectrum readings.txt --rate 360 --window Flattop -o spectrum.csv
+  wavkit convert tone.wav - --channel 2 | wavkit spectrum - --plot -)";
 
 }  // namespace
 
@@ -266,7 +277,7 @@ void add_spectrum(CLI::App& program) {
     command->add_option("--unit", options->unit, "unit of the spacing, for labels: s gives Hz")
         ->type_name("UNIT");
     options->reading.declare(*command);
-    command->footer(footer());
+    command->footer(about_results + window_list() + about_peaks);
     command->callback([options] { run(*options); });
 }
 

@@ -103,6 +103,15 @@ TEST_F(SpectrumTest, SidesConstantsAndDecibels) {
     printed("spectrum x.dsp --window hamming --db -o x.sig");
     EXPECT_EQ(read("x.sig").at(0)->complex, 0);
 
+    // Seven samples through a window that fills its record: half a bin short of half the rate.
+    write("odd.dsp", Signals{real<dsp>({1, 1, 1, 1, 1, 1, 1})});
+    const auto odd = rows(printed("spectrum odd.dsp --window kaiser70 -o - --to csv"));
+    ASSERT_EQ(odd.size(), 4u);
+    EXPECT_NEAR(odd[0][1], 1, 1e-12);
+    EXPECT_DOUBLE_EQ(odd[3][0], 3.0 / 7);
+    ASSERT_EQ(dsph_dft(real<dsp>({1, 1, 1, 1, 1, 1, 1}), want, DSP_WINDOW_KAISER70, 0), 0);
+    EXPECT_NEAR(odd[3][1], std::hypot(want[6], want[7]), 1e-15);
+
     write("z.dsp", Signals{complex<dsp>({{0, 3}, {3, 0}, {0, -3}, {-3, 0}})});  // 3 at -1/4
     EXPECT_EQ(rows(printed("spectrum z.dsp --window none --peaks 1")).at(0),
               (std::vector<double>{-0.25, 4, 3}));
