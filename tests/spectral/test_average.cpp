@@ -118,7 +118,8 @@ Samples correlation(const Samples& a, const Samples& b, std::size_t m) {
 TYPED_TEST(AverageTest, CorrelationBySlidingSums) {
     using R = TypeParam;
     Noise noise;
-    for (const auto& [points, m] : {std::pair{1, 1}, {2, 1}, {5, 5}, {8, 3}, {100, 37}, {129, 1}}) {
+    for (const auto& sizes : {std::pair{1, 1}, {2, 1}, {5, 5}, {8, 3}, {100, 37}, {129, 1}}) {
+        const int points = sizes.first, m = sizes.second;  // clang 14 captures no bindings
         for (const int kinds : {0, 1, 2, 3}) {
             auto a = kinds & 1 ? noise.complex<R>(m + 2) : noise.real<R>(m + 2);
             auto b = kinds & 2 ? noise.complex<R>(points) : noise.real<R>(points);
