@@ -55,9 +55,10 @@ constexpr double noise_floor = 1e-12;
 
 Rule rule_for(const Spectrum& spectrum) {
     const Rule rule = lobes[std::size_t(spectrum.window)].rule;
-    // The pair's constants hold for bins as far apart as the measured samples put them.
-    return rule == Rule::gauss_pair && spectrum.length != spectrum.samples ? Rule::log_parabola
-                                                                           : rule;
+    // The pair's constants hold for bins as far apart as the measured samples put them, and it
+    // takes complex bins, which an average has not.
+    const bool pairs = spectrum.length == spectrum.samples && spectrum.bins->complex;
+    return rule == Rule::gauss_pair && !pairs ? Rule::log_parabola : rule;
 }
 
 /// Height and position, in bins, that dsps_peak() finds at a bin.
@@ -144,8 +145,8 @@ std::vector<Peak> find_peaks(const Spectrum& spectrum, std::size_t count, const 
     std::vector<Peak> peaks;
     for (const int i : kept) {
         const auto peak = refine(spectrum, magnitudes, i);
-        const double share = spectrum.has_no_mirror(i) ? 0.5 : 1.0;
-        peaks.push_back({spectrum.frequency(peak.bin), share * peak.height});
+        peaks.push_back({spectrum.frequency(peak.bin),
+                         peak.height * (spectrum.has_no_mirror(i) ? 0.5 : 1.0), i});
     }
     std::ranges::stable_sort(peaks, std::greater(), &Peak::amplitude);
     return peaks;

@@ -10,6 +10,7 @@ namespace wavkit::tool {
 
 struct Peak {
     double frequency, amplitude;
+    int bin;  // the highest one
 };
 
 /// The frequencies that are looked at.

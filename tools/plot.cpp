@@ -1,85 +1,21 @@
 #include "plot.hpp"
 
-#include <spawn.h>
 #include <sys/ioctl.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <array>
-#include <cerrno>
 #include <cmath>
-#include <cstring>
 #include <filesystem>
-#include <memory>
 
 #include "csv.hpp"
 #include "error.hpp"
+#include "gnuplot.hpp"
 #include "output.hpp"
 #include "progress.hpp"
 
-extern char** environ;
-
 namespace wavkit::tool {
 namespace {
-
-using Stream = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
-
-Stream scratch() {
-    Stream file(std::tmpfile(), std::fclose);
-    if (!file) throw Error(std::string("cannot make a temporary file: ") + std::strerror(errno));
-    return file;
-}
-
-std::string quoted(const std::string& text) {
-    std::string result = "\"";
-    for (const char c : text) {
-        if (c == '"' || c == '\\') result += '\\';
-        result += c;
-    }
-    return result + "\"";
-}
-
-/// The last line that gnuplot complained with.
-std::string complaint(std::FILE* errors) {
-    std::rewind(errors);
-    std::array<char, 512> line{};
-    std::string last;
-    while (std::fgets(line.data(), int(line.size()), errors)) {
-        std::string text(line.data());
-        while (!text.empty() && std::isspace(static_cast<unsigned char>(text.back()))) {
-            text.pop_back();
-        }
-        if (!text.empty()) last = text;
-    }
-    return last;
-}
-
-/// Runs gnuplot on a script; what it draws goes to `to`.
-void run_gnuplot(std::FILE* script, std::FILE* to) {
-    const auto errors = scratch();
-    std::fflush(script);
-    lseek(fileno(script), 0, SEEK_SET);
-    posix_spawn_file_actions_t streams;
-    posix_spawn_file_actions_init(&streams);
-    posix_spawn_file_actions_adddup2(&streams, fileno(script), STDIN_FILENO);
-    posix_spawn_file_actions_adddup2(&streams, fileno(to), STDOUT_FILENO);
-    posix_spawn_file_actions_adddup2(&streams, fileno(errors.get()), STDERR_FILENO);
-    std::string program = "gnuplot", option = "-d";  // no start-up files of the user's
-    std::array<char*, 3> arguments{program.data(), option.data(), nullptr};
-    pid_t child;
-    const int failure =
-        posix_spawnp(&child, program.c_str(), &streams, nullptr, arguments.data(), environ);
-    posix_spawn_file_actions_destroy(&streams);
-    if (failure == ENOENT) {
-        throw Error("pictures need gnuplot, which is not installed (Debian: gnuplot-nox)");
-    }
-    if (failure != 0) throw Error(std::string("cannot run gnuplot: ") + std::strerror(failure));
-    int status = 0;
-    while (waitpid(child, &status, 0) < 0 && errno == EINTR) {
-    }
-    if (status != 0) throw Error("gnuplot failed: " + complaint(errors.get()));
-}
 
 /// The terminal's width and height in characters.
 std::pair<int, int> terminal_size() {
@@ -121,32 +57,32 @@ void write_data(std::FILE* script, const Curve& curve, std::size_t columns) {
 void write_range(std::FILE* script, const Curve& curve) {
     const double top = *std::ranges::max_element(curve.y);
     if (!curve.decibels) {
-        std::fprintf(script, "set yrange [0:%s]\n", number(top > 0 ? 1.15 * top : 1).c_str());
+        const double low = *std::ranges::min_element(curve.y);
+        std::fprintf(script, "set yrange [%s:%s]\n", number(low < 0 ? 1.15 * low : 0).c_str(),
+                     number(top > 0 ? 1.15 * top : 1).c_str());
         return;
     }
-    constexpr double deepest = 150;
-    const double low = std::max(*std::ranges::min_element(curve.y), top - deepest);
+    const double low = std::max(*std::ranges::min_element(curve.y), top - curve.depth);
     std::fprintf(script, "set yrange [%s:%s]\n", number(std::floor(low / 10) * 10).c_str(),
                  number(std::ceil((top + 5) / 10) * 10).c_str());
 }
 
-std::string peak_label(const Curve& curve, const Peak& peak) {
+std::string peak_label(const Curve& curve, const Mark& mark) {
     std::array<char, 96> text;
-    std::snprintf(text.data(), text.size(), "%.4g (%.4g%s%s)", peak.frequency,
-                  1 / std::fabs(peak.frequency), curve.unit.empty() ? "" : " ", curve.unit.c_str());
+    std::snprintf(text.data(), text.size(), "%.4g (%.4g%s%s)", mark.x, 1 / std::fabs(mark.x),
+                  curve.unit.empty() ? "" : " ", curve.unit.c_str());
     return text.data();
 }
 
 void write_labels(std::FILE* script, const Curve& curve, bool characters) {
     const double right_part = curve.x.front() + 0.75 * (curve.x.back() - curve.x.front());
-    for (const auto& peak : curve.marked) {
-        const double height = curve.decibels ? 20 * std::log10(peak.amplitude) : peak.amplitude;
-        const bool left = peak.frequency < right_part;
+    for (const auto& mark : curve.marked) {
+        const bool left = mark.x < right_part;
         const std::string aside = characters ? "1,0" : "0.8,0.3";
         std::fprintf(
             script, "set label %s at %s,%s %s offset %s%s front%s\n",
-            quoted(peak_label(curve, peak)).c_str(), number(peak.frequency).c_str(),
-            number(height).c_str(), left ? "left" : "right", left ? "" : "-", aside.c_str(),
+            quoted(peak_label(curve, mark)).c_str(), number(mark.x).c_str(), number(mark.y).c_str(),
+            left ? "left" : "right", left ? "" : "-", aside.c_str(),
             characters ? "" : " point pt 7 ps 0.7 lc rgb '#c0392b' textcolor rgb '#333333'");
     }
 }

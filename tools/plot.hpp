@@ -1,21 +1,22 @@
-// Pictures of spectra, drawn by gnuplot.
+// Pictures of curves, drawn by gnuplot.
 #pragma once
 
-#include <optional>
-#include <span>
 #include <string>
 #include <vector>
 
-#include "peaks.hpp"
-
 namespace wavkit::tool {
+
+struct Mark {
+    double x, y;
+};
 
 struct Curve {
     std::string title, x_label, y_label;
     std::vector<double> x, y;
     bool decibels = false;
+    double depth = 150;        // decibels worth showing below the highest value
     std::string unit;          // of the period, for the labels of the peaks
-    std::vector<Peak> marked;  // peaks to label
+    std::vector<Mark> marked;  // peaks to label
 };
 
 /// The format of a picture by its name: "-" is a drawing in characters. Throws for others than

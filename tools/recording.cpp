@@ -6,7 +6,6 @@
 #include <array>
 
 #include "error.hpp"
-#include "input.hpp"
 #include "options.hpp"
 #include "output.hpp"
 #include "progress.hpp"
@@ -114,9 +113,17 @@ Format WriteOptions::format_for(const std::string& path) const {
     return *named;
 }
 
+Format format_of(InputFile& input, const ReadOptions& options) {
+    return options.format ? *options.format : format_of_contents(input);
+}
+
 Recording read_recording(const std::string& path, const ReadOptions& options) {
     InputFile input(path);
-    const auto format = options.format.value_or(format_of_contents(input));
+    return read_recording(input, options);
+}
+
+Recording read_recording(InputFile& input, const ReadOptions& options) {
+    const auto format = format_of(input, options);
     Recording recording;
     if (is_sound(format)) {
         auto sound = read_sound(input, options.channel);

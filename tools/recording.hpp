@@ -8,6 +8,7 @@
 
 #include "csv.hpp"
 #include "format.hpp"
+#include "input.hpp"
 #include "signal.hpp"
 #include "sound.hpp"
 
@@ -43,7 +44,11 @@ struct Recording {
     std::vector<Signal> signals;
 };
 
+/// The format that the options give, or the contents.
+Format format_of(InputFile& input, const ReadOptions& options);
+
 /// Reads every signal that was asked for; at least one, or it throws.
+Recording read_recording(InputFile& input, const ReadOptions& options);
 Recording read_recording(const std::string& path, const ReadOptions& options);
 
 /// Writes signals under a name, completely or not at all.

@@ -12,6 +12,7 @@
 #include "csv.hpp"
 #include "error.hpp"
 #include "progress.hpp"
+#include "stream.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -95,6 +96,61 @@ int container_of(Format format, double scalars) {
     return 4 * scalars < 4.0e9 ? SF_FORMAT_WAV : SF_FORMAT_RF64;
 }
 
+/// The channel that was asked for, if the file has it.
+std::optional<int> chosen_channel(const SF_INFO& info, const std::string& name,
+                                  std::optional<int> channel) {
+    if (channel && (*channel < 1 || *channel > info.channels)) {
+        throw Error(name + " has " + std::to_string(info.channels) + " channel" +
+                    (info.channels == 1 ? "" : "s") + ", no channel " + std::to_string(*channel));
+    }
+    return channel;
+}
+
+void check_complete(SNDFILE* file, const std::string& name) {
+    if (sf_error(file) == SF_ERR_NO_ERROR) return;
+    throw Error("cannot read " + name + ": " + sf_strerror(file));
+}
+
+/// One channel of a sound file.
+class SoundStream : public SampleStream {
+  public:
+    SoundStream(InputFile& input, std::optional<int> channel)
+        : name_(input.name()),
+          file_(open_sound(input.stream(), SFM_READ, info_, "cannot read " + name_)),
+          channel_(std::size_t(chosen_channel(info_, name_, channel).value_or(1) - 1)),
+          frames_(block_frames * std::size_t(info_.channels)) {
+        delta = 1.0 / info_.samplerate;
+        sound = true;
+        alone = channel || info_.channels == 1;
+    }
+
+    std::size_t read(std::span<double> values) override {
+        const auto width = std::size_t(info_.channels);
+        std::size_t done = 0;
+        while (done < values.size()) {
+            const auto wanted = std::min(values.size() - done, block_frames);
+            const auto got = sf_readf_double(file_.get(), frames_.data(), sf_count_t(wanted));
+            if (got <= 0) break;
+            for (std::size_t i = 0; i < std::size_t(got); ++i) {
+                values[done++] = frames_[i * width + channel_];
+            }
+        }
+        check_complete(file_.get(), name_);
+        taken_ += sf_count_t(done);
+        return done;
+    }
+
+    double done() const override { return double(taken_) / double(info_.frames); }
+
+  private:
+    SF_INFO info_{};
+    std::string name_;
+    Handle file_;
+    std::size_t channel_;
+    std::vector<double> frames_;
+    sf_count_t taken_ = 0;
+};
+
 }  // namespace
 
 bool looks_like_sound(const std::string& head) {
@@ -107,10 +163,7 @@ Sound read_sound(InputFile& input, std::optional<int> channel) {
     SF_INFO info{};
     const auto file = open_sound(input.stream(), SFM_READ, info, "cannot read " + input.name());
     const auto channels = std::size_t(info.channels);
-    if (channel && (*channel < 1 || *channel > info.channels)) {
-        throw Error(input.name() + " has " + std::to_string(info.channels) + " channel" +
-                    (info.channels == 1 ? "" : "s") + ", no channel " + std::to_string(*channel));
-    }
+    chosen_channel(info, input.name(), channel);
     Sound sound;
     sound.format =
         (info.format & SF_FORMAT_TYPEMASK) == SF_FORMAT_FLAC ? Format::flac : Format::wav;
@@ -136,10 +189,17 @@ Sound read_sound(InputFile& input, std::optional<int> channel) {
         done += got;
         progress.done(double(done) / double(info.frames));
     }
-    if (sf_error(file.get()) != SF_ERR_NO_ERROR) {
-        throw Error("cannot read " + input.name() + ": " + sf_strerror(file.get()));
-    }
+    check_complete(file.get(), input.name());
     return sound;
+}
+
+std::unique_ptr<SampleStream> stream_sound(InputFile& input, std::optional<int> channel,
+                                           std::optional<int> signal) {
+    if (channel && signal && *signal != 1) {
+        throw Error(input.name() + " holds 1 signal in that channel, no signal " +
+                    std::to_string(*signal));
+    }
+    return std::make_unique<SoundStream>(input, channel ? channel : signal);
 }
 
 void write_sound(std::FILE* to, std::span<const Signal> signals, Format format, SampleType type) {

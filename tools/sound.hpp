@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstdio>
+#include <memory>
 #include <optional>
 #include <span>
 #include <string>
@@ -12,6 +13,8 @@
 #include "signal.hpp"
 
 namespace wavkit::tool {
+
+class SampleStream;
 
 enum class SampleType { pcm16, pcm24, float32 };
 
@@ -27,6 +30,11 @@ struct Sound {
 
 /// Reads all channels, or the one given (from 1).
 Sound read_sound(InputFile& input, std::optional<int> channel);
+
+/// One channel, the first without a choice, to be read as it is needed. As every channel is a
+/// signal of its own, `signal` chooses one as well.
+std::unique_ptr<SampleStream> stream_sound(InputFile& input, std::optional<int> channel,
+                                           std::optional<int> signal);
 
 /// Writes signals of one length and spacing as the channels of one file; a complex signal takes two
 /// channels, re and im. The spacing becomes the nearest whole sampling rate; what was lost on the

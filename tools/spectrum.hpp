@@ -13,14 +13,17 @@ struct SpectrumSettings {
     int points = 0;       // length of the transform, made a power of two; 0: as many as samples
     double fraction = 1;  // share of the transform that samples fill; zeros fill the rest
     bool two_sided = false;
+    bool any_length = false;  // no zeros: the transform is as long as the samples
 };
 
 struct Spectrum {
-    Signal bins;  // complex, spaced in frequency by delta
-    int samples;  // measured
-    int length;   // of the transform: samples and zeros
+    Signal bins;   // spaced in frequency by delta; complex, but real where they are an average
+    int samples;   // measured
+    int length;    // of the transform: samples and zeros
+    double width;  // of the window, in samples, which need not be whole
     int window;
     bool two_sided;
+    long averaged = 1;  // spectra that went into it
 
     /// The bin of frequency 0.
     int origin() const { return two_sided ? length / 2 : 0; }
@@ -35,7 +38,13 @@ struct Spectrum {
 int window_of_name(const std::string& name);
 std::vector<std::string> window_names();
 
-/// Measures a signal. A complex one always has a two-sided spectrum.
+/// Refuses a spacing from which no frequencies follow.
+void check_spacing(double delta);
+
+/// Refuses values that are not finite; `first` is the sample that the first one belongs to.
+void check_finite(std::span<const double> values, bool complex, long first = 0);
+
+/// Measures a signal of finite samples. A complex one always has a two-sided spectrum.
 Spectrum measure(const Signal& x, const SpectrumSettings& settings);
 
 /// The magnitude of every bin, as the transform left it.
@@ -45,5 +54,13 @@ Signal magnitudes(const Spectrum& spectrum);
 /// the sampling rate, were doubled like the others and are halved again, so that a constant reads
 /// as itself.
 Signal amplitudes(const Spectrum& spectrum);
+
+/// What takes the amplitude of a bin to its density, see densities().
+double amplitude_to_density(const Spectrum& spectrum, int bin);
+
+/// The density of every bin, per root of the frequency: the rms value of its component over the
+/// root of the window's noise bandwidth. White noise shows the same whatever window and length, and
+/// the squares times the spacing of the bins add up to the signal's mean square.
+Signal densities(const Spectrum& spectrum);
 
 }  // namespace wavkit::tool

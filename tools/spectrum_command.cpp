@@ -1,199 +1,154 @@
 // wavkit spectrum: what frequencies a signal holds, and how much of each.
-#include <algorithm>
-#include <cmath>
 #include <cstdio>
-#include <filesystem>
 #include <memory>
+#include <optional>
 
 #include "commands.hpp"
 #include "error.hpp"
 #include "options.hpp"
-#include "output.hpp"
-#include "peaks.hpp"
 #include "plot.hpp"
 #include "progress.hpp"
-#include "recording.hpp"
-#include "spectrum.hpp"
+#include "segments.hpp"
+#include "spectrum_report.hpp"
+#include "waterfall.hpp"
 
 namespace wavkit::tool {
 namespace {
 
-constexpr std::size_t peaks_in_summary = 5, peaks_in_picture = 5;
-
 struct SpectrumOptions {
-    std::string in, out, plot, unit, window = "Hann";
+    std::string window = "Hann", waterfall;
     ReadOptions reading;
-    WriteOptions writing;
     SpectrumSettings settings;
-    bool detrend = false, slope = false, decibels = false, complex = false;
-    std::size_t peaks = 0;
-    std::vector<double> band;
+    Segmentation segments;
+    std::optional<double> overlap;
+    std::optional<AverageType> type;
+    Averaging averaging;
+    ReportOptions report;
+
+    bool segmented() const { return segments.length > 0; }
 };
 
-/// A measured spectrum and the words that go with it.
-struct Result {
-    const SpectrumOptions& options;
-    Spectrum spectrum;
-    Band band;
-    std::string unit;  // of time; empty: unknown
+constexpr int usual_segment = 1024;
 
-    std::string frequency_unit() const {
-        return unit == "s" ? "Hz" : unit.empty() ? "" : "1/" + unit;
+void check_segments(const SpectrumOptions& options) {
+    const auto type = options.averaging.type;
+    if (!options.segmented()) {
+        if (options.overlap || options.type || options.averaging.every ||
+            options.averaging.forget) {
+            throw UsageError("--overlap, --type, --every and --forget go with --average");
+        }
+        return;
     }
-    std::string amplitude_name() const { return options.decibels ? "amplitude (dB)" : "amplitude"; }
-};
-
-std::string with_unit(const std::string& name, const std::string& unit) {
-    return unit.empty() ? name : name + " (" + unit + ")";
+    if (options.settings.points > 0 || options.settings.fraction < 1) {
+        throw UsageError(
+            "the segments of --average and --waterfall are transformed whole, without "
+            "--points or --fraction");
+    }
+    if (options.report.complex) throw UsageError("an average has no phases for --complex");
+    if ((type == AverageType::every) != (options.averaging.every > 0)) {
+        throw UsageError("--every N and --type every go together");
+    }
+    if (options.averaging.forget > 0 && type != AverageType::linear &&
+        type != AverageType::harmonic && type != AverageType::log) {
+        throw UsageError("--forget goes with the types linear, harmonic and log");
+    }
 }
 
 void check_usage(const SpectrumOptions& options) {
-    if (!options.plot.empty()) picture_of_name(options.plot);
-    if (options.out.empty()) {
-        if (options.complex) throw UsageError("--complex is for the output that -o names");
-        if (options.writing.format) throw UsageError("--to is for the output that -o names");
+    const auto& report = options.report;
+    if (!report.plot.empty()) picture_of_name(report.plot);
+    if (!options.waterfall.empty() &&
+        (options.waterfall == "-" || picture_of_name(options.waterfall) != Picture::png)) {
+        throw UsageError("the picture of --waterfall is a .png file");
+    }
+    check_segments(options);
+    if (report.out.empty()) {
+        if (report.complex) throw UsageError("--complex is for the output that -o names");
+        if (report.writing.format) throw UsageError("--to is for the output that -o names");
         return;
     }
-    const auto format = options.writing.format_for(options.out);
+    const auto format = report.writing.format_for(report.out);
     if (is_sound(format)) throw UsageError("a spectrum cannot be written as a sound file");
-    if (!options.band.empty() && is_signal_file(format)) {
+    if (!report.band.empty() && is_signal_file(format)) {
         throw UsageError("a signal file holds the whole spectrum; --band goes with CSV");
     }
-    if (options.out == "-" && (options.peaks > 0 || options.plot == "-")) {
+    if (report.out == "-" && (report.peaks > 0 || report.plot == "-")) {
         throw UsageError("standard output takes only one of -o -, --plot - and --peaks");
     }
 }
 
-Signal prepared(Signal x, const SpectrumOptions& options) {
-    if (options.slope) {
-        check(dspi_differ(x), "computing the slope");
-        // The first difference is one to nothing, a step that the signal does not have.
-        check(dspu_subvec(x, x, 1, x->points), "computing the slope");
-        check(x->complex ? dspi_mag(x) : dspi_abs(x), "computing the slope");
-    }
-    if (options.detrend) {
-        Signal mean;
-        check(dsps_mean(x, mean) || dspi_neg(mean), "removing the mean");
-        const auto values = x.values();
-        const auto offset = mean.values();
-        for (std::size_t i = 0; i < values.size(); ++i) values[i] += offset[i % offset.size()];
-    }
-    return x;
+/// The band and the unit that a report shows.
+SpectrumReport report_of(const SpectrumOptions& options, Spectrum spectrum, bool sound) {
+    const auto& report = options.report;
+    Band band;
+    if (!report.band.empty()) band = {report.band[0], report.band[1]};
+    return {report, std::move(spectrum), band,
+            report.unit.empty() && sound ? std::string("s") : report.unit};
 }
 
-/// The amplitudes as they are shown: decibels where they were asked for.
-Signal shown_amplitudes(const Result& result) {
-    auto y = amplitudes(result.spectrum);
-    if (result.options.decibels) check(dspi_db(y, 20.0), "computing decibels");
-    return y;
-}
-
-void write_table(std::FILE* to, const Result& result) {
-    const auto& spectrum = result.spectrum;
-    const auto write = [&](const char* header, const Signal& y) {
-        const std::size_t width = y->complex ? 2 : 1;
-        std::fprintf(to, "frequency,%s\n", header);
-        for (int i = 0; i < y->points; ++i) {
-            const double frequency = spectrum.frequency(i);
-            if (!result.band.contains(frequency)) continue;
-            const auto value = y.values().subspan(std::size_t(i) * width, width);
-            std::fputs(number(frequency).c_str(), to);
-            for (const double part : value) std::fprintf(to, ",%s", number(part).c_str());
-            std::fputc('\n', to);
-        }
-    };
-    if (result.options.complex) {
-        write("re,im", spectrum.bins);
-    } else {
-        write(result.options.decibels ? "amplitude_db" : "amplitude", shown_amplitudes(result));
-    }
-}
-
-void write_output(Result& result) {
-    const auto& options = result.options;
-    Progress progress("writing");
-    if (options.writing.format_for(options.out) == Format::csv) {
-        OutputFile output(options.out);
-        write_table(output.stream(), result);
-        return output.commit();
-    }
-    if (!options.decibels) {
-        return write_recording(options.out, {&result.spectrum.bins, 1}, options.writing);
-    }
-    const auto y = shown_amplitudes(result);
-    write_recording(options.out, {&y, 1}, options.writing);
-}
-
-void print_peaks(const Result& result, std::size_t count) {
-    const auto peaks = find_peaks(result.spectrum, count, result.band);
-    if (peaks.empty()) {
-        std::puts("no peaks");
-        return;
-    }
-    std::printf("%18s %18s %18s\n", with_unit("frequency", result.frequency_unit()).c_str(),
-                with_unit("period", result.unit).c_str(), result.amplitude_name().c_str());
-    for (const auto& peak : peaks) {
-        const double height =
-            result.options.decibels ? 20 * std::log10(peak.amplitude) : peak.amplitude;
-        std::printf("%18.8g %18.8g %18.6g\n", peak.frequency, 1 / std::fabs(peak.frequency),
-                    height);
-    }
-}
-
-void print_summary(const Result& result) {
-    const auto& spectrum = result.spectrum;
-    const auto name = window_names()[std::size_t(spectrum.window)];
-    std::printf("%d samples through %s, transform of %d points, %s spectrum\n", spectrum.samples,
-                name.c_str(), spectrum.length, spectrum.two_sided ? "two-sided" : "one-sided");
-    const auto unit = result.frequency_unit();
-    std::printf("bins every %s%s, from %s to %s; strongest peaks:\n\n",
-                number(spectrum.bins->delta).c_str(), unit.empty() ? "" : (" " + unit).c_str(),
-                number(spectrum.frequency(0)).c_str(),
-                number(spectrum.frequency(spectrum.bins->points - 1)).c_str());
-    print_peaks(result, peaks_in_summary);
-}
-
-void draw_spectrum(const Result& result) {
-    const auto& options = result.options;
-    const auto y = shown_amplitudes(result);
-    Curve curve;
-    curve.title = options.in == "-" ? "standard input"
-                                    : std::filesystem::path(options.in).filename().string();
-    curve.title += ", " + window_names()[std::size_t(result.spectrum.window)];
-    curve.x_label = with_unit("frequency", result.frequency_unit());
-    curve.y_label = result.amplitude_name();
-    curve.decibels = options.decibels;
-    curve.unit = result.unit;
-    for (int i = 0; i < y->points; ++i) {
-        if (!result.band.contains(result.spectrum.frequency(i))) continue;
-        curve.x.push_back(result.spectrum.frequency(i));
-        curve.y.push_back(y->data[i]);
-    }
-    const auto count = std::min(options.peaks, peaks_in_picture);
-    if (count > 0) curve.marked = find_peaks(result.spectrum, count, result.band);
-    draw(curve, options.plot);
-}
-
-void run(SpectrumOptions& options) {
-    check_usage(options);
-    options.settings.window = window_of_name(options.window);
-    auto recording = read_recording(options.in, options.reading);
+SpectrumReport measured_whole(const SpectrumOptions& options) {
+    auto recording = read_recording(options.report.in, options.reading);
     if (recording.signals.size() > 1) {
         std::fprintf(stderr, "wavkit: using the first of %zu signals; choose with %s\n",
                      recording.signals.size(), recording.sound ? "--channel" : "--signal");
     }
-    Band band;
-    if (!options.band.empty()) band = {options.band[0], options.band[1]};
-    const auto unit = options.unit.empty() && recording.sound ? "s" : options.unit;
-    Result result = [&] {
-        Progress progress("transforming");
-        const auto x = prepared(std::move(recording.signals[0]), options);
-        return Result{options, measure(x, options.settings), band, unit};
-    }();
-    if (!options.out.empty()) write_output(result);
-    if (options.peaks > 0) print_peaks(result, options.peaks);
-    if (!options.plot.empty()) draw_spectrum(result);
-    if (options.out.empty() && options.peaks == 0 && options.plot.empty()) print_summary(result);
+    Progress progress("transforming");
+    auto& x = recording.signals[0];
+    if (options.segments.slope) take_slope(x);
+    if (options.segments.detrend) remove_mean(x);
+    check_finite(x.values(), x->complex);
+    return report_of(options, measure(x, options.settings), recording.sound);
+}
+
+SpectrumReport measured_in_segments(const SpectrumOptions& options) {
+    InputFile input(options.report.in);
+    const auto stream = open_stream(input, options.reading);
+    if (!stream->alone) {
+        std::fprintf(stderr, "wavkit: using the first of several signals; choose with %s\n",
+                     stream->sound ? "--channel" : "--signal");
+    }
+    SpectrumAverage average(options.averaging);
+    auto report = report_of(options, {}, stream->sound);
+    std::optional<Waterfall> waterfall;
+    if (!options.waterfall.empty()) {
+        waterfall.emplace(report.band, options.report.density,
+                          options.segments.step() * stream->delta);
+    }
+    {
+        Progress progress("measuring " + input.name());
+        measure_segments(*stream, options.segments, options.settings, [&](Spectrum& spectrum) {
+            average.add(spectrum);
+            if (waterfall) waterfall->add(spectrum);
+            progress.done(stream->done());
+        });
+    }
+    report.spectrum = average.result();
+    if (waterfall) {
+        waterfall->draw(
+            options.waterfall,
+            {short_name(options.report.in) + ", " +
+                 window_names()[std::size_t(report.spectrum.window)],
+             with_unit("time", report.unit), with_unit("frequency", report.frequency_unit()),
+             quantity_name(options.report.density, true, report.unit)});
+    }
+    return report;
+}
+
+void run(SpectrumOptions& options) {
+    if (!options.waterfall.empty() && !options.segmented()) options.segments.length = usual_segment;
+    options.segments.overlap = options.overlap.value_or(options.segments.overlap);
+    options.averaging.type = options.type.value_or(options.averaging.type);
+    check_usage(options);
+    options.settings.window = window_of_name(options.window);
+    const auto report =
+        options.segmented() ? measured_in_segments(options) : measured_whole(options);
+    const auto& shown = options.report;
+    if (!shown.out.empty()) write_output(report);
+    if (shown.peaks > 0) print_peaks(report, shown.peaks);
+    if (!shown.plot.empty()) draw_spectrum(report);
+    if (shown.out.empty() && shown.peaks == 0 && shown.plot.empty() && options.waterfall.empty()) {
+        print_summary(report);
+    }
 }
 
 /// The names of the windows in lines of a fair length.
@@ -221,19 +176,69 @@ with those at 0 and at half the sampling rate doubled as well.
 Windows, in upper or lower case; other names of the catalogue will do, too:
 )";
 
+constexpr const char* about_averages = R"(
+
+--average N cuts the recording into segments of N samples and shows the root of their mean power
+(Welch). --type chooses what becomes of the powers: linear their mean, harmonic and log the harmonic
+and the geometric mean, max and min the greatest and the least in every bin, last the newest
+segment, every the newest of every N-th (--every N). With --forget N the means are exponential: once
+N segments are in, a new one counts 1/N. What fills no segment at the end is left out. Sound files
+and binary signal files may be longer than memory.
+
+--density shows the rms value per root of the frequency, by the noise bandwidth of the window: white
+noise shows the same whatever the window and the length. That of a sine depends on both.)";
+
 constexpr const char* about_peaks = R"(
 
 Peaks lie between bins. Most windows place them by a parabola through the logarithms of three bins:
 Hann to 0.02 bins and 4 %, Kaiser90 to 0.003 bins and 0.4 %. Gausstop has a rule of its own, good
 to 0.000005 bins and 0.1 % where no zeros are added: for 2^n samples, or with --points below their
-number. Flat windows read amplitudes to 0.06 % and frequencies to 0.17 bins. docs/program.md has
+number, or with --any-length. Flat windows read amplitudes to 0.06 % and frequencies to 0.17 bins. docs/program.md has
 the figures for all.
 
 Examples:
   wavkit spectrum tone.wav --peaks 5
   wavkit spectrum log.csv --time --detrend --db --plot log.png
+  wavkit spectrum hour.wav --average 8192 --density --db --plot noise.png --waterfall hour.png
   wavkit spectrum readings.txt --rate 360 --window Flattop -o spectrum.csv
   wavkit convert tone.wav - --channel 2 | wavkit spectrum - --plot -)";
+
+void declare_averaging(CLI::App& command, SpectrumOptions& options) {
+    const char* const group = "Averaging";
+    command.add_option("--average", options.segments.length, "average over segments of N samples")
+        ->check(CLI::Range(1, 1 << 30))
+        ->type_name("N")
+        ->group(group);
+    command
+        .add_option("--overlap", options.overlap,
+                    "percent of a segment that lies in the one before (default: 50)")
+        ->check(CLI::Range(0.0, 99.0))
+        ->type_name("P")
+        ->group(group);
+    add_choice<AverageType>(command, "--type", options.type,
+                            {{"linear", AverageType::linear},
+                             {"max", AverageType::max},
+                             {"min", AverageType::min},
+                             {"harmonic", AverageType::harmonic},
+                             {"log", AverageType::log},
+                             {"last", AverageType::last},
+                             {"every", AverageType::every}},
+                            "what the average is (default: linear)")
+        ->group(group);
+    command.add_option("--every", options.averaging.every, "take every N-th segment")
+        ->check(CLI::PositiveNumber)
+        ->type_name("N")
+        ->group(group);
+    command.add_option("--forget", options.averaging.forget, "an exponential mean over N segments")
+        ->check(CLI::PositiveNumber)
+        ->type_name("N")
+        ->group(group);
+    command
+        .add_option("--waterfall", options.waterfall,
+                    "draw the segments' spectra over time (--average, or else 1024)")
+        ->type_name("FILE.png")
+        ->group(group);
+}
 
 }  // namespace
 
@@ -242,42 +247,53 @@ void add_spectrum(CLI::App& program) {
         "spectrum", "Measures the amplitude spectrum of a signal: values, peaks, pictures.");
     const auto options = std::make_shared<SpectrumOptions>();
     auto& settings = options->settings;
-    command->add_option("IN", options->in, "file to read; - is standard input")
+    auto& report = options->report;
+    command->add_option("IN", report.in, "file to read; - is standard input")
         ->required()
         ->type_name("");
-    command->add_option("-o,--output", options->out, "write the spectrum; - is standard output")
+    command->add_option("-o,--output", report.out, "write the spectrum; - is standard output")
         ->type_name("FILE");
-    add_choice<Format>(*command, "--to", options->writing.format,
+    add_choice<Format>(*command, "--to", report.writing.format,
                        {{"csv", Format::csv}, {"binary", Format::binary}, {"text", Format::text}},
                        "format of the output (default: by its name)");
-    command->add_option("--peaks", options->peaks, "print the N strongest peaks")
+    command->add_option("--peaks", report.peaks, "print the N strongest peaks")
         ->check(CLI::Range(1, 1000000))
         ->type_name("N");
-    command->add_option("--plot", options->plot, "draw into a .png or .svg file, or - the terminal")
+    command->add_option("--plot", report.plot, "draw into a .png or .svg file, or - the terminal")
         ->type_name("FILE");
     command->add_option("--window", options->window, "window (default: Hann)")->type_name("NAME");
     command->add_option("--points", settings.points, "samples to transform, made a power of two")
         ->check(CLI::Range(1, 1 << 30))
         ->type_name("N");
+    auto* const fraction =
+        command
+            ->add_option("--fraction", settings.fraction,
+                         "share of the transform to fill, 0 to 1; zeros fill the rest")
+            ->check(CLI::Range(1e-9, 1.0))
+            ->type_name("F");
     command
-        ->add_option("--fraction", settings.fraction,
-                     "share of the transform to fill, 0 to 1; zeros fill the rest")
-        ->check(CLI::Range(1e-9, 1.0))
-        ->type_name("F");
+        ->add_flag("--any-length", settings.any_length,
+                   "transform the samples as many as they are, without zeros")
+        ->excludes(fraction);
     command->add_flag("--two-sided", settings.two_sided, "show negative frequencies as well");
-    command->add_flag("--detrend", options->detrend, "remove the mean first");
-    command->add_flag("--slope", options->slope,
+    command->add_flag("--detrend", options->segments.detrend,
+                      "remove the mean first; of every segment by itself with --average");
+    command->add_flag("--slope", options->segments.slope,
                       "measure |slope| instead: how often pulses come, whatever their shape");
-    auto* const decibels =
-        command->add_flag("--db", options->decibels, "amplitudes in dB: 20 log10");
-    command->add_flag("--complex", options->complex, "CSV: frequency,re,im")->excludes(decibels);
-    command->add_option("--band", options->band, "frequencies to look at")
+    auto* const decibels = command->add_flag("--db", report.decibels, "heights in dB: 20 log10");
+    auto* const density =
+        command->add_flag("--density", report.density, "rms per root of the frequency, for noise");
+    command->add_flag("--complex", report.complex, "CSV: frequency,re,im")
+        ->excludes(decibels)
+        ->excludes(density);
+    command->add_option("--band", report.band, "frequencies to look at")
         ->expected(2)
         ->type_name("LOW HIGH");
-    command->add_option("--unit", options->unit, "unit of the spacing, for labels: s gives Hz")
+    command->add_option("--unit", report.unit, "unit of the spacing, for labels: s gives Hz")
         ->type_name("UNIT");
+    declare_averaging(*command, *options);
     options->reading.declare(*command);
-    command->footer(about_results + window_list() + about_peaks);
+    command->footer(about_results + window_list() + about_averages + about_peaks);
     command->callback([options] { run(*options); });
 }
 
