@@ -16,7 +16,7 @@ extern "C" {
  *      odd != 0  a b c d  ->  a b c d d c b    2 points - 1 (fewer than 2 points: unchanged)
  *
  *  `delta` and `complex` do not change. A borrowed record owns its samples afterwards.
- *  @return 0, or -1 when memory runs out */
+ *  @return 0, or -1 when memory runs out or the whole has more than 2^30 points */
 WAVKIT_API int dspi_orecon(dsp *x, int odd);
 WAVKIT_API int dspfi_orecon(dspf *x, int odd);
 

@@ -265,8 +265,9 @@ TYPED_TEST(RealFftTest, ReconstructionMirrorsAndConjugates) {
     EXPECT_TRUE(is_real<R>(host, {1, 2, 3, 2}));
     EXPECT_EQ(host.host.size(), 3u);
     Signal<R> huge;
-    huge->points = (1 << 30) + 2;
+    huge->points = (1 << 29) + 2;
     EXPECT_EQ(dspi_orecon(huge, 0), -1);
+    EXPECT_EQ(huge->points, (1 << 29) + 2);
 }
 
 }  // namespace
