@@ -226,6 +226,15 @@ inline int dspi_window2(dspf* x, int window, int scale_type, float win_length) {
 inline int dspi_window(dspf* x, int window, int scale_type) {
     return dspfi_window(x, window, scale_type);
 }
+inline int dspi_window_gauss(dspf* x, float sigma, int scale_type) {
+    return dspfi_window_gauss(x, sigma, scale_type);
+}
+inline int dspi_window_kaiser(dspf* x, float beta, int scale_type) {
+    return dspfi_window_kaiser(x, beta, scale_type);
+}
+inline int dspi_window_sinc(dspf* x, float x0, float p, int scale_type) {
+    return dspfi_window_sinc(x, x0, p, scale_type);
+}
 
 inline int dspc_line(dspf* x, float slope, float offset) { return dspfc_line(x, slope, offset); }
 

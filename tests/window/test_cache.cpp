@@ -18,9 +18,9 @@ TYPED_TEST_SUITE(Windowing, Precisions);
 
 template <Record R>
 int free_form(R* x, int which, int scale_type) {
-    if (which == 0) return pick<R>(dspi_window_kaiser, dspfi_window_kaiser)(x, 3, scale_type);
-    if (which == 1) return pick<R>(dspi_window_gauss, dspfi_window_gauss)(x, 1, scale_type);
-    return pick<R>(dspi_window_sinc, dspfi_window_sinc)(x, 1, 1, scale_type);
+    if (which == 0) return dspi_window_kaiser(x, 3, scale_type);
+    if (which == 1) return dspi_window_gauss(x, 1, scale_type);
+    return dspi_window_sinc(x, 1, 1, scale_type);
 }
 
 TYPED_TEST(Windowing, RotatesAndKeepsTheRest) {

@@ -181,20 +181,18 @@ TYPED_TEST(WindowShapes, SumsOfAnyCosines) {
 /// A window of parameters of one's own.
 template <Record R>
 Signal<R> gauss(int n, double sigma, int scale_type) {
-    const auto apply = pick<R>(dspi_window_gauss, dspfi_window_gauss);
-    return made<R>(n, [=](R* x) { return apply(x, scalar<R>(sigma), scale_type); });
+    return made<R>(n, [=](R* x) { return dspi_window_gauss(x, scalar<R>(sigma), scale_type); });
 }
 
 template <Record R>
 Signal<R> kaiser(double beta, int scale_type) {
-    const auto apply = pick<R>(dspi_window_kaiser, dspfi_window_kaiser);
-    return made<R>(9, [=](R* x) { return apply(x, scalar<R>(beta), scale_type); });
+    return made<R>(9, [=](R* x) { return dspi_window_kaiser(x, scalar<R>(beta), scale_type); });
 }
 
 template <Record R>
 Signal<R> sinc(int n, double x0, long double p, int scale_type) {
-    const auto apply = pick<R>(dspi_window_sinc, dspfi_window_sinc);
-    return made<R>(n, [=](R* x) { return apply(x, scalar<R>(x0), scalar<R>(p), scale_type); });
+    return made<R>(
+        n, [=](R* x) { return dspi_window_sinc(x, scalar<R>(x0), scalar<R>(p), scale_type); });
 }
 
 TYPED_TEST(WindowShapes, FreeParameters) {
