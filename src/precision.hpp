@@ -244,6 +244,13 @@ inline int dsps_rms(const dspf* x, dspf* out) { return dspfs_rms(x, out); }
 inline int dsps_pop_var(const dspf* x, dspf* out) { return dspfs_pop_var(x, out); }
 inline int dsps_magsq_sum(const dspf* x, dspf* out) { return dspfs_magsq_sum(x, out); }
 
+inline int dsps_psolve(const dspf* polynomial, dspf* out, float x0) {
+    return dspfs_psolve(polynomial, out, x0);
+}
+inline int dsps_pcsolve(const dspf* polynomial, dspf* out, float re0, float im0) {
+    return dspfs_pcsolve(polynomial, out, re0, im0);
+}
+
 namespace wavkit {
 
 /// A record of the library's own, released when it leaves the scope.

@@ -1,0 +1,190 @@
+// All roots of a polynomial, and the polynomial of its roots.
+#include <algorithm>
+
+#include "support/failing_allocator.hpp"
+#include "support/polynomials.hpp"
+
+namespace wavkit::test {
+namespace {
+
+using Z = std::complex<long double>;
+using List = std::vector<long double>;
+
+template <class R>
+struct RootsTest : ::testing::Test {
+    static constexpr auto solve = pick<R>(dsps_proots, dspfs_proots);
+    static constexpr auto solve_any = pick<R>(dspi_proots, dspfi_proots);
+    static constexpr auto expand = pick<R>(dspi_pztoc, dspfi_pztoc);
+};
+TYPED_TEST_SUITE(RootsTest, Precisions);
+
+TYPED_TEST(RootsTest, ClosedFormsInTheirOrder) {
+    using R = TypeParam;
+    const long double h = std::sqrt(3.0L) / 2, d = std::sqrt(0.5L);
+    const struct {
+        List c, real;
+        Samples complex = {};
+    } cases[] = {{{}, {}},
+                 {{7}, {}},
+                 {{3, 0, 0}, {}},
+                 {{-6, 2}, {3}},
+                 {{2, -3, 1}, {1, 2}},
+                 {{-2, -3, -1, 0}, {-2, -1}},  // 5
+                 {{0, 0, 4}, {0, 0}},
+                 {{-1, 0, 1, 0, 0, 0}, {-1, 1}},
+                 {{1, 0, 1}, {}, {{-0.0L, -1}, {-0.0L, 1}}},
+                 {{-6, 11, -6, 1}, {1, 2, 3}},
+                 {{-8, 12, -6, 1}, {2, 2, 2}},  // 10
+                 {{-1, 0, 0, 1}, {}, {1, {-0.5L, -h}, {-0.5L, h}}},
+                 {{24, -50, 35, -10, 1}, {1, 2, 3, 4}},
+                 {{5, -2, 6, -2, 1}, {}, {{0, -1}, {0, 1}, {1, -2}, {1, 2}}},
+                 {{5, 2, 6, 2, 1}, {}, {{-1, -2}, {-1, 2}, {0, -1}, {0, 1}}},
+                 {{-4, 0, 3, 0, 1}, {}, {-1, 1, {0, -2}, {0, 2}}},  // 15
+                 {{1, 0, 0, 0, 1}, {}, {{-d, -d}, {-d, d}, {d, -d}, {d, d}}},
+                 {{4, 0, 5, 0, 1}, {}, {{0, -2}, {0, 2}, {0, -1}, {0, 1}}},
+                 {{-120, 274, -225, 85, -15, 1}, {1, 2, 3, 4, 5}},
+                 {{-4, 4, -5, 5, -1, 1}, {}, {1, {0, -2}, {0, 2}, {0, -1}, {0, 1}}},
+                 // The root found first is 1: before, between and behind the quartic's real roots.
+                 {{-6, 11, -12, 12, -6, 1}, {}, {1, 2, 3, {0, -1}, {0, 1}}},
+                 {{15, -17, 16, -16, 1, 1}, {}, {-5, 1, 3, {0, -1}, {0, 1}}},
+                 {{-15, 7, -8, 8, 7, 1}, {}, {-5, -3, 1, {0, -1}, {0, 1}}}};
+    for (const auto& c : cases) {
+        in_every_place(real<R>(c.c, 0.5), [&](const R* in, R* out) {
+            const auto delta = in == out ? 1 : out->delta;
+            ASSERT_EQ(this->solve(in, out), 0);
+            EXPECT_TRUE(c.complex.empty() ? is_real<R>(out, c.real, 2)
+                                          : is_complex<R>(out, c.complex, 2))
+                << &c - cases;
+            EXPECT_EQ(out->delta, delta);
+        });
+    }
+}
+
+TYPED_TEST(RootsTest, RandomPolynomials) {
+    using R = TypeParam;
+    Noise noise(4);
+    for (int round = 0; round < 2000; ++round) {
+        auto c = noise.real<R>(2 + round % 5);
+        for (auto& v : values(c.get())) v *= scalar<R>(std::pow(1000.0L, noise()));
+        Signal<R> closed;
+        ASSERT_EQ(this->solve(c, closed), 0) << round;
+        EXPECT_LT(misfit<R>(c, closed), 2) << round;
+        if (round >= 200) continue;
+        const auto any_degree = noise.real<R>(2 + round % 40);
+        auto roots = any_degree;
+        ASSERT_EQ(this->solve_any(roots), 0) << round;
+        EXPECT_LT(misfit<R>(any_degree, roots), 8) << round;
+    }
+    // (x^2 + s x + s^2)(x^2 + s x + 2 s^2): what the quartic is split by vanishes, at any scale.
+    for (const long double s : {1e-6L, 1.0L, 3e6L}) {
+        const auto c = real<R>({2 * s * s * s * s, 3 * s * s * s, 4 * s * s, 2 * s, 1});
+        Signal<R> roots;
+        ASSERT_EQ(this->solve(c, roots), 0);
+        EXPECT_LT(misfit<R>(c, roots), 2) << s;
+    }
+}
+
+TYPED_TEST(RootsTest, AnyDegreeIsSorted) {
+    using R = TypeParam;
+    const struct {
+        List c;
+        Samples roots;
+    } cases[] = {{{6, -5, 1}, {2, 3}},
+                 {{5, -2, 1, 0, 0}, {{1, -2}, {1, 2}}},
+                 {{0, 0, 0, 2}, {0, 0, 0}},
+                 {{0, 4, 0, -1}, {0, -2, 2}},
+                 {{-4, 4, -5, 5, -1, 1}, {{0, -1}, {0, 1}, 1, {0, -2}, {0, 2}}}};
+    for (const auto& c : cases) {
+        Borrowed<R> x(real<R>(c.c, 0.5));
+        const auto before = x.host;
+        ASSERT_EQ(this->solve_any(x), 0);
+        EXPECT_TRUE(is_complex<R>(x, c.roots, 2)) << &c - cases;
+        EXPECT_EQ(x->delta, 1);
+        EXPECT_EQ(x.host, before);
+    }
+    for (auto none : {real<R>({}), real<R>({5, 0, 0}), real<R>({0, 0, 0})}) {
+        ASSERT_EQ(this->solve_any(none), 0);
+        EXPECT_TRUE(is_real<R>(none, {}));
+    }
+}
+
+/// The largest distance between the roots and those that were wanted, paired as they lie nearest.
+template <Record R>
+long double distance(const R* got, Samples want) {
+    long double farthest = 0;
+    for (const auto& z : samples_of(got)) {
+        const auto nearest = std::ranges::min_element(
+            want, {}, [&](const Z& candidate) { return std::abs(candidate - z); });
+        farthest = std::max(farthest, std::abs(*nearest - z));
+        want.erase(nearest);
+    }
+    return farthest;
+}
+
+TYPED_TEST(RootsTest, MultipleAndClusteredRoots) {
+    using R = TypeParam;
+    const long double e = epsilon<R>;
+    const std::pair<Samples, long double> cases[] = {
+        {{1, 1, -2}, std::sqrt(e)},
+        {{1, 1, 1, -2}, 2 * std::cbrt(e)},
+        {{{0, 1}, {0, 1}, {0, -1}, {0, -1}}, 8 * std::sqrt(e)},
+        {{0.5L, 0.5L, {0, 2}, {0, -2}, 3}, 8 * std::sqrt(e)},
+        {{1, 1.0625L, 1.125L, -1}, 2e3L * e}};
+    for (const auto& [roots, tolerance] : cases) {
+        List coefficients;
+        for (const auto& v : expanded(roots)) coefficients.push_back(v.real());
+        auto any = real<R>(coefficients);
+        Signal<R> closed;
+        ASSERT_EQ(this->solve(any, closed) || this->solve_any(any), 0);
+        EXPECT_LT(distance<R>(closed, roots), tolerance) << roots[2];
+        EXPECT_LT(distance<R>(any, roots), tolerance) << roots[2];
+    }
+}
+
+TYPED_TEST(RootsTest, CoefficientsFromRoots) {
+    using R = TypeParam;
+    const std::pair<Signal<R>, Signal<R>> cases[] = {
+        {real<R>({2, 3}), real<R>({6, -5, 1})},
+        {real<R>({}), real<R>({1})},
+        {complex<R>({}), complex<R>({1})},
+        {complex<R>({{1, 2}, {1, -2}, {0, 1}}), complex<R>({{0, -5}, {5, 2}, {-2, -1}, 1})}};
+    for (const auto& [roots, want] : cases) {
+        Borrowed<R> x(roots);
+        const auto before = x.host;
+        x->delta = 3;
+        ASSERT_EQ(this->expand(x), 0);
+        EXPECT_TRUE(matches<R>(x, want, 1));
+        EXPECT_EQ(x->delta, 1);
+        EXPECT_EQ(x.host, before);
+    }
+    const auto roots = Noise(6).complex<R>(30);
+    auto x = roots;
+    ASSERT_EQ(this->expand(x), 0);
+    EXPECT_LT(relative_error<R>(x, expanded(samples_of<R>(roots))), 100 * epsilon<R>);
+}
+
+TYPED_TEST(RootsTest, RefusalsAndFailingMemory) {
+    using R = TypeParam;
+    const auto z = complex<R>({{1, 2}, {3, 4}});
+    auto out = real<R>({8}, 3), in_place = z;
+    EXPECT_EQ(this->solve(z, out), -1);
+    EXPECT_EQ(this->solve(real<R>({1, 2, 3, 4, 5, 6, 0}), out), -1);
+    EXPECT_TRUE(is_real<R>(out, {8}));
+    EXPECT_EQ(this->solve(in_place, in_place), -1);
+    EXPECT_EQ(this->solve_any(in_place), -1);
+    EXPECT_TRUE(matches<R>(in_place, z));
+
+    const auto quintic = real<R>({-4, 4, -5, 5, -1, 1});
+    const auto growths = [&](auto call) {
+        return fail_each_growth<R>([&] {
+            Borrowed<R> x(quintic);
+            return call(x);
+        });
+    };
+    EXPECT_EQ(growths([&](R* x) { return this->solve(x, x); }), 2);
+    EXPECT_EQ(growths(this->solve_any), 4);
+    EXPECT_EQ(growths(this->expand), 2);
+}
+
+}  // namespace
+}  // namespace wavkit::test
