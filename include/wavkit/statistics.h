@@ -1,10 +1,11 @@
 /** @file statistics.h
- *  A signal reduced to one value, to a histogram or to a peak.
+ *  A signal reduced to one value, to a histogram, to a peak or to a straight line.
  *
- *  The input is read only and its `delta` is not used. The functions down to dsps_hmean() size
- *  `out` as one point, real unless said otherwise, and leave its `delta` alone. `out` may be the
- *  input or a record over its buffer. N is the number of points; the value for an empty record is
- *  0 except where another one is named, and an empty record is no error.
+ *  The input is read only and its `delta` is not used, except for the abscissae of
+ *  dsps_lin_regres(). The functions down to dsps_hmean() size `out` as one point, real unless said
+ *  otherwise, and leave its `delta` alone. `out` may be the input or a record over its buffer. N is
+ *  the number of points; the value for an empty record is 0 except where another one is named, and
+ *  an empty record is no error.
  *
  *  B stands for the large value, 1e100 in double and 1e15 in single precision: values beyond +-B
  *  count as +-B in the sums of powers and deviations, and B marks a ratio whose denominator is 0.
@@ -155,6 +156,51 @@ WAVKIT_API int dspfs_hist(const dspf *x, dspf *out, float lo, float width, int n
  *          result is then 0 and 0) */
 WAVKIT_API int dsps_peak(const dsp *x, dsp *out, unsigned flags, int index);
 WAVKIT_API int dspfs_peak(const dspf *x, dspf *out, unsigned flags, int index);
+
+/** Fits a straight line by least squares: two real points, slope and intercept of y on x.
+ *
+ *  A real signal gives y[i] = data[i] at x[i] = i * delta (a `delta` of 0 counts as 1). Its
+ *  abscissae begin anew after every 2048 points: a longer signal is fitted, all of it, against a
+ *  ramp that repeats; to fit it against one ramp, store it as complex points. A complex signal
+ *  gives the pairs (x, y) = (re, im), and its `delta` plays no part.
+ *
+ *  A line over equal abscissae has no slope: slope and intercept are then the large value 1e100
+ *  (1e15 in single precision). A single point has slope 0 and itself as intercept, no points have
+ *  0 and 0.
+ *  @param out  its `delta` is kept; may be `data`
+ *  @return 0, or -1 when memory runs out */
+WAVKIT_API int dsps_lin_regres(const dsp *data, dsp *out);
+WAVKIT_API int dspfs_lin_regres(const dspf *data, dspf *out);
+
+/** Fits straight lines by least squares, y on x and x on y, and tells how well: 20 real points.
+ *  Data as for dsps_lin_regres().
+ *
+ *  | y on x | x on y | value                                                        |
+ *  |--------|--------|--------------------------------------------------------------|
+ *  |   0    |   7    | slope b = cov / var                                          |
+ *  |   1    |   8    | intercept                                                    |
+ *  |   2    |   9    | residual variance s^2 about the line, with N - 2 degrees of  |
+ *  |        |        | freedom (0 for two points)                                   |
+ *  |   3    |  10    | variance of the slope, s^2 / (N var)                         |
+ *  |   4    |  11    | variance of the intercept                                    |
+ *  |   5    |  12    | covariance of slope and intercept                            |
+ *  |   6    |  13    | correlation of slope and intercept                           |
+ *
+ *  | index  | value                                            |
+ *  |--------|--------------------------------------------------|
+ *  | 14, 15 | means of x and y                                 |
+ *  | 16, 17 | sample variances of x and y, with divisor N - 1  |
+ *  | 18     | sample covariance of x and y                     |
+ *  | 19     | correlation coefficient r                        |
+ *
+ *  cov and var have the divisor N; var is that of the abscissa of the line, x or y. Where var is 0,
+ *  slope and intercept are the large value 1e100 (1e15 in single precision), the variances and the
+ *  covariance of the estimates are multiples of it, and r is 0. With fewer than two points all
+ *  entries are 0 but the means (14, 15) and, equal to them, the intercepts (8, 1).
+ *  @param out  its `delta` becomes 1.0; may be `data`
+ *  @return 0, or -1 when memory runs out */
+WAVKIT_API int dsps_lin_regres2(const dsp *data, dsp *out);
+WAVKIT_API int dspfs_lin_regres2(const dspf *data, dspf *out);
 
 #ifdef __cplusplus
 }
