@@ -250,6 +250,10 @@ inline int dsps_psolve(const dspf* polynomial, dspf* out, float x0) {
 inline int dsps_pcsolve(const dspf* polynomial, dspf* out, float re0, float im0) {
     return dspfs_pcsolve(polynomial, out, re0, im0);
 }
+inline int dspb_cspline_2d(const dspf* x, const dspf* y, dspf* y2, float d0, float dn, int start,
+                           int end) {
+    return dspfb_cspline_2d(x, y, y2, d0, dn, start, end);
+}
 
 namespace wavkit {
 

@@ -1,0 +1,51 @@
+// Two signals whose points take turns.
+#include "core/binary.hpp"
+
+namespace wavkit {
+namespace {
+
+template <class Out, class Sample>
+Out as(Sample sample) {
+    if constexpr (std::same_as<Out, Sample>) {
+        return sample;
+    } else {
+        return {sample, 0};
+    }
+}
+
+/// Backwards, and both points read before either is written: in place, the points 2i and 2i + 1
+/// take the room of operand points that have had their turn.
+template <class Out, class A, class B>
+void interleave(Out* out, const A* a, const B* b, std::size_t n) {
+    for (std::size_t i = n; i-- > 0;) {
+        const Out first = as<Out>(a[i]), second = as<Out>(b[i]);
+        out[2 * i] = first;
+        out[2 * i + 1] = second;
+    }
+}
+
+template <Record R>
+int take_turns(const R* first, const R* second, R* out) {
+    R a = *first, b = *second;
+    if (length(&a) != length(&b)) return -1;
+    const std::size_t n = length(&a);
+    out->delta = (a.delta + b.delta) * scalar<R>(0.25);
+    if (size_output(a, b, out, 2 * std::int64_t(n), a.complex || b.complex)) return -1;
+    const auto p = bins(&a).data(), q = bins(&b).data(), points = bins(out).data();
+    if (a.complex && b.complex) {
+        interleave(points, p, q, n);
+    } else if (a.complex) {
+        interleave(points, p, b.data, n);
+    } else if (b.complex) {
+        interleave(points, a.data, q, n);
+    } else {
+        interleave(out->data, a.data, b.data, n);
+    }
+    return 0;
+}
+
+}  // namespace
+}  // namespace wavkit
+
+int dspb_inter(const dsp* a, const dsp* b, dsp* out) { return wavkit::take_turns(a, b, out); }
+int dspfb_inter(const dspf* a, const dspf* b, dspf* out) { return wavkit::take_turns(a, b, out); }
