@@ -258,7 +258,8 @@ void write_csv(std::FILE* to, std::span<const Signal> signals, bool time) {
         const auto values = x.values();
         const std::size_t width = x->complex ? 2 : 1;
         for (std::size_t i = 0; i < values.size(); i += width) {
-            if (time) std::fprintf(to, "%s,", number(double(i / width) * x->delta).c_str());
+            const auto point = i / width;
+            if (time) std::fprintf(to, "%s,", number(double(point) * x->delta).c_str());
             std::fputs(number(values[i]).c_str(), to);
             if (width == 2) std::fprintf(to, ",%s", number(values[i + 1]).c_str());
             std::fputc('\n', to);

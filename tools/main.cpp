@@ -29,11 +29,7 @@ std::string version() {
     return "wavkit " + std::to_string(number / 100) + "." + std::to_string(number % 100);
 }
 
-}  // namespace
-
-int main(int argc, char** argv) {
-    CLI::App program("Looks at sampled signals, converts them and measures their spectra.",
-                     "wavkit");
+void run(CLI::App& program, int argc, char** argv) {
     program.set_version_flag("--version", version());
     program.require_subcommand(1);
     program.footer(
@@ -45,8 +41,13 @@ int main(int argc, char** argv) {
     wavkit::tool::add_info(program);
     wavkit::tool::add_convert(program);
     wavkit::tool::add_spectrum(program);
+    program.parse(argc, argv);
+}
+
+/// Runs the program and turns what it throws into a line and an exit status.
+int outcome(CLI::App& program, int argc, char** argv) {
     try {
-        program.parse(argc, argv);
+        run(program, argc, argv);
         return 0;
     } catch (const CLI::Success& asked) {
         return program.exit(asked);
@@ -57,6 +58,16 @@ int main(int argc, char** argv) {
         return complain(who, std::string(error.what()) + " (" + who + " --help)", bad_usage);
     } catch (const wavkit::tool::UsageError& error) {
         return complain(invoked(program), error.what(), bad_usage);
+    }
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    try {
+        CLI::App program("Looks at sampled signals, converts them and measures their spectra.",
+                         "wavkit");
+        return outcome(program, argc, argv);
     } catch (const std::bad_alloc&) {
         return complain("wavkit", "out of memory", bad_input);
     } catch (const std::exception& error) {
