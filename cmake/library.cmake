@@ -35,7 +35,7 @@ set_target_properties(wavkit PROPERTIES VERSION ${PROJECT_VERSION} SOVERSION 2)
 target_link_libraries(wavkit PRIVATE wavkit_options)
 target_link_options(wavkit PRIVATE
   -Wl,--version-script=${PROJECT_SOURCE_DIR}/cmake/exports.map)
-if(FALSE)
+if(NOT WAVKIT_SANITIZE)
   target_link_options(wavkit PRIVATE -Wl,--no-undefined)
 endif()
 set_property(TARGET wavkit APPEND PROPERTY LINK_DEPENDS ${PROJECT_SOURCE_DIR}/cmake/exports.map)
