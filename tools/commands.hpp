@@ -8,5 +8,8 @@ namespace wavkit::tool {
 void add_info(CLI::App& program);
 void add_convert(CLI::App& program);
 void add_spectrum(CLI::App& program);
+void add_correlate(CLI::App& program);
+void add_envelope(CLI::App& program);
+void add_window(CLI::App& program);
 
 }  // namespace wavkit::tool

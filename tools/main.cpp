@@ -41,6 +41,9 @@ void run(CLI::App& program, int argc, char** argv) {
     wavkit::tool::add_info(program);
     wavkit::tool::add_convert(program);
     wavkit::tool::add_spectrum(program);
+    wavkit::tool::add_correlate(program);
+    wavkit::tool::add_envelope(program);
+    wavkit::tool::add_window(program);
     program.parse(argc, argv);
 }
 

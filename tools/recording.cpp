@@ -153,6 +153,14 @@ Recording read_recording(InputFile& input, const ReadOptions& options) {
     return recording;
 }
 
+Signal first_signal(Recording recording) {
+    if (recording.signals.size() > 1) {
+        std::fprintf(stderr, "wavkit: using the first of %zu signals; choose with %s\n",
+                     recording.signals.size(), recording.sound ? "--channel" : "--signal");
+    }
+    return std::move(recording.signals[0]);
+}
+
 void write_recording(const std::string& path, std::span<const Signal> signals,
                      const WriteOptions& options) {
     const auto format = options.format_for(path);

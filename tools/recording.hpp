@@ -51,6 +51,9 @@ Format format_of(InputFile& input, const ReadOptions& options);
 Recording read_recording(InputFile& input, const ReadOptions& options);
 Recording read_recording(const std::string& path, const ReadOptions& options);
 
+/// The first signal; standard error tells when there are more.
+Signal first_signal(Recording recording);
+
 /// Writes signals under a name, completely or not at all.
 void write_recording(const std::string& path, std::span<const Signal> signals,
                      const WriteOptions& options);

@@ -68,6 +68,19 @@ std::vector<std::string> window_names() {
     return names;
 }
 
+std::string window_list() {
+    std::string list = " ";
+    std::size_t line = 0;
+    for (const auto& name : window_names()) {
+        if (list.size() - line + name.size() > 90) {
+            list += "\n ";
+            line = list.size();
+        }
+        list += " " + name;
+    }
+    return list;
+}
+
 int window_of_name(const std::string& name) {
     int window;
     if (dsp_window_from_str(name.c_str(), &window) == 0) return window;

@@ -37,6 +37,8 @@ struct Spectrum {
 /// The identifier of a window's name; throws with the list of all names.
 int window_of_name(const std::string& name);
 std::vector<std::string> window_names();
+/// All names in lines of a fair length.
+std::string window_list();
 
 /// Refuses a spacing from which no frequencies follow.
 void check_spacing(double delta);

@@ -88,16 +88,13 @@ SpectrumReport report_of(const SpectrumOptions& options, Spectrum spectrum, bool
 
 SpectrumReport measured_whole(const SpectrumOptions& options) {
     auto recording = read_recording(options.report.in, options.reading);
-    if (recording.signals.size() > 1) {
-        std::fprintf(stderr, "wavkit: using the first of %zu signals; choose with %s\n",
-                     recording.signals.size(), recording.sound ? "--channel" : "--signal");
-    }
+    const bool sound = recording.sound;
+    auto x = first_signal(std::move(recording));
     Progress progress("transforming");
-    auto& x = recording.signals[0];
     if (options.segments.slope) take_slope(x);
     if (options.segments.detrend) remove_mean(x);
     check_finite(x.values(), x->complex);
-    return report_of(options, measure(x, options.settings), recording.sound);
+    return report_of(options, measure(x, options.settings), sound);
 }
 
 SpectrumReport measured_in_segments(const SpectrumOptions& options) {
@@ -151,20 +148,6 @@ void run(SpectrumOptions& options) {
     }
 }
 
-/// The names of the windows in lines of a fair length.
-std::string window_list() {
-    std::string list = " ";
-    std::size_t line = 0;
-    for (const auto& name : window_names()) {
-        if (list.size() - line + name.size() > 90) {
-            list += "\n ";
-            line = list.size();
-        }
-        list += " " + name;
-    }
-    return list;
-}
-
 constexpr const char* about_results =
     R"(Without -o, --peaks or --plot a short summary is printed. -o writes frequency,amplitude into
 .csv, and the complex bins into a signal file (.dsp, .txt).
@@ -192,9 +175,9 @@ constexpr const char* about_peaks = R"(
 
 Peaks lie between bins. Most windows place them by a parabola through the logarithms of three bins:
 Hann to 0.02 bins and 4 %, Kaiser90 to 0.003 bins and 0.4 %. Gausstop has a rule of its own, good
-to 0.000005 bins and 0.1 % where no zeros are added: for 2^n samples, or with --points below their
-number, or with --any-length. Flat windows read amplitudes to 0.06 % and frequencies to 0.17 bins. docs/program.md has
-the figures for all.
+to 0.000005 bins and 0.1 % where no zeros are added: for 2^n samples, with --points below their
+number, or with --any-length. Flat windows read amplitudes to 0.06 % and frequencies to 0.17 bins.
+docs/program.md has the figures for all.
 
 Examples:
   wavkit spectrum tone.wav --peaks 5
