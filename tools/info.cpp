@@ -44,7 +44,7 @@ std::string point(int (*reduce)(const dsp*, dsp*), const Signal& x) {
 void describe(const Signal& x, bool seconds) {
     line("points", std::to_string(x->points));
     line("kind", x->complex ? "complex" : "real");
-    line("delta", number(x->delta));
+    line("delta", number(x->delta) + (seconds ? " s (" + brief(1 / x->delta) + " Hz)" : ""));
     line("duration", number(x->points * x->delta) + (seconds ? " s" : ""));
     if (x->points == 0) return;
     line("mean", point(dsps_mean, x));

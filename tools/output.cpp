@@ -28,7 +28,9 @@ void remove_unfinished(int signal) {
 
 void remember(const std::string& path) {
     std::copy_n(path.c_str(), std::min(path.size() + 1, unfinished.size() - 1), unfinished.data());
-    for (const int signal : {SIGINT, SIGTERM, SIGHUP}) std::signal(signal, remove_unfinished);
+    for (const int signal : {SIGINT, SIGTERM, SIGHUP}) {
+        if (std::signal(signal, remove_unfinished) == SIG_IGN) std::signal(signal, SIG_IGN);
+    }
 }
 
 /// The permissions a new file at `path` would have, or those of the file that it replaces.

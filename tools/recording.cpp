@@ -34,7 +34,8 @@ std::vector<Signal> read_signal_file(InputFile& input) {
         if (result == 0) return signals;
         if (result < 0) {
             throw Error("cannot read " + input.name() + ": signal " +
-                        std::to_string(signals.size() + 1) + " is damaged or no signal at all");
+                        std::to_string(signals.size() + 1) +
+                        " is damaged or no signal (columns of numbers take --from csv)");
         }
         signals.push_back(std::move(x));
     }

@@ -62,6 +62,9 @@ void check_usage(const SpectrumOptions& options) {
         throw UsageError("the picture of --waterfall is a .png file");
     }
     check_segments(options);
+    if (!report.band.empty() && !(report.band[0] < report.band[1])) {
+        throw UsageError("--band goes from a lower to a higher frequency");
+    }
     if (report.out.empty()) {
         if (report.complex) throw UsageError("--complex is for the output that -o names");
         if (report.writing.format) throw UsageError("--to is for the output that -o names");
@@ -82,8 +85,9 @@ SpectrumReport report_of(const SpectrumOptions& options, Spectrum spectrum, bool
     const auto& report = options.report;
     Band band;
     if (!report.band.empty()) band = {report.band[0], report.band[1]};
+    const bool seconds = sound || options.reading.rate;
     return {report, std::move(spectrum), band,
-            report.unit.empty() && sound ? std::string("s") : report.unit};
+            report.unit.empty() && seconds ? std::string("s") : report.unit};
 }
 
 SpectrumReport measured_whole(const SpectrumOptions& options) {

@@ -234,7 +234,8 @@ TEST_F(ConvertTest, BadUsageIsToldInOneLine) {
                                    "spectrum x.txt --complex --db -o o.csv",
                                    "spectrum x.txt --plot o.gif",
                                    "spectrum x.txt -o - --peaks 1",
-                                   "spectrum x.txt -o o.dsp --band 0 1"}) {
+                                   "spectrum x.txt -o o.dsp --band 0 1",
+                                   "spectrum x.txt --band 1 0"}) {
         const auto done = shell("wavkit " + line);
         EXPECT_EQ(done.status, 2) << line;
         EXPECT_EQ(std::count(done.err.begin(), done.err.end(), '\n'), 1) << line << "\n"
