@@ -19,8 +19,8 @@ WAVKIT_API int dspf_lib_init(void);
 WAVKIT_API int dsp_version(void);
 WAVKIT_API int dspf_version(void);
 
-/** Releases the tables and scratch records that this precision's transforms and windows keep
- *  between calls; the next call that needs one builds it again. Must not run while another
+/** Releases the tables and scratch records that this precision's transforms, windows and filters
+ *  keep between calls; the next call that needs one builds it again. Must not run while another
  *  function of the same precision does.
  *  @return 0, or -1 at the first cache that cannot be released (the later ones are then kept) */
 WAVKIT_API int dsp_free_internal(void);

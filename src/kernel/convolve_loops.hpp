@@ -94,11 +94,12 @@ inline void convolve_all(const Taps<T>& taps, const T* in, std::size_t delay, T*
 /// Narrow vectors where the taps are too few for groups, or the outputs for vectors, of wide ones.
 template <class T, int Narrow, int Wide>
 void convolve(const Taps<T>& taps, const T* in, std::size_t delay, T* out, std::size_t n) {
-    if (taps.count * delay < std::size_t(sharing_taps) * Wide || n < Wide) {
-        convolve_all<T, Narrow>(taps, in, delay, out, n);
-    } else {
-        convolve_all<T, Wide>(taps, in, delay, out, n);
+    if constexpr (Narrow < Wide) {
+        if (taps.count * delay < std::size_t(sharing_taps) * Wide || n < Wide) {
+            return convolve_all<T, Narrow>(taps, in, delay, out, n);
+        }
     }
+    convolve_all<T, Wide>(taps, in, delay, out, n);
 }
 
 }  // namespace
