@@ -2,6 +2,8 @@
 #pragma once
 
 #include <cstdio>
+#include <memory>
+#include <optional>
 #include <span>
 #include <string>
 #include <vector>
@@ -10,6 +12,8 @@
 #include "signal.hpp"
 
 namespace wavkit::tool {
+
+class SampleStream;
 
 struct CsvLayout {
     bool time = false;  // the first column holds the time of each sample
@@ -25,6 +29,10 @@ struct CsvLayout {
 /// without a number before the first row are headers; where the last of them calls its first column
 /// "time" or "frequency", that column is the axis as with `CsvLayout::time`.
 std::vector<Signal> read_csv(InputFile& input, const CsvLayout& layout);
+
+/// One signal, the first without a choice, to be read as it is needed.
+std::unique_ptr<SampleStream> stream_csv(InputFile& input, const CsvLayout& layout,
+                                         std::optional<int> signal);
 
 /// Writes signals one after the other, each with a header; numbers have as many digits as it takes
 /// to read the same value again.

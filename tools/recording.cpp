@@ -138,13 +138,12 @@ Recording read_recording(InputFile& input, const ReadOptions& options) {
     }
 
     auto& signals = recording.signals;
-    if (signals.empty()) throw Error("there is no signal in " + input.name());
+    const int wanted = options.signal.value_or(1);
+    if (std::size_t(wanted) > signals.size()) {
+        fail_without_signal(input.name(), int(signals.size()), wanted);
+    }
     if (options.signal) {
-        if (std::size_t(*options.signal) > signals.size()) {
-            throw Error(input.name() + " holds " + std::to_string(signals.size()) +
-                        " signals, no signal " + std::to_string(*options.signal));
-        }
-        std::swap(signals[0], signals[std::size_t(*options.signal) - 1]);
+        std::swap(signals[0], signals[std::size_t(wanted) - 1]);
         signals.resize(1);
     }
     for (auto& x : signals) {
@@ -152,6 +151,12 @@ Recording read_recording(InputFile& input, const ReadOptions& options) {
         if (options.rate) x->delta = 1 / *options.rate;
     }
     return recording;
+}
+
+void fail_without_signal(const std::string& file, int held, int wanted) {
+    if (held == 0) throw Error("there is no signal in " + file);
+    throw Error(file + " holds " + std::to_string(held) + (held == 1 ? " signal" : " signals") +
+                ", no signal " + std::to_string(wanted));
 }
 
 Signal first_signal(Recording recording) {

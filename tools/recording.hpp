@@ -51,6 +51,9 @@ Format format_of(InputFile& input, const ReadOptions& options);
 Recording read_recording(InputFile& input, const ReadOptions& options);
 Recording read_recording(const std::string& path, const ReadOptions& options);
 
+/// Throws, to tell that a file holds too few signals.
+[[noreturn]] void fail_without_signal(const std::string& file, int held, int wanted);
+
 /// The first signal; standard error tells when there are more.
 Signal first_signal(Recording recording);
 

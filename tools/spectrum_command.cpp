@@ -104,10 +104,6 @@ SpectrumReport measured_whole(const SpectrumOptions& options) {
 SpectrumReport measured_in_segments(const SpectrumOptions& options) {
     InputFile input(options.report.in);
     const auto stream = open_stream(input, options.reading);
-    if (!stream->alone) {
-        std::fprintf(stderr, "wavkit: using the first of several signals; choose with %s\n",
-                     stream->sound ? "--channel" : "--signal");
-    }
     SpectrumAverage average(options.averaging);
     auto report = report_of(options, {}, stream->sound);
     std::optional<Waterfall> waterfall;
@@ -123,6 +119,7 @@ SpectrumReport measured_in_segments(const SpectrumOptions& options) {
             progress.done(stream->done());
         });
     }
+    tell_of_others(*stream);
     report.spectrum = average.result();
     if (waterfall) {
         waterfall->draw(
@@ -169,8 +166,8 @@ constexpr const char* about_averages = R"(
 (Welch). --type chooses what becomes of the powers: linear their mean, harmonic and log the harmonic
 and the geometric mean, max and min the greatest and the least in every bin, last the newest
 segment, every the newest of every N-th (--every N). With --forget N the means are exponential: once
-N segments are in, a new one counts 1/N. What fills no segment at the end is left out. Sound files
-and binary signal files may be longer than memory.
+N segments are in, a new one counts 1/N. What fills no segment at the end is left out. The recording
+may be longer than memory.
 
 --density shows the rms value per root of the frequency, by the noise bandwidth of the window: white
 noise shows the same whatever the window and the length. That of a sine depends on both.)";

@@ -13,43 +13,19 @@ namespace {
 
 constexpr std::size_t block_values = 1 << 14;
 
-/// A signal that had to be read whole.
-class WholeStream : public SampleStream {
-  public:
-    explicit WholeStream(Recording recording) : x_(std::move(recording.signals[0])) {
-        delta = x_->delta;
-        complex = x_->complex;
-        alone = recording.signals.size() == 1;
-    }
-
-    std::size_t read(std::span<double> values) override {
-        const auto rest = std::span(x_.values()).subspan(taken_);
-        const auto count = std::min(values.size(), rest.size());
-        std::ranges::copy(rest.first(count), values.begin());
-        taken_ += count;
-        return count;
-    }
-
-    double done() const override { return double(taken_) / double(x_.values().size()); }
-
-  private:
-    Signal x_;
-    std::size_t taken_ = 0;
-};
-
 /// What can be known of a binary signal before its samples are read; see wavkit/file.h.
 class BinaryStream : public SampleStream {
   public:
     BinaryStream(InputFile& input, int number) : input_(input), number_(number) {
         for (int skipped = 1; skipped < number; ++skipped) {
-            if (!read_header()) fail_without(skipped - 1);
+            if (!read_header()) fail_without_signal(input_.name(), skipped - 1, number_);
             const long bytes = long(total_ * scalar_size_);
             if (std::ftell(file()) + bytes > input_.size() ||
                 std::fseek(file(), bytes, SEEK_CUR) != 0) {
                 fail();
             }
         }
-        if (!read_header()) fail_without(number - 1);
+        if (!read_header()) fail_without_signal(input_.name(), number - 1, number_);
         alone = number > 1 || std::ftell(file()) + long(total_ * scalar_size_) >= input_.size();
     }
 
@@ -74,13 +50,6 @@ class BinaryStream : public SampleStream {
         throw Error("cannot read " + input_.name() + ": signal " + std::to_string(number_) +
                     " is damaged or no signal at all");
     }
-    [[noreturn]] void fail_without(int count) const {
-        if (count == 0) throw Error("there is no signal in " + input_.name());
-        throw Error(input_.name() + " holds " + std::to_string(count) +
-                    (count == 1 ? " signal, no signal " : " signals, no signal ") +
-                    std::to_string(number_));
-    }
-
     template <class T>
     T field() {
         std::array<unsigned char, sizeof(T)> bytes;
@@ -138,6 +107,23 @@ class BinaryStream : public SampleStream {
 
 }  // namespace
 
+std::size_t BlockStream::read(std::span<double> values) {
+    std::size_t done = 0;
+    while (done < values.size()) {
+        if (used_ == block_.size()) {
+            used_ = 0;
+            block_.clear();
+            next_block(block_);
+            if (block_.empty()) break;
+        }
+        const auto count = std::min(values.size() - done, block_.size() - used_);
+        std::copy_n(block_.data() + used_, count, values.data() + done);
+        used_ += count;
+        done += count;
+    }
+    return done;
+}
+
 std::unique_ptr<SampleStream> open_stream(InputFile& input, const ReadOptions& options) {
     const auto format = format_of(input, options);
     std::unique_ptr<SampleStream> stream;
@@ -145,12 +131,20 @@ std::unique_ptr<SampleStream> open_stream(InputFile& input, const ReadOptions& o
         stream = stream_sound(input, options.channel, options.signal);
     } else if (format == Format::binary) {
         stream = std::make_unique<BinaryStream>(input, options.signal.value_or(1));
+    } else if (format == Format::csv) {
+        stream = stream_csv(input, options.csv, options.signal);
     } else {
-        stream = std::make_unique<WholeStream>(read_recording(input, options));
+        stream = stream_text(input, options.signal);
     }
     if (options.delta) stream->delta = *options.delta;
     if (options.rate) stream->delta = 1 / *options.rate;
     return stream;
+}
+
+void tell_of_others(const SampleStream& stream) {
+    if (stream.alone) return;
+    std::fprintf(stderr, "wavkit: using the first of several signals; choose with %s\n",
+                 stream.sound ? "--channel" : "--signal");
 }
 
 }  // namespace wavkit::tool

@@ -3,8 +3,9 @@
 
 #include <cstddef>
 #include <memory>
+#include <optional>
 #include <span>
-#include <string>
+#include <vector>
 
 #include "input.hpp"
 #include "recording.hpp"
@@ -25,11 +26,30 @@ class SampleStream {
     double delta = 1.0;
     bool complex = false;
     bool sound = false;  // the spacing is in seconds
-    bool alone = true;   // the only signal there is
+    bool alone = true;   // no other was there to choose; certain once all has been read
 };
 
-/// Opens the signal that the options choose, the first without a choice. Sound files and binary
-/// signal files are read as they are needed; text and CSV files are in memory.
+/// A stream that comes in blocks of its own size.
+class BlockStream : public SampleStream {
+  public:
+    std::size_t read(std::span<double> values) override;
+
+  private:
+    /// Adds some of the scalars that follow to an empty block; none only at the end.
+    virtual void next_block(std::vector<double>& block) = 0;
+
+    std::vector<double> block_;
+    std::size_t used_ = 0;
+};
+
+/// One signal of a text signal file, the first without a choice.
+std::unique_ptr<SampleStream> stream_text(InputFile& input, std::optional<int> signal);
+
+/// Opens the signal that the options choose, the first without a choice; it is read as it is
+/// needed.
 std::unique_ptr<SampleStream> open_stream(InputFile& input, const ReadOptions& options);
+
+/// Tells, on standard error, of a stream read to its end that there were others to choose.
+void tell_of_others(const SampleStream& stream);
 
 }  // namespace wavkit::tool

@@ -157,6 +157,8 @@ TEST_F(SegmentsTest, EverySourceGivesTheSame) {
     write("swapped.dsp", other_order(x));
     printed("convert x.dsp single.dsp --type float");
     printed("convert y.dsp y.wav");
+    printed("convert y.dsp y.txt");
+    printed("convert y.dsp y.csv");
     printed("convert x.dsp x.txt --signal 1");
     printed("convert x.dsp x.csv --with-time --signal 1");
     const std::string options = " --average 3000 --overlap 30 --slope --detrend";
@@ -166,7 +168,8 @@ TEST_F(SegmentsTest, EverySourceGivesTheSame) {
               spectrum("x.dsp --any-length --slope --detrend").size());
     for (const std::string source :
          {"y.dsp --signal 2", "swapped.dsp", "single.dsp", "y.wav --channel 2", "y.wav --signal 2",
-          "x.txt", "x.csv", "- <x.dsp", "x.csv --rate 8000"}) {
+          "x.txt", "x.csv", "- <x.dsp", "x.csv --rate 8000", "y.txt --signal 2",
+          "y.csv --signal 2"}) {
         const auto got = spectrum(source + options);
         ASSERT_EQ(got.size(), want.size()) << source;
         for (std::size_t i = 0; i < want.size(); ++i) {
@@ -174,13 +177,25 @@ TEST_F(SegmentsTest, EverySourceGivesTheSame) {
             EXPECT_NEAR(got[i][1], want[i][1], 1e-5 * want[10][1]) << source;
         }
     }
-    EXPECT_NE(shell("wavkit spectrum x.dsp --average 64").err.find("--signal"), std::string::npos);
+    for (const std::string several : {"x.dsp", "y.txt", "y.csv"}) {
+        const auto done = shell("wavkit spectrum --average 64 " + several);
+        EXPECT_NE(done.err.find("--signal"), std::string::npos) << several;
+    }
+    EXPECT_EQ(shell("wavkit spectrum --average 64 x.txt").err, "");
     EXPECT_NE(shell("wavkit spectrum y.wav --average 64").err.find("--channel"), std::string::npos);
 
     write("z.dsp", Signals{complex<dsp>({{0, 3}, {3, 0}, {0, -3}, {-3, 0}, {0, 3}, {3, 0}})});
-    EXPECT_EQ(
-        rows(printed("spectrum z.dsp --window none --average 4 --overlap 75 --peaks 1")).at(0),
-        (std::vector<double>{-0.25, 4, 3}));
+    write("z.csv", "u;v\n1;2\n\n# nothing\nre;im\n0;3,0\n3;0\n# turn\n0;-3\n-3;0\n0;3\n3;0\n");
+    write("z.txt",
+          "#DSP points = 0\n#DSP complex = 0\n#DSP delta = 2\n#DSP points = 2\n7 8 "
+          "#DSP points = 6\n#DSP complex = 1\n0 3 3 0x0 0\n# turn\n-0x3-3 0 0 3#\n3 0 9");
+    for (const std::string source : {"z.dsp", "z.csv --signal 2", "z.txt --signal 3"}) {
+        EXPECT_EQ(
+            rows(printed("spectrum --window none --average 4 --overlap 75 --peaks 1 " + source))
+                .at(0),
+            (std::vector<double>{-0.25, 4, 3}))
+            << source;
+    }
     printed("spectrum x.dsp --average 64 -o bins.dsp --signal 1");
     EXPECT_EQ(read("bins.dsp").at(0)->complex, 0);
     EXPECT_NEAR(read("bins.dsp").at(0)[20], spectrum("x.dsp --average 64 --signal 1")[20][1], 0);
@@ -192,11 +207,21 @@ TEST_F(SegmentsTest, DamagedAndUnfitSourcesAreRefused) {
     std::string text;
     for (int i = 0; i < 3000; ++i) text += i == 2500 ? "inf\n" : "1\n";
     write("inf.txt", text);
+    std::string times = "time,x\n";
+    for (int i = 0; i < 3000; ++i) times += std::to_string(i + i / 2000) + ",1\n";
+    write("times.csv", times);
+    write("short.txt", "#DSP points = 1000\n" + text.substr(0, 1800));
+    write("order.txt", "1 2 3\n#DSP delta = 2\n4 5 6\n");
+    write("word.txt", "1 2 3 four");
     const auto before = files();
     const struct {
         std::string line, complaint;
     } cases[] = {
         {"cut.dsp --average 512", "signal 1 is damaged"},
+        {"short.txt --average 512", "signal 1 is damaged"},
+        {"word.txt --average 2", "signal 1 is damaged"},
+        {"order.txt --average 2", "header lines between its values"},
+        {"times.csv --average 512", "the time column is not equally spaced"},
         {"inf.txt --average 512", "sample 2500 is not a finite number"},
         {"x.dsp --average 5001", "5000 samples, fewer than one segment of 5001"},
         {"x.dsp --average 64 --signal 2", "holds 1 signal, no signal 2"},
