@@ -11,5 +11,10 @@ void add_spectrum(CLI::App& program);
 void add_correlate(CLI::App& program);
 void add_envelope(CLI::App& program);
 void add_window(CLI::App& program);
+void add_stats(CLI::App& program);
+void add_hist(CLI::App& program);
+void add_fit(CLI::App& program);
+void add_roots(CLI::App& program);
+void add_interp(CLI::App& program);
 
 }  // namespace wavkit::tool

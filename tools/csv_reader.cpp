@@ -143,9 +143,11 @@ class CsvReader {
     /// Settles, at the first row of a signal, which columns are read.
     void choose_columns() {
         width_ = fields_.size();
-        has_time_ = layout_.time || (!names_.empty() && names_an_axis(names_[0]));
         columns_.clear();
         for (const auto& column : layout_.columns) columns_.push_back(column_index(column));
+        // An axis that is asked for as a value may be as uneven as any other column.
+        const bool wanted = std::ranges::count(columns_, 0u) > 0;
+        has_time_ = layout_.time || (!wanted && !names_.empty() && names_an_axis(names_[0]));
         if (!columns_.empty()) return;
         for (std::size_t i = has_time_ ? 1 : 0; i < width_; ++i) columns_.push_back(i);
         if (columns_.empty()) lines_.fail("no column beside the time");

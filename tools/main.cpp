@@ -44,6 +44,11 @@ void run(CLI::App& program, int argc, char** argv) {
     wavkit::tool::add_correlate(program);
     wavkit::tool::add_envelope(program);
     wavkit::tool::add_window(program);
+    wavkit::tool::add_stats(program);
+    wavkit::tool::add_hist(program);
+    wavkit::tool::add_fit(program);
+    wavkit::tool::add_roots(program);
+    wavkit::tool::add_interp(program);
     program.parse(argc, argv);
 }
 

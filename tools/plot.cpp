@@ -26,45 +26,65 @@ std::pair<int, int> terminal_size() {
     return {size.ws_col, std::min<int>(size.ws_row - 1, 40)};
 }
 
-/// At most `columns` steps, each with its lowest and highest value in the order in which they
-/// come, so that no peak is lost.
-std::vector<std::pair<double, double>> thinned(const Curve& curve, std::size_t columns) {
-    std::vector<std::pair<double, double>> points;
+/// Samples that share a step of a picture with so many columns.
+std::size_t samples_a_step(const Curve& curve, std::size_t columns) {
     const std::size_t n = curve.x.size();
-    const std::size_t step = n > 2 * columns ? (n + columns - 1) / columns : 1;
+    return n > 2 * columns ? (n + columns - 1) / columns : 1;
+}
+
+/// At most `columns` steps, each with its lowest and highest value in the order in which they
+/// come, so that no peak is lost. Of boxes, which would hide one another, the highest suffices.
+std::vector<Mark> thinned(const Curve& curve, std::size_t columns) {
+    std::vector<Mark> points;
+    const std::size_t n = curve.x.size();
+    const std::size_t step = samples_a_step(curve, columns);
     for (std::size_t start = 0; start < n; start += step) {
         const auto first = curve.y.begin() + std::ptrdiff_t(start);
         const auto last = curve.y.begin() + std::ptrdiff_t(std::min(n, start + step));
         auto [low, high] = std::minmax_element(first, last);
+        if (curve.style == Style::boxes) low = high;
         if (high < low) std::swap(low, high);
         for (const auto at : {low, high}) {
-            points.emplace_back(curve.x[std::size_t(at - curve.y.begin())], *at);
+            points.push_back({curve.x[std::size_t(at - curve.y.begin())], *at});
             if (low == high) break;
         }
     }
     return points;
 }
 
-void write_data(std::FILE* script, const Curve& curve, std::size_t columns) {
-    std::fputs("$curve << EOD\n", script);
-    for (const auto& [x, y] : thinned(curve, columns)) {
+void write_data(std::FILE* script, const char* name, const std::vector<Mark>& points) {
+    std::fprintf(script, "$%s << EOD\n", name);
+    for (const auto& [x, y] : points) {
         std::fprintf(script, "%s %s\n", number(x).c_str(), number(y).c_str());
     }
     std::fputs("EOD\n", script);
 }
 
+void write_range(std::FILE* script, char axis, double low, double high) {
+    std::fprintf(script, "set %crange [%s:%s]\n", axis, number(low).c_str(), number(high).c_str());
+}
+
+/// Room for boxes and dots at the ends.
+void write_x_range(std::FILE* script, const Curve& curve) {
+    const double low = curve.x.front(), high = curve.x.back();
+    double margin = 0.5 * curve.box_width;
+    if (curve.style == Style::dots) margin = low < high ? 0.02 * (high - low) : 1;
+    write_range(script, 'x', low - margin, high + margin);
+}
+
 /// The range of the height axis: what is far below the highest value is not worth paper.
-void write_range(std::FILE* script, const Curve& curve) {
+void write_y_range(std::FILE* script, const Curve& curve) {
     const double top = *std::ranges::max_element(curve.y);
     if (!curve.decibels) {
         const double low = *std::ranges::min_element(curve.y);
-        std::fprintf(script, "set yrange [%s:%s]\n", number(low < 0 ? 1.15 * low : 0).c_str(),
-                     number(top > 0 ? 1.15 * top : 1).c_str());
-        return;
+        if (curve.style == Style::dots) {
+            const double margin = low < top ? 0.08 * (top - low) : 1;
+            return write_range(script, 'y', low - margin, top + margin);
+        }
+        return write_range(script, 'y', low < 0 ? 1.15 * low : 0, top > 0 ? 1.15 * top : 1);
     }
     const double low = std::max(*std::ranges::min_element(curve.y), top - curve.depth);
-    std::fprintf(script, "set yrange [%s:%s]\n", number(std::floor(low / 10) * 10).c_str(),
-                 number(std::ceil((top + 5) / 10) * 10).c_str());
+    write_range(script, 'y', std::floor(low / 10) * 10, std::ceil((top + 5) / 10) * 10);
 }
 
 std::string peak_label(const Curve& curve, const Mark& mark) {
@@ -87,6 +107,31 @@ void write_labels(std::FILE* script, const Curve& curve, bool characters) {
     }
 }
 
+void write_plot(std::FILE* script, const Curve& curve, std::size_t columns, bool characters) {
+    if (curve.style == Style::boxes) {
+        const double boxes = double(samples_a_step(curve, columns));
+        std::fprintf(script, "set boxwidth %s\n", number(boxes * curve.box_width).c_str());
+    }
+    write_data(script, "curve", thinned(curve, columns));
+    if (!curve.line.empty()) write_data(script, "line", curve.line);
+    std::fputs("plot ", script);
+    if (curve.style == Style::line && !curve.decibels && !characters) {
+        std::fputs("$curve with filledcurves y=0 fc rgb '#1f5fa8' fs transparent solid 0.15, ",
+                   script);
+    }
+    if (characters) {
+        static constexpr std::array looks{"lines", "boxes", "points pt '+'"};
+        std::fprintf(script, "$curve with %s", looks[std::size_t(curve.style)]);
+    } else {
+        static constexpr std::array looks{"lines lw 1.4 lc",
+                                          "boxes fs solid 0.35 border rgb '#1f5fa8' fc",
+                                          "points pt 7 ps 0.5 lc"};
+        std::fprintf(script, "$curve with %s rgb '#1f5fa8'", looks[std::size_t(curve.style)]);
+    }
+    if (!curve.line.empty()) std::fputs(", $line with lines lw 2 lc rgb '#c0392b'", script);
+    std::fputc('\n', script);
+}
+
 void write_script(std::FILE* script, const Curve& curve, Picture picture) {
     const bool characters = picture == Picture::terminal;
     std::fputs("set encoding utf8\nset key off\nset tics nomirror out\nset border 3\n", script);
@@ -104,18 +149,10 @@ void write_script(std::FILE* script, const Curve& curve, Picture picture) {
     std::fprintf(script, "set title %s\nset xlabel %s\nset ylabel %s\n",
                  quoted(curve.title).c_str(), quoted(curve.x_label).c_str(),
                  quoted(curve.y_label).c_str());
-    std::fprintf(script, "set xrange [%s:%s]\n", number(curve.x.front()).c_str(),
-                 number(curve.x.back()).c_str());
-    write_range(script, curve);
+    write_x_range(script, curve);
+    write_y_range(script, curve);
     write_labels(script, curve, characters);
-    write_data(script, curve, characters ? 200 : 4000);
-    std::fputs("plot ", script);
-    if (!curve.decibels && !characters) {
-        std::fputs("$curve with filledcurves y=0 fc rgb '#1f5fa8' fs transparent solid 0.15, ",
-                   script);
-    }
-    std::fputs(characters ? "$curve with lines\n" : "$curve with lines lw 1.4 lc rgb '#1f5fa8'\n",
-               script);
+    write_plot(script, curve, characters ? 200 : 4000, characters);
 }
 
 }  // namespace
@@ -130,7 +167,9 @@ Picture picture_of_name(const std::string& path) {
 }
 
 void draw(const Curve& curve, const std::string& path) {
-    if (curve.x.size() < 2) throw Error("there are too few frequencies to draw");
+    if (curve.x.empty() || (curve.x.size() < 2 && curve.style == Style::line)) {
+        throw Error("there are too few points to draw");
+    }
     OutputFile picture(path);
     {
         Progress progress("drawing");

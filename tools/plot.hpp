@@ -10,9 +10,14 @@ struct Mark {
     double x, y;
 };
 
+enum class Style { line, boxes, dots };
+
 struct Curve {
     std::string title, x_label, y_label;
     std::vector<double> x, y;
+    Style style = Style::line;
+    double box_width = 0;    // of boxes, which stand on their x
+    std::vector<Mark> line;  // a straight line's two ends, drawn across
     bool decibels = false;
     double depth = 150;        // decibels worth showing below the highest value
     std::string unit;          // of the period, for the labels of the peaks

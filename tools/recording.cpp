@@ -70,7 +70,7 @@ void write_signal_file(std::FILE* to, std::span<const Signal> signals, Format fo
 
 }  // namespace
 
-void ReadOptions::declare(CLI::App& command) {
+void ReadOptions::declare(CLI::App& command, bool with_rate) {
     const char* const group = "Reading";
     add_choice(command, "--from", format, formats(), "format of IN (default: by its contents)")
         ->group(group);
@@ -78,11 +78,13 @@ void ReadOptions::declare(CLI::App& command) {
                               ->check(CLI::PositiveNumber)
                               ->type_name("STEP")
                               ->group(group);
-    command.add_option("--rate", rate, "sampling rate: a spacing of 1/RATE")
-        ->check(CLI::PositiveNumber)
-        ->type_name("RATE")
-        ->excludes(spacing)
-        ->group(group);
+    if (with_rate) {
+        command.add_option("--rate", rate, "sampling rate: a spacing of 1/RATE")
+            ->check(CLI::PositiveNumber)
+            ->type_name("RATE")
+            ->excludes(spacing)
+            ->group(group);
+    }
     command.add_flag("--time", csv.time, "CSV: the first column is the time of each sample")
         ->group(group);
     command

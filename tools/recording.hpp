@@ -22,8 +22,8 @@ struct ReadOptions {
     std::optional<int> channel;  // of a sound file, from 1
     std::optional<int> signal;   // the only one wanted, from 1
 
-    /// Adds the options to a subcommand.
-    void declare(CLI::App& command);
+    /// Adds the options to a subcommand; without --rate where that means another one's rate.
+    void declare(CLI::App& command, bool with_rate = true);
 };
 
 /// How a result is to be written.
