@@ -1,0 +1,219 @@
+using System;
+using static Corvane.QuillonInternal.DataAnalysis.NativeMethods;
+
+namespace Corvane.QuillonInternal.DataAnalysis;
+
+/// <summary>
+/// Native functions on signal records in double precision: each call goes straight to the native
+/// function of its name and returns what that returns, 0 on success and -1 on failure.
+/// </summary>
+/// <remarks>
+/// <para>
+/// A disposed record makes every function throw <see cref="ObjectDisposedException"/>, and a null one
+/// <see cref="NullReferenceException"/>; there are no other exceptions.
+/// </para>
+/// <para>
+/// Inputs and outputs may be the same record. Transforms, windows and filters share tables that nothing
+/// locks: they must not run at the same time, even on distinct records. All other functions may, on
+/// distinct records.
+/// </para>
+/// </remarks>
+public static unsafe class DspApi
+{
+    /// <summary>Releases the samples that the library allocated, and makes the record an empty one
+    /// with <see cref="DspInput.Delta"/> 1.0. A borrowed buffer is left alone.</summary>
+    /// <param name="x">The record; it may be filled again.</param>
+    /// <returns>Always 0.</returns>
+    public static int dsp_destroy(DspInput x) => Call(NativeMethods.dsp_destroy, x);
+
+    /// <summary>Multiplies a signal by a window of the catalogue and rotates it, so that the centre
+    /// of the window lies at sample 0.</summary>
+    /// <param name="x">The signal, changed in place; a borrowed buffer is exchanged for one of the
+    /// library's.</param>
+    /// <param name="window">0 to 23, for example 0 none, 2 Hann, 7 Gausstop, 9 Flattop.</param>
+    /// <param name="scaleType">0 keeps the amplitude of a sine, 1 the power of noise, 2 leaves the
+    /// centre at 1; added to that 4 for equal samples at both ends (Kaiser, Gauss and sinc only), 8
+    /// for a width (sums of cosines and none only), 16 to rotate without a window too, 32 not to
+    /// rotate.</param>
+    /// <param name="winLength">Width of the window in samples; heeded only with 8.</param>
+    /// <returns>0, or -1 for a window or a scale that does not exist, or when memory runs
+    /// out.</returns>
+    public static int dspi_window2(DspInput x, int window, int scaleType, double winLength)
+    {
+        int result = NativeMethods.dspi_window2(x.GetDspPtr(), window, scaleType, winLength);
+        GC.KeepAlive(x);
+        return result;
+    }
+
+    /// <summary>Rotates a signal so that its first sample comes to lie in the middle: (a, b, c, d,
+    /// e) becomes (d, e, a, b, c).</summary>
+    /// <param name="x">The signal, changed in place.</param>
+    /// <returns>Always 0.</returns>
+    public static int dspi_swap_halves(DspInput x) => Call(NativeMethods.dspi_swap_halves, x);
+
+    /// <summary>Appends zeros.</summary>
+    /// <param name="x">The signal, changed in place; longer than that already, it stays as it
+    /// is.</param>
+    /// <param name="n">How many samples it shall have.</param>
+    /// <returns>0, or -1 when memory runs out.</returns>
+    public static int dspi_zpad(DspInput x, int n) => Call(NativeMethods.dspi_zpad, x, n);
+
+    /// <summary>Reverses the order of the samples.</summary>
+    /// <param name="x">The signal, changed in place.</param>
+    /// <returns>Always 0.</returns>
+    public static int dspi_rev(DspInput x) => Call(NativeMethods.dspi_rev, x);
+
+    /// <summary>Conjugates complex samples; a real signal stays as it is.</summary>
+    /// <param name="x">The signal, changed in place.</param>
+    /// <returns>Always 0.</returns>
+    public static int dspi_conj(DspInput x) => Call(NativeMethods.dspi_conj, x);
+
+    /// <summary>Fourier transform of N = 2^m samples; a forward one is divided by N.</summary>
+    /// <param name="x">The signal, which becomes complex, and its <see cref="DspInput.Delta"/> 1 /
+    /// (N delta).</param>
+    /// <param name="inverse">0 forward, anything else inverse.</param>
+    /// <returns>0; -1 when the length is no power of two (nothing is then changed), or when memory
+    /// runs out.</returns>
+    public static int dspi_fft(DspInput x, int inverse) => Call(NativeMethods.dspi_fft, x, inverse);
+
+    /// <summary>Fourier transform of N = 2^m real samples into the bins 0 to N/2, divided by
+    /// N.</summary>
+    /// <param name="x">The signal, which becomes complex, and its <see cref="DspInput.Delta"/> 1 /
+    /// (N delta).</param>
+    /// <returns>0; -1 for a complex signal, when the length is no power of two (nothing is then
+    /// changed), or when memory runs out.</returns>
+    public static int dspi_rfft(DspInput x) => Call(NativeMethods.dspi_rfft, x);
+
+    /// <summary>Turns the bins of <see cref="dspi_rfft"/> back into real samples, twice as many as
+    /// bins less two.</summary>
+    /// <param name="x">The bins, changed in place.</param>
+    /// <returns>0; -1 when the number of samples would be no power of two (the record then holds
+    /// the whole spectrum), or when memory runs out.</returns>
+    public static int dspi_irfft(DspInput x) => Call(NativeMethods.dspi_irfft, x);
+
+    /// <summary>Fourier transform of any length N; a forward one is divided by N.</summary>
+    /// <param name="x">The signal, which becomes complex, and its <see cref="DspInput.Delta"/> 1 /
+    /// (N delta).</param>
+    /// <param name="inverse">0 forward, anything else inverse.</param>
+    /// <returns>0, or -1 when memory runs out.</returns>
+    public static int dspi_dft(DspInput x, int inverse) => Call(NativeMethods.dspi_dft, x, inverse);
+
+    /// <summary>Fourier transform of N real samples, any number, into the bins 0 to N/2, divided by
+    /// N.</summary>
+    /// <param name="x">The signal, which becomes complex, and its <see cref="DspInput.Delta"/> 1 /
+    /// (N delta).</param>
+    /// <returns>0; -1 for a complex signal (nothing is then changed), or when memory runs
+    /// out.</returns>
+    public static int dspi_rdft(DspInput x) => Call(NativeMethods.dspi_rdft, x);
+
+    /// <summary>Turns the bins of <see cref="dspi_rdft"/> back into real samples.</summary>
+    /// <param name="x">The bins, changed in place.</param>
+    /// <param name="odd">0 for twice as many samples as bins less two, anything else for one
+    /// more.</param>
+    /// <returns>0, or -1 when memory runs out.</returns>
+    public static int dspi_irdft(DspInput x, int odd) => Call(NativeMethods.dspi_irdft, x, odd);
+
+    /// <summary>Multiplies every sample by a factor.</summary>
+    /// <param name="x">The signal, changed in place.</param>
+    /// <param name="factor">The factor.</param>
+    /// <returns>Always 0.</returns>
+    public static int dspi_scale(DspInput x, double factor) =>
+        Call(NativeMethods.dspi_scale, x, factor);
+
+    /// <summary>Modified Bessel function of the first kind, I0, of every sample; 1e100 beyond
+    /// 700.</summary>
+    /// <param name="x">The arguments, real, replaced by the values.</param>
+    /// <returns>0, or -1 for a complex signal.</returns>
+    public static int dspi_besi0(DspInput x) => Call(NativeMethods.dspi_besi0, x);
+
+    /// <summary>Bessel function of the first kind J0 of every sample.</summary>
+    /// <param name="x">The arguments, real, replaced by the values.</param>
+    /// <returns>0, or -1 for a complex signal.</returns>
+    public static int dspi_besj0(DspInput x) => Call(NativeMethods.dspi_besj0, x);
+
+    /// <summary>Bessel function of the first kind J1 of every sample.</summary>
+    /// <param name="x">The arguments, real, replaced by the values.</param>
+    /// <returns>0, or -1 for a complex signal.</returns>
+    public static int dspi_besj1(DspInput x) => Call(NativeMethods.dspi_besj1, x);
+
+    /// <summary>Bessel function of the second kind Y0 of every sample; 0 where it is not above
+    /// 0.</summary>
+    /// <param name="x">The arguments, real, replaced by the values.</param>
+    /// <returns>0, or -1 for a complex signal.</returns>
+    public static int dspi_besy0(DspInput x) => Call(NativeMethods.dspi_besy0, x);
+
+    /// <summary>Bessel function of the second kind Y1 of every sample; 0 where it is not above
+    /// 0.</summary>
+    /// <param name="x">The arguments, real, replaced by the values.</param>
+    /// <returns>0, or -1 for a complex signal.</returns>
+    public static int dspi_besy1(DspInput x) => Call(NativeMethods.dspi_besy1, x);
+
+    /// <summary>Filters a block of samples: each output is the sum over k of taps[k] times the
+    /// input k samples before.</summary>
+    /// <param name="input">The block.</param>
+    /// <param name="output">As many samples, complex if input or taps are.</param>
+    /// <param name="taps">The taps.</param>
+    /// <param name="state">The end of the block before, empty at first, kept from call to call so
+    /// that a stream can be filtered block by block; or null, and what lies before the block counts
+    /// as zeros.</param>
+    /// <returns>0, or -1 when memory runs out.</returns>
+    public static int dspd_fir(DspInput input, DspInput output, DspInput taps, DspInput? state)
+    {
+        int result = NativeMethods.dspd_fir(input.GetDspPtr(), output.GetDspPtr(), taps.GetDspPtr(),
+            state == null ? null : state.GetDspPtr());
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(taps);
+        GC.KeepAlive(state);
+        return result;
+    }
+
+    /// <summary>Arithmetic mean.</summary>
+    /// <param name="input">The signal.</param>
+    /// <param name="output">One sample, complex for a complex signal.</param>
+    /// <returns>0, or -1 when memory runs out.</returns>
+    public static int dsps_mean(DspInput input, DspInput output) =>
+        Call(NativeMethods.dsps_mean, input, output);
+
+    /// <summary>Median: the middle sample in order, or the mean of the two middle ones.</summary>
+    /// <param name="input">The signal.</param>
+    /// <param name="output">One sample, complex for a complex signal.</param>
+    /// <returns>0, or -1 when memory runs out.</returns>
+    public static int dsps_median(DspInput input, DspInput output) =>
+        Call(NativeMethods.dsps_median, input, output);
+
+    /// <summary>Root mean square.</summary>
+    /// <param name="input">The signal.</param>
+    /// <param name="output">One real sample.</param>
+    /// <returns>0, or -1 when memory runs out.</returns>
+    public static int dsps_rms(DspInput input, DspInput output) =>
+        Call(NativeMethods.dsps_rms, input, output);
+
+    /// <summary>Standard deviation estimated from a sample, over N - 1.</summary>
+    /// <param name="input">The signal.</param>
+    /// <param name="output">One real sample.</param>
+    /// <returns>0, or -1 when memory runs out.</returns>
+    public static int dsps_samp_stddev(DspInput input, DspInput output) =>
+        Call(NativeMethods.dsps_samp_stddev, input, output);
+
+    /// <summary>Variance estimated from a sample, over N - 1.</summary>
+    /// <param name="input">The signal.</param>
+    /// <param name="output">One real sample.</param>
+    /// <returns>0, or -1 when memory runs out.</returns>
+    public static int dsps_samp_var(DspInput input, DspInput output) =>
+        Call(NativeMethods.dsps_samp_var, input, output);
+
+    /// <summary>Smallest sample, of a complex signal the one of smallest magnitude.</summary>
+    /// <param name="input">The signal.</param>
+    /// <param name="output">One sample, complex for a complex signal.</param>
+    /// <returns>0, or -1 when memory runs out.</returns>
+    public static int dsps_min(DspInput input, DspInput output) =>
+        Call(NativeMethods.dsps_min, input, output);
+
+    /// <summary>Largest sample, of a complex signal the one of largest magnitude.</summary>
+    /// <param name="input">The signal.</param>
+    /// <param name="output">One sample, complex for a complex signal.</param>
+    /// <returns>0, or -1 when memory runs out.</returns>
+    public static int dsps_max(DspInput input, DspInput output) =>
+        Call(NativeMethods.dsps_max, input, output);
+}

@@ -1,0 +1,96 @@
+using System;
+using System.Runtime.CompilerServices;
+
+namespace Corvane.QuillonInternal.DataAnalysis;
+
+using unsafe OfFourRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, dsp_struct*, int>;
+using unsafe OfRecord = delegate* unmanaged[Cdecl]<dsp_struct*, int>;
+using unsafe OfRecordAndDouble = delegate* unmanaged[Cdecl]<dsp_struct*, double, int>;
+using unsafe OfRecordAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, int, int>;
+using unsafe OfRecordAndWindow = delegate* unmanaged[Cdecl]<dsp_struct*, int, int, double, int>;
+using unsafe OfTwoRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int>;
+
+/// <summary>
+/// The native functions, as plain pointers: their arguments are what the processor takes, so that a call
+/// costs no more than the runtime's change to native code and back.
+/// </summary>
+/// <remarks>Null until a library is loaded, which happens before the first record exists.</remarks>
+internal static unsafe class NativeMethods
+{
+    internal static OfRecord dsp_destroy, dspi_swap_halves, dspi_rev, dspi_conj, dspi_rfft, dspi_irfft,
+        dspi_rdft, dspi_besi0, dspi_besj0, dspi_besj1, dspi_besy0, dspi_besy1;
+    internal static OfRecordAndInt dspi_zpad, dspi_fft, dspi_dft, dspi_irdft;
+    internal static OfRecordAndDouble dspi_scale;
+    internal static OfRecordAndWindow dspi_window2;
+    internal static OfTwoRecords dsps_mean, dsps_median, dsps_rms, dsps_samp_stddev, dsps_samp_var,
+        dsps_min, dsps_max;
+    internal static OfFourRecords dspd_fir;
+
+    /// <exception cref="EntryPointNotFoundException">The library lacks a function.</exception>
+    internal static void Resolve(IntPtr library)
+    {
+        dsp_destroy = (OfRecord)Find(nameof(dsp_destroy));
+        dspi_window2 = (OfRecordAndWindow)Find(nameof(dspi_window2));
+        dspi_swap_halves = (OfRecord)Find(nameof(dspi_swap_halves));
+        dspi_zpad = (OfRecordAndInt)Find(nameof(dspi_zpad));
+        dspi_rev = (OfRecord)Find(nameof(dspi_rev));
+        dspi_conj = (OfRecord)Find(nameof(dspi_conj));
+        dspi_fft = (OfRecordAndInt)Find(nameof(dspi_fft));
+        dspi_rfft = (OfRecord)Find(nameof(dspi_rfft));
+        dspi_irfft = (OfRecord)Find(nameof(dspi_irfft));
+        dspi_dft = (OfRecordAndInt)Find(nameof(dspi_dft));
+        dspi_rdft = (OfRecord)Find(nameof(dspi_rdft));
+        dspi_irdft = (OfRecordAndInt)Find(nameof(dspi_irdft));
+        dspi_scale = (OfRecordAndDouble)Find(nameof(dspi_scale));
+        dspi_besi0 = (OfRecord)Find(nameof(dspi_besi0));
+        dspi_besj0 = (OfRecord)Find(nameof(dspi_besj0));
+        dspi_besj1 = (OfRecord)Find(nameof(dspi_besj1));
+        dspi_besy0 = (OfRecord)Find(nameof(dspi_besy0));
+        dspi_besy1 = (OfRecord)Find(nameof(dspi_besy1));
+        dspd_fir = (OfFourRecords)Find(nameof(dspd_fir));
+        dsps_mean = (OfTwoRecords)Find(nameof(dsps_mean));
+        dsps_median = (OfTwoRecords)Find(nameof(dsps_median));
+        dsps_rms = (OfTwoRecords)Find(nameof(dsps_rms));
+        dsps_samp_stddev = (OfTwoRecords)Find(nameof(dsps_samp_stddev));
+        dsps_samp_var = (OfTwoRecords)Find(nameof(dsps_samp_var));
+        dsps_min = (OfTwoRecords)Find(nameof(dsps_min));
+        dsps_max = (OfTwoRecords)Find(nameof(dsps_max));
+
+        void* Find(string name) => (void*)SharedObject.Find(library, name);
+    }
+
+    // The calls by their shape. The owner of a record lives until the native function is back.
+
+    [MethodImpl(MethodImplOptions.AggressiveInlining)]
+    internal static int Call(OfRecord function, DspInput x)
+    {
+        int result = function(x.GetDspPtr());
+        GC.KeepAlive(x);
+        return result;
+    }
+
+    [MethodImpl(MethodImplOptions.AggressiveInlining)]
+    internal static int Call(OfRecordAndInt function, DspInput x, int argument)
+    {
+        int result = function(x.GetDspPtr(), argument);
+        GC.KeepAlive(x);
+        return result;
+    }
+
+    [MethodImpl(MethodImplOptions.AggressiveInlining)]
+    internal static int Call(OfRecordAndDouble function, DspInput x, double argument)
+    {
+        int result = function(x.GetDspPtr(), argument);
+        GC.KeepAlive(x);
+        return result;
+    }
+
+    [MethodImpl(MethodImplOptions.AggressiveInlining)]
+    internal static int Call(OfTwoRecords function, DspInput input, DspInput output)
+    {
+        int result = function(input.GetDspPtr(), output.GetDspPtr());
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        return result;
+    }
+}
