@@ -1,10 +1,8 @@
 // Signals as columns of numbers.
 #pragma once
 
-#include <cstdio>
 #include <memory>
 #include <optional>
-#include <span>
 #include <string>
 #include <vector>
 
@@ -33,10 +31,6 @@ std::vector<Signal> read_csv(InputFile& input, const CsvLayout& layout);
 /// One signal, the first without a choice, to be read as it is needed.
 std::unique_ptr<SampleStream> stream_csv(InputFile& input, const CsvLayout& layout,
                                          std::optional<int> signal);
-
-/// Writes signals one after the other, each with a header; numbers have as many digits as it takes
-/// to read the same value again.
-void write_csv(std::FILE* to, std::span<const Signal> signals, bool time);
 
 /// Whether contents look like CSV rather than a plain list of numbers.
 bool looks_like_csv(const std::string& head);

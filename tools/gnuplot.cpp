@@ -33,12 +33,6 @@ std::string complaint(std::FILE* errors) {
 
 }  // namespace
 
-Stream scratch() {
-    Stream file(std::tmpfile(), std::fclose);
-    if (!file) throw Error(std::string("cannot make a temporary file: ") + std::strerror(errno));
-    return file;
-}
-
 std::string quoted(const std::string& text) {
     std::string result = "\"";
     for (const char c : text) {

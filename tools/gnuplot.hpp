@@ -2,15 +2,11 @@
 #pragma once
 
 #include <cstdio>
-#include <memory>
 #include <string>
 
+#include "scratch.hpp"
+
 namespace wavkit::tool {
-
-using Stream = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
-
-/// A nameless file to write a script into.
-Stream scratch();
 
 /// Text as a script takes it.
 std::string quoted(const std::string& text);

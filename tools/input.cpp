@@ -5,29 +5,21 @@
 
 #include <cerrno>
 #include <cstring>
-#include <vector>
 
 #include "error.hpp"
+#include "scratch.hpp"
 
 namespace wavkit::tool {
 namespace {
 
 /// Moves what is left of a stream into a nameless file of its own.
 std::FILE* taken_in(std::FILE* from, const std::string& name) {
-    std::FILE* const copy = std::tmpfile();
-    if (!copy) throw Error("cannot make a temporary file: " + std::string(std::strerror(errno)));
-    std::vector<char> block(1 << 16);
-    std::size_t count;
-    while ((count = std::fread(block.data(), 1, block.size(), from)) > 0 &&
-           std::fwrite(block.data(), 1, count, copy) == count) {
+    auto copy = scratch();
+    if (!copy_rest(from, copy.get())) {
+        throw Error("cannot read " + name + ": " + std::strerror(errno));
     }
-    if (std::ferror(from) || std::ferror(copy) || std::fflush(copy) != 0) {
-        const std::string reason = std::strerror(errno);
-        std::fclose(copy);
-        throw Error("cannot read " + name + ": " + reason);
-    }
-    std::rewind(copy);
-    return copy;
+    std::rewind(copy.get());
+    return copy.release();
 }
 
 }  // namespace

@@ -10,9 +10,9 @@
 #include <csignal>
 #include <cstring>
 #include <filesystem>
-#include <vector>
 
 #include "error.hpp"
+#include "scratch.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -95,12 +95,7 @@ void OutputFile::hand_over() {
     std::FILE* const to = dspf_fopen(target_.c_str(), "wb");
     if (!to) fail();
     std::rewind(stream_);
-    std::vector<char> block(1 << 16);
-    std::size_t count;
-    while ((count = std::fread(block.data(), 1, block.size(), stream_)) > 0) {
-        if (std::fwrite(block.data(), 1, count, to) != count) break;
-    }
-    const bool complete = std::feof(stream_) && std::fflush(to) == 0;
+    const bool complete = copy_rest(stream_, to);
     const int reason = errno;
     const bool closed = dspf_fclose(to) == 0;
     if (!complete) errno = reason;

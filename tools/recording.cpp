@@ -41,31 +41,57 @@ std::vector<Signal> read_signal_file(InputFile& input) {
     }
 }
 
-/// The same signal in the other record; a record may borrow, so no copy of the header is needed.
-class Narrowed {
-  public:
-    explicit Narrowed(const Signal& x) : samples_(x.values().begin(), x.values().end()) {
-        dspf_init(&record_);
-        record_.delta = float(x->delta);
-        record_.points = x->points;
-        record_.complex = x->complex;
-        record_.data = samples_.data();
-    }
-    const dspf* get() const { return &record_; }
+constexpr std::size_t block_points = 1 << 14;
 
-  private:
-    std::vector<float> samples_;
-    dspf record_;
-};
+SignalShape shape_of(const Signal& x) {
+    return {x->delta, bool(x->complex), 1, std::size_t(x->points)};
+}
 
-void write_signal_file(std::FILE* to, std::span<const Signal> signals, Format format, bool single) {
+/// One signal after the other.
+void write_in_turn(BlockWriter& writer, std::span<const Signal> signals) {
     Progress progress("writing");
-    const int flags = format == Format::text ? 1 : 0;
     for (const auto& x : signals) {
-        const int result =
-            single ? dspff_fwrite2(Narrowed(x).get(), to, flags) : dspf_fwrite2(x, to, flags);
-        if (result != 0) return;  // the stream remembers why
+        writer.begin(shape_of(x));
+        const auto values = x.values();
+        for (std::size_t i = 0; i < values.size(); i += 2 * block_points) {
+            writer.write(values.subspan(i, std::min(2 * block_points, values.size() - i)));
+            progress.done(double(i) / double(values.size()));
+        }
+        writer.end();
     }
+}
+
+/// Signals of one length and spacing side by side, the parts of a complex one too.
+void write_as_channels(BlockWriter& writer, std::span<const Signal> signals) {
+    struct Channel {
+        const double* first;
+        std::size_t step;
+    };
+    if (signals.empty()) throw Error("there is no signal to write");
+    std::vector<Channel> channels;
+    for (const auto& x : signals) {
+        if (x->points != signals[0]->points || x->delta != signals[0]->delta) {
+            throw Error(
+                "signals of different lengths or spacings do not fit one sound file; choose "
+                "one with --signal");
+        }
+        const std::size_t width = x->complex ? 2 : 1;
+        for (std::size_t i = 0; i < width; ++i) channels.push_back({x->data + i, width});
+    }
+
+    Progress progress("writing");
+    const auto points = std::size_t(signals[0]->points);
+    writer.begin({signals[0]->delta, false, channels.size(), points});
+    std::vector<double> frames;
+    for (std::size_t start = 0; start < points; start += block_points) {
+        frames.clear();
+        for (std::size_t i = start; i < std::min(points, start + block_points); ++i) {
+            for (const auto& channel : channels) frames.push_back(channel.first[i * channel.step]);
+        }
+        writer.write(frames);
+        progress.done(double(start) / double(points));
+    }
+    writer.end();
 }
 
 }  // namespace
@@ -106,6 +132,25 @@ void ReadOptions::declare(CLI::App& command, bool with_rate) {
         ->check(CLI::PositiveNumber)
         ->type_name("N")
         ->group(group);
+}
+
+void WriteOptions::declare(CLI::App& command) {
+    add_choice(command, "--to", format, formats(), "format of the output (default: by its name)");
+    command.add_flag("--with-time", time, "CSV: begin with a column of times");
+    add_choice<SampleType>(
+        command, "--bits", samples,
+        {{"16", SampleType::pcm16}, {"24", SampleType::pcm24}, {"float", SampleType::float32}},
+        "sound: samples (default: WAV float, FLAC 24)");
+    add_choice<bool>(command, "--type", single, {{"double", false}, {"float", true}},
+                     "signal files: precision of the samples (default: double)");
+}
+
+Format WriteOptions::checked_format_for(const std::string& path) const {
+    const auto chosen = format_for(path);
+    if (samples && !is_sound(chosen)) throw UsageError("--bits is for sound files");
+    if (single && !is_signal_file(chosen)) throw UsageError("--type is for signal files");
+    if (time && chosen != Format::csv) throw UsageError("--with-time is for CSV");
+    return chosen;
 }
 
 Format WriteOptions::format_for(const std::string& path) const {
@@ -173,13 +218,11 @@ void write_recording(const std::string& path, std::span<const Signal> signals,
                      const WriteOptions& options) {
     const auto format = options.format_for(path);
     OutputFile output(path);
+    const auto writer = block_writer(output.stream(), format, options);
     if (is_sound(format)) {
-        const auto usual = format == Format::flac ? SampleType::pcm24 : SampleType::float32;
-        write_sound(output.stream(), signals, format, options.samples.value_or(usual));
-    } else if (format == Format::csv) {
-        write_csv(output.stream(), signals, options.time);
+        write_as_channels(*writer, signals);
     } else {
-        write_signal_file(output.stream(), signals, format, options.single.value_or(false));
+        write_in_turn(*writer, signals);
     }
     output.commit();
 }

@@ -33,8 +33,13 @@ struct WriteOptions {
     std::optional<bool> single;  // signal files in single precision
     std::optional<SampleType> samples;
 
+    /// Adds the options to a subcommand.
+    void declare(CLI::App& command);
+
     /// The format for this name; throws where neither name nor option tells.
     Format format_for(const std::string& path) const;
+    /// The same; throws where an option is for another format.
+    Format checked_format_for(const std::string& path) const;
 };
 
 /// What a source held.

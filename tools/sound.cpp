@@ -57,27 +57,6 @@ int whole_rate(double delta) {
     return int(rate);
 }
 
-/// One channel of a file: a real signal, or one part of a complex one.
-struct Channel {
-    const double* first;
-    std::size_t step;
-};
-
-std::vector<Channel> channels_of(std::span<const Signal> signals) {
-    std::vector<Channel> channels;
-    for (const auto& x : signals) {
-        if (x->points != signals[0]->points || x->delta != signals[0]->delta) {
-            throw Error(
-                "signals of different lengths or spacings do not fit one sound file; choose "
-                "one with --signal");
-        }
-        const std::size_t width = x->complex ? 2 : 1;
-        for (std::size_t part = 0; part < width; ++part)
-            channels.push_back({x->data + part, width});
-    }
-    return channels;
-}
-
 int samples_of(SampleType type) {
     switch (type) {
         case SampleType::pcm16:
@@ -90,10 +69,12 @@ int samples_of(SampleType type) {
     return SF_FORMAT_FLOAT;
 }
 
-/// A plain WAV file ends at 4 GiB; RF64 is what takes over there.
-int container_of(Format format, double scalars) {
+/// A plain WAV file ends at 4 GiB; RF64 is what takes over there, and where the length is not known
+/// before the end, it becomes a WAV file if it can.
+int container_of(Format format, const SignalShape& shape, int channels) {
     if (format == Format::flac) return SF_FORMAT_FLAC;
-    return 4 * scalars < 4.0e9 ? SF_FORMAT_WAV : SF_FORMAT_RF64;
+    const bool fits = shape.points && 4.0 * double(*shape.points) * channels < 4.0e9;
+    return fits ? SF_FORMAT_WAV : SF_FORMAT_RF64;
 }
 
 /// The channel that was asked for, if the file has it.
@@ -151,6 +132,64 @@ class SoundStream : public SampleStream {
     sf_count_t taken_ = 0;
 };
 
+/// The channels of one sound file. What is lost on the way is told on standard error.
+class SoundWriter : public BlockWriter {
+  public:
+    SoundWriter(std::FILE* to, Format format, SampleType type)
+        : to_(to), format_(format), type_(type) {
+        if (format == Format::flac && type == SampleType::float32) {
+            throw UsageError("FLAC holds whole numbers only: use --bits 16 or 24");
+        }
+    }
+
+    void begin(const SignalShape& shape) override {
+        if (file_) throw Error("a sound file holds one signal a channel; choose with --signal");
+        SF_INFO info{};
+        info.samplerate = whole_rate(shape.delta);
+        info.channels = int(shape.channels) * (shape.complex ? 2 : 1);
+        info.format = container_of(format_, shape, info.channels) | samples_of(type_);
+        file_ = open_sound(to_, SFM_WRITE, info, cannot_write);
+        sf_command(file_.get(), SFC_SET_CLIPPING, nullptr, SF_TRUE);
+        sf_command(file_.get(), SFC_RF64_AUTO_DOWNGRADE, nullptr, SF_TRUE);
+        channels_ = std::size_t(info.channels);
+    }
+
+    void write(std::span<const double> values) override {
+        if (type_ != SampleType::float32) {
+            const auto bad = std::ranges::find_if(values, [](double v) { return std::isnan(v); });
+            if (bad != values.end()) {
+                const auto sample = taken_ + std::size_t(bad - values.begin()) / channels_;
+                throw Error("sample " + std::to_string(sample) +
+                            " is not a number; only --bits float can hold it");
+            }
+        }
+        clipped_ += std::ranges::count_if(values, [](double v) { return std::fabs(v) > 1; });
+        taken_ += values.size() / channels_;
+        const auto count = sf_count_t(values.size());
+        if (sf_write_double(file_.get(), values.data(), count) != count) {
+            throw Error(std::string(cannot_write) + ": " + sf_strerror(file_.get()));
+        }
+    }
+
+    void end() override {
+        if (sf_close(file_.release()) != 0) throw Error(cannot_write);
+        if (type_ != SampleType::float32 && clipped_ > 0) {
+            std::fprintf(stderr, "wavkit: %td sample%s beyond -1 to 1 clipped\n", clipped_,
+                         clipped_ == 1 ? "" : "s");
+        }
+    }
+
+  private:
+    static constexpr const char* cannot_write = "cannot write this sound file";
+
+    std::FILE* to_;
+    Format format_;
+    SampleType type_;
+    Handle file_{nullptr, sf_close};
+    std::size_t channels_ = 1, taken_ = 0;
+    std::ptrdiff_t clipped_ = 0;
+};
+
 }  // namespace
 
 bool looks_like_sound(const std::string& head) {
@@ -202,47 +241,10 @@ std::unique_ptr<SampleStream> stream_sound(InputFile& input, std::optional<int> 
     return std::make_unique<SoundStream>(input, channel ? channel : signal);
 }
 
-void write_sound(std::FILE* to, std::span<const Signal> signals, Format format, SampleType type) {
-    if (signals.empty()) throw Error("there is no signal to write");
-    if (format == Format::flac && type == SampleType::float32) {
-        throw UsageError("FLAC holds whole numbers only: use --bits 16 or 24");
-    }
-    const auto channels = channels_of(signals);
-    const auto points = std::size_t(signals[0]->points);
-    SF_INFO info{};
-    info.samplerate = whole_rate(signals[0]->delta);
-    info.channels = int(channels.size());
-    info.format = container_of(format, double(points * channels.size())) | samples_of(type);
-    auto file = open_sound(to, SFM_WRITE, info, "cannot write this sound file");
-    sf_command(file.get(), SFC_SET_CLIPPING, nullptr, SF_TRUE);
-
-    Progress progress("writing");
-    std::size_t clipped = 0;
-    std::vector<double> frames;
-    for (std::size_t start = 0; start < points; start += block_frames) {
-        const auto count = std::min(block_frames, points - start);
-        frames.clear();
-        for (std::size_t i = start; i < start + count; ++i) {
-            for (const auto& channel : channels) {
-                const double sample = channel.first[i * channel.step];
-                if (type != SampleType::float32 && std::isnan(sample)) {
-                    throw Error("sample " + std::to_string(i) +
-                                " is not a number; only --bits float can hold it");
-                }
-                clipped += std::fabs(sample) > 1 ? 1 : 0;
-                frames.push_back(sample);
-            }
-        }
-        if (sf_writef_double(file.get(), frames.data(), sf_count_t(count)) != sf_count_t(count)) {
-            throw Error(std::string("cannot write this sound file: ") + sf_strerror(file.get()));
-        }
-        progress.done(double(start) / double(points));
-    }
-    if (sf_close(file.release()) != 0) throw Error("cannot write this sound file");
-    if (type != SampleType::float32 && clipped > 0) {
-        std::fprintf(stderr, "wavkit: %zu sample%s beyond -1 to 1 clipped\n", clipped,
-                     clipped == 1 ? "" : "s");
-    }
+std::unique_ptr<BlockWriter> sound_writer(std::FILE* to, Format format,
+                                          std::optional<SampleType> type) {
+    const auto usual = format == Format::flac ? SampleType::pcm24 : SampleType::float32;
+    return std::make_unique<SoundWriter>(to, format, type.value_or(usual));
 }
 
 }  // namespace wavkit::tool

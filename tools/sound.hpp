@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "block_writer.hpp"
 #include "format.hpp"
 #include "input.hpp"
 #include "signal.hpp"
@@ -39,6 +40,7 @@ std::unique_ptr<SampleStream> stream_sound(InputFile& input, std::optional<int> 
 /// Writes signals of one length and spacing as the channels of one file; a complex signal takes two
 /// channels, re and im. The spacing becomes the nearest whole sampling rate; what was lost on the
 /// way (clipped samples, a rate that is no whole number) is told on standard error.
-void write_sound(std::FILE* to, std::span<const Signal> signals, Format format, SampleType type);
+std::unique_ptr<BlockWriter> sound_writer(std::FILE* to, Format format,
+                                          std::optional<SampleType> type);
 
 }  // namespace wavkit::tool
