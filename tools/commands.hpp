@@ -16,5 +16,8 @@ void add_hist(CLI::App& program);
 void add_fit(CLI::App& program);
 void add_roots(CLI::App& program);
 void add_interp(CLI::App& program);
+void add_design(CLI::App& program);
+void add_filter(CLI::App& program);
+void add_generate(CLI::App& program);
 
 }  // namespace wavkit::tool

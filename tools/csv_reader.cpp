@@ -235,7 +235,7 @@ class CsvReader {
 class CsvStream : public BlockStream {
   public:
     CsvStream(InputFile& input, const CsvLayout& layout, std::optional<int> signal)
-        : layout_(layout), reader_(input, layout_), chosen_(signal.has_value()) {
+        : layout_(layout), reader_(input, layout_) {
         const int number = signal.value_or(1);
         for (int found = 0; found < number; ++found) {
             if (found > 0) skip_signal();
@@ -258,12 +258,11 @@ class CsvStream : public BlockStream {
 
     void next_block(std::vector<double>& block) override {
         reader_.read(block);
-        if (block.empty()) alone = chosen_ || !reader_.more_follows();
+        if (block.empty()) last = !reader_.more_follows();
     }
 
     CsvLayout layout_;
     CsvReader reader_;
-    bool chosen_;
 };
 
 }  // namespace

@@ -49,6 +49,9 @@ void run(CLI::App& program, int argc, char** argv) {
     wavkit::tool::add_fit(program);
     wavkit::tool::add_roots(program);
     wavkit::tool::add_interp(program);
+    wavkit::tool::add_design(program);
+    wavkit::tool::add_filter(program);
+    wavkit::tool::add_generate(program);
     program.parse(argc, argv);
 }
 

@@ -74,7 +74,10 @@ void write_x_range(std::FILE* script, const Curve& curve) {
 
 /// The range of the height axis: what is far below the highest value is not worth paper.
 void write_y_range(std::FILE* script, const Curve& curve) {
+    const bool given = curve.y_tics > 0;
+    std::fprintf(script, "set ytics %s\n", given ? number(curve.y_tics).c_str() : "autofreq");
     const double top = *std::ranges::max_element(curve.y);
+    if (curve.range) return write_range(script, 'y', curve.range->first, curve.range->second);
     if (!curve.decibels) {
         const double low = *std::ranges::min_element(curve.y);
         if (curve.style == Style::dots) {
@@ -115,7 +118,7 @@ void write_plot(std::FILE* script, const Curve& curve, std::size_t columns, bool
     write_data(script, "curve", thinned(curve, columns));
     if (!curve.line.empty()) write_data(script, "line", curve.line);
     std::fputs("plot ", script);
-    if (curve.style == Style::line && !curve.decibels && !characters) {
+    if (curve.style == Style::line && curve.filled && !curve.decibels && !characters) {
         std::fputs("$curve with filledcurves y=0 fc rgb '#1f5fa8' fs transparent solid 0.15, ",
                    script);
     }
@@ -132,21 +135,23 @@ void write_plot(std::FILE* script, const Curve& curve, std::size_t columns, bool
     std::fputc('\n', script);
 }
 
-void write_script(std::FILE* script, const Curve& curve, Picture picture) {
-    const bool characters = picture == Picture::terminal;
+void write_terminal(std::FILE* script, Picture picture, std::size_t panels) {
     std::fputs("set encoding utf8\nset key off\nset tics nomirror out\nset border 3\n", script);
-    if (characters) {
+    if (picture == Picture::terminal) {
         const auto [width, height] = terminal_size();
         std::fprintf(script, "set terminal dumb noenhanced size %d,%d\n", width, height);
     } else {
-        std::fputs(picture == Picture::png
-                       ? "set terminal pngcairo noenhanced size 1000,560 font 'Sans,11'\n"
-                       : "set terminal svg noenhanced size 1000,560 font 'Sans,13' background "
-                         "'#ffffff'\n",
-                   script);
+        const bool png = picture == Picture::png;
+        std::fprintf(script, "set terminal %s noenhanced size 1000,%d font 'Sans,%d'%s\n",
+                     png ? "pngcairo" : "svg", panels > 1 ? 840 : 560, png ? 11 : 13,
+                     png ? "" : " background '#ffffff'");
         std::fputs("set grid lc rgb '#e0e0e0' lt 1\nset border lc rgb '#555555'\n", script);
     }
-    std::fprintf(script, "set title %s\nset xlabel %s\nset ylabel %s\n",
+    if (panels > 1) std::fprintf(script, "set multiplot layout %zu,1\n", panels);
+}
+
+void write_panel(std::FILE* script, const Curve& curve, bool characters) {
+    std::fprintf(script, "unset label\nset title %s\nset xlabel %s\nset ylabel %s\n",
                  quoted(curve.title).c_str(), quoted(curve.x_label).c_str(),
                  quoted(curve.y_label).c_str());
     write_x_range(script, curve);
@@ -166,15 +171,23 @@ Picture picture_of_name(const std::string& path) {
                      path + "'");
 }
 
-void draw(const Curve& curve, const std::string& path) {
-    if (curve.x.empty() || (curve.x.size() < 2 && curve.style == Style::line)) {
-        throw Error("there are too few points to draw");
+void draw(const Curve& curve, const std::string& path) { draw({&curve, 1}, path); }
+
+void draw(std::span<const Curve> panels, const std::string& path) {
+    for (const auto& curve : panels) {
+        if (curve.x.empty() || (curve.x.size() < 2 && curve.style == Style::line)) {
+            throw Error("there are too few points to draw");
+        }
     }
+    const auto format = picture_of_name(path);
     OutputFile picture(path);
     {
         Progress progress("drawing");
         const auto script = scratch();
-        write_script(script.get(), curve, picture_of_name(path));
+        write_terminal(script.get(), format, panels.size());
+        for (const auto& curve : panels) {
+            write_panel(script.get(), curve, format == Picture::terminal);
+        }
         run_gnuplot(script.get(), picture.stream());
     }
     picture.commit();

@@ -1,7 +1,10 @@
 // Pictures of curves, drawn by gnuplot.
 #pragma once
 
+#include <optional>
+#include <span>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace wavkit::tool {
@@ -19,9 +22,12 @@ struct Curve {
     double box_width = 0;    // of boxes, which stand on their x
     std::vector<Mark> line;  // a straight line's two ends, drawn across
     bool decibels = false;
-    double depth = 150;        // decibels worth showing below the highest value
-    std::string unit;          // of the period, for the labels of the peaks
-    std::vector<Mark> marked;  // peaks to label
+    double depth = 150;  // decibels worth showing below the highest value
+    bool filled = true;  // down to 0, unless in decibels
+    double y_tics = 0;   // between the numbers at the height axis; 0: as it suits
+    std::optional<std::pair<double, double>> range;  // of the heights, where they do not choose it
+    std::string unit;                                // of the period, for the labels of the peaks
+    std::vector<Mark> marked;                        // peaks to label
 };
 
 /// The format of a picture by its name: "-" is a drawing in characters. Throws for others than
@@ -31,5 +37,8 @@ Picture picture_of_name(const std::string& path);
 
 /// Draws a curve into a file, completely or not at all; "-" is standard output.
 void draw(const Curve& curve, const std::string& path);
+
+/// The same with several curves, each in a panel below the one before.
+void draw(std::span<const Curve> panels, const std::string& path);
 
 }  // namespace wavkit::tool

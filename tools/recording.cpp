@@ -1,5 +1,6 @@
 #include "recording.hpp"
 
+#include <unistd.h>
 #include <wavkit/dsp.h>
 
 #include <algorithm>
@@ -147,6 +148,9 @@ void WriteOptions::declare(CLI::App& command) {
 
 Format WriteOptions::checked_format_for(const std::string& path) const {
     const auto chosen = format_for(path);
+    if (path == "-" && isatty(STDOUT_FILENO) && (is_sound(chosen) || chosen == Format::binary)) {
+        throw UsageError("standard output is a terminal: name a file with -o or say --to csv");
+    }
     if (samples && !is_sound(chosen)) throw UsageError("--bits is for sound files");
     if (single && !is_signal_file(chosen)) throw UsageError("--type is for signal files");
     if (time && chosen != Format::csv) throw UsageError("--with-time is for CSV");

@@ -36,6 +36,8 @@ struct WriteOptions {
     /// Adds the options to a subcommand.
     void declare(CLI::App& command);
 
+    bool any() const { return format || time || single || samples; }
+
     /// The format for this name; throws where neither name nor option tells.
     Format format_for(const std::string& path) const;
     /// The same; throws where an option is for another format.

@@ -8,6 +8,7 @@
 #include <cmath>
 #include <limits>
 #include <memory>
+#include <utility>
 
 #include "csv.hpp"
 #include "error.hpp"
@@ -92,20 +93,42 @@ void check_complete(SNDFILE* file, const std::string& name) {
     throw Error("cannot read " + name + ": " + sf_strerror(file));
 }
 
-/// One channel of a sound file.
+/// One channel of a sound file, or all of them.
 class SoundStream : public SampleStream {
   public:
-    SoundStream(InputFile& input, std::optional<int> channel)
+    explicit SoundStream(InputFile& input)
         : name_(input.name()),
-          file_(open_sound(input.stream(), SFM_READ, info_, "cannot read " + name_)),
-          channel_(std::size_t(chosen_channel(info_, name_, channel).value_or(1) - 1)),
-          frames_(block_frames * std::size_t(info_.channels)) {
+          file_(open_sound(input.stream(), SFM_READ, info_, "cannot read " + name_)) {
         delta = 1.0 / info_.samplerate;
         sound = true;
-        alone = channel || info_.channels == 1;
+        channels = std::size_t(info_.channels);
+    }
+
+    /// Reads one channel alone, the first without a choice.
+    void choose(std::optional<int> channel) {
+        first_ = std::size_t(chosen_channel(info_, name_, channel).value_or(1) - 1);
+        last = first_ + 1 == channels;
+        channels = 1;
+        frames_.resize(block_frames * std::size_t(info_.channels));
     }
 
     std::size_t read(std::span<double> values) override {
+        const std::size_t done = frames_.empty() ? read_all(values) : read_chosen(values);
+        check_complete(file_.get(), name_);
+        taken_ += sf_count_t(done / channels);
+        return done;
+    }
+
+    double done() const override { return double(taken_) / double(info_.frames); }
+
+  private:
+    std::size_t read_all(std::span<double> values) {
+        const auto wanted = sf_count_t(values.size() / channels * channels);
+        return std::size_t(
+            std::max<sf_count_t>(sf_read_double(file_.get(), values.data(), wanted), 0));
+    }
+
+    std::size_t read_chosen(std::span<double> values) {
         const auto width = std::size_t(info_.channels);
         std::size_t done = 0;
         while (done < values.size()) {
@@ -113,22 +136,17 @@ class SoundStream : public SampleStream {
             const auto got = sf_readf_double(file_.get(), frames_.data(), sf_count_t(wanted));
             if (got <= 0) break;
             for (std::size_t i = 0; i < std::size_t(got); ++i) {
-                values[done++] = frames_[i * width + channel_];
+                values[done++] = frames_[i * width + first_];
             }
         }
-        check_complete(file_.get(), name_);
-        taken_ += sf_count_t(done);
         return done;
     }
 
-    double done() const override { return double(taken_) / double(info_.frames); }
-
-  private:
     SF_INFO info_{};
     std::string name_;
     Handle file_;
-    std::size_t channel_;
-    std::vector<double> frames_;
+    std::size_t first_ = 0;
+    std::vector<double> frames_;  // of all channels, where one is chosen
     sf_count_t taken_ = 0;
 };
 
@@ -143,7 +161,9 @@ class SoundWriter : public BlockWriter {
     }
 
     void begin(const SignalShape& shape) override {
-        if (file_) throw Error("a sound file holds one signal a channel; choose with --signal");
+        if (std::exchange(begun_, true)) {
+            throw Error("one signal fits a sound file here; choose with --signal");
+        }
         SF_INFO info{};
         info.samplerate = whole_rate(shape.delta);
         info.channels = int(shape.channels) * (shape.complex ? 2 : 1);
@@ -185,6 +205,7 @@ class SoundWriter : public BlockWriter {
     std::FILE* to_;
     Format format_;
     SampleType type_;
+    bool begun_ = false;
     Handle file_{nullptr, sf_close};
     std::size_t channels_ = 1, taken_ = 0;
     std::ptrdiff_t clipped_ = 0;
@@ -238,7 +259,13 @@ std::unique_ptr<SampleStream> stream_sound(InputFile& input, std::optional<int> 
         throw Error(input.name() + " holds 1 signal in that channel, no signal " +
                     std::to_string(*signal));
     }
-    return std::make_unique<SoundStream>(input, channel ? channel : signal);
+    auto stream = std::make_unique<SoundStream>(input);
+    stream->choose(channel ? channel : signal);
+    return stream;
+}
+
+std::unique_ptr<SampleStream> stream_channels(InputFile& input) {
+    return std::make_unique<SoundStream>(input);
 }
 
 std::unique_ptr<BlockWriter> sound_writer(std::FILE* to, Format format,

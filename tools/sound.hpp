@@ -37,6 +37,9 @@ Sound read_sound(InputFile& input, std::optional<int> channel);
 std::unique_ptr<SampleStream> stream_sound(InputFile& input, std::optional<int> channel,
                                            std::optional<int> signal);
 
+/// All channels side by side.
+std::unique_ptr<SampleStream> stream_channels(InputFile& input);
+
 /// Writes signals of one length and spacing as the channels of one file; a complex signal takes two
 /// channels, re and im. The spacing becomes the nearest whole sampling rate; what was lost on the
 /// way (clipped samples, a rate that is no whole number) is told on standard error.

@@ -119,7 +119,7 @@ SpectrumReport measured_in_segments(const SpectrumOptions& options) {
             progress.done(stream->done());
         });
     }
-    tell_of_others(*stream);
+    tell_of_others(*stream, options.reading);
     report.spectrum = average.result();
     if (waterfall) {
         waterfall->draw(

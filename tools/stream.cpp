@@ -26,7 +26,7 @@ class BinaryStream : public SampleStream {
             }
         }
         if (!read_header()) fail_without_signal(input_.name(), number - 1, number_);
-        alone = number > 1 || std::ftell(file()) + long(total_ * scalar_size_) >= input_.size();
+        last = std::ftell(file()) + long(total_ * scalar_size_) >= input_.size();
     }
 
     std::size_t read(std::span<double> values) override {
@@ -124,6 +124,15 @@ std::size_t BlockStream::read(std::span<double> values) {
     return done;
 }
 
+namespace {
+
+void set_spacing(SampleStream& stream, const ReadOptions& options) {
+    if (options.delta) stream.delta = *options.delta;
+    if (options.rate) stream.delta = 1 / *options.rate;
+}
+
+}  // namespace
+
 std::unique_ptr<SampleStream> open_stream(InputFile& input, const ReadOptions& options) {
     const auto format = format_of(input, options);
     std::unique_ptr<SampleStream> stream;
@@ -136,13 +145,21 @@ std::unique_ptr<SampleStream> open_stream(InputFile& input, const ReadOptions& o
     } else {
         stream = stream_text(input, options.signal);
     }
-    if (options.delta) stream->delta = *options.delta;
-    if (options.rate) stream->delta = 1 / *options.rate;
+    set_spacing(*stream, options);
     return stream;
 }
 
-void tell_of_others(const SampleStream& stream) {
-    if (stream.alone) return;
+std::unique_ptr<SampleStream> open_channels(InputFile& input, const ReadOptions& options) {
+    if (!is_sound(format_of(input, options)) || options.channel || options.signal) {
+        return open_stream(input, options);
+    }
+    auto stream = stream_channels(input);
+    set_spacing(*stream, options);
+    return stream;
+}
+
+void tell_of_others(const SampleStream& stream, const ReadOptions& options) {
+    if (stream.last || options.signal || options.channel) return;
     std::fprintf(stderr, "wavkit: using the first of several signals; choose with %s\n",
                  stream.sound ? "--channel" : "--signal");
 }

@@ -25,8 +25,9 @@ class SampleStream {
 
     double delta = 1.0;
     bool complex = false;
-    bool sound = false;  // the spacing is in seconds
-    bool alone = true;   // no other was there to choose; certain once all has been read
+    bool sound = false;        // the spacing is in seconds
+    bool last = true;          // no other signal follows; certain once all has been read
+    std::size_t channels = 1;  // side by side, of a sound file: a scalar of each in turn
 };
 
 /// A stream that comes in blocks of its own size.
@@ -49,7 +50,10 @@ std::unique_ptr<SampleStream> stream_text(InputFile& input, std::optional<int> s
 /// needed.
 std::unique_ptr<SampleStream> open_stream(InputFile& input, const ReadOptions& options);
 
-/// Tells, on standard error, of a stream read to its end that there were others to choose.
-void tell_of_others(const SampleStream& stream);
+/// Opens the signal that the options choose; of a sound file without a choice all channels.
+std::unique_ptr<SampleStream> open_channels(InputFile& input, const ReadOptions& options);
+
+/// Tells, on standard error, of a stream read to its end that others follow and none was chosen.
+void tell_of_others(const SampleStream& stream, const ReadOptions& options);
 
 }  // namespace wavkit::tool

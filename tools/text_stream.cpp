@@ -17,7 +17,7 @@ bool is_space(int c) { return c == ' ' || (c >= '\t' && c <= '\r'); }
 class TextStream : public BlockStream {
   public:
     TextStream(InputFile& input, std::optional<int> signal)
-        : input_(input), number_(signal.value_or(1)), chosen_(signal.has_value()) {
+        : input_(input), number_(signal.value_or(1)) {
         for (int found = 0; found < number_; ++found) {
             if (found > 0) skip_signal();
             if (peek() == EOF) fail_without_signal(input.name(), found, number_);
@@ -130,7 +130,7 @@ class TextStream : public BlockStream {
             ++taken_;
         }
         if (values_left().value_or(0) != 0) fail(" is damaged: it has fewer values than it says");
-        alone = chosen_ || peek() == EOF;
+        last = peek() == EOF;
     }
 
     void skip_signal() {
@@ -144,7 +144,6 @@ class TextStream : public BlockStream {
 
     InputFile& input_;
     int number_;
-    bool chosen_;
     std::optional<long long> declared_;  // points
     bool has_delta_ = false, ended_ = false;
     long long taken_ = 0;  // values
