@@ -45,19 +45,14 @@ struct FilterOptions {
     Tapering tapering;
     ReadOptions reading;
     WriteOptions writing;
-
-    /// The band filter that was asked for.
-    std::size_t band() const {
-        const auto given = std::ranges::find_if(edges, [](auto& e) { return !e.empty(); });
-        return std::size_t(given - edges.begin());
-    }
 };
 
 void check_usage(FilterOptions& options) {
-    const auto bands = std::ranges::count_if(options.edges, [](auto& e) { return !e.empty(); });
-    if (bands + (options.taps.empty() ? 0 : 1) != 1) {
+    const bool bands = std::ranges::any_of(options.edges, [](auto& e) { return !e.empty(); });
+    if (bands == !options.taps.empty()) {
         throw UsageError(
-            "say what to filter by: one of --taps, --lowpass, --highpass, --bandpass, --bandstop");
+            "say what to filter by: bands (--lowpass, --highpass, --bandpass, --bandstop) or "
+            "--taps");
     }
     const auto& tapering = options.tapering;
     if (!options.taps.empty() &&
@@ -87,16 +82,31 @@ void check_usage(FilterOptions& options) {
     }
 }
 
+/// One filter in place of two, one behind the other.
+Signal convolved(Signal a, const Signal& b) {
+    Signal both;
+    check(dspi_zpad(a, a->points + b->points - 1) || dspd_fir(a, both, b, nullptr),
+          "joining filters");
+    return both;
+}
+
+/// A filter for all bands that were asked for.
 Signal designed_taps(const FilterOptions& options, double delta) {
     check_spacing(delta);
-    const auto& edges = options.edges[options.band()];
-    const auto problem = problem_with_edges(edges, 1 / delta);
-    if (!problem.empty()) throw Error(problem);
     auto tapering = options.tapering;
     if (tapering.transition) *tapering.transition *= delta;
-    std::vector<double> fractions;
-    for (const double edge : edges) fractions.push_back(edge * delta);
-    return tapered_design(band_options[options.band()].type, fractions, 0, tapering);
+    Signal taps;
+    for (std::size_t i = 0; i < band_options.size(); ++i) {
+        const auto& edges = options.edges[i];
+        if (edges.empty()) continue;
+        const auto problem = problem_with_edges(edges, 1 / delta);
+        if (!problem.empty()) throw Error(problem);
+        std::vector<double> fractions;
+        for (const double edge : edges) fractions.push_back(edge * delta);
+        auto band = tapered_design(band_options[i].type, fractions, 0, tapering);
+        taps = taps->points > 0 ? convolved(std::move(taps), band) : std::move(band);
+    }
+    return taps;
 }
 
 Signal given_taps(const FilterOptions& options) {
@@ -242,9 +252,10 @@ class FilterRun {
 
 constexpr const char* about =
     R"(Edges are in hertz where the spacing is in seconds, and lie in the middle of the transition, where
-the filter passes half the amplitude. It has as many taps as --transition and --attenuation take, or
---length taps, through a Kaiser window unless --window names another one ('wavkit design' shows what
-such a filter is like). --taps takes any signal file of taps instead, real or complex.
+the filter passes half the amplitude. Several bands are filters one behind the other. Each has as
+many taps as --transition and --attenuation take, or --length taps, through a Kaiser window unless
+--window names another one ('wavkit design' shows what such a filter is like). --taps takes any
+signal file of taps instead, real or complex.
 
 The output lies in time where the input does: the delay of the filter, half its taps, is taken out,
 and before and behind the signal there are zeros, or with --hold its first and last sample over and
@@ -259,7 +270,7 @@ first signal before and after.
 Examples:
   wavkit filter hum.wav --bandstop 45 55 -o clean.wav
   wavkit filter log.csv --time --lowpass 2 --transition 1 --attenuation 80 -o smooth.csv --with-time
-  wavkit filter ecg.txt --rate 360 --highpass 0.5 --hold --plot ecg.png --span 10 15
+  wavkit filter ecg.txt --rate 360 --highpass 0.5 --bandstop 59 61 --hold --plot ecg.png --span 10 15
   wavkit filter - --lowpass 100 <tone.wav | wavkit spectrum - --peaks 3)";
 
 }  // namespace

@@ -3,6 +3,7 @@
 
 #include <sys/wait.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -94,6 +95,22 @@ class ProgramTest : public ::testing::Test {
             for (double value; fields >> value;) result.back().push_back(value);
         }
         return result;
+    }
+
+    /// A command line that must fail with one line on standard error, and leave nothing.
+    struct Failure {
+        int status;
+        std::string line, complaint;
+    };
+    void expect_failures(const std::vector<Failure>& failures) const {
+        const auto before = files();
+        for (const auto& [status, line, complaint] : failures) {
+            const auto done = shell("wavkit " + line);
+            EXPECT_EQ(done.status, status) << line;
+            EXPECT_NE(done.err.find(complaint), std::string::npos) << line << "\n" << done.err;
+            EXPECT_EQ(std::count(done.err.begin(), done.err.end(), '\n'), 1) << done.err;
+            EXPECT_EQ(files(), before) << line;
+        }
     }
 
     /// The names of the files there, but for what shell() keeps.

@@ -105,6 +105,12 @@ TEST_F(FilterTest, ChannelsAndSignalsAreFilteredEach) {
     }
     EXPECT_TRUE(matches<dsp>(through("second.wav").at(0), both[1]));
 
+    // One filter behind the other.
+    printed("filter ab.dsp --bandstop 200 300 -o - | wavkit filter - --highpass 100 -o y.dsp");
+    printed("filter ab.dsp --highpass 100 --bandstop 200 300 -o yy.dsp");
+    const auto twice = read("y.dsp"), once = read("yy.dsp");
+    for (int i = 1000; i < 69000; ++i) ASSERT_NEAR(once.at(1)[i], twice.at(1)[i], 1e-12) << i;
+
     // Each signal has its own spacing, and so its own taps.
     write("x.dsp", Signals{a, slow});
     printed("filter x.dsp --lowpass 20 -o y.csv");
@@ -257,11 +263,7 @@ TEST_F(FilterTest, FailuresAreToldAndLeaveNothing) {
     write("none.txt", "#DSP points = 0\n");
     write("z.csv", "re,im\n1,2\n3,4\n");
     write("cut.dsp", "\xBE\x30\x03\xEB\x08\x04");
-    const auto before = files();
-    const struct {
-        int status;
-        std::string line, complaint;
-    } cases[] = {
+    expect_failures({
         {1, "filter x.txt --lowpass 0.6 -o y.csv", "half the sampling rate"},
         {1, "filter x.txt --bandpass 0.3 0.2 -o y.csv", "lower to a higher"},
         {1, "filter x.txt --bandstop 0.3 0.3 -o y.csv", "lower to a higher"},
@@ -274,7 +276,7 @@ TEST_F(FilterTest, FailuresAreToldAndLeaveNothing) {
         {1, "filter x.txt --lowpass 0.1 -o nowhere/y.csv", "nowhere"},
         {1, "filter z.csv --lowpass 0.1 --plot y.png", "real signals"},
         {2, "filter x.txt -o y.csv", "what to filter by"},
-        {2, "filter x.txt --lowpass 0.1 --highpass 0.2 -o y.csv", "what to filter by"},
+        {2, "filter x.txt --lowpass 0.1 --taps x.txt -o y.csv", "what to filter by"},
         {2, "filter x.txt --bandpass 0.1 -o y.csv", "--bandpass"},
         {2, "filter x.txt --highpass 0.1 --length 10 -o y.csv", "odd number"},
         {2, "filter x.txt --lowpass 0.1 --window hann -o y.csv", "Kaiser70"},
@@ -307,14 +309,7 @@ TEST_F(FilterTest, FailuresAreToldAndLeaveNothing) {
         {2, "generate cos 1 --rate 2 --delta 1 -o x.dsp", "--delta"},
         {2, "generate cos 1 --duration 1e99 -o x.dsp", "1073741824"},
         {2, "generate cos 1 -o x", "--to"},
-    };
-    for (const auto& [status, line, complaint] : cases) {
-        const auto done = shell("wavkit " + line);
-        EXPECT_EQ(done.status, status) << line;
-        EXPECT_NE(done.err.find(complaint), std::string::npos) << line << "\n" << done.err;
-        EXPECT_EQ(std::count(done.err.begin(), done.err.end(), '\n'), 1) << done.err;
-        EXPECT_EQ(files(), before) << line;
-    }
+    });
     for (const std::string command : {"filter", "design", "generate"}) {
         EXPECT_NE(printed(command + " --help").find("Example"), std::string::npos);
     }
