@@ -53,7 +53,10 @@ public class CallTests
         Assert.Equal(-1, DspApi.dspi_fft(three, 0));
         Assert.Equal(-1, DspApi.dspi_rfft(three));
         three.ShouldBe(0, 0, 1, 0);
-        Assert.Equal(-1, DspApi.dspi_irfft(four));
+        four.Delta = 0.5;
+        Assert.Equal(0, DspApi.dspi_fft(four, 0));
+        Assert.Equal(0.5, four.Delta); // 1 / (4 * 0.5)
+        Assert.Equal(-1, DspApi.dspi_irfft(four)); // of 6 samples
     }
 
     /// <summary>The same with 3 samples, whose bins turn by a third.</summary>
@@ -66,18 +69,6 @@ public class CallTests
         Check(Signal.Real(0, 1, 0), DspApi.dspi_rdft, 1, bins[..4]);
         Check(Signal.Interleaved(bins[..4]), x => DspApi.dspi_irdft(x, 1), 0, 0, 1, 0);
         Check(Signal.Interleaved(0.5, 0, -0.5, 0), x => DspApi.dspi_irdft(x, 0), 0, 0, 1);
-    }
-
-    [Fact]
-    public void SpacingOfTransforms()
-    {
-        using Signal x = Signal.Real(new double[4]);
-        x.Delta = 0.5;
-        Assert.Equal(0, DspApi.dspi_rfft(x));
-        Assert.Equal(0.5, x.Delta); // 1 / (4 * 0.5)
-        x.Delta = 0.125;
-        Assert.Equal(0, DspApi.dspi_irfft(x));
-        Assert.Equal(2.0, x.Delta);
     }
 
     /// <summary>A Hann window of 8 samples about sample 4, in three scales and two layouts, and one of 4
@@ -100,47 +91,39 @@ public class CallTests
         Assert.Equal(-1, DspApi.dspi_window2(unknown, 24, 0, 0));
     }
 
+    /// <summary>A block by itself, and two blocks of a stream.</summary>
     [Fact]
-    public void FilterOfOneBlock()
+    public void Filters()
     {
-        using Signal input = Signal.Real(1, 2, 3, 4), taps = Signal.Real(1, 10, 100), output = Signal.Real();
-        Assert.Equal(0, DspApi.dspd_fir(input, output, taps, null));
-        output.ShouldBe(0, 1, 12, 123, 234);
-        input.ShouldBe(0, 1, 2, 3, 4);
+        using Signal first = Signal.Real(1, 2, 3), second = Signal.Real(4, 5), taps = Signal.Real(1, 10, 100);
+        using Signal output = Signal.Real(), state = Signal.Real();
+        Assert.Equal(0, DspApi.dspd_fir(first, output, taps, null));
+        output.ShouldBe(0, 1, 12, 123);
+        Assert.Equal(0, DspApi.dspd_fir(first, output, taps, state));
+        Assert.Equal(0, DspApi.dspd_fir(second, output, taps, state));
+        output.ShouldBe(0, 234, 345);
+        state.ShouldBe(0, 4, 5);
+        first.ShouldBe(0, 1, 2, 3);
         taps.ShouldBe(0, 1, 10, 100);
     }
 
+    /// <summary>A signal in which all of them differ, also from those of a population.</summary>
     [Fact]
-    public void FilterOfAStream()
+    public void Statistics()
     {
-        using Signal taps = Signal.Real(1, 10), output = Signal.Real(), state = Signal.Real();
-        using Signal first = Signal.Real(1, 2), second = Signal.Real(3, 4);
-        Assert.Equal(0, DspApi.dspd_fir(first, output, taps, state));
-        output.ShouldBe(0, 1, 12);
-        Assert.Equal(0, DspApi.dspd_fir(second, output, taps, state));
-        output.ShouldBe(0, 23, 34);
-        state.ShouldBe(0, 4);
-    }
-
-    public static readonly TheoryData<string, double> Expected = new()
-    {
-        { nameof(DspApi.dsps_mean), 3 },
-        { nameof(DspApi.dsps_median), 2 },
-        { nameof(DspApi.dsps_rms), Math.Sqrt(30.2) },
-        { nameof(DspApi.dsps_samp_stddev), Math.Sqrt(26.5) },
-        { nameof(DspApi.dsps_samp_var), 26.5 },
-        { nameof(DspApi.dsps_min), -4 },
-        { nameof(DspApi.dsps_max), 9 },
-    };
-
-    [Theory]
-    [MemberData(nameof(Expected))]
-    public void Statistics(string name, double expected)
-    {
-        var function = typeof(DspApi).GetMethod(name)!.CreateDelegate<Func<DspInput, DspInput, int>>();
-        using Signal input = Signal.Real(2, -4, 7, 1, 9), output = Signal.Real(5, 5);
-        Assert.Equal(0, function(input, output));
-        output.ShouldBe(0, expected);
-        input.ShouldBe(0, 2, -4, 7, 1, 9);
+        static void Check(Func<DspInput, DspInput, int> function, double expected)
+        {
+            using Signal input = Signal.Real(2, -4, 7, 1, 9), output = Signal.Real(5, 5);
+            Assert.Equal(0, function(input, output));
+            output.ShouldBe(0, expected);
+            input.ShouldBe(0, 2, -4, 7, 1, 9);
+        }
+        Check(DspApi.dsps_mean, 3);
+        Check(DspApi.dsps_median, 2);
+        Check(DspApi.dsps_rms, Math.Sqrt(30.2));
+        Check(DspApi.dsps_samp_stddev, Math.Sqrt(26.5));
+        Check(DspApi.dsps_samp_var, 26.5);
+        Check(DspApi.dsps_min, -4);
+        Check(DspApi.dsps_max, 9);
     }
 }

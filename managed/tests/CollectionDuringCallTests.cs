@@ -31,23 +31,18 @@ public unsafe partial class CollectionDuringCallTests
     private static partial int dsp_lib_alloc(delegate* unmanaged[Cdecl]<void**, void> hook, void* previous);
 
     [LibraryImport("libwavkit.so.2")]
-    private static partial int dsp_lib_realloc(
-        delegate* unmanaged[Cdecl]<void**, int, int, void> hook, void* previous);
+    private static partial int dsp_lib_realloc(delegate* unmanaged[Cdecl]<void**, void> hook, void* previous);
 
+    /// <summary>Serves as either hook: what the second one is given besides the record, it
+    /// ignores.</summary>
     [UnmanagedCallersOnly(CallConvs = [typeof(CallConvCdecl)])]
-    private static void Allocate(void** record) => Grow(record);
-
-    [UnmanagedCallersOnly(CallConvs = [typeof(CallConvCdecl)])]
-    private static void Reallocate(void** record, int oldPoints, int oldComplex) => Grow(record);
-
     private static void Grow(void** record)
     {
         ++hookCalls;
         LifeCycleTests.Collect();
         finalisedDuringCall = finalised;
-        ref void* data = ref record[1];
-        bool owned = *(int*)(record + 2) > 0;
-        data = NativeMemory.Realloc(owned ? data : null, 64 * sizeof(double));
+        bool owned = *(int*)(record + 2) > 0; // alloc, behind delta and data
+        record[1] = NativeMemory.Realloc(owned ? record[1] : null, 64 * sizeof(double));
     }
 
     [MethodImpl(MethodImplOptions.NoInlining)]
@@ -70,8 +65,8 @@ public unsafe partial class CollectionDuringCallTests
     {
         using (new DspInput()) LifeCycleTests.Collect(); // the library is there, and nothing is pending
         (hookCalls, finalised, finalisedDuringCall) = (0, 0, 0);
-        dsp_lib_alloc(&Allocate, null);
-        dsp_lib_realloc(&Reallocate, null);
+        dsp_lib_alloc(&Grow, null);
+        dsp_lib_realloc(&Grow, null);
         int result = Call(shape);
         dsp_lib_alloc(null, null);
         dsp_lib_realloc(null, null);

@@ -14,10 +14,10 @@ namespace Corvane.QuillonInternal.DataAnalysis.Tests;
 public sealed class LibrarySearchTests : IDisposable
 {
     private const string Library = "libwavkit.so.2";
-    private static readonly string Machine = RuntimeInformation.ProcessArchitecture.ToString().ToLowerInvariant();
-    private static readonly string Native = $"runtimes/linux-{Machine}/native/{Library}";
-
-    private static readonly string Application = typeof(LibrarySearchTests).Assembly.Location;
+    private static readonly string Native =
+        $"runtimes/linux-{RuntimeInformation.ProcessArchitecture}/native/".ToLowerInvariant() + Library;
+    private static readonly string Program = typeof(LibrarySearchTests).Assembly.Location;
+    private static readonly string OurLibrary = Path.Combine(Path.GetDirectoryName(Program)!, Library);
 
     private readonly string root = Directory.CreateTempSubdirectory("wavkit").FullName;
 
@@ -41,7 +41,7 @@ public sealed class LibrarySearchTests : IDisposable
 
     public LibrarySearchTests()
     {
-        foreach (string file in new[] { Application, Path.ChangeExtension(Application, "runtimeconfig.json"),
+        foreach (string file in new[] { Program, Path.ChangeExtension(Program, "runtimeconfig.json"),
                                         typeof(DspInput).Assembly.Location })
         {
             Put(file, "lib/any/" + Path.GetFileName(file));
@@ -57,16 +57,10 @@ public sealed class LibrarySearchTests : IDisposable
         File.Copy(file, path, true);
     }
 
-    private void PutLibrary(string place) =>
-        Put(Path.Combine(Path.GetDirectoryName(Application)!, Library), place);
-
     private (int Status, string Output) RunHost(string variable = "", string value = "")
     {
-        string program = Path.Combine(root, "lib/any", Path.GetFileName(Application));
-        var start = new ProcessStartInfo("dotnet", [program])
-        {
-            RedirectStandardOutput = true
-        };
+        var start = new ProcessStartInfo("dotnet", [$"{root}/lib/any/{Path.GetFileName(Program)}"]);
+        start.RedirectStandardOutput = true;
         start.Environment.Remove("WAVKIT_LIBRARY");
         if (variable.Length > 0) start.Environment[variable] = Path.Combine(root, value);
         using var process = Process.Start(start)!;
@@ -89,15 +83,15 @@ public sealed class LibrarySearchTests : IDisposable
     [MemberData(nameof(Places))]
     public void EveryPlaceIsFound(string place, string variable, string value)
     {
-        PutLibrary(place);
-        if (variable == "WAVKIT_LIBRARY") PutLibrary("lib/any/" + Library); // which it overrules
+        Put(OurLibrary, place);
+        if (variable == "WAVKIT_LIBRARY") Put(OurLibrary, "lib/any/" + Library); // which it overrules
         Assert.Equal((0, Path.Combine(root, place)), RunHost(variable, value));
     }
 
     [Fact]
     public void TheVariableIsObeyedEvenIfNothingIsThere()
     {
-        PutLibrary("lib/any/" + Library);
+        Put(OurLibrary, "lib/any/" + Library);
         var (status, message) = RunHost("WAVKIT_LIBRARY", "missing.so");
         Assert.Equal(1, status);
         Assert.Contains("missing.so (no such file)", message);
