@@ -1,4 +1,4 @@
-// Power-of-two transforms beside FFTW (MEASURE) and KissFFT.
+// Transforms beside FFTW (MEASURE) and KissFFT: powers of two, and round, smooth and prime lengths.
 //
 // wavkit works in place; the peers go from one buffer to another, which is what they do fastest.
 // All of them transform zeros: the time does not depend on the samples as long as none is
@@ -22,8 +22,11 @@ struct Double {
     using Record = dsp;
     using Plan = fftw_plan;
     static constexpr const char* name = "double";
-    static int fft(Record* x) { return dspi_fft(x, 0); }
-    static int rfft(Record* x) { return dspi_rfft(x); }
+    static int dft(Record* x) { return dspi_dft(x, 0); }
+    static int rdft(Record* x) { return dspi_rdft(x); }
+    static void init(Record* x) { dsp_init(x); }
+    static int reserve(Record* x) { return dsp_alloc(x); }
+    static void release(Record* x) { dsp_destroy(x); }
     static Scalar* allocate(std::size_t n) { return fftw_alloc_real(n); }
     static void free(void* p) { fftw_free(p); }
     static Plan plan_complex(int n, Scalar* in, Scalar* out) {
@@ -42,8 +45,11 @@ struct Single {
     using Record = dspf;
     using Plan = fftwf_plan;
     static constexpr const char* name = "float";
-    static int fft(Record* x) { return dspfi_fft(x, 0); }
-    static int rfft(Record* x) { return dspfi_rfft(x); }
+    static int dft(Record* x) { return dspfi_dft(x, 0); }
+    static int rdft(Record* x) { return dspfi_rdft(x); }
+    static void init(Record* x) { dspf_init(x); }
+    static int reserve(Record* x) { return dspf_alloc(x); }
+    static void release(Record* x) { dspf_destroy(x); }
     static Scalar* allocate(std::size_t n) { return fftwf_alloc_real(n); }
     static void free(void* p) { fftwf_free(p); }
     static Plan plan_complex(int n, Scalar* in, Scalar* out) {
@@ -59,14 +65,19 @@ struct Single {
 
 template <class P>
 void wavkit_transform(benchmark::State& state, int n, bool real) {
-    std::vector<typename P::Scalar> samples(2 * std::size_t(n));
-    typename P::Record x{1, samples.data(), 2 * n, n, 0, 0};
+    typename P::Record x;
+    P::init(&x);
+    x.points = 4 * n;  // room for the convolution behind lengths that are no power of two
+    x.complex = 1;
+    if (P::reserve(&x)) state.SkipWithError("out of memory");
+    std::fill_n(x.data, 8 * std::size_t(n), 0);
     for (auto _ : state) {
         x.points = n;
         x.complex = !real;
-        if (real ? P::rfft(&x) : P::fft(&x)) state.SkipWithError("transform failed");
+        if (real ? P::rdft(&x) : P::dft(&x)) state.SkipWithError("transform failed");
         benchmark::ClobberMemory();
     }
+    P::release(&x);
 }
 
 template <class P>
@@ -102,12 +113,19 @@ void kiss_transform(benchmark::State& state, int n, bool real) {
 template <class P>
 void add_lengths(bool real) {
     using wavkit::bench::add;
-    for (int n = 16; n <= 1 << 20; n *= 2) {
+    std::vector<int> lengths;
+    for (int n = 16; n <= 1 << 20; n *= 2) lengths.push_back(n);
+    for (const int n : {60, 100, 127, 360, 1000, 1009, 4800, 10000, 10007, 44100, 48000, 96000,
+                        100003, 480000, 1000000}) {
+        lengths.push_back(n);
+    }
+    for (const int n : lengths) {
         const std::string what =
             std::string(real ? "real " : "complex ") + P::name + " " + std::to_string(n);
         add(what, "wavkit", [=](auto& state) { wavkit_transform<P>(state, n, real); });
         add(what, "FFTW", [=](auto& state) { fftw_transform<P>(state, n, real); });
-        add(what, "KissFFT", [=](auto& state) { kiss_transform<P>(state, n, real); });
+        if (!real || n % 2 == 0)
+            add(what, "KissFFT", [=](auto& state) { kiss_transform<P>(state, n, real); });
     }
 }
 

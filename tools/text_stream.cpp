@@ -110,7 +110,9 @@ class TextStream : public BlockStream {
         taken_ += numbers->points;
     }
 
-    void next_block(std::vector<double>& block) override {
+    void next_block(std::vector<double>& block) override { add_values(block); }
+
+    void add_values(std::vector<double>& block) {
         while (block.empty() && !ended_) {
             const int next = values_left() == 0 ? EOF : peek();
             if (next == EOF) {
@@ -137,7 +139,7 @@ class TextStream : public BlockStream {
         std::vector<double> block;
         do {
             block.clear();
-            next_block(block);
+            add_values(block);
         } while (!block.empty());
         ended_ = false;
     }

@@ -58,16 +58,18 @@ WAVKIT_API int dspfi_irfft(dspf *x);
 
 /** Transforms a signal of any length N; a real one becomes complex first.
  *  Fewer than two points are left as they are (a real record stays real), but for `delta`. Powers
- * of two go through dspi_fft(); other lengths are a convolution with a chirp (Bluestein, "A linear
- *  filtering approach to the computation of discrete Fourier transform", 1970), for which the
- * record grows to 2^m >= 2N - 2 complex points; it keeps that capacity, and `points` is N again.
- *  The relative error in the L2 norm stays below 10 epsilon log2(N).
+ *  of two go through dspi_fft(), products of 2, 3, 5 and 7 through passes of these radices; other
+ *  lengths are a convolution with a chirp (Bluestein, "A linear filtering approach to the
+ *  computation of discrete Fourier transform", 1970), some ten times as long. For all but powers of
+ *  two the record grows to 2^m >= 2N - 2 complex points; it keeps that capacity, and `points` is N
+ *  again. The relative error in the L2 norm stays below 10 epsilon log2(N).
  *  @param inverse  0 forward, anything else inverse
  *  @return 0, or -1 when memory runs out or N exceeds 2^29 + 1 */
 WAVKIT_API int dspi_dft(dsp *x, int inverse);
 WAVKIT_API int dspfi_dft(dspf *x, int inverse);
 
-/** Transforms a real signal of any length N into its bins 0 .. N/2 (integer division), forward.
+/** Transforms a real signal of any length N into its bins 0 .. N/2 (integer division), forward; in
+ *  half the time of a complex one where N is even.
  *  The record becomes complex with N/2 + 1 points; one real point stays one real point. An empty
  *  record only changes its `delta`.
  *  @return 0; -1 for a complex record (then untouched) or when memory runs out */

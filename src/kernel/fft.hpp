@@ -1,6 +1,7 @@
-// The hot loops of the power-of-two transforms, chosen for the processor at hand.
+// The hot loops of the transforms, chosen for the processor at hand.
 #pragma once
 
+#include <array>
 #include <cstddef>
 
 namespace wavkit::kernel {
@@ -24,6 +25,17 @@ struct FftPlan {
     int fine_bits = 0;
 };
 
+/// The same for a length that is no power of two, but a product of 2, 3, 5 and 7.
+template <class T>
+struct MixedPlan {
+    std::size_t points = 0;
+    int passes = 0;
+    std::array<unsigned char, 31> radices{};  // of the passes; the first is 4 where `blocks` is set
+    bool wide = false;                        // vectors of wide_lanes, otherwise of narrow_lanes
+    bool blocks = false;                      // the samples between passes lie in whole vectors
+    const T* twiddles = nullptr;              // pass by pass; none for the last
+};
+
 template <class T>
 struct FftKernels {
     /// Samples a vector holds, for lengths below and from wide_from on.
@@ -32,6 +44,9 @@ struct FftKernels {
     /// Transforms `data` (pairs) in place and multiplies by `scale`: kernel e^(-2 pi i n k / N), or
     /// its conjugate for an inverse. `work` holds work_scalars(plan) scalars.
     void (*transform)(const FftPlan<T>& plan, T* data, T* work, bool inverse, T scale);
+
+    /// The same for a mixed plan; `work` holds as much as the data.
+    void (*transform_mixed)(const MixedPlan<T>& plan, T* data, T* work, bool inverse, T scale);
 
     /// Turns the transform Z of a real signal's even and odd samples, `half` points, into its
     /// spectrum, half + 1 points: X[k] = Z[k] + conj Z[half - k] - i w^k (Z[k] - conj Z[half - k])

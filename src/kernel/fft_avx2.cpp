@@ -1,6 +1,6 @@
 // The transform kernels for processors with AVX2 and FMA.
-#include "kernel/fft_passes.hpp"
 #include "kernel/fft_sets.hpp"
+#include "kernel/mixed_passes.hpp"
 
 namespace wavkit::kernel {
 

@@ -1,6 +1,6 @@
 // The transform kernels for every processor of the target.
-#include "kernel/fft_passes.hpp"
 #include "kernel/fft_sets.hpp"
+#include "kernel/mixed_passes.hpp"
 
 namespace wavkit::kernel {
 

@@ -395,9 +395,5 @@ void multiply(T* a, const T* b, std::size_t count) {
     }
 }
 
-template <class T, int Narrow, int Wide>
-constexpr FftKernels<T> kernels{Narrow,         Wide,          transform<T, Narrow, Wide>,
-                                split<T, Wide>, join<T, Wide>, multiply<T, Narrow>};
-
 }  // namespace
 }  // namespace wavkit::kernel

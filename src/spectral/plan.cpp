@@ -3,6 +3,7 @@
 
 #include <algorithm>
 
+#include "spectral/mixed.hpp"
 #include "spectral/tables.hpp"
 
 namespace wavkit {
@@ -11,15 +12,6 @@ namespace {
 using kernel::direct_limit;
 using kernel::FftPlan;
 using kernel::strip_width;
-
-/// Alignment of tables and workspace: a cache line, and the widest vector.
-constexpr std::size_t alignment = 64;
-
-template <class T>
-T* new_aligned(std::size_t count) {
-    const std::size_t bytes = (count * sizeof(T) + alignment - 1) / alignment * alignment;
-    return static_cast<T*>(std::aligned_alloc(alignment, bytes));
-}
 
 template <Record R>
 struct Plans {
@@ -151,7 +143,7 @@ template <Record R>
 bool build(int exponent) {
     using T = scalar<R>;
     auto& fft = plans<R>.ffts[std::size_t(exponent)];
-    fft.kernels = plans<R>.chosen ? plans<R>.chosen : &kernel::fft_kernels<T>();
+    fft.kernels = &kernels_in_use<R>();
     FftPlan<T> plan{.points = std::size_t(1) << exponent};
     if (plan.points >= 16) {
         const T* twiddle_table;
@@ -210,8 +202,14 @@ void free_plans() {
 }
 
 template <Record R>
+const kernel::FftKernels<scalar<R>>& kernels_in_use() {
+    return plans<R>.chosen ? *plans<R>.chosen : kernel::fft_kernels<scalar<R>>();
+}
+
+template <Record R>
 void use_kernels(const kernel::FftKernels<scalar<R>>* kernels) {
     free_plans<R>();
+    free_mixed_ffts<R>();
     plans<R>.chosen = kernels;
 }
 
@@ -219,6 +217,8 @@ template const Fft<double>* find_fft<dsp>(int);
 template const Fft<float>* find_fft<dspf>(int);
 template const double* find_split_roots<dsp>(int);
 template const float* find_split_roots<dspf>(int);
+template const kernel::FftKernels<double>& kernels_in_use<dsp>();
+template const kernel::FftKernels<float>& kernels_in_use<dspf>();
 template void free_plans<dsp>();
 template void free_plans<dspf>();
 template void use_kernels<dsp>(const kernel::FftKernels<double>*);

@@ -32,6 +32,10 @@ const scalar<R>* find_split_roots(int exponent);
 template <Record R>
 void free_plans();
 
+/// The kernels that plans are laid out for.
+template <Record R>
+const kernel::FftKernels<scalar<R>>& kernels_in_use();
+
 /// Drops all plans and lays out later ones for these kernels, or with null for those that suit the
 /// processor best: a way to run every set of kernels on one machine.
 template <Record R>

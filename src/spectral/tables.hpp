@@ -39,6 +39,16 @@ T* new_table(std::size_t count) {
     return static_cast<T*>(std::malloc(count * sizeof(T)));
 }
 
+/// Alignment of what vectors read: a cache line, and the widest vector.
+inline constexpr std::size_t alignment = 64;
+
+/// The same for what vectors read.
+template <class T>
+T* new_aligned(std::size_t count) {
+    const std::size_t bytes = (count * sizeof(T) + alignment - 1) / alignment * alignment;
+    return static_cast<T*>(std::aligned_alloc(alignment, bytes));
+}
+
 constexpr bool is_power_of_two(int n) { return n > 0 && (n & (n - 1)) == 0; }
 
 /// log2 of a power of two.
