@@ -115,8 +115,8 @@ void add_lengths(bool real) {
     using wavkit::bench::add;
     std::vector<int> lengths;
     for (int n = 16; n <= 1 << 20; n *= 2) lengths.push_back(n);
-    for (const int n : {60, 100, 127, 360, 1000, 1009, 4800, 10000, 10007, 44100, 48000, 96000,
-                        100003, 480000, 1000000}) {
+    for (const int n : {60, 100, 127, 360, 1000, 1009, 4800, 6007, 10000, 10007, 44100, 48000,
+                        96000, 100003, 480000, 1000000}) {
         lengths.push_back(n);
     }
     for (const int n : lengths) {

@@ -2,12 +2,13 @@
 //
 // With nk = (n^2 + k^2 - (k - n)^2) / 2 a transform is a product with the chirp
 // c[n] = e^(-pi i n^2 / N), a convolution with its conjugate, and another product with the chirp.
-// The convolution runs through transforms of a power of two L >= 2N - 2 points: the chirp is
-// symmetric, so that the two outermost lags may share a place.
+// The convolution takes L >= 2N - 2 points: the chirp is symmetric, so that the two outermost lags
+// may share a place.
 #include "spectral/bluestein.hpp"
 
 #include <algorithm>
 
+#include "spectral/mixed.hpp"
 #include "spectral/plan.hpp"
 #include "spectral/roots.hpp"
 #include "spectral/tables.hpp"
@@ -54,8 +55,35 @@ void fill_filter(R* filter, const R* chirp) {
     for (std::size_t k = 1; k < from.size(); ++k) to[k] = to[to.size() - k] = conj(from[k]);
 }
 
+/// The transforms of a convolution, a power of two or a round length below it.
 template <Record R>
-int prepare(int n, int length, const Fft<scalar<R>>& transform) {
+struct Convolution {
+    int length;
+    const Fft<scalar<R>>* fft = nullptr;
+    const MixedFft<scalar<R>>* mixed = nullptr;
+
+    explicit Convolution(int n) : length(int(convolution_length(n))) {
+        // Lengths that are not much shorter are not faster.
+        for (const int sixteenths : {9, 10, 12}) {
+            const int shorter = length / 16 * sixteenths;
+            if (length < shortest_power || shorter < 2 * n - 2) continue;
+            length = shorter;
+            mixed = find_mixed_fft<R>(length);
+            return;
+        }
+        fft = find_fft<R>(exponent_of(length));
+    }
+    bool ready() const { return fft || mixed; }
+    void run(scalar<R>* samples, bool inverse, scalar<R> scale) const {
+        fft ? fft->run(samples, inverse, scale) : mixed->run(samples, inverse, scale);
+    }
+
+  private:
+    static constexpr int shortest_power = 512;
+};
+
+template <Record R>
+int prepare(int n, const Convolution<R>& convolution) {
     auto& s = state<R>;
     if (s.points == n) return 0;
     if (!s.initialised) {
@@ -64,10 +92,10 @@ int prepare(int n, int length, const Fft<scalar<R>>& transform) {
         dsp_init(&s.filter);
     }
     s.points = 0;
-    if (resize(&s.chirp, n) || resize(&s.filter, length)) return -1;
+    if (resize(&s.chirp, n) || resize(&s.filter, convolution.length)) return -1;
     fill_chirp(&s.chirp);
     fill_filter(&s.filter, &s.chirp);
-    transform.run(s.filter.data, false, 1);
+    convolution.run(s.filter.data, false, 1);
     s.points = n;
     return 0;
 }
@@ -75,19 +103,18 @@ int prepare(int n, int length, const Fft<scalar<R>>& transform) {
 template <Record R>
 int convolve_with_chirp(Bin<scalar<R>>* z, int n, bool inverse, double scale) {
     using T = scalar<R>;
-    const int length = int(convolution_length(n));
-    const auto* transform = find_fft<R>(exponent_of(length));
-    if (!transform || prepare<R>(n, length, *transform)) return -1;
+    const Convolution<R> convolution(n);
+    if (!convolution.ready() || prepare<R>(n, convolution)) return -1;
     const auto chirp = bins(&state<R>.chirp);
     for (std::size_t i = 0; i < chirp.size(); ++i) {
         z[i] = (inverse ? conj(z[i]) : z[i]) * chirp[i];
     }
-    std::fill(z + n, z + length, Bin<T>{0, 0});
+    std::fill(z + n, z + convolution.length, Bin<T>{0, 0});
 
     T* const samples = &z[0].re;
-    transform->run(samples, false, 1);
-    transform->kernels->multiply(samples, state<R>.filter.data, std::size_t(length));
-    transform->run(samples, true, T(scale / length));
+    convolution.run(samples, false, 1);
+    kernels_in_use<R>().multiply(samples, state<R>.filter.data, std::size_t(convolution.length));
+    convolution.run(samples, true, T(scale / convolution.length));
 
     for (std::size_t i = 0; i < chirp.size(); ++i) {
         const auto turned = z[i] * chirp[i];
