@@ -60,6 +60,7 @@ class SignalFileWriter : public BlockWriter {
             if (!copy_rest(waiting_.get(), to_)) throw Error("cannot copy a temporary file");
             waiting_.reset();
         } else if (points_ != promised_) {
+            if (text_) throw Error("the signal has another length than its source says");
             std::fseek(to_, header_at_, SEEK_SET);
             put_header(points_);
             std::fseek(to_, 0, SEEK_END);

@@ -229,7 +229,8 @@ class FilterRun {
         ChannelFilter filter(filtering, stream);
         const bool draws = !options_.plot.empty() && !comparison_;
         if (draws) comparison_.emplace(options_, stream);
-        if (writer_) writer_->begin({stream.delta, filter.complex_output(), stream.channels, {}});
+        if (writer_)
+            writer_->begin({stream.delta, filter.complex_output(), stream.channels, stream.length});
         {
             Progress progress("filtering " + input_.name());
             filter.run([&](std::span<const double> in, std::span<const double> out) {

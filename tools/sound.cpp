@@ -102,6 +102,7 @@ class SoundStream : public SampleStream {
         delta = 1.0 / info_.samplerate;
         sound = true;
         channels = std::size_t(info_.channels);
+        if (info_.frames >= 0) length = std::size_t(info_.frames);
     }
 
     /// Reads one channel alone, the first without a choice.

@@ -26,6 +26,7 @@ class BinaryStream : public SampleStream {
             }
         }
         if (!read_header()) fail_without_signal(input_.name(), number - 1, number_);
+        length = total_ / (complex ? 2 : 1);
         last = std::ftell(file()) + long(total_ * scalar_size_) >= input_.size();
     }
 

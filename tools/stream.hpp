@@ -25,9 +25,10 @@ class SampleStream {
 
     double delta = 1.0;
     bool complex = false;
-    bool sound = false;        // the spacing is in seconds
-    bool last = true;          // no other signal follows; certain once all has been read
-    std::size_t channels = 1;  // side by side, of a sound file: a scalar of each in turn
+    bool sound = false;                 // the spacing is in seconds
+    std::optional<std::size_t> length;  // in points, where it is known before the end
+    bool last = true;                   // no other signal follows; certain once all has been read
+    std::size_t channels = 1;           // side by side, of a sound file: a scalar of each in turn
 };
 
 /// A stream that comes in blocks of its own size.
