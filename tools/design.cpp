@@ -109,8 +109,12 @@ Signal smoothing_taps(const Request& request, const Tapering& tapering) {
     }
     if (type != DSP_FIR_GAUSS) return design(type, request.other, 0, tapering.length.value_or(11));
     // Down to a ten-thousandth at the ends.
-    const double reach = std::min(std::ceil(0.57 / request.edges[0]), 5e6);
-    return design(type, request.edges[0], 0, tapering.length.value_or(2 * int(reach) + 1));
+    const double reach = std::ceil(0.57 / request.edges[0]);
+    if (!tapering.length && reach > 1e6) {
+        throw UsageError("so low an edge takes more than 2000000 taps; give --length");
+    }
+    const int length = tapering.length ? *tapering.length : 2 * int(reach) + 1;
+    return design(type, request.edges[0], 0, length);
 }
 
 Signal taps_of(const Request& request, const Tapering& tapering) {

@@ -143,7 +143,8 @@ class Filters {
     void take(Signal taps) {
         filtering_.taps = std::move(taps);
         filtering_.delay = options_.delay.value_or(delay_of(filtering_.taps));
-        if (!options_.delay && filtering_.delay > 0 && filtering_.taps->points % 2 == 0) {
+        if (!options_.delay && filtering_.taps->points % 2 == 0 &&
+            symmetry_of(filtering_.taps) != Symmetry::none) {
             std::fputs("wavkit: an even number of taps leaves a delay of half a sample\n", stderr);
         }
     }

@@ -148,9 +148,6 @@ void WriteOptions::declare(CLI::App& command) {
 
 Format WriteOptions::checked_format_for(const std::string& path) const {
     const auto chosen = format_for(path);
-    if (path == "-" && isatty(STDOUT_FILENO) && (is_sound(chosen) || chosen == Format::binary)) {
-        throw UsageError("standard output is a terminal: name a file with -o or say --to csv");
-    }
     if (samples && !is_sound(chosen)) throw UsageError("--bits is for sound files");
     if (single && !is_signal_file(chosen)) throw UsageError("--type is for signal files");
     if (time && chosen != Format::csv) throw UsageError("--with-time is for CSV");
@@ -158,11 +155,14 @@ Format WriteOptions::checked_format_for(const std::string& path) const {
 }
 
 Format WriteOptions::format_for(const std::string& path) const {
-    if (format) return *format;
-    if (path == "-") return Format::binary;
-    const auto named = format_of_name(path);
-    if (!named) throw UsageError("cannot tell a format from the name '" + path + "'; say --to");
-    return *named;
+    auto chosen = format;
+    if (!chosen) chosen = path == "-" ? Format::binary : format_of_name(path);
+    if (!chosen) throw UsageError("cannot tell a format from the name '" + path + "'; say --to");
+    const bool readable = chosen == Format::csv || chosen == Format::text;
+    if (path == "-" && !readable && isatty(STDOUT_FILENO)) {
+        throw UsageError("this is a terminal: name a file, or say --to csv");
+    }
+    return *chosen;
 }
 
 Format format_of(InputFile& input, const ReadOptions& options) {

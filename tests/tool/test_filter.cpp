@@ -253,6 +253,8 @@ TEST_F(FilterTest, CommandsPipe) {
     const auto same = shell("wavkit design fixed20 -o - | wavkit filter x.txt --taps - --to csv");
     printed("design fixed20 -o h.txt");
     EXPECT_EQ(same.out, printed("filter x.txt --taps h.txt --to csv"));
+    const auto half = shell("wavkit filter x.txt --lowpass 0.1 --length 2 --to csv");
+    EXPECT_NE(half.err.find("half a sample"), std::string::npos);
     printed("filter x.txt --lowpass 0.1 --plot x.svg --span 0 1");
     EXPECT_NE(contents("x.svg").find("<svg"), std::string::npos);
 }
@@ -293,6 +295,7 @@ TEST_F(FilterTest, FailuresAreToldAndLeaveNothing) {
         {2, "design lowpass 0.7 -o h.dsp", "half the sampling rate"},
         {2, "design bandstop 0.1 0.2 --length 10 -o h.dsp", "odd number"},
         {2, "design gauss 0.1 --transition 0.1", "stop band"},
+        {2, "design gauss 1e-9", "--length"},
         {2, "design fixed12 --length 5", "its own length"},
         {2, "design lowpass 0.1 --plot h.gif", ".png"},
         {2, "design lowpass 0.1 --to csv", "-o"},
