@@ -20,7 +20,7 @@
  *  | 10 | Flat6, P511                         | 6 cosine terms, flat    | 4.2316 |  -117 dB  |
  *  | 11 | Flat7, P611                         | 7 cosine terms, flat    | 4.5500 |  -144 dB  |
  *  | 12 | P501                                | 6 cosine terms, flat    | 4.1794 |  -121 dB  |
- *  | 13 | P601                                | 7 cosine terms, flat    | 4.5124 |  -148 dB  |
+ *  | 13 | P601                                | 7 cosine terms, flat    | 4.5124 |  -147 dB  |
  *  | 14 | Kaiser70                            | beta 9.473960131326246  | 1.7995 |   -70 dB  |
  *  | 15 | Kaiser80                            | beta 10.751776690564654 | 1.9084 |   -80 dB  |
  *  | 16 | Kaiser90                            | beta 12.014077292090791 | 2.0103 |   -90 dB  |
@@ -238,6 +238,8 @@ WAVKIT_API int dspf_window2_scale(float *scale, int window, int scale_type, int 
 
 /** Equivalent noise bandwidth of a window of n points, in bins: mean(w^2) / mean(w)^2, the width of
  *  a rectangular filter of the same gain that lets as much white noise through (Harris, 1978).
+ *  That of a sum of cosines is computed from its coefficients, and of a flat one with the gain of
+ *  its scaled form, which makes it up to 0.11 % less.
  *  @param enbw  receives the bandwidth
  *  @return 0; -1 for a null `enbw`, an unknown window, or when memory runs out (nothing is then
  *          written) */
