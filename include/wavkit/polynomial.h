@@ -50,7 +50,8 @@ WAVKIT_API int dspfs_peval(const dspf *polynomial, dspf *out, float x);
  *  Where a start leads nowhere, the middle of the bounds and the two bounds themselves are tried,
  *  and then Newton's method from the same places. A root is accepted when the last step is rounding
  *  noise and the residual (divided by |p'| where that exceeds 1) is below
- *  points / 4 * (largest / smallest coefficient that counts) * epsilon.
+ *  points / 4 * (largest / smallest coefficient that counts) * epsilon, computed in the samples'
+ *  arithmetic or in a wider one. A coefficient counts that is at least epsilon times the largest.
  *
  *  An empty polynomial has the root 0; a constant other than 0 has none.
  *  @return 0, or -1 when there is no root (`out` is then 0), the polynomial is complex (`out` is
@@ -108,13 +109,17 @@ WAVKIT_API int dspfs_proots(const dspf *polynomial, dspf *out);
  *
  *  Leading coefficients of 0 are dropped. Roots are searched with dsps_pcsolve() from 0 on and
  *  divided out, from the top coefficient down and from the lowest up to where the two meet without
- *  loss (Peters and Wilkinson, 1971); in the end all roots are corrected together on the polynomial
- *  itself (Aberth, 1973). A polynomial of degree 0, or without coefficients other than 0, leaves a
- *  real record without points.
+ *  loss (Peters and Wilkinson, 1971). Before each search x is measured in the power of two that
+ *  makes the outer coefficients alike, and coefficients that are rounding noise beside the others
+ *  at every x are taken as 0. In the end all roots are corrected together on the polynomial itself
+ *  (Aberth, 1973). A polynomial of degree 0, or without coefficients other than 0, leaves a real
+ *  record without points.
  *
- *  A root that dsps_pcsolve() judges real is taken as real. Where the largest coefficient is some
- *  0.1 / (points * epsilon) times the smallest one that counts, it judges complex roots so, and the
- *  result is of no use: in single precision this may happen from degree 20 on.
+ *  A root that dsps_pcsolve() judges real is taken as real. Where the coefficients, measured so,
+ *  are still some 0.1 / (points * epsilon) apart, it judges complex roots so, and the result is of
+ *  no use: in single precision this may happen when they span more than four powers of ten, in
+ *  double precision more than twelve. In single precision the search may find no root of x^n + a
+ *  from degree 25 on.
  *  @return 0, or -1 when a search finds no root, as may happen with many roots close together, the
  *          record is complex, or memory runs out; the coefficients are kept in the first two cases
  */

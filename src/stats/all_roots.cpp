@@ -1,26 +1,82 @@
 // Roots of a polynomial of any degree, one after the other, and the polynomial of given roots.
+#include <algorithm>
+#include <cstdint>
+
 #include "stats/polynomial.hpp"
 
 namespace wavkit {
 namespace {
+
+/// Measures x in the power of two that brings the lowest and the highest coefficient to the same
+/// size, and returns its exponent. A search judges roots by how far coefficients are apart.
+template <class T>
+int balance(std::span<T> c) {
+    const std::size_t top = c.size() - 1;
+    std::size_t low = 0;
+    while (c[low] == T(0)) ++low;
+    if (low == top || !std::isfinite(c[low]) || !std::isfinite(c[top])) return 0;
+    const int exponent = (std::ilogb(c[low]) - std::ilogb(c[top])) / int(top - low);
+    const auto balanced = [&](std::size_t k) {
+        constexpr std::int64_t beyond = 1 << 16;  // every exponent of a number
+        const auto shift = exponent * (std::int64_t(k) - std::int64_t(top));
+        return std::ldexp(c[k], int(std::clamp(shift, -beyond, beyond)));
+    };
+    for (std::size_t k = low; k < top; ++k) {
+        if (!std::isfinite(balanced(k))) return 0;
+    }
+    for (std::size_t k = low; k < top; ++k) c[k] = balanced(k);
+    return exponent;
+}
+
+/// Clears the coefficients that count for nothing: |c[k] x^k| is rounding noise beside the largest
+/// term at every x, since c[k] lies that far below Newton's polygon, the hull over the logarithms
+/// of all. Left alone, the rounding noise of a division would pass for the smallest coefficient.
+template <class T>
+void drop_noise(std::span<T> c, T* logarithms) {
+    const T noise = std::log2(16 * T(c.size()) * std::numeric_limits<T>::epsilon());
+    const std::size_t top = c.size() - 1;
+    for (std::size_t k = 0; k <= top; ++k) logarithms[k] = std::log2(std::fabs(c[k]));
+    const auto slope = [&](std::size_t from, std::size_t to) {
+        return (logarithms[to] - logarithms[from]) / T(to - from);
+    };
+    std::size_t corner = 0;
+    while (c[corner] == T(0)) ++corner;
+    while (corner < top) {
+        std::size_t next = top;
+        for (std::size_t k = corner + 1; k < top; ++k) {
+            if (slope(corner, k) > slope(corner, next)) next = k;
+        }
+        const T start = logarithms[corner], rise = slope(corner, next);
+        for (std::size_t k = corner + 1; k < next; ++k) {
+            if (logarithms[k] < start + rise * T(k - corner) + noise) c[k] = 0;
+        }
+        corner = next;
+    }
+}
 
 /// Fills `roots`, dividing the polynomial by every root found. Complex roots come in pairs; where
 /// only one place is left, the root is the real one of a linear polynomial.
 template <Record R>
 int deflate(R* polynomial, std::span<Bin<scalar<R>>> roots) {
     using T = scalar<R>;
-    Temporary<R> found;
+    Temporary<R> found, logarithms;
+    logarithms->points = polynomial->points;
+    if (dsp_alloc(logarithms)) return -1;
+    T unit = 1;
     for (std::size_t i = 0; i < roots.size();) {
+        const auto c = values(polynomial);
+        unit = std::ldexp(unit, balance(c));
+        drop_noise(c, logarithms->data);
         if (dsps_pcsolve(polynomial, found, 0, 0)) return -1;
         const Bin<T> z{found->data[0], found->data[1]};
-        roots[i++] = {z.re, 0};
+        roots[i++] = Bin<T>{z.re, 0} * unit;
         if (found->complex && z.im != T(0) && i < roots.size()) {
-            roots[i - 1] = z;
-            roots[i++] = conj(z);
-            divide_by_pair(values(polynomial), z);
+            roots[i - 1] = z * unit;
+            roots[i++] = conj(z) * unit;
+            divide_by_pair(c, z);
             polynomial->points -= 2;
         } else {
-            divide_by_root(values(polynomial), z.re);
+            divide_by_root(c, z.re);
             polynomial->points -= 1;
         }
     }

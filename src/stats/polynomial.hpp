@@ -38,10 +38,9 @@ Bin<To> convert(Bin<T> z) {
     return {To(z.re), To(z.im)};
 }
 
-/// p(z) and p'(z) by Horner's rule in one pass, for a real or complex z.
-template <class T, class Z>
-Tangent<Z> tangent(std::span<const T> c, Z place) {
-    using W = wider<T>;
+/// p(z) and p'(z) by Horner's rule in one pass, for a real or complex z, in the arithmetic of W.
+template <class W, class T, class Z>
+Tangent<Z> tangent_in(std::span<const T> c, Z place) {
     const auto z = convert<W>(place);
     auto value = convert<W>(Z{}), slope = value;
     for (std::size_t k = c.size(); k-- > 0;) {
@@ -49,6 +48,11 @@ Tangent<Z> tangent(std::span<const T> c, Z place) {
         value = value * z + W(c[k]);
     }
     return {convert<T>(value), convert<T>(slope)};
+}
+
+template <class T, class Z>
+Tangent<Z> tangent(std::span<const T> c, Z z) {
+    return tangent_in<wider<T>>(c, z);
 }
 
 /// Where a division from the top coefficient down meets one from the lowest up: at the largest

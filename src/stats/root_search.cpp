@@ -46,6 +46,14 @@ scalar<R> tolerance(Coefficients<scalar<R>> c) {
     return spread<R>(c) * scalar<R>(c.size()) * scalar<R>(0.25);
 }
 
+/// Whether the residual at z passes, in the samples' own arithmetic or in the wider one. Far from 0
+/// the place of a root is rounded so coarsely that only the first, which rounds alike, comes to 0;
+/// where large terms cancel, only the second is free of their noise.
+template <class T, class Z, class Test>
+bool passes(Coefficients<T> c, Z z, Test test) {
+    return test(tangent_in<T>(c, z)) || test(tangent(c, z));
+}
+
 // ---- complex arithmetic that stays finite ----
 
 /// a / b; where |b|^2 is no normal number, b counts as having the real part 1, 1 / |b|^2 as large.
@@ -73,10 +81,10 @@ scalar<R> bounded_square(Bin<scalar<R>> z) {
 template <Record R>
 Bin<scalar<R>> square_root(Bin<scalar<R>> z) {
     using T = scalar<R>;
-    const auto root = std::sqrt(std::complex<T>(z.re, z.im));
-    const Bin<T> s{root.real(), root.imag()};
-    if (!out_of_range<R>(z)) return s;
-    return s * (std::sqrt(limits<R>::big) / std::hypot(s.re, s.im));
+    const auto root = out_of_range<R>(z)
+                          ? std::polar(std::sqrt(limits<R>::big), std::atan2(z.im, z.re) / 2)
+                          : std::sqrt(std::complex<T>(z.re, z.im));
+    return {root.real(), root.imag()};
 }
 
 // ---- steps: what to subtract from a point ----
@@ -153,10 +161,12 @@ template <Record R>
 bool accept(Coefficients<scalar<R>> c, Bin<scalar<R>> z, scalar<R> tolerance,
             ComplexRoot<scalar<R>>& root) {
     using T = scalar<R>;
-    auto [p, slope] = tangent(c, z);
-    const T steepness = magnitude<R>(slope);
-    if (steepness > T(1)) p = {p.re / steepness, p.im / steepness};
-    if (!(std::fabs(p.re) < tolerance && std::fabs(p.im) < tolerance)) return false;
+    const auto small = [&](Tangent<Bin<T>> at) {
+        const T steepness = std::max(T(1), magnitude<R>(at.slope));
+        return std::fabs(at.value.re / steepness) < tolerance &&
+               std::fabs(at.value.im / steepness) < tolerance;
+    };
+    if (!passes(c, z, small)) return false;
     const T inverse = z.re == T(0) ? limits<R>::big : T(1) / z.re;
     root = {z, c[0] == T(0) || std::fabs(z.im * inverse) < tolerance};
     return true;
@@ -282,16 +292,19 @@ bool iterate(Coefficients<scalar<R>> c, scalar<R> x, Rule rule, Bracket<scalar<R
         last = std::fabs(relative<R>(by, next));
         x = next;
         if (last < eps) {
-            const auto [p, slope] = tangent(c, x);
-            const T steepness = std::max(T(1), std::fabs(slope));
             root = x;
-            return std::fabs(p) / steepness < tolerance<R>(c) * eps;
+            return passes(c, x, [&](Tangent<T> at) {
+                const T steepness = std::max(T(1), std::fabs(at.slope));
+                return std::fabs(at.value) / steepness < tolerance<R>(c) * eps;
+            });
         }
     }
     if (!(last < T(c.size()) * 4 * eps)) return false;
-    const auto [p, slope] = tangent(c, x);
     root = x;
-    return std::fabs(slope > T(1) ? p / slope : p) < tolerance<R>(c) * eps * 4;
+    return passes(c, x, [&](Tangent<T> at) {
+        return std::fabs(at.slope > T(1) ? at.value / at.slope : at.value) <
+               tolerance<R>(c) * eps * 4;
+    });
 }
 
 template <Record R>

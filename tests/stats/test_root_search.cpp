@@ -14,6 +14,11 @@ struct RootSearchTest : ::testing::Test {
 };
 TYPED_TEST_SUITE(RootSearchTest, Precisions);
 
+/// Its root lies so far out that rounding its place leaves a residual above the tolerance, which
+/// vanishes in the arithmetic of the samples.
+const List far_out{400, std::ldexp(3.0L, -50)};
+const long double far_root = std::ldexp(-400 / 3.0L, 50);
+
 TYPED_TEST(RootSearchTest, RealRootsFollowTheStart) {
     using R = TypeParam;
     const struct {
@@ -30,6 +35,7 @@ TYPED_TEST(RootSearchTest, RealRootsFollowTheStart) {
                  {{0, 0, 3}, 0.25, {0}},
                  {{8, 0, 0, 1}, 0, {-2}},
                  {{1, 2, 1}, 0.5, {-1}},
+                 {far_out, 1, {far_root}},
                  {{}, 5, {0}},
                  {{3}, 1, {0}, -1},
                  {{2, 2, 1, 0}, 1, {0}, -1}};
@@ -56,6 +62,7 @@ TYPED_TEST(RootSearchTest, ComplexRootsTellTheirKind) {
                  // Both derivatives vanish at the first start: the second one leads on.
                  {{1, 0, 0, 1}, 0, std::polar(1.0L, pi<long double> / 3), 1},
                  {{-8, 4, 0}, {1, 1}, 2, 0},
+                 {far_out, {1, 1}, far_root, 0},
                  {{}, {3, 4}, 0, 0},
                  {{3}, {1, 1}, 0, 1, -1}};
     for (const auto& c : cases) {

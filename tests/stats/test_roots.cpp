@@ -73,7 +73,7 @@ TYPED_TEST(RootsTest, RandomPolynomials) {
         const auto any_degree = noise.real<R>(2 + round % 40);
         auto roots = any_degree;
         ASSERT_EQ(this->solve_any(roots), 0) << round;
-        EXPECT_LT(misfit<R>(any_degree, roots), 8) << round;
+        EXPECT_LT(misfit<R>(any_degree, roots), 12) << round;
     }
     // (x^2 + s x + s^2)(x^2 + s x + 2 s^2): what the quartic is split by vanishes, at any scale.
     for (const long double s : {1e-6L, 1.0L, 3e6L}) {
@@ -81,6 +81,26 @@ TYPED_TEST(RootsTest, RandomPolynomials) {
         Signal<R> roots;
         ASSERT_EQ(this->solve(c, roots), 0);
         EXPECT_LT(misfit<R>(c, roots), 2) << s;
+    }
+}
+
+TYPED_TEST(RootsTest, NoiseOfDivisionsIsNoCoefficient) {
+    using R = TypeParam;
+    // What is 0 in an even polynomial is rounding noise in its factors; left there, it would stand
+    // for the smallest coefficient and soften every test by 1 / epsilon.
+    Noise noise(5);
+    for (int round = 0; round < 400; ++round) {
+        auto even = noise.real<R>(3 + 2 * (round % 20));
+        for (int k = 1; k < even->points; k += 2) even->data[k] = 0;
+        const int degree = 1 + round % 24, unit = round % 3 - 1;
+        List two_terms(std::size_t(degree) + 1);
+        two_terms[0] = round % 2 ? 1 : -1;
+        two_terms.back() = std::ldexp(1.0L, degree * unit);  // at places 2^-1, 1 and 2
+        for (const auto& c : {even, real<R>(two_terms)}) {
+            auto roots = c;
+            ASSERT_EQ(this->solve_any(roots), 0) << round;
+            EXPECT_LT(misfit<R>(c, roots), 64) << round;
+        }
     }
 }
 
@@ -182,7 +202,7 @@ TYPED_TEST(RootsTest, RefusalsAndFailingMemory) {
         });
     };
     EXPECT_EQ(growths([&](R* x) { return this->solve(x, x); }), 2);
-    EXPECT_EQ(growths(this->solve_any), 4);
+    EXPECT_EQ(growths(this->solve_any), 5);
     EXPECT_EQ(growths(this->expand), 2);
 }
 
