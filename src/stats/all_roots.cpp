@@ -13,7 +13,7 @@ template <class T>
 int balance(std::span<T> c) {
     const std::size_t top = c.size() - 1;
     std::size_t low = 0;
-    while (c[low] == T(0)) ++low;
+    while (low < top && c[low] == T(0)) ++low;
     if (low == top || !std::isfinite(c[low]) || !std::isfinite(c[top])) return 0;
     const int exponent = (std::ilogb(c[low]) - std::ilogb(c[top])) / int(top - low);
     const auto balanced = [&](std::size_t k) {
@@ -40,7 +40,7 @@ void drop_noise(std::span<T> c, T* logarithms) {
         return (logarithms[to] - logarithms[from]) / T(to - from);
     };
     std::size_t corner = 0;
-    while (c[corner] == T(0)) ++corner;
+    while (corner < top && c[corner] == T(0)) ++corner;
     while (corner < top) {
         std::size_t next = top;
         for (std::size_t k = corner + 1; k < top; ++k) {
