@@ -118,8 +118,8 @@ WAVKIT_API int dspfs_proots(const dspf *polynomial, dspf *out);
  *  A root that dsps_pcsolve() judges real is taken as real. Where the coefficients, measured so,
  *  are still some 0.1 / (points * epsilon) apart, it judges complex roots so, and the result is of
  *  no use: in single precision this may happen when they span more than four powers of ten, in
- *  double precision more than twelve. In single precision the search may find no root of x^n + a
- *  from degree 25 on.
+ *  double precision more than twelve. A search may find no root of a random polynomial from degree
+ *  200 on, and in single precision none of x^n + a from degree 25 on.
  *  @return 0, or -1 when a search finds no root, as may happen with many roots close together, the
  *          record is complex, or memory runs out; the coefficients are kept in the first two cases
  */
