@@ -20,27 +20,30 @@ namespace {
 /// A design by its name on the command line.
 struct Design {
     int type;
-    std::size_t edges;                // frequencies that follow the name
-    std::size_t others, most_others;  // numbers behind these
+    std::size_t edges;        // frequencies that follow the name
+    std::size_t least, most;  // numbers in all
+    const char* takes;
     Ideal ideal = Ideal::flat;
     bool tapered = true;  // made for a window
 };
 
 const std::map<std::string, Design>& designs() {
+    constexpr const char *one = "one frequency", *two = "two frequencies";
+    constexpr const char *shape = "a parameter at most", *nothing = "no number";
     static const std::map<std::string, Design> names{
-        {"lowpass", {DSP_FIR_LOW_PASS, 1, 0, 0}},
-        {"highpass", {DSP_FIR_HIGH_PASS, 1, 0, 0}},
-        {"bandpass", {DSP_FIR_BAND_PASS, 2, 0, 0}},
-        {"bandstop", {DSP_FIR_BAND_STOP, 2, 0, 0}},
-        {"delay", {DSP_FIR_DELAY, 1, 1, 1}},
-        {"differentiator", {DSP_FIR_DIFFERENTIATOR, 1, 0, 0, Ideal::derivative}},
-        {"hilbert", {DSP_FIR_HILBERT, 1, 0, 0}},
-        {"ramp", {DSP_FIR_RAMP, 1, 0, 0, Ideal::ramp}},
-        {"gauss", {DSP_FIR_GAUSS, 1, 0, 0, Ideal::flat, false}},
-        {"sinh", {DSP_FIR_SINH, 0, 0, 1, Ideal::flat, false}},
-        {"sinh-over-root", {DSP_FIR_SINH_OVER_ROOT, 0, 0, 1, Ideal::flat, false}},
-        {"fixed12", {DSP_FIR_FIXED_12, 0, 0, 0, Ideal::flat, false}},
-        {"fixed20", {DSP_FIR_FIXED_20, 0, 0, 0, Ideal::flat, false}}};
+        {"lowpass", {DSP_FIR_LOW_PASS, 1, 1, 1, one}},
+        {"highpass", {DSP_FIR_HIGH_PASS, 1, 1, 1, one}},
+        {"bandpass", {DSP_FIR_BAND_PASS, 2, 2, 2, two}},
+        {"bandstop", {DSP_FIR_BAND_STOP, 2, 2, 2, two}},
+        {"delay", {DSP_FIR_DELAY, 1, 2, 2, "a frequency and a delay in samples"}},
+        {"differentiator", {DSP_FIR_DIFFERENTIATOR, 1, 1, 1, one, Ideal::derivative}},
+        {"hilbert", {DSP_FIR_HILBERT, 1, 1, 1, one}},
+        {"ramp", {DSP_FIR_RAMP, 1, 1, 1, one, Ideal::ramp}},
+        {"gauss", {DSP_FIR_GAUSS, 1, 1, 1, one, Ideal::flat, false}},
+        {"sinh", {DSP_FIR_SINH, 0, 0, 1, shape, Ideal::flat, false}},
+        {"sinh-over-root", {DSP_FIR_SINH_OVER_ROOT, 0, 0, 1, shape, Ideal::flat, false}},
+        {"fixed12", {DSP_FIR_FIXED_12, 0, 0, 0, nothing, Ideal::flat, false}},
+        {"fixed20", {DSP_FIR_FIXED_20, 0, 0, 0, nothing, Ideal::flat, false}}};
     return names;
 }
 
@@ -68,14 +71,8 @@ Request request_of(const DesignOptions& options) {
     }
     const auto& design = found->second;
     const auto& given = options.parameters;
-    if (given.size() < design.edges + design.others ||
-        given.size() > design.edges + design.most_others) {
-        throw UsageError(options.name + " takes " +
-                         (design.edges == 0
-                              ? (design.most_others ? "a parameter at most" : "no number")
-                          : design.edges == 2 ? "two frequencies"
-                          : design.others > 0 ? "a frequency and a delay in samples"
-                                              : "one frequency"));
+    if (given.size() < design.least || given.size() > design.most) {
+        throw UsageError(options.name + " takes " + design.takes);
     }
     const double rate = options.rate.value_or(1);
     const auto edges = std::span(given).first(design.edges);

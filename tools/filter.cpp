@@ -162,9 +162,7 @@ class Comparison {
           seconds_(stream.sound || options.reading.rate),
           before_(outline(stream.delta)),
           after_(before_),
-          width_(stream.channels) {
-        if (stream.complex) throw Error("--plot draws real signals only");
-    }
+          width_(stream.channels) {}
 
     void add(std::span<const double> in, std::span<const double> out) {
         before_.add(in, width_);
@@ -204,8 +202,8 @@ class FilterRun {
             writer_ = block_writer(output_->stream(), *format_, options_.writing);
         }
         filter_signals();
-        if (output_) output_->commit();
         if (comparison_) comparison_->draw();
+        if (output_) output_->commit();
     }
 
   private:
@@ -229,6 +227,7 @@ class FilterRun {
         const auto& filtering = filters_.at(stream.delta);
         ChannelFilter filter(filtering, stream);
         const bool draws = !options_.plot.empty() && !comparison_;
+        if (draws && filter.complex_output()) throw Error("--plot draws real signals only");
         if (draws) comparison_.emplace(options_, stream);
         if (writer_)
             writer_->begin({stream.delta, filter.complex_output(), stream.channels, stream.length});

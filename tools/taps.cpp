@@ -81,7 +81,7 @@ Size size_for(const Tapering& tapering, std::span<const double> edges) {
         throw UsageError("a transition as narrow as that takes " + number(steps) +
                          " taps; widen --transition or give --length");
     }
-    return {int(steps / 2 + 0.5) * 2 + 1, transition};
+    return {2 * int(std::ceil(steps / 2)) + 1, transition};
 }
 
 }  // namespace

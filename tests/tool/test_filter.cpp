@@ -277,6 +277,8 @@ TEST_F(FilterTest, FailuresAreToldAndLeaveNothing) {
         {1, "filter x.txt --taps nan.txt -o y.csv", "not a finite number"},
         {1, "filter x.txt --lowpass 0.1 -o nowhere/y.csv", "nowhere"},
         {1, "filter z.csv --lowpass 0.1 --plot y.png", "real signals"},
+        {1, "filter x.txt --taps z.csv --plot y.png", "real signals"},
+        {1, "filter x.txt --lowpass 0.1 -o y.csv --plot y.png --span 7 9", "too few points"},
         {2, "filter x.txt -o y.csv", "what to filter by"},
         {2, "filter x.txt --lowpass 0.1 --taps x.txt -o y.csv", "what to filter by"},
         {2, "filter x.txt --bandpass 0.1 -o y.csv", "--bandpass"},
