@@ -91,6 +91,7 @@ void print_json(std::span<const double> table, int points) {
 
 void draw_line(const Signal& pairs, std::span<const double> table, const FitOptions& options) {
     std::vector<Mark> points;
+    points.reserve(std::size_t(pairs->points));
     for (int i = 0; i < pairs->points; ++i) {
         points.push_back({pairs->data[2 * i], pairs->data[2 * i + 1]});
     }

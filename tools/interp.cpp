@@ -171,6 +171,7 @@ void write(std::vector<Sampled> results, const InterpOptions& options) {
         return output.commit();
     }
     std::vector<Signal> signals;
+    signals.reserve(results.size());
     for (auto& result : results) signals.push_back(std::move(result.values));
     write_recording(options.out, signals, options.writing);
 }

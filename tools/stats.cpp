@@ -119,6 +119,7 @@ void run(const StatsOptions& options) {
     const auto& signals = recording.signals;
     if (options.json) {
         std::vector<JsonMembers> objects;
+        objects.reserve(signals.size());
         for (const auto& x : signals) objects.push_back(members(x));
         std::puts(json_list(objects).c_str());
         return;
