@@ -1,5 +1,6 @@
 // Text signals in blocks. Header lines are read here; the numbers between them, a piece of the text
 // at a time, by the library.
+#include <algorithm>
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -11,6 +12,7 @@ namespace wavkit::tool {
 namespace {
 
 constexpr long piece_size = 1 << 16;
+constexpr long long most_points = 1LL << 48;  // more than any file has
 
 bool is_space(int c) { return c == ' ' || (c >= '\t' && c <= '\r'); }
 
@@ -53,7 +55,7 @@ class TextStream : public BlockStream {
         int complex_flag;
         double spacing;
         if (std::sscanf(line.c_str(), "#DSP points = %lld", &points) == 1) {
-            declared_ = std::max(points, 0LL);
+            declared_ = std::clamp(points, 0LL, most_points);
         } else if (std::sscanf(line.c_str(), "#DSP complex = %d", &complex_flag) == 1) {
             complex = complex_flag != 0;
         } else if (std::sscanf(line.c_str(), "#DSP delta = %lf", &spacing) == 1) {
