@@ -9,6 +9,7 @@
 #include "commands.hpp"
 #include "csv.hpp"
 #include "error.hpp"
+#include "options.hpp"
 #include "plot.hpp"
 #include "recording.hpp"
 #include "response.hpp"
@@ -266,7 +267,7 @@ void add_design(CLI::App& program) {
     command->add_option("PARAMETERS", options->parameters, "its frequencies and parameters")
         ->type_name("");
     command->add_option("--rate", options->rate, "sampling rate: frequencies are in hertz")
-        ->check(CLI::PositiveNumber)
+        ->check(positive_number())
         ->type_name("RATE");
     command->add_option("-o,--output", options->out, "write the taps; - is standard output")
         ->type_name("FILE");

@@ -10,6 +10,7 @@
 
 #include "commands.hpp"
 #include "error.hpp"
+#include "options.hpp"
 #include "progress.hpp"
 #include "recording.hpp"
 
@@ -213,15 +214,15 @@ void add_generate(CLI::App& program) {
             ->check(CLI::Range(0, 1 << 30))
             ->type_name("N");
     command->add_option("--duration", options->duration, "length in the unit of the spacing")
-        ->check(CLI::NonNegativeNumber)
+        ->check(number_between(0, 1e300))
         ->type_name("T")
         ->excludes(points);
     auto* const spacing =
         command->add_option("--delta", options->delta, "sample spacing (default: 1)")
-            ->check(CLI::PositiveNumber)
+            ->check(positive_number())
             ->type_name("STEP");
     command->add_option("--rate", options->rate, "sampling rate: a spacing of 1/RATE")
-        ->check(CLI::PositiveNumber)
+        ->check(positive_number())
         ->type_name("RATE")
         ->excludes(spacing);
     command->add_option("--seed", options->seed, "the same noise for the same number")

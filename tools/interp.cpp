@@ -233,7 +233,7 @@ void add_interp(CLI::App& program) {
     auto* const at =
         command->add_option("--at", options->at, "places to interpolate at")->type_name("FILE");
     command->add_option("--rate", options->rate, "sampling rate of the result")
-        ->check(CLI::PositiveNumber)
+        ->check(positive_number())
         ->excludes(at)
         ->type_name("RATE");
     add_choice<unsigned>(*command, "--method", options->method,

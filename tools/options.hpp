@@ -2,6 +2,8 @@
 #pragma once
 
 #include <CLI/CLI.hpp>
+#include <cmath>
+#include <functional>
 #include <map>
 #include <optional>
 #include <string>
@@ -25,6 +27,29 @@ CLI::Option* add_choice(CLI::App& command, const std::string& option, std::optio
             return names.contains(CLI::detail::to_lower(name)) ? "" : name + " is none of " + list;
         })
         ->type_name(list);
+}
+
+using Check = std::function<std::string(const std::string&)>;
+
+/// Accepts the numbers that `good` accepts; `what` says what they are. CLI11's own ranges let NaN
+/// pass.
+inline Check numbers(std::function<bool(double)> good, const std::string& what) {
+    return [=](const std::string& text) {
+        double value = 0;
+        const bool fits = CLI::detail::lexical_cast(text, value) && good(value);
+        return fits ? "" : text + " is no " + what;
+    };
+}
+
+/// Spacings and rates: each has a finite reciprocal.
+inline Check positive_number() {
+    return numbers([](double x) { return x > 0 && std::isnormal(x); }, "positive number");
+}
+
+inline Check number_between(double low, double high) {
+    return numbers(
+        [=](double x) { return x >= low && x <= high; },
+        "number between " + CLI::detail::to_string(low) + " and " + CLI::detail::to_string(high));
 }
 
 }  // namespace wavkit::tool

@@ -102,12 +102,12 @@ void ReadOptions::declare(CLI::App& command, bool with_rate) {
     add_choice(command, "--from", format, formats(), "format of IN (default: by its contents)")
         ->group(group);
     auto* const spacing = command.add_option("--delta", delta, "sample spacing, whatever IN says")
-                              ->check(CLI::PositiveNumber)
+                              ->check(positive_number())
                               ->type_name("STEP")
                               ->group(group);
     if (with_rate) {
         command.add_option("--rate", rate, "sampling rate: a spacing of 1/RATE")
-            ->check(CLI::PositiveNumber)
+            ->check(positive_number())
             ->type_name("RATE")
             ->excludes(spacing)
             ->group(group);

@@ -196,7 +196,7 @@ void declare_averaging(CLI::App& command, SpectrumOptions& options) {
     command
         .add_option("--overlap", options.overlap,
                     "percent of a segment that lies in the one before (default: 50)")
-        ->check(CLI::Range(0.0, 99.0))
+        ->check(number_between(0, 99))
         ->type_name("P")
         ->group(group);
     add_choice<AverageType>(command, "--type", options.type,
@@ -253,7 +253,7 @@ void add_spectrum(CLI::App& program) {
         command
             ->add_option("--fraction", settings.fraction,
                          "share of the transform to fill, 0 to 1; zeros fill the rest")
-            ->check(CLI::Range(1e-9, 1.0))
+            ->check(number_between(1e-9, 1))
             ->type_name("F");
     command
         ->add_flag("--any-length", settings.any_length,

@@ -8,6 +8,7 @@
 
 #include "csv.hpp"
 #include "error.hpp"
+#include "options.hpp"
 #include "spectrum.hpp"
 
 namespace wavkit::tool {
@@ -91,11 +92,11 @@ void Tapering::declare(CLI::App& command) {
     command
         .add_option("--transition", transition,
                     "from pass band to stop band (default: a quarter of the narrowest band)")
-        ->check(CLI::PositiveNumber)
+        ->check(positive_number())
         ->type_name("WIDTH")
         ->group(group);
     command.add_option("--attenuation", attenuation, "of the stop band in dB (default: 60)")
-        ->check(CLI::Range(10.0, 200.0))
+        ->check(number_between(10, 200))
         ->type_name("DB")
         ->group(group);
     command.add_option("--length", length, "number of taps, in place of one of the two")
