@@ -33,7 +33,7 @@ using Check = std::function<std::string(const std::string&)>;
 
 /// Accepts the numbers that `good` accepts; `what` says what they are. CLI11's own ranges let NaN
 /// pass.
-inline Check numbers(std::function<bool(double)> good, const std::string& what) {
+inline Check numbers(const std::function<bool(double)>& good, const std::string& what) {
     return [=](const std::string& text) {
         double value = 0;
         const bool fits = CLI::detail::lexical_cast(text, value) && good(value);
