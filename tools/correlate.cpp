@@ -7,7 +7,6 @@
 
 #include "commands.hpp"
 #include "error.hpp"
-#include "options.hpp"
 #include "output.hpp"
 #include "peaks.hpp"
 #include "progress.hpp"
@@ -34,13 +33,9 @@ struct Correlation {
 };
 
 void check_usage(const CorrelateOptions& options) {
-    if (options.out.empty()) {
-        if (options.writing.format) throw UsageError("--to is for the output that -o names");
-        return;
-    }
-    const auto format = options.writing.format_for(options.out);
-    if (is_sound(format)) throw UsageError("a correlation cannot be written as a sound file");
-    if (!options.lags.empty() && is_signal_file(format)) {
+    options.writing.check_without_sound(options.out, "a correlation");
+    if (options.out.empty()) return;
+    if (!options.lags.empty() && is_signal_file(options.writing.format_for(options.out))) {
         throw UsageError("a signal file holds the whole correlation; --lags goes with CSV");
     }
 }
@@ -171,9 +166,7 @@ void add_correlate(CLI::App& program) {
     command->add_option("B", options->b, "the signal to look in")->type_name("");
     command->add_option("-o,--output", options->out, "write the correlation; - is standard output")
         ->type_name("FILE");
-    add_choice<Format>(*command, "--to", options->writing.format,
-                       {{"csv", Format::csv}, {"binary", Format::binary}, {"text", Format::text}},
-                       "format of the output (default: by its name)");
+    options->writing.declare_without_sound(*command);
     command->add_option("--lags", options->lags, "lags to look at")
         ->expected(2)
         ->type_name("LOW HIGH");

@@ -95,6 +95,7 @@ class CsvReader {
             const auto first_row = lines_.place();
             choose_columns();
             delta_ = told.value_or(1.0);
+            ended_ = false;
             if (has_time_) measure_times();
             lines_.go_to(first_row);
             ended_ = false;
@@ -196,13 +197,9 @@ class CsvReader {
     void measure_times() {
         first_time_ = required(0);
         double last = first_time_;
-        rows_ = 0;
-        ended_ = false;
-        while (next_row()) {
-            last = required(0);
-            ++rows_;
-        }
-        if (rows_ > 0) delta_ = (last - first_time_) / double(rows_);
+        std::size_t steps = 0;
+        for (; next_row(); ++steps) last = required(0);
+        if (steps > 0) delta_ = (last - first_time_) / double(steps);
         rows_ = 0;
     }
 

@@ -214,9 +214,7 @@ void run(DesignOptions& options) {
         throw UsageError("--to, --type, --bits and --with-time are for the output that -o names");
     }
     if (!options.out.empty()) options.writing.checked_format_for(options.out);
-    if (options.out == "-" && options.plot == "-") {
-        throw UsageError("standard output takes only one of -o - and --plot -");
-    }
+    check_apart(options.out, options.plot);
     const auto request = request_of(options);
     if (options.tapering.transition && options.rate) *options.tapering.transition /= *options.rate;
     auto taps = taps_of(request, options.tapering);

@@ -73,9 +73,7 @@ void check_usage(FilterOptions& options) {
     if (!options.span.empty() && !(options.span[0] < options.span[1])) {
         throw UsageError("--span goes from an earlier to a later time");
     }
-    if (options.out == "-" && options.plot == "-") {
-        throw UsageError("standard output takes only one of -o - and --plot -");
-    }
+    check_apart(options.out, options.plot);
     if (!options.out.empty()) options.writing.checked_format_for(options.out);
     if (options.out.empty() && options.writing.any()) {
         throw UsageError("--to, --type, --bits and --with-time are for the output that -o names");

@@ -8,7 +8,6 @@
 
 #include "commands.hpp"
 #include "error.hpp"
-#include "options.hpp"
 #include "output.hpp"
 #include "plot.hpp"
 #include "progress.hpp"
@@ -39,16 +38,8 @@ void check_usage(const HistOptions& options) {
     if (!options.range.empty() && !(options.range[0] < options.range[1])) {
         throw UsageError("--range takes the lower end first");
     }
-    if (options.out.empty()) {
-        if (options.writing.format) throw UsageError("--to is for the output that -o names");
-        return;
-    }
-    if (is_sound(options.writing.format_for(options.out))) {
-        throw UsageError("a histogram cannot be written as a sound file");
-    }
-    if (options.out == "-" && options.plot == "-") {
-        throw UsageError("standard output takes only one of -o - and --plot -");
-    }
+    options.writing.check_without_sound(options.out, "a histogram");
+    check_apart(options.out, options.plot);
 }
 
 /// From the least to the greatest finite value, or around the only one.
@@ -175,9 +166,7 @@ void add_hist(CLI::App& program) {
         ->type_name("LOW HIGH");
     command->add_option("-o,--output", options->out, "write the counts; - is standard output")
         ->type_name("FILE");
-    add_choice<Format>(*command, "--to", options->writing.format,
-                       {{"csv", Format::csv}, {"binary", Format::binary}, {"text", Format::text}},
-                       "format of the output (default: by its name)");
+    options->writing.declare_without_sound(*command);
     command
         ->add_option("--plot", options->plot,
                      "draw the counts into a .png or .svg file, or - the terminal")

@@ -171,6 +171,11 @@ Picture picture_of_name(const std::string& path) {
                      path + "'");
 }
 
+void check_apart(const std::string& out, const std::string& picture) {
+    if (out != "-" || picture != "-") return;
+    throw UsageError("standard output takes only one of -o - and --plot -");
+}
+
 void draw(const Curve& curve, const std::string& path) { draw({&curve, 1}, path); }
 
 void draw(std::span<const Curve> panels, const std::string& path) {

@@ -35,6 +35,9 @@ struct Curve {
 enum class Picture { png, svg, terminal };
 Picture picture_of_name(const std::string& path);
 
+/// Throws where an output and a picture would both go to standard output.
+void check_apart(const std::string& out, const std::string& picture);
+
 /// Draws a curve into a file, completely or not at all; "-" is standard output.
 void draw(const Curve& curve, const std::string& path);
 

@@ -135,6 +135,8 @@ void ReadOptions::declare(CLI::App& command, bool with_rate) {
         ->group(group);
 }
 
+double ReadOptions::spacing(double told) const { return rate ? 1 / *rate : delta.value_or(told); }
+
 void WriteOptions::declare(CLI::App& command) {
     add_choice(command, "--to", format, formats(), "format of the output (default: by its name)");
     command.add_flag("--with-time", time, "CSV: begin with a column of times");
@@ -144,6 +146,20 @@ void WriteOptions::declare(CLI::App& command) {
         "sound: samples (default: WAV float, FLAC 24)");
     add_choice<bool>(command, "--type", single, {{"double", false}, {"float", true}},
                      "signal files: precision of the samples (default: double)");
+}
+
+void WriteOptions::declare_without_sound(CLI::App& command) {
+    add_choice<Format>(command, "--to", format,
+                       {{"csv", Format::csv}, {"binary", Format::binary}, {"text", Format::text}},
+                       "format of the output (default: by its name)");
+}
+
+void WriteOptions::check_without_sound(const std::string& path, const std::string& what) const {
+    if (path.empty()) {
+        if (format) throw UsageError("--to is for the output that -o names");
+    } else if (is_sound(format_for(path))) {
+        throw UsageError(what + " cannot be written as a sound file");
+    }
 }
 
 Format WriteOptions::checked_format_for(const std::string& path) const {
@@ -197,10 +213,7 @@ Recording read_recording(InputFile& input, const ReadOptions& options) {
         std::swap(signals[0], signals[std::size_t(wanted) - 1]);
         signals.resize(1);
     }
-    for (auto& x : signals) {
-        if (options.delta) x->delta = *options.delta;
-        if (options.rate) x->delta = 1 / *options.rate;
-    }
+    for (auto& x : signals) x->delta = options.spacing(x->delta);
     return recording;
 }
 

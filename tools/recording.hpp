@@ -24,6 +24,9 @@ struct ReadOptions {
 
     /// Adds the options to a subcommand; without --rate where that means another one's rate.
     void declare(CLI::App& command, bool with_rate = true);
+
+    /// The spacing of a signal, whatever its source told.
+    double spacing(double told) const;
 };
 
 /// How a result is to be written.
@@ -33,8 +36,9 @@ struct WriteOptions {
     std::optional<bool> single;  // signal files in single precision
     std::optional<SampleType> samples;
 
-    /// Adds the options to a subcommand.
+    /// Adds the options to a subcommand; the second for results that are no signal to be heard.
     void declare(CLI::App& command);
+    void declare_without_sound(CLI::App& command);
 
     bool any() const { return format || time || single || samples; }
 
@@ -42,6 +46,8 @@ struct WriteOptions {
     Format format_for(const std::string& path) const;
     /// The same; throws where an option is for another format.
     Format checked_format_for(const std::string& path) const;
+    /// Throws where `what` would become a sound file, and for a format without a name.
+    void check_without_sound(const std::string& path, const std::string& what) const;
 };
 
 /// What a source held.

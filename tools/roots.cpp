@@ -10,7 +10,6 @@
 
 #include "commands.hpp"
 #include "error.hpp"
-#include "options.hpp"
 #include "output.hpp"
 #include "progress.hpp"
 #include "recording.hpp"
@@ -180,11 +179,7 @@ void print_coefficients(const Signal& polynomial, bool descending) {
 // ---- the command ----
 
 void run(const RootsOptions& options) {
-    if (options.out.empty()) {
-        if (options.writing.format) throw UsageError("--to is for the output that -o names");
-    } else if (is_sound(options.writing.format_for(options.out))) {
-        throw UsageError("roots and coefficients cannot be written as a sound file");
-    }
+    options.writing.check_without_sound(options.out, "roots and coefficients");
     auto x = read_values(options);
     check_finite(x.values(), x->complex);
     const auto write = [&](const Signal& result) {
@@ -239,9 +234,7 @@ void add_roots(CLI::App& program) {
     command->add_flag("--descending", options->descending, "highest power first");
     command->add_option("-o,--output", options->out, "write the result; - is standard output")
         ->type_name("FILE");
-    add_choice<Format>(*command, "--to", options->writing.format,
-                       {{"csv", Format::csv}, {"binary", Format::binary}, {"text", Format::text}},
-                       "format of the output (default: by its name)");
+    options->writing.declare_without_sound(*command);
     options->reading.declare(*command);
     command->footer(about);
     command->callback([options] { run(*options); });

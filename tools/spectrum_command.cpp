@@ -65,14 +65,12 @@ void check_usage(const SpectrumOptions& options) {
     if (!report.band.empty() && !(report.band[0] < report.band[1])) {
         throw UsageError("--band goes from a lower to a higher frequency");
     }
-    if (report.out.empty()) {
-        if (report.complex) throw UsageError("--complex is for the output that -o names");
-        if (report.writing.format) throw UsageError("--to is for the output that -o names");
-        return;
+    if (report.out.empty() && report.complex) {
+        throw UsageError("--complex is for the output that -o names");
     }
-    const auto format = report.writing.format_for(report.out);
-    if (is_sound(format)) throw UsageError("a spectrum cannot be written as a sound file");
-    if (!report.band.empty() && is_signal_file(format)) {
+    report.writing.check_without_sound(report.out, "a spectrum");
+    if (report.out.empty()) return;
+    if (!report.band.empty() && is_signal_file(report.writing.format_for(report.out))) {
         throw UsageError("a signal file holds the whole spectrum; --band goes with CSV");
     }
     if (report.out == "-" && (report.peaks > 0 || report.plot == "-")) {
@@ -237,9 +235,7 @@ void add_spectrum(CLI::App& program) {
         ->type_name("");
     command->add_option("-o,--output", report.out, "write the spectrum; - is standard output")
         ->type_name("FILE");
-    add_choice<Format>(*command, "--to", report.writing.format,
-                       {{"csv", Format::csv}, {"binary", Format::binary}, {"text", Format::text}},
-                       "format of the output (default: by its name)");
+    report.writing.declare_without_sound(*command);
     command->add_option("--peaks", report.peaks, "print the N strongest peaks")
         ->check(CLI::Range(1, 1000000))
         ->type_name("N");

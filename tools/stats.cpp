@@ -9,7 +9,6 @@
 
 #include "commands.hpp"
 #include "json.hpp"
-#include "progress.hpp"
 #include "recording.hpp"
 
 namespace wavkit::tool {

@@ -125,15 +125,6 @@ std::size_t BlockStream::read(std::span<double> values) {
     return done;
 }
 
-namespace {
-
-void set_spacing(SampleStream& stream, const ReadOptions& options) {
-    if (options.delta) stream.delta = *options.delta;
-    if (options.rate) stream.delta = 1 / *options.rate;
-}
-
-}  // namespace
-
 std::unique_ptr<SampleStream> open_stream(InputFile& input, const ReadOptions& options) {
     const auto format = format_of(input, options);
     std::unique_ptr<SampleStream> stream;
@@ -146,7 +137,7 @@ std::unique_ptr<SampleStream> open_stream(InputFile& input, const ReadOptions& o
     } else {
         stream = stream_text(input, options.signal);
     }
-    set_spacing(*stream, options);
+    stream->delta = options.spacing(stream->delta);
     return stream;
 }
 
@@ -155,7 +146,7 @@ std::unique_ptr<SampleStream> open_channels(InputFile& input, const ReadOptions&
         return open_stream(input, options);
     }
     auto stream = stream_channels(input);
-    set_spacing(*stream, options);
+    stream->delta = options.spacing(stream->delta);
     return stream;
 }
 

@@ -1,7 +1,6 @@
 // Text signals in blocks. Header lines are read here; the numbers between them, a piece of the text
 // at a time, by the library.
 #include <algorithm>
-#include <cstdint>
 #include <optional>
 #include <string>
 

@@ -115,9 +115,7 @@ void run(const WindowOptions& options) {
         throw UsageError("--to is for the output that -o names");
     }
     if (!options.out.empty()) options.writing.format_for(options.out);
-    if (options.out == "-" && options.plot == "-") {
-        throw UsageError("standard output takes only one of -o - and --plot -");
-    }
+    check_apart(options.out, options.plot);
     const int window = window_of_name(options.name);
     const auto w = samples_of(window, options.points);
     if (!options.out.empty()) write_recording(options.out, {&w, 1}, options.writing);
