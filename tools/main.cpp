@@ -5,8 +5,8 @@
 #include <exception>
 #include <string>
 
-#include "commands.hpp"
-#include "error.hpp"
+#include "base/error.hpp"
+#include "commands/commands.hpp"
 
 namespace {
 

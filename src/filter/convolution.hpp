@@ -4,7 +4,7 @@
 #include <algorithm>
 #include <cstdint>
 
-#include "precision.hpp"
+#include "record_view.hpp"
 
 namespace wavkit {
 

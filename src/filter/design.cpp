@@ -3,7 +3,7 @@
 #include <span>
 
 #include "filter/fixed_taps.hpp"
-#include "precision.hpp"
+#include "record_view.hpp"
 #include "window/catalogue.hpp"
 #include "window/generate.hpp"
 

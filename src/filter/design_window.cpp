@@ -1,5 +1,5 @@
 // Windows for FIR designs, chosen for a bandwidth.
-#include "precision.hpp"
+#include "record_view.hpp"
 
 namespace wavkit {
 namespace {

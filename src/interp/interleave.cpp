@@ -1,5 +1,5 @@
 // Two signals whose points take turns.
-#include "core/binary.hpp"
+#include "math/binary.hpp"
 
 namespace wavkit {
 namespace {

@@ -1,5 +1,5 @@
 // Tabulated data at new abscissae: held, along lines, parabolas or a cubic spline.
-#include "core/binary.hpp"
+#include "math/binary.hpp"
 
 namespace wavkit {
 namespace {

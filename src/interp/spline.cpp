@@ -2,7 +2,7 @@
 #include <cstdlib>
 #include <memory>
 
-#include "core/binary.hpp"
+#include "math/binary.hpp"
 
 namespace wavkit {
 namespace {

@@ -7,7 +7,7 @@
 #include <tuple>
 #include <type_traits>
 
-#include "precision.hpp"
+#include "record_view.hpp"
 
 namespace wavkit {
 

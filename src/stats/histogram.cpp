@@ -1,7 +1,7 @@
 // Histogram of values or magnitudes.
 #include <algorithm>
 
-#include "precision.hpp"
+#include "record_view.hpp"
 
 namespace wavkit {
 namespace {

@@ -1,7 +1,7 @@
 // A value as the result of a statistic: a record of one point.
 #pragma once
 
-#include "precision.hpp"
+#include "record_view.hpp"
 
 namespace wavkit {
 

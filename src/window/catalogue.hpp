@@ -3,7 +3,7 @@
 
 #include <span>
 
-#include "precision.hpp"
+#include "record_view.hpp"
 
 namespace wavkit {
 

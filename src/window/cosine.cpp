@@ -2,8 +2,8 @@
 #include <algorithm>
 #include <numeric>
 
-#include "core/tolerance.hpp"
 #include "window/generate.hpp"
+#include "window/tolerance.hpp"
 
 namespace wavkit {
 namespace {

@@ -1,7 +1,7 @@
 // Windows given by a formula: triangle, Kaiser, Gauss, powers of a sinc.
 #include <algorithm>
 
-#include "core/bessel.hpp"
+#include "math/bessel.hpp"
 #include "window/generate.hpp"
 
 namespace wavkit {

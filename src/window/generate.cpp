@@ -4,8 +4,8 @@
 #include <algorithm>
 #include <array>
 
-#include "core/tolerance.hpp"
 #include "window/catalogue.hpp"
+#include "window/tolerance.hpp"
 
 namespace wavkit {
 namespace {

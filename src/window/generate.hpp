@@ -4,7 +4,7 @@
 
 #include <span>
 
-#include "precision.hpp"
+#include "record_view.hpp"
 
 namespace wavkit {
 

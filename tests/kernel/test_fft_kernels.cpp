@@ -4,10 +4,10 @@
 #include <cmath>
 #include <map>
 
-#include "spectral/mixed.hpp"
-#include "spectral/plan.hpp"
-#include "spectral/tables.hpp"
 #include "support/oracles.hpp"
+#include "transform/mixed.hpp"
+#include "transform/plan.hpp"
+#include "transform/tables.hpp"
 
 namespace wavkit::test {
 namespace {

@@ -3,7 +3,7 @@
 
 #include <gtest/gtest.h>
 
-#include "../../src/precision.hpp"
+#include "../../src/record_view.hpp"
 
 // The remaining names that tests call on both precisions; the library's own sources need fewer.
 inline int dsp_lib_alloc(dspf_alloc_hook hook, dspf_alloc_hook* previous) {

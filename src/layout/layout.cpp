@@ -1,0 +1,160 @@
+// Points moved, added and dropped: rotation by half a length, padding, trimming, interleaved zeros.
+#include <algorithm>
+#include <cstring>
+#include <limits>
+#include <optional>
+
+#include "record_view.hpp"
+
+namespace wavkit {
+namespace {
+
+constexpr int keep_power = 1, unscaled = 2, scale_bits = 3;  // 0 keeps the amplitude
+constexpr int at_start = 0x000, in_middle = 0x100, at_end = 0x200, split = 0x300,
+              placement_bits = 0x700;
+
+/// Where the points of a short signal lie in a long one: the first `head` points from point `lead`
+/// on, the others at the very end.
+struct Placement {
+    std::size_t lead, head;
+};
+
+std::optional<Placement> placement(int mode, std::size_t longer, std::size_t shorter) {
+    switch (mode & placement_bits) {
+        case at_start:
+            return Placement{0, shorter};
+        case in_middle:  // point count / 2, the zero frequency of a rotated spectrum, stays that
+            return Placement{longer / 2 - shorter / 2, shorter};
+        case at_end:
+            return Placement{0, 0};
+        case split:
+            return Placement{0, (shorter + 1) / 2};
+        default:
+            return std::nullopt;
+    }
+}
+
+template <class T>
+std::optional<T> scale_factor(int mode, std::size_t old_count, std::size_t new_count) {
+    const int kept = mode & scale_bits;
+    if (kept == scale_bits) return std::nullopt;
+    if (kept == unscaled || old_count == 0 || new_count == 0) return T(1);
+    const double ratio = double(new_count) / double(old_count);
+    return T(kept == keep_power ? std::sqrt(ratio) : ratio);
+}
+
+template <Record R>
+void scale_points(R* x, std::size_t count, scalar<R> factor) {
+    if (factor == 1) return;
+    for (auto& value : values(x).first(count * width(x))) value *= factor;
+}
+
+template <Record R>
+void move_points(R* x, std::size_t to, std::size_t from, std::size_t count) {
+    const std::size_t w = width(x);
+    std::memmove(x->data + to * w, x->data + from * w, count * w * sizeof(scalar<R>));
+}
+
+template <Record R>
+void clear_points(R* x, std::size_t first, std::size_t last) {
+    std::fill(x->data + first * width(x), x->data + last * width(x), scalar<R>(0));
+}
+
+template <Record R>
+int pad(R* x, int n, int mode) {
+    const std::size_t had = length(x);
+    if (n <= 0 || had >= std::size_t(n)) return 0;
+    x->points = n;
+    if (dsp_realloc(x, int(had), x->complex)) return -1;
+
+    const std::size_t now = length(x);
+    const auto factor = scale_factor<scalar<R>>(mode, had, now);
+    const auto place = placement(mode, now, had);
+    if (!factor || !place) return -1;
+
+    const std::size_t tail = had - place->head;
+    scale_points(x, had, *factor);
+    move_points(x, now - tail, place->head, tail);
+    move_points(x, place->lead, 0, place->head);
+    clear_points(x, 0, place->lead);
+    clear_points(x, place->lead + place->head, now - tail);
+    return 0;
+}
+
+template <Record R>
+int trim(R* x, int n, int mode) {
+    const std::size_t had = length(x), now = n > 0 ? std::size_t(n) : 0;
+    if (had <= now) return 0;
+    const auto factor = scale_factor<scalar<R>>(mode, had, now);
+    const auto place = placement(mode, had, now);
+    if (!factor || !place) return -1;
+
+    const std::size_t tail = now - place->head;
+    move_points(x, 0, place->lead, place->head);
+    move_points(x, place->head, had - tail, tail);
+    x->points = int(now);
+    scale_points(x, now, *factor);
+    return 0;
+}
+
+/// Moves the first `count` points behind the others.
+template <Record R>
+int rotate(R* x, std::size_t count) {
+    const auto turn = [count](auto points) {
+        std::rotate(points.begin(), points.begin() + std::ptrdiff_t(count), points.end());
+    };
+    if (x->complex) {
+        turn(bins(x));
+    } else {
+        turn(values(x));
+    }
+    return 0;
+}
+
+template <class Sample>
+void spread(Sample* samples, std::size_t count) {
+    for (std::size_t i = count; i-- > 0;) {
+        samples[2 * i] = samples[i];
+        samples[2 * i + 1] = {};
+    }
+}
+
+template <Record R>
+int interleave_zeros(R* x) {
+    const int n = int(length(x));
+    x->delta *= scalar<R>(0.5);
+    if (n > std::numeric_limits<int>::max() / 2) {  // as when memory runs out
+        x->data = nullptr;
+        x->alloc = 0;
+        return -1;
+    }
+    x->points = 2 * n;
+    if (dsp_realloc(x, n, x->complex)) return -1;
+    if (x->complex) {
+        spread(bins(x).data(), std::size_t(n));
+    } else {
+        spread(x->data, std::size_t(n));
+    }
+    return 0;
+}
+
+}  // namespace
+}  // namespace wavkit
+
+int dspi_swap_halves(dsp* x) { return wavkit::rotate(x, (wavkit::length(x) + 1) / 2); }
+int dspfi_swap_halves(dspf* x) { return wavkit::rotate(x, (wavkit::length(x) + 1) / 2); }
+
+int dspi_swap_halves2(dsp* x) { return wavkit::rotate(x, wavkit::length(x) / 2); }
+int dspfi_swap_halves2(dspf* x) { return wavkit::rotate(x, wavkit::length(x) / 2); }
+
+int dspi_zpad(dsp* x, int n) { return wavkit::pad(x, n, wavkit::at_start | wavkit::unscaled); }
+int dspfi_zpad(dspf* x, int n) { return wavkit::pad(x, n, wavkit::at_start | wavkit::unscaled); }
+
+int dspi_zpad2(dsp* x, int n, int mode) { return wavkit::pad(x, n, mode); }
+int dspfi_zpad2(dspf* x, int n, int mode) { return wavkit::pad(x, n, mode); }
+
+int dspi_unzpad(dsp* x, int n, int mode) { return wavkit::trim(x, n, mode); }
+int dspfi_unzpad(dspf* x, int n, int mode) { return wavkit::trim(x, n, mode); }
+
+int dspi_zinter(dsp* x) { return wavkit::interleave_zeros(x); }
+int dspfi_zinter(dspf* x) { return wavkit::interleave_zeros(x); }

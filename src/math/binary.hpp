@@ -1,0 +1,86 @@
+// What operations on two signals share: an output that may be an operand, or another record over an
+// operand's buffer.
+#pragma once
+
+#include <algorithm>
+#include <cstdint>
+
+#include "record_view.hpp"
+
+namespace wavkit {
+
+/// Makes `out` `points` samples, complex or real, for two operands of one length. `a` and `b` are
+/// copies of the operands' records, taken on entry; they stay readable afterwards also where `out`
+/// shares their buffer: an owned block keeps its contents and may move, then they follow it; a
+/// borrowed one stays as it was, and `out` leaves it.
+template <Record R>
+int size_output(R& a, R& b, R* out, std::int64_t points, bool complex) {
+    constexpr std::int64_t most = std::numeric_limits<int>::max();
+    const bool over_a = out->data && out->data == a.data;
+    const bool over_b = out->data && out->data == b.data;
+    const bool owned = out->alloc > 0;
+    const bool kept_complex = (over_a && a.complex) || (over_b && b.complex);
+
+    out->points = int(std::min(points, most));
+    out->complex = complex || points > most;  // a count beyond int must not fit by being cut
+    if (over_a || over_b ? dsp_realloc(out, int(length(&a)), kept_complex) : dsp_alloc(out))
+        return -1;
+    if (owned && over_a) a.data = out->data;
+    if (owned && over_b) b.data = out->data;
+    return 0;
+}
+
+/// The usual output of an operation point by point: the operands' length, the mean of their
+/// spacings, complex when either is. Operands of different lengths fail and leave `out` untouched.
+template <Record R>
+int prepare_output(R& a, R& b, R* out) {
+    if (length(&a) != length(&b)) return -1;
+    out->delta = (a.delta + b.delta) * scalar<R>(0.5);
+    return size_output(a, b, out, std::int64_t(length(&a)), a.complex || b.complex);
+}
+
+template <class A, class B, class Out, class Operation>
+void combine(const A* a, const B* b, Out* out, std::size_t n, Operation operation) {
+    for (std::size_t i = 0; i < n; ++i) out[i] = operation(a[i], b[i]);
+}
+
+/// Calls `combine_block(first, count, samples)` until all n real samples have gone into complex
+/// points. Where the points take the place of the samples, point i overwrites the samples 2i and
+/// 2i + 1: the blocks then go from the last to the first, each on a copy of its samples.
+template <class T, class Block>
+void widen(const T* reals, const Bin<T>* out, std::size_t n, Block combine_block) {
+    if (static_cast<const void*>(reals) != out) return combine_block(0, n, reals);
+    constexpr std::size_t longest = 512;
+    T samples[longest];
+    for (std::size_t end = n; end > 0;) {
+        const std::size_t first = (end - 1) / longest * longest;
+        std::copy(reals + first, reals + end, samples);
+        combine_block(first, end - first, samples);
+        end = first;
+    }
+}
+
+/// out[n] = operation(a[n], b[n]); the operation takes every pairing of real and complex samples.
+template <Record R, class Operation>
+int pointwise(const R* first, const R* second, R* out, Operation operation) {
+    R a = *first, b = *second;
+    if (prepare_output(a, b, out)) return -1;
+    const std::size_t n = length(&a);
+    const auto p = bins(&a).data(), q = bins(&b).data(), result = bins(out).data();
+    if (a.complex && b.complex) {
+        combine(p, q, result, n, operation);
+    } else if (a.complex) {
+        widen(b.data, result, n, [&](std::size_t i, std::size_t count, const scalar<R>* reals) {
+            combine(p + i, reals, result + i, count, operation);
+        });
+    } else if (b.complex) {
+        widen(a.data, result, n, [&](std::size_t i, std::size_t count, const scalar<R>* reals) {
+            combine(reals, q + i, result + i, count, operation);
+        });
+    } else {
+        combine(a.data, b.data, out->data, n, operation);
+    }
+    return 0;
+}
+
+}  // namespace wavkit

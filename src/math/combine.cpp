@@ -1,0 +1,98 @@
+// Two signals joined otherwise than point by point: as the parts of a complex one, as polynomials,
+// as a dot product.
+#include "math/binary.hpp"
+#include "stats/blockwise.hpp"
+
+namespace wavkit {
+namespace {
+
+template <Record R>
+int join_parts(const R* real_parts, const R* imaginary_parts, R* out) {
+    R a = *real_parts, b = *imaginary_parts;
+    if (a.complex || b.complex || length(&a) != length(&b)) return -1;
+    out->delta = (a.delta + b.delta) * scalar<R>(0.5);
+    if (size_output(a, b, out, std::int64_t(length(&a)), true)) return -1;
+    // Backwards: in place, point i overwrites the samples 2i and 2i + 1 of either operand.
+    for (std::size_t i = length(&a); i-- > 0;) bins(out)[i] = {a.data[i], b.data[i]};
+    return 0;
+}
+
+/// out[i + j] += a[i] * b[j], the longer operand in the inner loop.
+template <class A, class B, class Out>
+void convolve(std::span<const A> a, std::span<const B> b, std::span<Out> out) {
+    if (a.size() > b.size()) return convolve(b, a, out);
+    for (std::size_t i = 0; i < a.size(); ++i) {
+        for (std::size_t j = 0; j < b.size(); ++j) out[i + j] += a[i] * b[j];
+    }
+}
+
+template <Record R>
+int multiply_apart(const R* a, const R* b, R* out) {
+    const auto n = std::int64_t(length(a)), m = std::int64_t(length(b));
+    R p = *a, q = *b;
+    out->delta = (p.delta + q.delta) * scalar<R>(0.5);
+    if (size_output(p, q, out, n && m ? n + m - 1 : 0, p.complex || q.complex)) return -1;
+    std::ranges::fill(values(out), scalar<R>(0));
+    if (a->complex && b->complex) {
+        convolve(bins(a), bins(b), bins(out));
+    } else if (a->complex) {
+        convolve(bins(a), values(b), bins(out));
+    } else if (b->complex) {
+        convolve(values(a), bins(b), bins(out));
+    } else {
+        convolve(values(a), values(b), values(out));
+    }
+    return 0;
+}
+
+template <Record R>
+int multiply_polynomials(const R* a, const R* b, R* out) {
+    if (out->data != a->data && out->data != b->data) return multiply_apart(a, b, out);
+    Temporary<R> product;
+    return status(multiply_apart<R>(a, b, product) || dsp_copy(out, product));
+}
+
+template <Record R>
+Bin<scalar<R>> dot(const R* a, const R* b) {
+    using T = scalar<R>;
+    const auto sum_of_products = [n = length(a)](auto p, auto q) -> Bin<T> {
+        const auto [re, im] = blockwise_sums(n, [=](std::size_t i) {
+            const Bin<T> product = p[i] * q[i];
+            return std::array{product.re, product.im};
+        });
+        return {re, im};
+    };
+    if (a->complex && b->complex) return sum_of_products(bins(a), bins(b));
+    if (a->complex) return sum_of_products(bins(a), values(b));
+    if (b->complex) return sum_of_products(values(a), bins(b));
+    const auto [sum] = blockwise_sums(
+        length(a), [p = a->data, q = b->data](std::size_t i) { return std::array{p[i] * q[i]}; });
+    return {sum, 0};
+}
+
+template <Record R>
+int dot_product(const R* first, const R* second, R* out) {
+    R a = *first, b = *second;
+    if (length(&a) != length(&b)) return -1;
+    const Bin<scalar<R>> sum = dot(&a, &b);
+    if (size_output(a, b, out, 1, a.complex || b.complex)) return -1;
+    out->data[0] = sum.re;
+    if (out->complex) out->data[1] = sum.im;
+    return 0;
+}
+
+}  // namespace
+}  // namespace wavkit
+
+int dspb_ritoc(const dsp* a, const dsp* b, dsp* out) { return wavkit::join_parts(a, b, out); }
+int dspfb_ritoc(const dspf* a, const dspf* b, dspf* out) { return wavkit::join_parts(a, b, out); }
+
+int dspb_pmul(const dsp* a, const dsp* b, dsp* out) {
+    return wavkit::multiply_polynomials(a, b, out);
+}
+int dspfb_pmul(const dspf* a, const dspf* b, dspf* out) {
+    return wavkit::multiply_polynomials(a, b, out);
+}
+
+int dspbs_dot(const dsp* a, const dsp* b, dsp* out) { return wavkit::dot_product(a, b, out); }
+int dspfbs_dot(const dspf* a, const dspf* b, dspf* out) { return wavkit::dot_product(a, b, out); }

@@ -1,0 +1,223 @@
+// All roots of a real polynomial of degree 5 at most, in closed form.
+#include <algorithm>
+#include <array>
+
+#include "polynomial/polynomial.hpp"
+
+namespace wavkit {
+namespace {
+
+template <class T>
+using Coefficients = std::span<const T>;
+
+/// Roots in their order; a complex one is followed by its conjugate.
+template <class T>
+struct Roots {
+    std::array<Bin<T>, 5> z{};
+    std::size_t count = 0;
+    bool complex = false;
+
+    std::span<Bin<T>> all() { return std::span(z).first(count); }
+    std::span<const Bin<T>> all() const { return std::span(z).first(count); }
+
+    void add(T re) { z[count++] = {re, 0}; }
+    void add_pair(T re, T im) {
+        z[count++] = {re, im};
+        z[count++] = {re, -im};
+        complex = true;
+    }
+    void add(const Roots& more) {
+        for (const auto& root : more.all()) z[count++] = root;
+        complex = complex || more.complex;
+    }
+    void insert(std::size_t at, T re) {
+        z[count++] = {re, 0};
+        std::rotate(z.begin() + at, z.begin() + count - 1, z.begin() + count);
+    }
+};
+
+template <class T>
+Roots<T> solve_linear(T c1, T c0) {
+    Roots<T> roots;
+    roots.add(-c0 / c1);
+    return roots;
+}
+
+/// c2 x^2 + c1 x + c0; real roots follow from their sum and product without cancellation.
+template <class T>
+Roots<T> solve_quadratic(T c2, T c1, T c0) {
+    Roots<T> roots;
+    const T discriminant = c1 * c1 - 4 * c2 * c0;
+    if (discriminant < T(0)) {
+        const T twice = 2 * c2;
+        roots.add_pair(-c1 / twice, -std::fabs(std::sqrt(-discriminant) / twice));
+        return roots;
+    }
+    const T s = c1 > T(0) ? -std::sqrt(discriminant) : std::sqrt(discriminant);
+    const T q = (s - c1) / 2;
+    T low = q / c2, high = q == T(0) ? c0 : c0 / q;
+    if (high < low) std::swap(low, high);
+    roots.add(low);
+    roots.add(high);
+    return roots;
+}
+
+/// x^3 + b2 x^2 + b1 x + b0: Cardano's formula where one root is real, Vieta's cosines where three
+/// are.
+template <class T>
+Roots<T> solve_cubic(T b2, T b1, T b0) {
+    const T third_turn = pi<T> / 3, half_root_of_3 = std::sqrt(T(3)) / 2;
+    const T p = b2 / 3;
+    const T q = b1 / 3 - p * p;
+    const T r = (b1 / 2 - p * p) * p - b0 / 2;
+    const T discriminant = r * r + q * q * q;
+    Roots<T> roots;
+    if (discriminant > T(0)) {
+        const T s = std::sqrt(discriminant);
+        const T outer = r > T(0) ? std::cbrt(s + r) : -std::cbrt(s - r);
+        const T inner = -q / outer;
+        const T sum = outer + inner;
+        roots.add(sum - p);
+        roots.add_pair(-sum / 2 - p, -std::fabs(outer - inner) * half_root_of_3);
+    } else {
+        const T cosine = q == T(0) ? T(1) : r / (-q * std::sqrt(-q));
+        const T angle = std::acos(std::clamp(cosine, T(-1), T(1))) / 3;
+        const T m = 2 * std::sqrt(-q);
+        roots.add(-m * std::cos(angle - third_turn) - p);
+        roots.add(-m * std::cos(angle + third_turn) - p);
+        roots.add(m * std::cos(angle) - p);
+    }
+    return roots;
+}
+
+/// The root of the resolvent cubic that splits the quartic into two real quadratics; down to
+/// -noise, a square counts as 0.
+template <class T>
+T splitting_root(T b3, T b2, T b1, T b0, T noise) {
+    const std::array resolvent{-b0 * b3 * b3 + 4 * b0 * b2 - b1 * b1, b3 * b1 - 4 * b0, -b2, T(1)};
+    auto roots = solve_cubic(resolvent[2], resolvent[1], resolvent[0]);
+    correct<T>(resolvent, roots.all());
+    if (roots.complex) return roots.z[0].re;
+    const auto splits = [&](T y) {
+        return !(y + b3 * b3 / 4 - b2 < -noise) && !(y * y / 4 - b0 < -noise);
+    };
+    for (const std::size_t i : {1, 2}) {
+        if (splits(roots.z[i].re)) return roots.z[i].re;
+    }
+    return roots.z[0].re;
+}
+
+/// x^4 + b3 x^3 + b2 x^2 + b1 x + b0 by Ferrari's method: (x^2 + g1 x + h1)(x^2 + g2 x + h2) with
+/// g = b3 / 2 +- r and h = y / 2 +- w, of a root y of the resolvent cubic.
+template <class T>
+Roots<T> solve_quartic(T b3, T b2, T b1, T b0, T noise) {
+    const T y = splitting_root(b3, b2, b1, b0, noise);
+    const T half = y / 2;
+    const T w = std::sqrt(std::max(y * y / 4 - b0, T(0)));
+    T r = std::sqrt(std::max(y + b3 * b3 / 4 - b2, T(0)));
+    if (half * b3 - b1 < T(0)) r = -r;
+    const T h1 = half + w;
+    const bool cancels = half >= T(0) && b0 != T(0) && h1 != T(0);
+    const T h2 = cancels ? b0 / h1 : half - w;
+    Roots<T> roots = solve_quadratic(T(1), b3 / 2 + r, h1);
+    Roots<T> others = solve_quadratic(T(1), b3 / 2 - r, h2);
+
+    // Real roots before complex ones; of two pairs the one with the smaller real part first.
+    if (roots.complex == others.complex ? r < T(0) : roots.complex) std::swap(roots, others);
+    roots.add(others);
+    return roots;
+}
+
+/// The power of two in which x is measured so that the largest coefficients of the monic polynomial
+/// come near 1: nothing overflows then, and noise is a matter of epsilons.
+template <class T>
+T unit_of(Coefficients<T> c) {
+    int exponent = std::numeric_limits<int>::min();
+    for (std::size_t k = 1; k < c.size(); ++k) {
+        const T b = c[c.size() - 1 - k] / c.back();
+        if (b != T(0) && std::isfinite(b)) exponent = std::max(exponent, std::ilogb(b) / int(k));
+    }
+    return exponent == std::numeric_limits<int>::min() ? T(1) : std::ldexp(T(1), exponent);
+}
+
+/// Degrees 3 and 4 in the arithmetic of residuals, since a difference decides which roots are real.
+template <class T>
+Roots<T> solve_scaled(Coefficients<T> c) {
+    using W = wider<T>;
+    constexpr W noise = 8 * std::numeric_limits<T>::epsilon();
+    const std::size_t degree = c.size() - 1;
+    std::array<W, 4> b;  // of x^0 ... x^(degree - 1)
+    const W unit = unit_of(c);
+    W power = 1;
+    for (std::size_t k = degree; k-- > 0;) {
+        power *= unit;
+        b[k] = W(c[k]) / W(c[degree]) / power;
+    }
+    const Roots<W> wide =
+        degree == 3 ? solve_cubic(b[2], b[1], b[0]) : solve_quartic(b[3], b[2], b[1], b[0], noise);
+    Roots<T> roots;
+    for (const auto& z : wide.all()) roots.z[roots.count++] = convert<T>(z * unit);
+    roots.complex = wide.complex;
+    return roots;
+}
+
+/// One real root by search, the others from the quartic that remains. Among complex roots the real
+/// one is placed by the first two alone.
+template <Record R>
+bool solve_quintic(const R* polynomial, Roots<scalar<R>>& roots) {
+    using T = scalar<R>;
+    Temporary<R> found;
+    if (dsps_psolve(polynomial, found, 0)) return false;
+    const T r = found->data[0];
+    std::array<T, 6> c;
+    std::ranges::copy(values(polynomial), c.begin());
+    divide_by_root<T>(c, r);
+    roots = solve_scaled<T>(std::span(c).first(5));
+    const auto& z = roots.z;
+    if (!roots.complex) {
+        roots.add(r);
+    } else if (z[0].im != T(0) || z[0].re > r) {
+        roots.insert(0, r);
+    } else {
+        roots.insert(z[1].re > r ? 1 : 2, r);
+    }
+    return true;
+}
+
+template <Record R>
+int write(const Roots<scalar<R>>& roots, R* out) {
+    out->points = int(roots.count);
+    out->complex = roots.complex;
+    if (dsp_alloc(out)) return -1;
+    for (std::size_t i = 0; i < roots.count; ++i) {
+        if (roots.complex) {
+            bins(out)[i] = roots.z[i];
+        } else {
+            out->data[i] = roots.z[i].re;
+        }
+    }
+    return 0;
+}
+
+template <Record R>
+int solve(const R* polynomial, R* out) {
+    using T = scalar<R>;
+    if (polynomial->complex || polynomial->points > 6) return -1;
+    const Coefficients<T> c = without_leading_zeros(values(polynomial));
+    Roots<T> roots;
+    if (c.size() == 2) roots = solve_linear(c[1], c[0]);
+    if (c.size() == 3) roots = solve_quadratic(c[2], c[1], c[0]);
+    if (c.size() == 4 || c.size() == 5) roots = solve_scaled(c);
+    if (c.size() == 6 && !solve_quintic(polynomial, roots)) return -1;
+    // The closed forms lose half of the digits where an inner square root vanishes.
+    if (c.size() > 3) correct(c, roots.all());
+    if (out == polynomial) out->delta = 1;
+    if (write(roots, out)) return -1;
+    return roots.complex || roots.count < 4 ? 0 : dspi_sort(out);
+}
+
+}  // namespace
+}  // namespace wavkit
+
+int dsps_proots(const dsp* polynomial, dsp* out) { return wavkit::solve(polynomial, out); }
+int dspfs_proots(const dspf* polynomial, dspf* out) { return wavkit::solve(polynomial, out); }

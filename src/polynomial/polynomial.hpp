@@ -1,0 +1,160 @@
+// Polynomials in ascending powers: evaluation, division by a root, correction of a root.
+#pragma once
+
+#include <algorithm>
+
+#include "record_view.hpp"
+
+namespace wavkit {
+
+/// The coefficients up to the highest that is not 0.
+template <class T>
+std::span<T> without_leading_zeros(std::span<T> c) {
+    std::size_t n = c.size();
+    while (n > 0 && c[n - 1] == T(0)) --n;
+    return c.first(n);
+}
+
+/// A polynomial's value and first derivative at one place.
+template <class Z>
+struct Tangent {
+    Z value, slope;
+};
+
+/// The arithmetic of residuals, which near a root are what cancellation leaves over: the next wider
+/// type that the processor has.
+template <class T>
+using wider = std::conditional_t<
+    std::same_as<T, float>, double,
+    std::conditional_t<std::numeric_limits<long double>::digits == 64, long double, T>>;
+
+template <class To, class T>
+To convert(T value) {
+    return To(value);
+}
+
+template <class To, class T>
+Bin<To> convert(Bin<T> z) {
+    return {To(z.re), To(z.im)};
+}
+
+/// p(z) and p'(z) by Horner's rule in one pass, for a real or complex z, in the arithmetic of W.
+template <class W, class T, class Z>
+Tangent<Z> tangent_in(std::span<const T> c, Z place) {
+    const auto z = convert<W>(place);
+    auto value = convert<W>(Z{}), slope = value;
+    for (std::size_t k = c.size(); k-- > 0;) {
+        slope = slope * z + value;
+        value = value * z + W(c[k]);
+    }
+    return {convert<T>(value), convert<T>(slope)};
+}
+
+template <class T, class Z>
+Tangent<Z> tangent(std::span<const T> c, Z z) {
+    return tangent_in<wider<T>>(c, z);
+}
+
+/// Where a division from the top coefficient down meets one from the lowest up: at the largest
+/// terms |c[k] z^k| of a root z, the first of `width` neighbours. Farther on, either would lose
+/// digits to the roots beyond z (G. Peters and J. H. Wilkinson, "Practical problems arising in the
+/// solution of polynomial equations", 1971).
+template <class T>
+std::size_t meeting_place(std::span<const T> c, T modulus, std::size_t width) {
+    std::size_t place = 0;
+    T largest = 0, term = 0, power = 1;
+    for (std::size_t k = 0; k < c.size(); ++k, power *= modulus) {
+        const T last = term;
+        term = std::fabs(c[k]) * power;
+        const T sum = width == 2 ? last + term : term;
+        if (k + 1 >= width && sum > largest) {
+            largest = sum;
+            place = k + 1 - width;
+        }
+    }
+    return place;
+}
+
+/// Divides by x - root; the quotient takes all places but the last.
+template <class T>
+void divide_by_root(std::span<T> c, T root) {
+    const std::size_t place = meeting_place<T>(c, std::fabs(root), 1);
+    for (std::size_t k = c.size() - 1; k > place; --k) c[k - 1] += root * c[k];
+    for (std::size_t k = 0; k < place; ++k) {
+        c[k] = -c[k] / root;
+        c[k + 1] -= c[k];
+    }
+    std::shift_left(c.begin() + place, c.end(), 1);
+}
+
+/// Divides by x^2 - 2 re x + (re^2 + im^2), in all places but the last two.
+template <class T>
+void divide_by_pair(std::span<T> c, Bin<T> root) {
+    const T sum = 2 * root.re, product = magnitude_squared(root);
+    const std::size_t place = meeting_place<T>(c, std::sqrt(product), 2);
+    for (std::size_t k = c.size() - 1; k > place + 1; --k) {
+        c[k - 1] += sum * c[k];
+        c[k - 2] -= product * c[k];
+    }
+    for (std::size_t k = 0; k < place; ++k) {
+        c[k] /= product;
+        c[k + 1] += sum * c[k];
+        c[k + 2] -= c[k];
+    }
+    std::shift_left(c.begin() + place, c.end(), 2);
+}
+
+template <class T>
+Bin<T> ratio(Bin<T> a, Bin<T> b) {
+    return a * conj(b) * (T(1) / magnitude_squared(b));
+}
+
+/// |re| + |im|, which neither overflows nor vanishes before its parts do.
+template <class T>
+T one_norm(Bin<T> z) {
+    return std::fabs(z.re) + std::fabs(z.im);
+}
+
+/// One step of the Ehrlich-Aberth iteration for a root: Newton's step freed from the pull of the
+/// other roots, here a quarter of the way to the nearest one at most. A step that does not lower
+/// the residual is not taken. Tells whether the root moved.
+template <class T>
+bool improve(std::span<const T> c, std::span<const Bin<T>> roots, Bin<T>& root) {
+    const auto at = tangent(c, root);
+    Bin<T> pull{0, 0};
+    T nearest = std::numeric_limits<T>::max();
+    for (const auto& other : roots) {
+        if (&other == &root) continue;
+        const auto away = root - other;
+        pull += ratio(Bin<T>{1, 0}, away);
+        nearest = std::min(nearest, one_norm(away));
+    }
+    const auto newton = ratio(at.value, at.slope);
+    auto step = ratio(newton, T(1) - newton * pull);
+    if (root.im == T(0)) step.im = 0;
+    if (one_norm(step) > nearest / 4) step = step * (nearest / 4 / one_norm(step));
+    const auto next = root - step;
+    if (!(one_norm(tangent(c, next).value) < one_norm(at.value))) return false;
+    root = next;
+    return true;
+}
+
+/// Corrects all roots of a polynomial together, complex ones standing before their conjugates (O.
+/// Aberth, "Iteration methods for finding all zeros of a polynomial simultaneously", 1973). What is
+/// real stays real, conjugates stay conjugate, no two roots become one.
+template <class T>
+void correct(std::span<const T> c, std::span<Bin<T>> roots) {
+    constexpr int most = 16;
+    bool moved = true;
+    for (int sweep = 0; moved && sweep < most; ++sweep) {
+        moved = false;
+        for (std::size_t i = 0; i < roots.size(); ++i) {
+            moved |= improve<T>(c, roots, roots[i]);
+            if (roots[i].im == T(0)) continue;
+            roots[i + 1] = conj(roots[i]);
+            ++i;
+        }
+    }
+}
+
+}  // namespace wavkit

@@ -1,0 +1,282 @@
+// Life of a signal record: buffers, copies, ranges, comparison.
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <functional>
+
+#include "record_view.hpp"
+
+namespace wavkit {
+namespace {
+
+template <Record R>
+struct Hooks {
+    void (*alloc)(R*) = nullptr;
+    void (*realloc)(R*, int, int) = nullptr;
+    void (*free)(R*) = nullptr;
+};
+
+template <Record R>
+Hooks<R> hooks;
+
+constexpr std::size_t largest_block = std::numeric_limits<int>::max();
+
+template <Record R>
+bool fits(const R* x) {
+    return used(x) <= std::size_t(x->alloc > 0 ? x->alloc : 0);
+}
+
+template <Record R>
+int without_memory(R* x) {
+    x->data = nullptr;
+    x->alloc = 0;
+    return -1;
+}
+
+template <Record R>
+int init(R* x) {
+    *x = R{1, nullptr, 0, 0, 0, 0};
+    return 0;
+}
+
+template <Record R>
+void release(R* x) {
+    if (x->alloc <= 0) return;
+    if (hooks<R>.free) {
+        hooks<R>.free(x);
+    } else {
+        std::free(x->data);
+    }
+}
+
+template <Record R>
+int allocate(R* x) {
+    if (fits(x)) return 0;
+    const std::size_t need = used(x);
+    if (need > largest_block) {
+        release(x);
+        return without_memory(x);
+    }
+    if (hooks<R>.alloc) {
+        hooks<R>.alloc(x);
+    } else {
+        if (x->alloc > 0) std::free(x->data);
+        x->data = static_cast<scalar<R>*>(std::malloc(need * sizeof(scalar<R>)));
+    }
+    if (!x->data) return without_memory(x);
+    x->alloc = int(need);
+    return 0;
+}
+
+template <Record R>
+int reallocate(R* x, int old_points, int old_complex) {
+    if (fits(x)) return 0;
+    const std::size_t need = used(x);
+    if (need > largest_block) return without_memory(x);
+    const scalar<R>* borrowed = nullptr;
+    if (x->alloc < 1) {
+        borrowed = x->data;
+        x->data = nullptr;
+    }
+    if (hooks<R>.realloc) {
+        hooks<R>.realloc(x, old_points, old_complex);
+    } else {
+        x->data = static_cast<scalar<R>*>(std::realloc(x->data, need * sizeof(scalar<R>)));
+    }
+    if (!x->data) return without_memory(x);
+    if (borrowed && old_points > 0) {
+        const std::size_t had = std::size_t(old_points) * (old_complex ? 2 : 1);
+        std::memcpy(x->data, borrowed, std::min(had, need) * sizeof(scalar<R>));
+    }
+    x->alloc = int(need);
+    return 0;
+}
+
+template <Record R>
+int destroy(R* x) {
+    release(x);
+    return init(x);
+}
+
+template <Record R>
+int subvec(const R* source, R* destination, int start, int count) {
+    const int available = int(length(source));
+    const int first = std::clamp(start, 0, available);
+    const int kept = std::clamp(count, 0, available - first);
+    const R from = *source;  // the two may be one record
+    const bool shared = destination->data == from.data;
+    const int had = destination->points, had_complex = destination->complex;
+
+    destination->points = kept;
+    destination->complex = from.complex;
+    destination->delta = from.delta;
+    if (shared && destination->alloc < 1 && kept > 0) {
+        // A borrowed buffer may be larger than what is kept of it, and is not the record's to
+        // change: cut the range into a block of its own.
+        destination->data = nullptr;
+        if (dsp_alloc(destination)) return -1;
+        std::memcpy(destination->data, from.data + std::size_t(first) * width(&from),
+                    used(destination) * sizeof(scalar<R>));
+        return 0;
+    }
+    if (shared ? dsp_realloc(destination, had, had_complex) : dsp_alloc(destination)) return -1;
+    const scalar<R>* begin = shared ? destination->data : from.data;
+    if (kept > 0 && (!shared || first > 0)) {
+        std::memmove(destination->data, begin + std::size_t(first) * width(&from),
+                     used(destination) * sizeof(scalar<R>));
+    }
+    return 0;
+}
+
+/// Whether the samples of `x` lie in the block that `owner` may move or write to as it grows.
+template <Record R>
+bool lies_within(const R* x, const R* owner) {
+    const std::less<> before;
+    return owner->alloc > 0 && !before(x->data, owner->data) &&
+           before(x->data, owner->data + owner->alloc);
+}
+
+template <Record R>
+int append(R* destination, const R* source) {
+    if (lies_within(source, destination)) {
+        Temporary<R> copy;
+        return status(dsp_copy(copy, source) || append<R>(destination, copy));
+    }
+    if (source->complex && !destination->complex && dspi_rtoc(destination)) return -1;
+    const int old = int(length(destination));
+    const int added = int(length(source));
+    if (added > std::numeric_limits<int>::max() - old) return without_memory(destination);
+    destination->points = old + added;
+    if (dsp_realloc(destination, old, destination->complex)) return -1;
+
+    if (destination->complex && !source->complex) {
+        const auto tail = bins(destination).subspan(old);
+        for (int i = 0; i < added; ++i) tail[i] = {source->data[i], 0};
+    } else if (added > 0) {
+        std::memcpy(destination->data + std::size_t(old) * width(destination), source->data,
+                    used(source) * sizeof(scalar<R>));
+    }
+    return 0;
+}
+
+template <Record R>
+int promote(R* x) {
+    if (x->complex) return 0;
+    x->complex = 1;
+    if (dsp_realloc(x, x->points, 0)) return -1;
+    for (std::size_t i = length(x); i-- > 0;) bins(x)[i] = {x->data[i], 0};
+    return 0;
+}
+
+/// 1, -1 or 0: whether a difference lies above, below or within the tolerance (a NaN lies within).
+template <class T>
+int sign_beyond(T difference, T tolerance) {
+    if (difference > tolerance) return 1;
+    if (difference < -tolerance) return -1;
+    return 0;
+}
+
+template <Record R>
+int compare_samples(const R* a, const R* b, scalar<R> tolerance) {
+    using T = scalar<R>;
+    const auto sample = [](const R* x, std::size_t i) {
+        return x->complex ? bins(x)[i] : Bin<T>{x->data[i], 0};
+    };
+    const bool any_complex = a->complex || b->complex;
+    for (std::size_t i = 0; i < length(a); ++i) {
+        const Bin<T> p = sample(a, i), q = sample(b, i);
+        if (const int sign = sign_beyond(p.re - q.re, tolerance)) return sign;
+        if (!any_complex) continue;
+        if (const int sign = sign_beyond(p.im - q.im, tolerance)) return sign;
+    }
+    return 0;
+}
+
+template <Record R>
+int compare(const R* a, const R* b, scalar<R> tolerance, int* result) {
+    if (a->points != b->points) return -1;
+    *result = sign_beyond<scalar<R>>(a->delta - b->delta, tolerance);
+    if (*result == 0) *result = compare_samples(a, b, tolerance);
+    return 0;
+}
+
+template <class Hook>
+int install(Hook& slot, Hook hook, Hook* previous) {
+    if (previous) *previous = slot;
+    slot = hook;
+    return 0;
+}
+
+}  // namespace
+}  // namespace wavkit
+
+int dsp_init(dsp* record) { return wavkit::init(record); }
+int dspf_init(dspf* record) { return wavkit::init(record); }
+
+int dsp_alloc(dsp* record) { return wavkit::allocate(record); }
+int dspf_alloc(dspf* record) { return wavkit::allocate(record); }
+
+int dsp_realloc(dsp* record, int old_points, int old_complex) {
+    return wavkit::reallocate(record, old_points, old_complex);
+}
+int dspf_realloc(dspf* record, int old_points, int old_complex) {
+    return wavkit::reallocate(record, old_points, old_complex);
+}
+
+int dsp_destroy(dsp* record) { return wavkit::destroy(record); }
+int dspf_destroy(dspf* record) { return wavkit::destroy(record); }
+
+int dspu_subvec(const dsp* source, dsp* destination, int start, int count) {
+    return wavkit::subvec(source, destination, start, count);
+}
+int dspfu_subvec(const dspf* source, dspf* destination, int start, int count) {
+    return wavkit::subvec(source, destination, start, count);
+}
+
+int dsp_copy(dsp* destination, const dsp* source) {
+    return dspu_subvec(source, destination, 0, source->points);
+}
+int dspf_copy(dspf* destination, const dspf* source) {
+    return dspfu_subvec(source, destination, 0, source->points);
+}
+
+int dsp_copy_at_most(dsp* destination, const dsp* source, int n) {
+    return dspu_subvec(source, destination, 0, n);
+}
+int dspf_copy_at_most(dspf* destination, const dspf* source, int n) {
+    return dspfu_subvec(source, destination, 0, n);
+}
+
+int dsp_append(dsp* destination, const dsp* source) { return wavkit::append(destination, source); }
+int dspf_append(dspf* destination, const dspf* source) {
+    return wavkit::append(destination, source);
+}
+
+int dsp_cmp(const dsp* a, const dsp* b, double tolerance, int* result) {
+    return wavkit::compare(a, b, tolerance, result);
+}
+int dspf_cmp(const dspf* a, const dspf* b, float tolerance, int* result) {
+    return wavkit::compare(a, b, tolerance, result);
+}
+
+int dspi_rtoc(dsp* record) { return wavkit::promote(record); }
+int dspfi_rtoc(dspf* record) { return wavkit::promote(record); }
+
+int dsp_lib_alloc(dsp_alloc_hook hook, dsp_alloc_hook* previous) {
+    return wavkit::install(wavkit::hooks<dsp>.alloc, hook, previous);
+}
+int dspf_lib_alloc(dspf_alloc_hook hook, dspf_alloc_hook* previous) {
+    return wavkit::install(wavkit::hooks<dspf>.alloc, hook, previous);
+}
+int dsp_lib_realloc(dsp_realloc_hook hook, dsp_realloc_hook* previous) {
+    return wavkit::install(wavkit::hooks<dsp>.realloc, hook, previous);
+}
+int dspf_lib_realloc(dspf_realloc_hook hook, dspf_realloc_hook* previous) {
+    return wavkit::install(wavkit::hooks<dspf>.realloc, hook, previous);
+}
+int dsp_lib_free(dsp_free_hook hook, dsp_free_hook* previous) {
+    return wavkit::install(wavkit::hooks<dsp>.free, hook, previous);
+}
+int dspf_lib_free(dspf_free_hook hook, dspf_free_hook* previous) {
+    return wavkit::install(wavkit::hooks<dspf>.free, hook, previous);
+}

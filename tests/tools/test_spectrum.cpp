@@ -1,0 +1,194 @@
+// Measured spectra against sines of known frequency and amplitude, and real recordings.
+#include <algorithm>
+
+#include "tools/program.hpp"
+
+namespace wavkit::test {
+namespace {
+
+using SpectrumTest = ProgramTest;
+using Signals = std::vector<Signal<dsp>>;
+
+/// How far a peak between bins may be off, in bins and in relative amplitude; the guide states the
+/// same figures.
+struct Accuracy {
+    const char* window;
+    double bins, amplitude;
+};
+constexpr Accuracy accuracies[] = {
+    {"Uniform", 0.24, 0.32},       {"Bartlett", 0.022, 0.07},     {"Hann", 0.017, 0.04},
+    {"Hamming", 0.017, 0.05},      {"Blackman", 0.007, 0.012},    {"Blackman_Harris3", 0.006, 0.01},
+    {"Lowleak", 0.0032, 0.0036},   {"Gausstop", 5e-6, 0.001},     {"Flat4", 0.16, 0.0006},
+    {"Flattop", 0.16, 0.0004},     {"Flat6", 0.17, 0.0003},       {"Flat7", 0.17, 0.0002},
+    {"P501", 0.17, 0.0003},        {"P601", 0.17, 0.0002},        {"Kaiser70", 0.0052, 0.0075},
+    {"Kaiser80", 0.004, 0.0052},   {"Kaiser90", 0.0032, 0.0037},  {"Kaiser100", 0.0027, 0.0028},
+    {"Kaiser110", 0.0023, 0.0022}, {"Kaiser120", 0.0019, 0.0017}, {"Gauss60", 0.003, 0.003},
+    {"Gauss70", 0.001, 0.001},     {"Gauss80", 0.0005, 0.0005},   {"Riemann", 0.033, 0.15},
+};
+
+TEST_F(SpectrumTest, EveryWindowReadsASineOnABinAndBetweenBins) {
+    write("on.dsp", Signals{sine(1024, 200, 3, 1e-3)});
+    const double bin = 1000.0 / 1024;
+    for (const auto& [window, bins, amplitude] : accuracies) {
+        SCOPED_TRACE(window);
+        const std::string options = std::string(" --window ") + window;
+        const auto table = rows(printed("spectrum on.dsp -o - --to csv" + options));
+        ASSERT_EQ(table.size(), 513u);
+        EXPECT_DOUBLE_EQ(table[200][0], 200 * bin);
+        EXPECT_NEAR(table[200][1], 3,
+                    3 * 0.0006);  // flat windows are scaled for the middle of their error
+        EXPECT_NEAR(table[400][1], 0, 2e-5);
+
+        for (const double offset : {-0.45, -0.3, -0.12, 0.2, 0.37, 0.49}) {
+            write("off.dsp", Signals{sine(1024, 200 + offset, 3, 1e-3)});
+            const auto peak = rows(printed("spectrum off.dsp --peaks 1" + options)).at(0);
+            EXPECT_NEAR(peak[0] / bin, 200 + offset, bins + 2e-6);
+            EXPECT_NEAR(peak[1], 1 / peak[0], 1e-7);
+            EXPECT_NEAR(peak[2] / 3, 1, amplitude + 1e-5);
+        }
+    }
+}
+
+TEST_F(SpectrumTest, PaddingAndShortRecordsKeepTheScale) {
+    write("x.dsp", Signals{sine(1000, 100.3, 2, 0.01)});  // 10.03 Hz
+    for (const auto& [window, bins, amplitude] : accuracies) {
+        for (const std::string options : {"", "--fraction 0.5", "--points 512", "--points 5000"}) {
+            SCOPED_TRACE(std::string(window) + " " + options);
+            const auto peak = rows(printed(std::string("spectrum x.dsp --peaks 1 --window ") +
+                                           window + " " + options))
+                                  .at(0);
+            EXPECT_NEAR(peak[0], 10.03, 0.5 * 100.0 / 512);
+            EXPECT_NEAR(peak[2] / 2, 1, amplitude + 0.002);
+        }
+    }
+}
+
+TEST_F(SpectrumTest, SidesConstantsAndDecibels) {
+    std::vector<long double> samples;
+    for (int i = 0; i < 64; ++i)
+        samples.push_back(5 + 2 * std::cos(pi<long double> * i / 8) + i % 2);
+    write("x.dsp", Signals{real<dsp>(samples, 0.25)});
+    const auto spectrum = [&](const std::string& options) {
+        return rows(printed("spectrum x.dsp --window none -o - --to csv " + options));
+    };
+    const auto one = spectrum("");
+    ASSERT_EQ(one.size(), 33u);
+    EXPECT_NEAR(one[0][1], 5.5, 1e-12);  // the constant as itself
+    EXPECT_NEAR(one[4][1], 2, 1e-12);
+    EXPECT_NEAR(one[32][1], 0.5, 1e-12);  // and the alternation of +-0.5
+    EXPECT_EQ(one[32][0], 2);
+
+    const auto two = spectrum("--two-sided");
+    ASSERT_EQ(two.size(), 64u);
+    EXPECT_EQ(two[0][0], -2);
+    EXPECT_NEAR(two[28][1], 1, 1e-12);
+    EXPECT_NEAR(two[32][1], 5.5, 1e-12);
+    EXPECT_NEAR(two[36][1], 1, 1e-12);
+    EXPECT_EQ(two[36][0], 0.25);
+
+    EXPECT_NEAR(spectrum("--db")[4][1], 20 * std::log10(2.0), 1e-12);
+    EXPECT_NEAR(spectrum("--detrend")[0][1], 0, 1e-12);
+    const auto parts = spectrum("--complex")[4];
+    EXPECT_NEAR(std::hypot(parts[1], parts[2]), 2, 1e-12);
+    const auto band = spectrum("--band 0.18 0.32");
+    ASSERT_EQ(band.size(), 3u);
+    EXPECT_EQ(band[0][0], 0.1875);
+
+    // A signal file holds what the library gives.
+    printed("spectrum x.dsp --window hamming -o x.sig");
+    Signal<dsp> want;
+    ASSERT_EQ(dsph_fft(real<dsp>(samples, 0.25), want, 0, 1.0, DSP_WINDOW_HAMMING, 0), 0);
+    EXPECT_TRUE(matches<dsp>(read("x.sig").at(0), want));
+    EXPECT_EQ(read("x.sig")[0]->delta, want->delta);
+    printed("spectrum x.dsp --window hamming --db -o x.sig");
+    EXPECT_EQ(read("x.sig").at(0)->complex, 0);
+
+    // Seven samples through a window that fills its record: half a bin short of half the rate.
+    write("odd.dsp", Signals{real<dsp>({1, 1, 1, 1, 1, 1, 1})});
+    const auto odd = rows(printed("spectrum odd.dsp --window kaiser70 -o - --to csv"));
+    ASSERT_EQ(odd.size(), 4u);
+    EXPECT_NEAR(odd[0][1], 1, 1e-12);
+    EXPECT_DOUBLE_EQ(odd[3][0], 3.0 / 7);
+    ASSERT_EQ(dsph_dft(real<dsp>({1, 1, 1, 1, 1, 1, 1}), want, DSP_WINDOW_KAISER70, 0), 0);
+    EXPECT_NEAR(odd[3][1], std::hypot(want[6], want[7]), 1e-15);
+
+    write("z.dsp", Signals{complex<dsp>({{0, 3}, {3, 0}, {0, -3}, {-3, 0}})});  // 3 at -1/4
+    EXPECT_EQ(rows(printed("spectrum z.dsp --window none --peaks 1")).at(0),
+              (std::vector<double>{-0.25, 4, 3}));
+}
+
+TEST_F(SpectrumTest, UnusableSignalsAreRefused) {
+    write("nan.txt", "1\n2\nnan\n");
+    write("flat.txt", "#DSP delta = 0\n1\n2\n");
+    write("empty.txt", "#DSP points = 0\n");
+    EXPECT_NE(shell("wavkit spectrum nan.txt").err.find("sample 2 is not a finite number"),
+              std::string::npos);
+    EXPECT_NE(shell("wavkit spectrum flat.txt").err.find("gives no frequencies"),
+              std::string::npos);
+    EXPECT_EQ(shell("wavkit spectrum empty.txt").status, 1);
+    write("one.txt", "7\n");
+    EXPECT_EQ(printed("spectrum one.txt --peaks 2"), "no peaks\n");
+}
+
+TEST_F(SpectrumTest, Pictures) {
+    write("x.dsp", Signals{sine(4096, 400, 1)});
+    printed("spectrum x.dsp --plot x.png --peaks 1");
+    EXPECT_TRUE(contents("x.png").starts_with("\x89PNG\r\n"));
+    EXPECT_EQ(printed("spectrum x.dsp --db --plot x.svg"), "");
+    EXPECT_NE(contents("x.svg").find("</svg>"), std::string::npos);
+    const auto drawing = printed("spectrum x.dsp --plot -");
+    EXPECT_NE(drawing.find("x.dsp"), std::string::npos);
+    EXPECT_GT(std::count(drawing.begin(), drawing.end(), '\n'), 20);
+
+    const auto before = files();
+    const auto done = shell("PATH=/nowhere; wavkit spectrum x.dsp --plot y.png");
+    EXPECT_EQ(done.status, 1);
+    EXPECT_NE(done.err.find("gnuplot"), std::string::npos) << done.err;
+    EXPECT_EQ(files(), before);
+}
+
+TEST_F(SpectrumTest, SunspotsHaveACycleOfElevenYears) {
+    const std::string data = WAVKIT_DATA "/sunspots-yearly.txt";
+    for (const std::string window : {"Hann", "Gausstop", "Kaiser80", "Flattop"}) {
+        const auto peak =
+            rows(printed("spectrum " + data + " --detrend --peaks 1 --window " + window)).at(0);
+        EXPECT_GT(peak[1], 10) << window;
+        EXPECT_LT(peak[1], 12) << window;
+    }
+}
+
+/// Beats of an electrocardiogram, counted where its slope is steep.
+std::vector<double> beats(const Signal<dsp>& x, double rate) {
+    std::vector<double> energy;
+    double sum = 0;
+    const auto slope2 = [&](int i) { return std::pow(x[i + 2] - x[i - 2], 2); };
+    for (int i = 50; i < x->points - 2; ++i) {
+        sum += slope2(i) - (i >= 95 ? slope2(i - 45) : 0);
+        energy.push_back(sum);
+    }
+    auto sorted = energy;
+    std::ranges::sort(sorted);
+    const double threshold = 0.18 * sorted[sorted.size() * 98 / 100];
+    std::vector<double> times;
+    for (std::size_t i = 0; i < energy.size(); ++i) {
+        const double t = double(i) / rate;
+        if (energy[i] > threshold && (times.empty() || t - times.back() > 0.25)) times.push_back(t);
+    }
+    return times;
+}
+
+TEST_F(SpectrumTest, TheHeartRateIsThatOfTheCountedBeats) {
+    const std::string data = WAVKIT_DATA "/ecg-360hz.txt";
+    const auto peak = rows(printed("spectrum " + data +
+                                   " --rate 360 --slope --detrend --peaks 1 "
+                                   "--band 0.5 4"))
+                          .at(0);
+    const auto times = beats(through(data).at(0), 360);
+    std::vector<double> intervals;
+    for (std::size_t i = 1; i < times.size(); ++i) intervals.push_back(times[i] - times[i - 1]);
+    std::ranges::sort(intervals);
+    EXPECT_NEAR(peak[1], intervals[intervals.size() / 2], 0.05 * peak[1]);
+}
+
+}  // namespace
+}  // namespace wavkit::test

@@ -1,0 +1,282 @@
+// wavkit design: the taps of a FIR filter, and what it does to the frequencies.
+#include <wavkit/dsp.h>
+
+#include <cmath>
+#include <cstdio>
+#include <map>
+#include <memory>
+
+#include "base/error.hpp"
+#include "base/options.hpp"
+#include "commands/commands.hpp"
+#include "files/csv.hpp"
+#include "files/recording.hpp"
+#include "measure/response.hpp"
+#include "measure/taps.hpp"
+#include "show/plot.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+/// A design by its name on the command line.
+struct Design {
+    int type;
+    std::size_t edges;        // frequencies that follow the name
+    std::size_t least, most;  // numbers in all
+    const char* takes;
+    Ideal ideal = Ideal::flat;
+    bool tapered = true;  // made for a window
+};
+
+const std::map<std::string, Design>& designs() {
+    constexpr const char *one = "one frequency", *two = "two frequencies";
+    constexpr const char *shape = "a parameter at most", *nothing = "no number";
+    static const std::map<std::string, Design> names{
+        {"lowpass", {DSP_FIR_LOW_PASS, 1, 1, 1, one}},
+        {"highpass", {DSP_FIR_HIGH_PASS, 1, 1, 1, one}},
+        {"bandpass", {DSP_FIR_BAND_PASS, 2, 2, 2, two}},
+        {"bandstop", {DSP_FIR_BAND_STOP, 2, 2, 2, two}},
+        {"delay", {DSP_FIR_DELAY, 1, 2, 2, "a frequency and a delay in samples"}},
+        {"differentiator", {DSP_FIR_DIFFERENTIATOR, 1, 1, 1, one, Ideal::derivative}},
+        {"hilbert", {DSP_FIR_HILBERT, 1, 1, 1, one}},
+        {"ramp", {DSP_FIR_RAMP, 1, 1, 1, one, Ideal::ramp}},
+        {"gauss", {DSP_FIR_GAUSS, 1, 1, 1, one, Ideal::flat, false}},
+        {"sinh", {DSP_FIR_SINH, 0, 0, 1, shape, Ideal::flat, false}},
+        {"sinh-over-root", {DSP_FIR_SINH_OVER_ROOT, 0, 0, 1, shape, Ideal::flat, false}},
+        {"fixed12", {DSP_FIR_FIXED_12, 0, 0, 0, nothing, Ideal::flat, false}},
+        {"fixed20", {DSP_FIR_FIXED_20, 0, 0, 0, nothing, Ideal::flat, false}}};
+    return names;
+}
+
+struct DesignOptions {
+    std::string name, out, plot;
+    std::vector<double> parameters;
+    std::optional<double> rate;
+    Tapering tapering;
+    WriteOptions writing;
+};
+
+/// What was asked for, with frequencies in cycles a sample.
+struct Request {
+    const Design& design;
+    std::vector<double> edges;
+    double other = 0;
+};
+
+Request request_of(const DesignOptions& options) {
+    const auto found = designs().find(CLI::detail::to_lower(options.name));
+    if (found == designs().end()) {
+        std::string known;
+        for (const auto& [name, design] : designs()) known += (known.empty() ? "" : ", ") + name;
+        throw UsageError("there is no design '" + options.name + "'; there are " + known);
+    }
+    const auto& design = found->second;
+    const auto& given = options.parameters;
+    if (given.size() < design.least || given.size() > design.most) {
+        throw UsageError(options.name + " takes " + design.takes);
+    }
+    const double rate = options.rate.value_or(1);
+    const auto edges = std::span(given).first(design.edges);
+    const auto problem = problem_with_edges(edges, rate);
+    if (!problem.empty()) throw UsageError(problem);
+    Request request{design, {}};
+    for (const double edge : edges) request.edges.push_back(edge / rate);
+    if (given.size() > design.edges) request.other = given[design.edges];
+    if (!std::isfinite(request.other)) throw UsageError("a parameter is a finite number");
+    return request;
+}
+
+/// A filter of which the library has one half, with the centre as its last tap.
+Signal fixed_taps(int type) {
+    Signal taps, mirrored;
+    check(dspc_fir2(taps, type) || dspu_subvec(taps, mirrored, 0, taps->points - 1) ||
+              dspi_rev(mirrored) || dsp_append(taps, mirrored),
+          "designing the filter");
+    return taps;
+}
+
+/// Smoothing filters, which are as long as their shape takes.
+Signal smoothing_taps(const Request& request, const Tapering& tapering) {
+    const int type = request.design.type;
+    if (tapering.transition || tapering.attenuation) {
+        throw UsageError("--transition and --attenuation are for designs with a stop band");
+    }
+    if (type == DSP_FIR_FIXED_12 || type == DSP_FIR_FIXED_20) {
+        if (tapering.length) throw UsageError("a fixed set of taps has its own length");
+        return fixed_taps(type);
+    }
+    if (type != DSP_FIR_GAUSS) return design(type, request.other, 0, tapering.length.value_or(11));
+    // Down to a ten-thousandth at the ends.
+    const double reach = std::ceil(0.57 / request.edges[0]);
+    if (!tapering.length && reach > 1e6) {
+        throw UsageError("so low an edge takes more than 2000000 taps; give --length");
+    }
+    const int length = tapering.length ? *tapering.length : 2 * int(reach) + 1;
+    return design(type, request.edges[0], 0, length);
+}
+
+Signal taps_of(const Request& request, const Tapering& tapering) {
+    if (request.design.tapered) {
+        return tapered_design(request.design.type, request.edges, request.other, tapering);
+    }
+    auto taps = smoothing_taps(request, tapering);
+    if (tapering.window) taper(taps, *tapering.window, 1.0 / taps->points);
+    return taps;
+}
+
+/// Frequencies as the user gave them.
+class Report {
+  public:
+    Report(const DesignOptions& options, const Request& request, const Signal& taps)
+        : options_(options), request_(request), taps_(taps), response_(response_of(taps)) {}
+
+    void print() const {
+        static const std::map<Symmetry, const char*> symmetries{
+            {Symmetry::even, "even"},
+            {Symmetry::odd, "odd: turns phases by 90 degrees"},
+            {Symmetry::none, "none"}};
+        const double delay =
+            middle() + (request_.design.type == DSP_FIR_DELAY ? request_.other : 0);
+        std::printf("design       %s\n", title().c_str());
+        std::printf("symmetry     %s\n", symmetries.at(symmetry_of(taps_)));
+        std::printf("delay        %s samples", number(delay).c_str());
+        if (options_.rate) std::printf(", %.6g s", delay / *options_.rate);
+        std::puts("");
+        const auto gain = relative_gain(response_, request_.design.ideal);
+        print_crossings("-3 dB at", crossings(gain, std::sqrt(0.5)));
+        print_crossings("-6 dB at", crossings(gain, 0.5));
+        for (const auto& band : bands_of(gain)) {
+            // A ramp's kink at 0 is beyond any filter, as a part of next to nothing.
+            if (band.passes && request_.design.ideal == Ideal::ramp) continue;
+            std::printf("%-12s %.6g to %.6g%s, ", band.passes ? "passes" : "stops",
+                        frequency(double(band.first)), frequency(double(band.last)), unit());
+            std::printf(band.passes ? "within %.3g dB\n" : "by %.4g dB\n",
+                        std::fabs(band.decibels));
+        }
+    }
+
+    void draw(const std::string& path) const {
+        Curve gain, phase;
+        gain.title = title();
+        gain.y_label = "gain (dB)";
+        gain.decibels = true;
+        phase.title = "phase, without the delay of " + number(middle()) + " samples";
+        phase.y_label = "phase (degrees)";
+        phase.filled = false;
+        phase.range = {-200, 200};
+        phase.y_tics = 90;
+        gain.x_label = phase.x_label =
+            options_.rate ? "frequency (Hz)" : "frequency (cycles a sample)";
+        const double highest = *std::ranges::max_element(response_.magnitude);
+        for (std::size_t i = 0; i < response_.magnitude.size(); ++i) {
+            // A zero would have no place on the axis, and has no phase.
+            const double magnitude = response_.magnitude[i];
+            gain.x.push_back(frequency(double(i)));
+            gain.y.push_back(20 * std::log10(std::max(magnitude, 1e-15)));
+            if (magnitude < 1e-9 * highest) continue;
+            phase.x.push_back(frequency(double(i)));
+            phase.y.push_back(response_.phase[i]);
+        }
+        tool::draw(std::vector{gain, phase}, path);
+    }
+
+  private:
+    double frequency(double position) const {
+        return response_.frequency(position) * options_.rate.value_or(1);
+    }
+    const char* unit() const { return options_.rate ? " Hz" : ""; }
+    double middle() const { return (taps_->points - 1) / 2.0; }
+
+    std::string title() const {
+        std::string text = options_.name;
+        for (const double parameter : options_.parameters) text += " " + number(parameter);
+        return text + ", " + std::to_string(taps_->points) + " taps";
+    }
+
+    void print_crossings(const char* label, const std::vector<double>& positions) const {
+        if (positions.empty()) return;
+        std::printf("%-12s", label);
+        for (std::size_t i = 0; i < positions.size(); ++i) {
+            std::printf("%s %.6g", i ? "," : "", frequency(positions[i]));
+        }
+        std::printf("%s\n", unit());
+    }
+
+    const DesignOptions& options_;
+    const Request& request_;
+    const Signal& taps_;
+    Response response_;
+};
+
+void run(DesignOptions& options) {
+    if (!options.plot.empty()) picture_of_name(options.plot);
+    if (options.out.empty() && options.writing.any()) {
+        throw UsageError("--to, --type, --bits and --with-time are for the output that -o names");
+    }
+    if (!options.out.empty()) options.writing.checked_format_for(options.out);
+    check_apart(options.out, options.plot);
+    const auto request = request_of(options);
+    if (options.tapering.transition && options.rate) *options.tapering.transition /= *options.rate;
+    auto taps = taps_of(request, options.tapering);
+    if (options.rate) taps->delta = 1 / *options.rate;
+    if (!options.out.empty()) write_recording(options.out, {&taps, 1}, options.writing);
+    if (!options.out.empty() && options.plot.empty()) return;
+    const Report report(options, request, taps);
+    if (options.plot.empty()) return report.print();
+    report.draw(options.plot);
+}
+
+constexpr const char* about =
+    R"(Designs, with frequencies as fractions of the sampling rate, or in hertz with --rate:
+  lowpass F         highpass F        bandpass F1 F2       bandstop F1 F2
+  delay F D         passes up to F and delays by D samples more, which need not be whole
+  differentiator F  derivative by the sample, up to F
+  hilbert F         turns the phase by 90 degrees, up to F
+  ramp F            gain 2 f, up to F
+  gauss F           Gaussian shape, -3 dB at F
+  sinh [A]          smoothing without negative lobes in time; the parameter shapes it
+  sinh-over-root [A]
+  fixed20           low-pass of 39 taps, made to halve the sampling rate
+  fixed12           23 taps
+
+At the edge F a filter passes half the amplitude, in the middle of the transition. The first eight
+are tapered by a Kaiser window unless --window names another one, and have as many taps as
+--transition and --attenuation take, or --length taps, an odd number of them for highpass and
+bandstop. gauss, sinh and sinh-over-root take --length, and a window only where one is named.
+
+Without -o or --plot a summary is printed: delay, where the gain is 3 and 6 dB down, and the bands
+with their ripple or the height of their highest lobe. For differentiator and ramp the gain is that
+over the ideal one; the pass band of a ramp has no figure.
+
+Examples:
+  wavkit design lowpass 1000 --rate 48000 --transition 200 --attenuation 80
+  wavkit design bandpass 0.1 0.2 --plot response.png -o taps.dsp
+  wavkit design hilbert 0.45 --length 101 -o - | wavkit filter tone.wav --taps - -o turned.wav)";
+
+}  // namespace
+
+void add_design(CLI::App& program) {
+    auto* const command = program.add_subcommand(
+        "design", "Designs a FIR filter: figures, taps, response in gain and phase.");
+    const auto options = std::make_shared<DesignOptions>();
+    command->add_option("DESIGN", options->name, "the design, see below")
+        ->required()
+        ->type_name("");
+    command->add_option("PARAMETERS", options->parameters, "its frequencies and parameters")
+        ->type_name("");
+    command->add_option("--rate", options->rate, "sampling rate: frequencies are in hertz")
+        ->check(positive_number())
+        ->type_name("RATE");
+    command->add_option("-o,--output", options->out, "write the taps; - is standard output")
+        ->type_name("FILE");
+    command
+        ->add_option("--plot", options->plot,
+                     "draw gain and phase into a .png or .svg file, or - the terminal")
+        ->type_name("FILE");
+    options->writing.declare(*command);
+    options->tapering.declare(*command);
+    command->footer(about);
+    command->callback([options] { run(*options); });
+}
+
+}  // namespace wavkit::tool

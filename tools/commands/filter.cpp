@@ -1,0 +1,319 @@
+// wavkit filter: signals of any length through FIR filters.
+#include <wavkit/dsp.h>
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <cstdio>
+#include <memory>
+
+#include "base/error.hpp"
+#include "base/progress.hpp"
+#include "commands/commands.hpp"
+#include "files/block_writer.hpp"
+#include "files/csv.hpp"
+#include "files/output.hpp"
+#include "measure/channel_filter.hpp"
+#include "measure/spectrum.hpp"
+#include "measure/taps.hpp"
+#include "show/outline.hpp"
+#include "show/spectrum_report.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+/// A filter by its bands.
+struct BandOption {
+    const char* name;
+    int type, edges;
+    const char* description;
+};
+
+constexpr std::array<BandOption, 4> band_options{{
+    {"--lowpass", DSP_FIR_LOW_PASS, 1, "keep what is below F"},
+    {"--highpass", DSP_FIR_HIGH_PASS, 1, "keep what is above F"},
+    {"--bandpass", DSP_FIR_BAND_PASS, 2, "keep what is between F1 and F2"},
+    {"--bandstop", DSP_FIR_BAND_STOP, 2, "remove what is between F1 and F2"},
+}};
+
+struct FilterOptions {
+    std::string in, out, taps, plot;
+    std::array<std::vector<double>, band_options.size()> edges;
+    std::vector<double> span;
+    std::optional<int> delay;
+    bool hold = false;
+    Tapering tapering;
+    ReadOptions reading;
+    WriteOptions writing;
+};
+
+void check_usage(FilterOptions& options) {
+    const bool bands = std::ranges::any_of(options.edges, [](auto& e) { return !e.empty(); });
+    if (bands == !options.taps.empty()) {
+        throw UsageError(
+            "say what to filter by: bands (--lowpass, --highpass, --bandpass, --bandstop) or "
+            "--taps");
+    }
+    const auto& tapering = options.tapering;
+    if (!options.taps.empty() &&
+        (tapering.window || tapering.length || tapering.transition || tapering.attenuation)) {
+        throw UsageError(
+            "--transition, --attenuation, --length and --window are for filters designed here, not "
+            "for --taps");
+    }
+    if (options.taps == "-" && options.in == "-") {
+        throw UsageError("standard input holds either the signal or the taps");
+    }
+    if (options.plot.empty()) {
+        if (!options.span.empty()) throw UsageError("--span is for --plot");
+        if (options.out.empty()) options.out = "-";
+    } else {
+        picture_of_name(options.plot);
+    }
+    if (!options.span.empty() && !(options.span[0] < options.span[1])) {
+        throw UsageError("--span goes from an earlier to a later time");
+    }
+    check_apart(options.out, options.plot);
+    if (!options.out.empty()) options.writing.checked_format_for(options.out);
+    if (options.out.empty() && options.writing.any()) {
+        throw UsageError("--to, --type, --bits and --with-time are for the output that -o names");
+    }
+}
+
+/// One filter in place of two, one behind the other.
+Signal convolved(Signal a, const Signal& b) {
+    Signal both;
+    check(dspi_zpad(a, a->points + b->points - 1) || dspd_fir(a, both, b, nullptr),
+          "joining filters");
+    return both;
+}
+
+/// A filter for all bands that were asked for.
+Signal designed_taps(const FilterOptions& options, double delta) {
+    check_spacing(delta);
+    auto tapering = options.tapering;
+    if (tapering.transition) *tapering.transition *= delta;
+    Signal taps;
+    for (std::size_t i = 0; i < band_options.size(); ++i) {
+        const auto& edges = options.edges[i];
+        if (edges.empty()) continue;
+        const auto problem = problem_with_edges(edges, 1 / delta);
+        if (!problem.empty()) throw Error(problem);
+        std::vector<double> fractions;
+        for (const double edge : edges) fractions.push_back(edge * delta);
+        auto band = tapered_design(band_options[i].type, fractions, 0, tapering);
+        taps = taps->points > 0 ? convolved(std::move(taps), band) : std::move(band);
+    }
+    return taps;
+}
+
+Signal given_taps(const FilterOptions& options) {
+    auto taps = first_signal(read_recording(options.taps, {}));
+    if (taps->points < 1) throw Error("there are no taps in " + options.taps);
+    check_finite(taps.values(), taps->complex);
+    return taps;
+}
+
+/// The filters of a run: of one set of taps, or of one for each spacing.
+class Filters {
+  public:
+    explicit Filters(const FilterOptions& options) : options_(options) {
+        filtering_.hold = options.hold;
+        if (!options.taps.empty()) take(given_taps(options));
+    }
+
+    const Filtering& at(double delta) {
+        if (!options_.taps.empty()) {
+            const double designed = filtering_.taps->delta;
+            if (designed != 1 && std::fabs(designed - delta) > 1e-6 * std::fabs(delta)) {
+                std::fprintf(stderr,
+                             "wavkit: the taps are for a spacing of %s, the signal has %s\n",
+                             number(designed).c_str(), number(delta).c_str());
+            }
+        } else if (delta != delta_) {
+            take(designed_taps(options_, delta));
+            delta_ = delta;
+        }
+        return filtering_;
+    }
+
+  private:
+    void take(Signal taps) {
+        filtering_.taps = std::move(taps);
+        filtering_.delay = options_.delay.value_or(delay_of(filtering_.taps));
+        if (!options_.delay && filtering_.taps->points % 2 == 0 &&
+            symmetry_of(filtering_.taps) != Symmetry::none) {
+            std::fputs("wavkit: an even number of taps leaves a delay of half a sample\n", stderr);
+        }
+    }
+
+    const FilterOptions& options_;
+    Filtering filtering_;
+    std::optional<double> delta_;
+};
+
+/// A signal before and after, as a picture.
+class Comparison {
+  public:
+    Comparison(const FilterOptions& options, const SampleStream& stream)
+        : options_(options),
+          seconds_(stream.sound || options.reading.rate),
+          before_(outline(stream.delta)),
+          after_(before_),
+          width_(stream.channels) {}
+
+    void add(std::span<const double> in, std::span<const double> out) {
+        before_.add(in, width_);
+        after_.add(out, width_);
+    }
+
+    void draw() const {
+        std::vector panels{before_.curve(), after_.curve()};
+        panels[0].title = short_name(options_.in);
+        panels[1].title = "filtered";
+        for (auto& panel : panels) panel.x_label = with_unit("time", seconds_ ? "s" : "");
+        tool::draw(panels, options_.plot);
+    }
+
+  private:
+    Outline outline(double delta) const {
+        return options_.span.empty() ? Outline(delta)
+                                     : Outline(delta, options_.span[0], options_.span[1]);
+    }
+
+    const FilterOptions& options_;
+    bool seconds_;
+    Outline before_, after_;
+    std::size_t width_;
+};
+
+/// One run of the program.
+class FilterRun {
+  public:
+    explicit FilterRun(const FilterOptions& options)
+        : options_(options), input_(options.in), filters_(options) {}
+
+    void run() {
+        if (!options_.out.empty()) {
+            format_ = options_.writing.format_for(options_.out);
+            output_.emplace(options_.out);
+            writer_ = block_writer(output_->stream(), *format_, options_.writing);
+        }
+        filter_signals();
+        if (comparison_) comparison_->draw();
+        if (output_) output_->commit();
+    }
+
+  private:
+    /// The channels of a sound file belong together in another one, and are signals one after the
+    /// other elsewhere.
+    void filter_signals() {
+        const bool together = format_ && is_sound(*format_);
+        auto reading = options_.reading;
+        const bool chosen = reading.signal || reading.channel;
+        for (int number = 1;; ++number) {
+            if (!chosen && (!together || number > 1)) reading.signal = number;
+            std::rewind(input_.stream());
+            const auto stream =
+                together ? open_channels(input_, reading) : open_stream(input_, reading);
+            filter(*stream);
+            if (chosen || stream->last) return;
+        }
+    }
+
+    void filter(SampleStream& stream) {
+        const auto& filtering = filters_.at(stream.delta);
+        ChannelFilter filter(filtering, stream);
+        const bool draws = !options_.plot.empty() && !comparison_;
+        if (draws && filter.complex_output()) throw Error("--plot draws real signals only");
+        if (draws) comparison_.emplace(options_, stream);
+        if (writer_)
+            writer_->begin({stream.delta, filter.complex_output(), stream.channels, stream.length});
+        {
+            Progress progress("filtering " + input_.name());
+            filter.run([&](std::span<const double> in, std::span<const double> out) {
+                if (writer_) writer_->write(out);
+                if (draws) comparison_->add(in, out);
+                progress.done(stream.done());
+            });
+        }
+        if (writer_) writer_->end();
+    }
+
+    const FilterOptions& options_;
+    InputFile input_;
+    Filters filters_;
+    std::optional<Format> format_;
+    std::optional<OutputFile> output_;
+    std::unique_ptr<BlockWriter> writer_;
+    std::optional<Comparison> comparison_;
+};
+
+constexpr const char* about =
+    R"(Edges are in hertz where the spacing is in seconds, and lie in the middle of the transition, where
+the filter passes half the amplitude. Several bands are filters one behind the other. Each has as
+many taps as --transition and --attenuation take, or --length taps, through a Kaiser window unless
+--window names another one ('wavkit design' shows what such a filter is like). --taps takes any
+signal file of taps instead, real or complex.
+
+The output lies in time where the input does: the delay of the filter, half its taps, is taken out,
+and before and behind the signal there are zeros, or with --hold its first and last sample over and
+over, which spares a signal with an offset the jumps at its ends. Taps that are not their own mirror
+image have no such delay. --delay 0 leaves every output to the samples up to its own.
+
+The recording may be longer than memory. All signals of a file are filtered, all channels of a sound
+file too; into another sound file, of several signals one must be chosen. Without -o the output goes
+to standard output, in binary unless --to says otherwise, or nowhere beside --plot, which draws the
+first signal before and after.
+
+Examples:
+  wavkit filter hum.wav --bandstop 45 55 -o clean.wav
+  wavkit filter log.csv --time --lowpass 2 --transition 1 --attenuation 80 -o smooth.csv --with-time
+  wavkit filter ecg.txt --rate 360 --highpass 0.5 --bandstop 59 61 --hold --plot ecg.png --span 10 15
+  wavkit filter - --lowpass 100 <tone.wav | wavkit spectrum - --peaks 3)";
+
+}  // namespace
+
+void add_filter(CLI::App& program) {
+    auto* const command = program.add_subcommand(
+        "filter", "Filters signals: low-pass, high-pass, band-pass, band-stop, any taps.");
+    const auto options = std::make_shared<FilterOptions>();
+    command->add_option("IN", options->in, "file to read; - is standard input")
+        ->required()
+        ->type_name("");
+    for (std::size_t i = 0; i < band_options.size(); ++i) {
+        const auto& band = band_options[i];
+        command->add_option(band.name, options->edges[i], band.description)
+            ->expected(band.edges)
+            ->type_name(band.edges == 2 ? "F1 F2" : "F");
+    }
+    command->add_option("--taps", options->taps, "filter by the taps of a signal file")
+        ->type_name("FILE");
+    command
+        ->add_option("-o,--output", options->out, "file to write; - is standard output (default)")
+        ->type_name("FILE");
+    command
+        ->add_option("--plot", options->plot,
+                     "draw before and after into a .png or .svg file, or - the terminal")
+        ->type_name("FILE");
+    command->add_option("--span", options->span, "times between which --plot draws")
+        ->expected(2)
+        ->type_name("FROM TO");
+    command
+        ->add_option("--delay", options->delay,
+                     "samples by which to shift the output back (default: the filter's delay)")
+        ->check(CLI::Range(0, 1 << 24))
+        ->type_name("N");
+    command->add_flag("--hold", options->hold,
+                      "continue the ends by their last sample, not by zeros");
+    options->tapering.declare(*command);
+    options->reading.declare(*command);
+    options->writing.declare(*command);
+    command->footer(about);
+    command->callback([options] {
+        check_usage(*options);
+        FilterRun(*options).run();
+    });
+}
+
+}  // namespace wavkit::tool

@@ -1,0 +1,96 @@
+// wavkit info: what is in a file.
+#include <cmath>
+#include <cstdio>
+#include <memory>
+
+#include "base/error.hpp"
+#include "commands/commands.hpp"
+#include "files/recording.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+struct InfoOptions {
+    std::vector<std::string> files;
+    ReadOptions reading;
+};
+
+void line(const char* what, const std::string& value) {
+    std::printf("  %-9s %s\n", what, value.c_str());
+}
+
+/// Six significant digits, enough to look at.
+std::string brief(double value) {
+    char text[32];
+    std::snprintf(text, sizeof text, "%.6g", value);
+    return text;
+}
+
+std::size_t count_nan(const Signal& x) {
+    std::size_t count = 0;
+    for (const double value : x.values()) count += std::isnan(value) ? 1 : 0;
+    return count;
+}
+
+/// The point that a statistic of the library picks or computes, "re,im" of a complex signal.
+std::string point(int (*reduce)(const dsp*, dsp*), const Signal& x) {
+    Signal result;
+    check(reduce(x, result), "computing a statistic");
+    std::string text = brief(result->data[0]);
+    if (result->complex) text += "," + brief(result->data[1]);
+    return text;
+}
+
+void describe(const Signal& x, bool seconds) {
+    line("points", std::to_string(x->points));
+    line("kind", x->complex ? "complex" : "real");
+    line("delta", number(x->delta) + (seconds ? " s (" + brief(1 / x->delta) + " Hz)" : ""));
+    line("duration", number(x->points * x->delta) + (seconds ? " s" : ""));
+    if (x->points == 0) return;
+    line("mean", point(dsps_mean, x));
+    line("rms", point(dsps_rms, x));
+    line("min", point(dsps_min, x) + (x->complex ? " (least magnitude)" : ""));
+    line("max", point(dsps_max, x) + (x->complex ? " (greatest magnitude)" : ""));
+    if (const auto missing = count_nan(x)) line("nan", std::to_string(missing) + " values");
+}
+
+void describe(const std::string& path, const ReadOptions& reading) {
+    const auto recording = read_recording(path, reading);
+    const auto count = recording.signals.size();
+    std::printf("%s: %s, %zu %s\n", path == "-" ? "standard input" : path.c_str(),
+                recording.description.c_str(), count, count == 1 ? "signal" : "signals");
+    for (std::size_t i = 0; i < count; ++i) {
+        if (count > 1) line("signal", std::to_string(i + 1) + " of " + std::to_string(count));
+        describe(recording.signals[i], recording.sound);
+    }
+}
+
+/// A file that cannot be read does not keep the others from being shown.
+void run(const InfoOptions& options) {
+    bool failed = false;
+    for (const auto& file : options.files) {
+        try {
+            describe(file, options.reading);
+        } catch (const Error& error) {
+            std::fflush(stdout);
+            std::fprintf(stderr, "wavkit: %s\n", error.what());
+            failed = true;
+        }
+    }
+    if (failed) throw CLI::RuntimeError(1);
+}
+
+}  // namespace
+
+void add_info(CLI::App& program) {
+    auto* const command = program.add_subcommand(
+        "info", "Shows format, length, spacing and statistics of every signal in the files.");
+    const auto options = std::make_shared<InfoOptions>();
+    command->add_option("FILE", options->files, "files to look at; - is standard input")
+        ->required();
+    options->reading.declare(*command);
+    command->footer("Example:\n  wavkit info tone.wav examples/data/sunspots-yearly.txt");
+    command->callback([options] { run(*options); });
+}
+
+}  // namespace wavkit::tool

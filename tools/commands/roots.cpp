@@ -1,0 +1,243 @@
+// wavkit roots: from the coefficients of a polynomial to its roots, and back.
+#include <wavkit/dsp.h>
+
+#include <algorithm>
+#include <charconv>
+#include <cmath>
+#include <complex>
+#include <cstdio>
+#include <memory>
+
+#include "base/error.hpp"
+#include "base/progress.hpp"
+#include "commands/commands.hpp"
+#include "files/output.hpp"
+#include "files/recording.hpp"
+#include "measure/spectrum.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+using Complex = std::complex<double>;
+
+struct RootsOptions {
+    std::vector<std::string> values;
+    std::string out;
+    bool from_roots = false, descending = false;
+    ReadOptions reading;
+    WriteOptions writing;
+};
+
+std::complex<double> point(const Signal& x, int i) {
+    if (!x->complex) return x->data[i];
+    return {x->data[2 * i], x->data[2 * i + 1]};
+}
+
+Signal signal_of(const std::vector<Complex>& points) {
+    const bool real = std::ranges::all_of(points, [](auto z) { return z.imag() == 0; });
+    Signal x;
+    x->points = int(points.size());
+    x->complex = !real;
+    check(dsp_alloc(x), "taking in values");
+    for (std::size_t i = 0; i < points.size(); ++i) {
+        if (real) {
+            x->data[i] = points[i].real();
+        } else {
+            x->data[2 * i] = points[i].real();
+            x->data[2 * i + 1] = points[i].imag();
+        }
+    }
+    return x;
+}
+
+// ---- input ----
+
+/// Takes a number, signed or not, off the front of a text.
+bool take_number(std::string_view& text, double& value) {
+    if (text.starts_with('+')) text.remove_prefix(1);
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value);
+    text.remove_prefix(std::size_t(end - text.data()));
+    return error == std::errc();
+}
+
+/// "2", "-1.5e3", "1+2i", "-2i"
+std::optional<Complex> parsed(std::string_view text) {
+    double first = 0, second = 0;
+    if (!take_number(text, first)) return std::nullopt;
+    if (text.empty()) return first;
+    if (text == "i") return Complex(0, first);
+    if (text.front() != '+' && text.front() != '-') return std::nullopt;
+    if (!take_number(text, second) || text != "i") return std::nullopt;
+    return Complex(first, second);
+}
+
+/// The numbers that the command line holds, or the signal of the file that it names.
+Signal read_values(const RootsOptions& options) {
+    const auto& values = options.values;
+    if (values.size() == 1 && !parsed(values[0])) {
+        return first_signal(read_recording(values[0], options.reading));
+    }
+    std::vector<Complex> points;
+    for (const auto& value : values) {
+        const auto number = parsed(value);
+        if (!number) throw UsageError("'" + value + "' is not a number");
+        points.push_back(*number);
+    }
+    return signal_of(points);
+}
+
+// ---- coefficients to roots ----
+
+/// The roots of a real polynomial in ascending powers: up to degree 5 in closed form.
+Signal roots_of(const Signal& polynomial) {
+    const auto c = polynomial.values();
+    const auto zero = [](double v) { return v == 0; };
+    if (std::ranges::all_of(c, zero)) throw Error("the polynomial is 0 everywhere");
+    const auto leading = std::ranges::find_if_not(c.rbegin(), c.rend(), zero) - c.rbegin();
+    constexpr int closed_form_points = 6;
+    const int points = polynomial->points - int(leading);
+    Signal used, roots;
+    check(dsp_copy_at_most(used, polynomial, points), "taking in coefficients");
+    if (points <= closed_form_points && dsps_proots(used, roots) == 0) return roots;
+    if (dspi_proots(used) != 0) {
+        throw Error("the roots cannot be found; many of them may lie close together");
+    }
+    return used;
+}
+
+/// |p(z)| beside the sum of all |c[k] z^k|: how nearly z is a root. Powers of 1/z where those of z
+/// would overflow.
+double residual(const Signal& polynomial, Complex z) {
+    using Wide = std::complex<long double>;
+    const bool outside = std::abs(z) > 1;
+    const Wide place = outside ? 1.0L / Wide(z) : Wide(z);
+    const int n = polynomial->points;
+    Wide value = 0;
+    long double terms = 0;
+    for (int k = 0; k < n; ++k) {
+        const long double c = polynomial->data[outside ? k : n - 1 - k];
+        value = value * place + c;
+        terms = terms * std::abs(place) + std::fabs(c);
+    }
+    return terms > 0 ? double(std::abs(value) / terms) : 0;
+}
+
+void print_roots(const Signal& polynomial, const Signal& roots) {
+    if (roots->points == 0) {
+        std::puts("no roots");
+        return;
+    }
+    std::printf("%24s %24s %16s %10s\n", "real part", "imaginary part", "modulus", "residual");
+    for (int i = 0; i < roots->points; ++i) {
+        const auto z = point(roots, i);
+        const double re = z.real() + 0.0;  // no -0
+        std::printf("%24.15g ", re);
+        if (z.imag() == 0) {
+            std::printf("%24s", "");
+        } else {
+            std::printf("%23.15gi", z.imag());
+        }
+        std::printf(" %16.9g %10.1e\n", std::abs(z), residual(polynomial, z));
+    }
+}
+
+// ---- roots to coefficients ----
+
+/// Whether every complex root has its conjugate, so that the coefficients are real.
+bool closed_under_conjugation(const Signal& roots) {
+    const auto order = [](Complex a, Complex b) {
+        return a.real() != b.real() ? a.real() < b.real() : a.imag() < b.imag();
+    };
+    std::vector<Complex> points, conjugates;
+    for (int i = 0; i < roots->points; ++i) {
+        points.push_back(point(roots, i));
+        conjugates.push_back(std::conj(points.back()));
+    }
+    std::ranges::sort(points, order);
+    std::ranges::sort(conjugates, order);
+    return points == conjugates;
+}
+
+Signal polynomial_of(Signal roots) {
+    const bool real = closed_under_conjugation(roots);
+    check(dspi_pztoc(roots), "multiplying out");
+    if (real && roots->complex) check(dspi_real(roots), "multiplying out");
+    return roots;
+}
+
+void print_coefficients(const Signal& polynomial, bool descending) {
+    std::printf("%6s %24s%s\n", "power", "coefficient", polynomial->complex ? "  re,im" : "");
+    const int degree = polynomial->points - 1;
+    for (int i = 0; i <= degree; ++i) {
+        const auto c = point(polynomial, i);
+        std::printf("%6d %24.17g", descending ? degree - i : i, c.real());
+        if (polynomial->complex) std::printf(",%.17g", c.imag());
+        std::putchar('\n');
+    }
+}
+
+// ---- the command ----
+
+void run(const RootsOptions& options) {
+    options.writing.check_without_sound(options.out, "roots and coefficients");
+    auto x = read_values(options);
+    check_finite(x.values(), x->complex);
+    const auto write = [&](const Signal& result) {
+        write_recording(options.out, {&result, 1}, options.writing);
+    };
+    if (options.from_roots) {
+        auto polynomial = polynomial_of(std::move(x));
+        if (options.descending) check(dspi_rev(polynomial), "reversing");
+        if (!options.out.empty()) return write(polynomial);
+        return print_coefficients(polynomial, options.descending);
+    }
+    if (x->complex) throw Error("the coefficients must be real");
+    if (options.descending) check(dspi_rev(x), "reversing");
+    const auto roots = [&] {
+        Progress progress("finding roots");
+        return roots_of(x);
+    }();
+    if (!options.out.empty()) return write(roots);
+    print_roots(x, roots);
+}
+
+constexpr const char* about =
+    R"(Coefficients are real, in ascending powers: 6 -5 1 is 6 - 5x + x^2. --descending takes and gives the
+highest power first, as the taps of a filter are a polynomial in z^-1: its zeros are those of
+--descending. Up to degree 5 the roots follow from closed forms, beyond from a search; the residual
+is |p(z)| beside the sum of all |c[k] z^k|, for a good root some 1e-16. A root of multiplicity m
+keeps one m-th of its 15 digits.
+
+--from-roots multiplies (x - r) for all roots, written like 2, -1.5, 1+2i, 3i; the highest
+coefficient is 1. Where each root comes with its conjugate the coefficients are real.
+
+A single value that is no number names a file; - is standard input.
+
+Examples:
+  wavkit roots 6 -5 1
+  wavkit roots --from-roots 1+2i 1-2i 3
+  wavkit roots taps.dsp --descending -o zeros.csv
+  wavkit roots -1 0 0 1 -o - | wavkit roots - --from-roots)";
+
+}  // namespace
+
+void add_roots(CLI::App& program) {
+    auto* const command =
+        program.add_subcommand("roots", "Finds the roots of a polynomial, or multiplies them out.");
+    const auto options = std::make_shared<RootsOptions>();
+    command
+        ->add_option("VALUE", options->values,
+                     "coefficients (with --from-roots roots), or a file of them")
+        ->required()
+        ->type_name("");
+    command->add_flag("--from-roots", options->from_roots, "give the coefficients of these roots");
+    command->add_flag("--descending", options->descending, "highest power first");
+    command->add_option("-o,--output", options->out, "write the result; - is standard output")
+        ->type_name("FILE");
+    options->writing.declare_without_sound(*command);
+    options->reading.declare(*command);
+    command->footer(about);
+    command->callback([options] { run(*options); });
+}
+
+}  // namespace wavkit::tool

@@ -1,0 +1,163 @@
+// wavkit stats: every statistic of a signal.
+#include <wavkit/dsp.h>
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <cstdio>
+#include <memory>
+
+#include "commands/commands.hpp"
+#include "files/recording.hpp"
+#include "show/json.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+struct StatsOptions {
+    std::string in;
+    bool json = false;
+    ReadOptions reading;
+};
+
+/// A result by its name in JSON, one value or the two parts of a complex one.
+struct Figure {
+    std::string name;
+    std::vector<double> parts;
+    bool whole = false;  // a count, shown with all of its digits
+};
+
+struct Statistic {
+    const char* name;
+    int (*reduce)(const dsp*, dsp*);
+    bool of_spread = false;  // of the variance, 0 for a constant signal
+    bool real_only = false;
+};
+
+constexpr std::array<Statistic, 15> statistics{{{"sum", dsps_sum},
+                                                {"mean", dsps_mean},
+                                                {"median", dsps_median},
+                                                {"rms", dsps_rms},
+                                                {"energy", dsps_magsq_sum},
+                                                {"min", dsps_min},
+                                                {"max", dsps_max},
+                                                {"population_variance", dsps_pop_var, true},
+                                                {"sample_variance", dsps_samp_var, true},
+                                                {"population_deviation", dsps_pop_stddev, true},
+                                                {"sample_deviation", dsps_samp_stddev, true},
+                                                {"skewness", dsps_skew, true, true},
+                                                {"excess_kurtosis", dsps_excess, false, true},
+                                                {"geometric_mean", dsps_gmean},
+                                                {"harmonic_mean", dsps_hmean}}};
+
+std::vector<double> parts_of(const Statistic& wanted, const Signal& x) {
+    Signal result;
+    check(wanted.reduce(x, result), "computing a statistic");
+    return {result.values().begin(), result.values().end()};
+}
+
+/// The sample at which the signal (or the magnitude of a complex one) is extreme.
+double place(const Signal& x, bool smallest) {
+    constexpr unsigned least = 0x2000, greatest = 0;
+    Signal peak;
+    check(dsps_peak(x, peak, smallest ? least : greatest, 0), "finding an extreme");
+    return peak->data[1];
+}
+
+double count_nan(const Signal& x) {
+    return double(std::ranges::count_if(x.values(), [](double v) { return std::isnan(v); }));
+}
+
+std::vector<Figure> figures(const Signal& x) {
+    std::vector<Figure> list{{"points", {double(x->points)}, true},
+                             {"delta", {x->delta}},
+                             {"duration", {x->points * x->delta}}};
+    if (x->points == 0) return list;
+    list.push_back({"nan", {count_nan(x)}, true});
+    // Rounding takes the variance of a constant a little below 0, and its root to NaN.
+    const bool constant = statistic(dsps_pop_var, x) < 0;
+    for (const auto& wanted : statistics) {
+        if (wanted.real_only && x->complex) continue;
+        const bool vanishes = constant && wanted.of_spread;
+        list.push_back({wanted.name, vanishes ? std::vector{0.0} : parts_of(wanted, x)});
+    }
+    for (const bool smallest : {true, false}) {
+        const std::string name = smallest ? "min" : "max";
+        const double sample = place(x, smallest);
+        list.push_back({name + "_sample", {sample}, true});
+        list.push_back({name + "_at", {sample * x->delta}});
+    }
+    if (!x->complex) list.push_back({"range", {statistic(dsps_max, x) - statistic(dsps_min, x)}});
+    return list;
+}
+
+JsonMembers members(const Signal& x) {
+    JsonMembers list{{"complex", x->complex ? "true" : "false"}};
+    for (const auto& figure : figures(x)) {
+        list.emplace_back(figure.name, json_value(figure.parts));
+    }
+    return list;
+}
+
+void print(const Signal& x, bool seconds) {
+    std::printf("%-22s %s\n", "kind", x->complex ? "complex" : "real");
+    for (auto figure : figures(x)) {
+        const bool time =
+            figure.name == "delta" || figure.name == "duration" || figure.name.ends_with("_at");
+        std::ranges::replace(figure.name, '_', ' ');
+        std::printf("%-22s ", figure.name.c_str());
+        const char* const format = figure.whole ? "%.0f" : "%.9g";
+        std::printf(format, figure.parts[0]);
+        if (figure.parts.size() == 2) std::printf(",%.9g", figure.parts[1]);
+        std::puts(time && seconds ? " s" : "");
+    }
+}
+
+void run(const StatsOptions& options) {
+    const auto recording = read_recording(options.in, options.reading);
+    const auto& signals = recording.signals;
+    if (options.json) {
+        std::vector<JsonMembers> objects;
+        objects.reserve(signals.size());
+        for (const auto& x : signals) objects.push_back(members(x));
+        std::puts(json_list(objects).c_str());
+        return;
+    }
+    for (std::size_t i = 0; i < signals.size(); ++i) {
+        if (signals.size() > 1) {
+            std::printf("%s%-22s %zu of %zu\n", i > 0 ? "\n" : "", "signal", i + 1, signals.size());
+        }
+        print(signals[i], recording.sound);
+    }
+}
+
+constexpr const char* about =
+    R"(Of a complex signal, minimum and maximum are the points of least and greatest magnitude, variance
+is that of the distance from the mean, and there is no skewness, kurtosis or range. Population values
+divide by the number of samples, sample values by one less. Energy is the sum of the squares. Values
+of more than 1e100 count as 1e100 where powers are summed, and 1e100 stands for a ratio to nothing.
+A signal without samples has no statistics.
+
+--json prints a list with an object for every signal; complex values are [re,im], and null stands for
+what is not a finite number.
+
+Examples:
+  wavkit stats examples/data/sunspots-yearly.txt
+  wavkit stats stereo.wav --json)";
+
+}  // namespace
+
+void add_stats(CLI::App& program) {
+    auto* const command =
+        program.add_subcommand("stats", "Prints the statistics of every signal in a file.");
+    const auto options = std::make_shared<StatsOptions>();
+    command->add_option("IN", options->in, "file to read; - is standard input")
+        ->required()
+        ->type_name("");
+    command->add_flag("--json", options->json, "print JSON");
+    options->reading.declare(*command);
+    command->footer(about);
+    command->callback([options] { run(*options); });
+}
+
+}  // namespace wavkit::tool

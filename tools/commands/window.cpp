@@ -1,0 +1,156 @@
+// wavkit window: what a window of the catalogue is like.
+#include <wavkit/dsp.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <memory>
+#include <optional>
+
+#include "base/error.hpp"
+#include "base/options.hpp"
+#include "commands/commands.hpp"
+#include "files/csv.hpp"
+#include "files/recording.hpp"
+#include "measure/spectrum.hpp"
+#include "show/plot.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+constexpr int bins_in_picture = 16;
+
+struct WindowOptions {
+    std::string name, out, plot;
+    WriteOptions writing;
+    int points = 1024;
+};
+
+double decibels(double ratio) { return 20 * std::log10(ratio); }
+
+/// The samples, 1 at the centre, in the order of time.
+Signal samples_of(int window, int points) {
+    Signal w;
+    w->points = points;
+    check(dsp_alloc(w), "making the window");
+    std::ranges::fill(w.values(), 1.0);
+    check(dspi_window(w, window, DSP_SCALE_PEAK | DSP_SCALE_NO_ROTATION), "making the window");
+    return w;
+}
+
+/// The response to a sine some bins aside, 1 on the bin itself.
+struct Response {
+    Signal magnitude;  // `per_bin` values a bin, from 0 up to half the sampling rate
+    int per_bin;
+};
+
+/// Zeros resolve the lobes: a lobe's top is then found to 0.01 dB.
+Response response_of(const Signal& w) {
+    constexpr int fineness = 32;
+    Response response{{}, fineness};
+    Signal& y = response.magnitude;
+    check(dsp_copy(y, w) || dspi_zpad(y, fineness * w->points) || dspi_rdft(y) || dspi_mag(y),
+          "measuring the window");
+    const double top = y->data[0];
+    for (double& value : y.values()) value /= top;
+    return response;
+}
+
+/// The highest value beyond the main lobe, which a flat window's ripple at the top does not end.
+std::optional<double> highest_sidelobe(const Response& response) {
+    const auto y = response.magnitude.values();
+    std::size_t i = 0;
+    while (i < y.size() && y[i] > 0.5) ++i;
+    while (i + 1 < y.size() && y[i + 1] < y[i]) ++i;
+    if (i + 1 >= y.size()) return std::nullopt;
+    return *std::max_element(y.begin() + std::ptrdiff_t(i), y.end());
+}
+
+/// The greatest error of an amplitude, in decibels, for a sine up to half a bin aside.
+double scalloping_loss(const Response& response) {
+    double worst = 0;
+    for (int i = 0; i <= response.per_bin / 2; ++i) {
+        worst = std::max(worst, std::fabs(decibels(response.magnitude->data[i])));
+    }
+    return worst;
+}
+
+void print_figures(int window, const Signal& w) {
+    const double gain = statistic(dsps_mean, w), rms = statistic(dsps_rms, w);
+    const auto response = response_of(w);
+    const auto sidelobe = highest_sidelobe(response);
+    std::printf("window            %s, %d points\n", window_names()[std::size_t(window)].c_str(),
+                w->points);
+    std::printf("coherent gain     %.6f\n", gain);
+    std::printf("noise bandwidth   %.4f bins\n", rms * rms / (gain * gain));
+    if (sidelobe) {
+        std::printf("highest sidelobe  %.2f dB\n", decibels(*sidelobe));
+    } else {
+        std::puts("highest sidelobe  none");
+    }
+    std::printf("scalloping loss   %.4f dB\n", scalloping_loss(response));
+}
+
+void draw_response(int window, const Signal& w, const std::string& path) {
+    const auto response = response_of(w);
+    const int reach = std::min(response.magnitude->points - 1, bins_in_picture * response.per_bin);
+    Curve curve;
+    curve.title =
+        window_names()[std::size_t(window)] + ", " + std::to_string(w->points) + " points";
+    curve.x_label = "bins";
+    curve.y_label = "response (dB)";
+    curve.decibels = true;
+    curve.depth = 180;
+    for (int i = -reach; i <= reach; ++i) {
+        curve.x.push_back(double(i) / response.per_bin);
+        // A zero between two lobes would have no place on the axis.
+        curve.y.push_back(decibels(std::max(response.magnitude->data[std::abs(i)], 1e-15)));
+    }
+    draw(curve, path);
+}
+
+void run(const WindowOptions& options) {
+    if (!options.plot.empty()) picture_of_name(options.plot);
+    if (options.out.empty() && options.writing.format) {
+        throw UsageError("--to is for the output that -o names");
+    }
+    if (!options.out.empty()) options.writing.format_for(options.out);
+    check_apart(options.out, options.plot);
+    const int window = window_of_name(options.name);
+    const auto w = samples_of(window, options.points);
+    if (!options.out.empty()) write_recording(options.out, {&w, 1}, options.writing);
+    if (!options.plot.empty()) draw_response(window, w, options.plot);
+    if (options.out.empty() && options.plot.empty()) print_figures(window, w);
+}
+
+}  // namespace
+
+void add_window(CLI::App& program) {
+    auto* const command = program.add_subcommand(
+        "window", "Shows a window of the catalogue: figures, samples, response.");
+    const auto options = std::make_shared<WindowOptions>();
+    command->add_option("NAME", options->name, "the window")->required()->type_name("");
+    command->add_option("--points", options->points, "length of the window (default: 1024)")
+        ->check(CLI::Range(1, 1 << 24))
+        ->type_name("N");
+    command->add_option("-o,--output", options->out, "write the samples; - is standard output")
+        ->type_name("FILE");
+    add_choice(*command, "--to", options->writing.format, formats(),
+               "format of the output (default: by its name)");
+    command
+        ->add_option("--plot", options->plot,
+                     "draw main lobe and sidelobes into a .png or .svg file, or - the terminal")
+        ->type_name("FILE");
+    command->footer(
+        "The coherent gain is the mean of the samples, whose centre is 1; the noise bandwidth is "
+        "that of\nthe rectangular filter that lets as much white noise through; the scalloping "
+        "loss is the greatest\nerror of an amplitude up to half a bin beside a bin.\n\nWindows:\n" +
+        window_list() +
+        "\n\nExamples:\n"
+        "  wavkit window flattop\n"
+        "  wavkit window kaiser90 --points 256 -o kaiser.csv\n"
+        "  wavkit window hann --plot hann.png");
+    command->callback([options] { run(*options); });
+}
+
+}  // namespace wavkit::tool

@@ -1,0 +1,40 @@
+// Signals written block by block, so that they may be longer than memory.
+#pragma once
+
+#include <cstdio>
+#include <memory>
+#include <optional>
+#include <span>
+
+#include "files/format.hpp"
+
+namespace wavkit::tool {
+
+struct WriteOptions;
+
+/// What is known of a signal before its samples.
+struct SignalShape {
+    double delta = 1.0;
+    bool complex = false;
+    std::size_t channels = 1;  // signals of a sound file, sample by sample in turn
+    std::optional<std::size_t> points;
+};
+
+/// Writes one signal after the other; each format as it is documented for `convert`.
+class BlockWriter {
+  public:
+    virtual ~BlockWriter() = default;
+
+    virtual void begin(const SignalShape& shape) = 0;
+    /// The scalars that follow, whole points of all channels. What the file does not take is left
+    /// for the stream to tell.
+    virtual void write(std::span<const double> values) = 0;
+    virtual void end() = 0;
+};
+
+/// A writer into a file that can go back. Only signal files and CSV take more than one signal, and
+/// only sound more than one channel.
+std::unique_ptr<BlockWriter> block_writer(std::FILE* to, Format format,
+                                          const WriteOptions& options);
+
+}  // namespace wavkit::tool

@@ -1,0 +1,105 @@
+#include "files/output.hpp"
+
+#include <sys/stat.h>
+#include <unistd.h>
+#include <wavkit/dsp.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <csignal>
+#include <cstring>
+#include <filesystem>
+
+#include "base/error.hpp"
+#include "base/scratch.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+/// The temporary file of the moment, for the handler of interruptions, which may touch little else.
+std::array<char, 4096> unfinished{};
+
+void remove_unfinished(int signal) {
+    if (unfinished[0]) unlink(unfinished.data());
+    std::signal(signal, SIG_DFL);
+    std::raise(signal);
+}
+
+void remember(const std::string& path) {
+    std::copy_n(path.c_str(), std::min(path.size() + 1, unfinished.size() - 1), unfinished.data());
+    for (const int signal : {SIGINT, SIGTERM, SIGHUP}) {
+        if (std::signal(signal, remove_unfinished) == SIG_IGN) std::signal(signal, SIG_IGN);
+    }
+}
+
+/// The permissions a new file at `path` would have, or those of the file that it replaces.
+mode_t permissions(const std::string& path) {
+    struct stat status {};
+    if (stat(path.c_str(), &status) == 0) return status.st_mode & 0777;
+    const mode_t mask = umask(0);
+    umask(mask);
+    return 0666 & ~mask;
+}
+
+/// The file itself where `path` is a link to one, so that a rename keeps the link.
+std::string behind_links(const std::string& path) {
+    std::error_code missing;
+    const auto file = std::filesystem::canonical(path, missing);
+    return missing ? path : file.string();
+}
+
+}  // namespace
+
+OutputFile::OutputFile(const std::string& path)
+    : name_(path == "-" ? "standard output" : path), target_(path) {
+    std::error_code ignored;
+    const auto kind = std::filesystem::status(path, ignored).type();
+    if (kind == std::filesystem::file_type::directory) {
+        throw Error("cannot write " + name_ + ": it is a directory");
+    }
+    const bool plain = kind == std::filesystem::file_type::regular ||
+                       kind == std::filesystem::file_type::not_found;
+    if (path == "-" || !plain) {
+        stream_ = std::tmpfile();
+    } else {
+        target_ = behind_links(path);
+        temporary_ = target_ + ".XXXXXX.tmp";
+        const int file = mkstemps(temporary_.data(), 4);
+        if (file < 0) fail();
+        remember(temporary_);
+        stream_ = fdopen(file, "w+b");
+    }
+    if (!stream_) fail();
+}
+
+OutputFile::~OutputFile() {
+    if (stream_) std::fclose(stream_);
+    if (!temporary_.empty()) unlink(temporary_.c_str());
+    unfinished[0] = '\0';
+}
+
+void OutputFile::fail() const {
+    throw Error("cannot write " + name_ + ": " + std::strerror(errno));
+}
+
+void OutputFile::commit() {
+    if (std::ferror(stream_) || std::fflush(stream_) != 0) fail();
+    if (temporary_.empty()) return hand_over();
+    if (fchmod(fileno(stream_), permissions(target_)) != 0) fail();
+    if (std::rename(temporary_.c_str(), target_.c_str()) != 0) fail();
+    temporary_.clear();
+}
+
+void OutputFile::hand_over() {
+    std::FILE* const to = dspf_fopen(target_.c_str(), "wb");
+    if (!to) fail();
+    std::rewind(stream_);
+    const bool complete = copy_rest(stream_, to);
+    const int reason = errno;
+    const bool closed = dspf_fclose(to) == 0;
+    if (!complete) errno = reason;
+    if (!complete || !closed) fail();
+}
+
+}  // namespace wavkit::tool

@@ -1,0 +1,155 @@
+#include "measure/peaks.hpp"
+
+#include <wavkit/dsp.h>
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+
+namespace wavkit::tool {
+namespace {
+
+/// How a peak between bins is found.
+enum class Rule {
+    parabola,      // through the amplitudes
+    log_parabola,  // through their logarithms: most main lobes are nearly Gaussian
+    gauss_pair,    // from two bins, made for the lobe of the Gausstop window
+    flat_top,      // the height of the highest bin, which such a window keeps to 0.1 %
+};
+
+/// What the catalogue's windows need, by identifier.
+struct Lobe {
+    double half_width;  // from its top to its first zero, or to -100 dB, in bins
+    Rule rule;
+};
+
+constexpr std::array<Lobe, 24> lobes{{
+    {1.0, Rule::parabola},      // Uniform
+    {2.0, Rule::log_parabola},  // Bartlett
+    {2.0, Rule::log_parabola},  // Hann
+    {2.0, Rule::log_parabola},  // Hamming
+    {3.0, Rule::log_parabola},  // Blackman
+    {3.0, Rule::log_parabola},  // Blackman_Harris3
+    {4.0, Rule::log_parabola},  // Blackman_Harris4
+    {5.0, Rule::gauss_pair},    // Gausstop
+    {4.0, Rule::flat_top},      // Flat4
+    {5.0, Rule::flat_top},      // Flattop
+    {6.0, Rule::flat_top},      // Flat6
+    {7.0, Rule::flat_top},      // Flat7
+    {6.0, Rule::flat_top},      // P501
+    {7.0, Rule::flat_top},      // P601
+    {3.2, Rule::log_parabola},  // Kaiser70
+    {3.6, Rule::log_parabola},  // Kaiser80
+    {4.0, Rule::log_parabola},  // Kaiser90
+    {4.4, Rule::log_parabola},  // Kaiser100
+    {4.8, Rule::log_parabola},  // Kaiser110
+    {5.1, Rule::log_parabola},  // Kaiser120
+    {4.0, Rule::log_parabola},  // Gauss60
+    {4.4, Rule::log_parabola},  // Gauss70
+    {4.8, Rule::log_parabola},  // Gauss80
+    {2.0, Rule::log_parabola},  // Riemann
+}};
+
+/// Rounding noise of a transform; what lies below this share of the strongest bin is no component.
+constexpr double noise_floor = 1e-12;
+
+Rule rule_for(const Spectrum& spectrum) {
+    const Rule rule = lobes[std::size_t(spectrum.window)].rule;
+    // The pair's constants hold for bins as far apart as the measured samples put them, and it
+    // takes complex bins, which an average has not.
+    const bool pairs = spectrum.length == spectrum.samples && spectrum.bins->complex;
+    return rule == Rule::gauss_pair && !pairs ? Rule::log_parabola : rule;
+}
+
+/// Height and position, in bins, that dsps_peak() finds at a bin.
+struct Refined {
+    double height, bin;
+};
+
+constexpr unsigned at_index = 0x1000, by_parabola = 0x100, by_corrected_pair = 0x300;
+
+Refined refine(const dsp* y, unsigned rule, int index) {
+    Signal peak;
+    // -1 with a result tells of an offset that was limited; the result is still the best there is.
+    if (dsps_peak(y, peak, at_index | rule, index) != 0 && peak->data == nullptr) {
+        check(-1, "finding peaks");
+    }
+    return {peak->data[0], peak->data[1]};
+}
+
+/// The parabola through the logarithms of a bin and its neighbours.
+Refined refine_log(const Signal& magnitudes, int index) {
+    Signal three;
+    check(dspu_subvec(magnitudes, three, index - 1, 3), "finding peaks");
+    check(dspi_log(three), "finding peaks");
+    const auto peak = refine(three, by_parabola, 1);
+    return {std::exp(peak.height), peak.bin + index - 1};
+}
+
+/// The pair rule takes its logarithm from powers but its height factor is that of amplitudes:
+/// sqrt(power of the lower bin) * factor is the amplitude.
+Refined refine_pair(const Spectrum& spectrum, const Signal& magnitudes, int index) {
+    const auto peak = refine(spectrum.bins, by_corrected_pair, index);
+    const auto m = magnitudes.values();
+    const auto i = std::size_t(index);
+    const double lower = m[i - 1] > m[i + 1] ? m[i - 1] : m[i];
+    return {peak.height / lower, peak.bin};
+}
+
+Refined refine(const Spectrum& spectrum, const Signal& magnitudes, int index) {
+    const Refined plain{magnitudes.values()[std::size_t(index)], double(index)};
+    if (index == 0 || index == magnitudes->points - 1) return plain;
+    Refined peak = plain;
+    switch (rule_for(spectrum)) {
+        case Rule::parabola:
+            peak = refine(magnitudes, by_parabola, index);
+            break;
+        case Rule::log_parabola:
+            peak = refine_log(magnitudes, index);
+            break;
+        case Rule::gauss_pair:
+            peak = refine_pair(spectrum, magnitudes, index);
+            break;
+        case Rule::flat_top:
+            peak = {plain.height, refine_log(magnitudes, index).bin};
+            break;
+    }
+    return std::isfinite(peak.height) && std::isfinite(peak.bin) ? peak : plain;
+}
+
+}  // namespace
+
+std::vector<Peak> find_peaks(const Spectrum& spectrum, std::size_t count, const Band& band) {
+    const auto magnitudes = tool::magnitudes(spectrum);
+    const auto m = magnitudes.values();
+    const int last = magnitudes->points - 1;
+    std::vector<int> maxima;
+    for (int i = spectrum.two_sided ? 0 : 1; i <= last; ++i) {
+        const auto k = std::size_t(i);
+        if ((i == 0 || m[k] > m[k - 1]) && (i == last || m[k] >= m[k + 1]) && m[k] > 0 &&
+            band.contains(spectrum.frequency(i))) {
+            maxima.push_back(i);
+        }
+    }
+    const auto height = [&](int i) { return m[std::size_t(i)]; };
+    std::ranges::stable_sort(maxima, std::greater(), height);
+
+    const double lobe = lobes[std::size_t(spectrum.window)].half_width * spectrum.padding();
+    std::vector<int> kept;
+    for (const int i : maxima) {
+        if (kept.size() == count || height(i) < noise_floor * height(maxima.front())) break;
+        if (std::ranges::none_of(kept, [&](int other) { return std::abs(other - i) < lobe; })) {
+            kept.push_back(i);
+        }
+    }
+    std::vector<Peak> peaks;
+    for (const int i : kept) {
+        const auto peak = refine(spectrum, magnitudes, i);
+        peaks.push_back({spectrum.frequency(peak.bin),
+                         peak.height * (spectrum.has_no_mirror(i) ? 0.5 : 1.0), i});
+    }
+    std::ranges::stable_sort(peaks, std::greater(), &Peak::amplitude);
+    return peaks;
+}
+
+}  // namespace wavkit::tool

@@ -1,0 +1,125 @@
+#include "measure/segments.hpp"
+
+#include <wavkit/dsp.h>
+
+#include <algorithm>
+#include <cmath>
+#include <limits>
+#include <vector>
+
+#include "base/error.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+/// Another stream's slopes, in the manner of take_slope().
+class SlopeStream : public SampleStream {
+  public:
+    explicit SlopeStream(SampleStream& source) : source_(source) {
+        delta = source.delta;
+        before_.resize(source.complex ? 2 : 1);
+        source_.read(before_);
+    }
+
+    std::size_t read(std::span<double> values) override {
+        const auto width = before_.size();
+        samples_.resize(values.size() * width);
+        const auto count = source_.read(samples_) / width;
+        for (std::size_t i = 0; i < count; ++i) {
+            double squares = 0;
+            for (std::size_t part = 0; part < width; ++part) {
+                const double now = samples_[i * width + part];
+                squares += (now - before_[part]) * (now - before_[part]);
+                before_[part] = now;
+            }
+            values[i] = std::sqrt(squares) / delta;
+        }
+        return count;
+    }
+
+    double done() const override { return source_.done(); }
+
+  private:
+    SampleStream& source_;
+    std::vector<double> before_, samples_;
+};
+
+}  // namespace
+
+int Segmentation::step() const {
+    return std::max(1, int(std::lround(length * (1 - overlap / 100))));
+}
+
+void remove_mean(Signal& x) {
+    Signal mean;
+    check(dsps_mean(x, mean) || dspi_neg(mean), "removing the mean");
+    const auto values = x.values();
+    const auto offset = mean.values();
+    for (std::size_t i = 0; i < values.size(); ++i) values[i] += offset[i % offset.size()];
+}
+
+void take_slope(Signal& x) {
+    check(dspi_differ(x), "computing the slope");
+    // The first difference is one to nothing, a step that the signal does not have.
+    check(dspu_subvec(x, x, 1, x->points), "computing the slope");
+    check(x->complex ? dspi_mag(x) : dspi_abs(x), "computing the slope");
+}
+
+void measure_segments(SampleStream& source, const Segmentation& segmentation,
+                      const SpectrumSettings& settings,
+                      const std::function<void(Spectrum&)>& take) {
+    check_spacing(source.delta);
+    std::unique_ptr<SlopeStream> slopes;
+    if (segmentation.slope) slopes = std::make_unique<SlopeStream>(source);
+    SampleStream& stream = slopes ? *slopes : source;
+
+    const std::size_t width = stream.complex ? 2 : 1;
+    const auto length = std::size_t(segmentation.length) * width;
+    const auto step = std::size_t(segmentation.step()) * width;
+    std::vector<double> window(length);
+    Signal x(stream.delta);
+    long position = 0;  // of the next sample to be read
+    for (std::size_t kept = 0;; kept = length - step) {
+        std::copy(window.end() - std::ptrdiff_t(kept), window.end(), window.begin());
+        const auto fresh = std::span(window).subspan(kept);
+        const auto count = stream.read(fresh);
+        check_finite(fresh.first(count), stream.complex, position);
+        position += long(count / width);
+        if (count < fresh.size()) break;
+        x->complex = stream.complex;
+        x->points = segmentation.length;
+        check(dsp_alloc(x), "measuring segments");
+        std::ranges::copy(window, x->data);
+        if (segmentation.detrend) remove_mean(x);
+        auto spectrum = measure(x, settings);
+        take(spectrum);
+    }
+    if (position < segmentation.length) {
+        throw Error("the signal has " + std::to_string(position) +
+                    " samples, fewer than one segment of " + std::to_string(segmentation.length));
+    }
+}
+
+void SpectrumAverage::add(Spectrum& spectrum) {
+    const long count = average_.bins->points > 0 ? average_.averaged + 1 : 1;
+    constexpr int powers = 0x20, forgetting = 0x10;
+    const int flags = int(averaging_.type) | powers | (averaging_.forget > 0 ? forgetting : 0);
+    Signal& average = average_.bins;
+    check(dsph_avg(spectrum.bins, average, scratch_, flags,
+                   int(std::min<long>(count, std::numeric_limits<int>::max())), averaging_.every,
+                   -1.0, averaging_.forget),
+          "averaging");
+    average_.samples = spectrum.samples;
+    average_.length = spectrum.length;
+    average_.width = spectrum.width;
+    average_.window = spectrum.window;
+    average_.two_sided = spectrum.two_sided;
+    average_.averaged = count;
+}
+
+Spectrum SpectrumAverage::result() {
+    for (double& power : average_.bins.values()) power = std::sqrt(power);
+    return std::move(average_);
+}
+
+}  // namespace wavkit::tool

@@ -1,0 +1,150 @@
+#include "measure/spectrum.hpp"
+
+#include <wavkit/dsp.h>
+
+#include <algorithm>
+#include <array>
+#include <bit>
+#include <cmath>
+
+#include "base/error.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+constexpr int longest_transform = 1 << 30;
+
+/// The windows given by a formula fill the whole record, whatever its length: dsph_fft(), which
+/// windows in a width that need not be whole, has no use for them.
+bool takes_width(int window) {
+    return window != DSP_WINDOW_BARTLETT && window < DSP_WINDOW_KAISER70;
+}
+
+/// Whether the samples are transformed as many as they are: on request, and through windows that
+/// fill the record unless another length is asked for.
+bool as_they_are(const SpectrumSettings& settings) {
+    return settings.any_length ||
+           (!takes_width(settings.window) && settings.points == 0 && settings.fraction == 1);
+}
+
+int transform_length(const Signal& x, const SpectrumSettings& settings) {
+    if (as_they_are(settings)) {
+        return settings.points > 0 ? std::min(settings.points, x->points) : x->points;
+    }
+    const int wanted = settings.points > 0 ? settings.points : x->points;
+    if (wanted > longest_transform) throw Error("more than 1073741824 points to transform");
+    return int(std::bit_ceil(unsigned(std::max(wanted, 1))));
+}
+
+/// dsph_fft() for the other windows: the same samples, scale and layout.
+int padded_fft(const Signal& x, Signal& bins, const SpectrumSettings& settings, int length,
+               int samples) {
+    constexpr int scaled_split = 0x300;
+    if (dsp_copy_at_most(bins, x, samples) || dspi_window(bins, settings.window, 0)) return -1;
+    if (!settings.two_sided && dspi_scale(bins, 2.0)) return -1;
+    if (dspi_zpad2(bins, length, scaled_split)) return -1;
+    if (!settings.two_sided) return dspi_rfft(bins);
+    return dspi_fft(bins, 0) || dspi_swap_halves(bins) ? -1 : 0;
+}
+
+int transform(const Signal& x, Signal& bins, const SpectrumSettings& settings, int length,
+              int samples) {
+    const int flags = settings.two_sided ? DSP_SPECTRUM_TWO_SIDED : 0;
+    if (length == samples) {
+        return dsp_copy_at_most(bins, x, samples) || dsph_dft(bins, bins, settings.window, flags);
+    }
+    if (!takes_width(settings.window)) return padded_fft(x, bins, settings, length, samples);
+    return dsph_fft(x, bins, settings.points, settings.fraction, settings.window, flags);
+}
+
+}  // namespace
+
+std::vector<std::string> window_names() {
+    std::vector<std::string> names;
+    std::array<char, 64> name;
+    for (int id = 0; dsp_window_to_str(id, name.data(), int(name.size())) == 0; ++id) {
+        names.emplace_back(name.data());
+    }
+    return names;
+}
+
+std::string window_list() {
+    std::string list = " ";
+    std::size_t line = 0;
+    for (const auto& name : window_names()) {
+        if (list.size() - line + name.size() > 90) {
+            list += "\n ";
+            line = list.size();
+        }
+        list += " " + name;
+    }
+    return list;
+}
+
+int window_of_name(const std::string& name) {
+    int window;
+    if (dsp_window_from_str(name.c_str(), &window) == 0) return window;
+    std::string known;
+    for (const auto& other : window_names()) known += (known.empty() ? "" : ", ") + other;
+    throw UsageError("there is no window '" + name + "'; there are " + known);
+}
+
+void check_spacing(double delta) {
+    if (delta > 0) return;
+    throw Error("a sample spacing of " + std::to_string(delta) +
+                " gives no frequencies; set --delta or --rate");
+}
+
+void check_finite(std::span<const double> values, bool complex, long first) {
+    const auto bad = std::ranges::find_if_not(values, [](double v) { return std::isfinite(v); });
+    if (bad == values.end()) return;
+    const auto sample = first + (bad - values.begin()) / (complex ? 2 : 1);
+    throw Error("sample " + std::to_string(sample) + " is not a finite number");
+}
+
+Spectrum measure(const Signal& x, const SpectrumSettings& settings) {
+    if (x->points < 1) throw Error("the signal has no samples");
+    check_spacing(x->delta);
+    auto used = settings;
+    used.two_sided = settings.two_sided || x->complex;
+    const int length = transform_length(x, settings);
+    const double width = std::min(double(x->points), length * settings.fraction);
+    const int samples = std::min(x->points, int(std::ceil(width)));
+
+    Spectrum spectrum{{}, samples, length, width, settings.window, used.two_sided};
+    check(transform(x, spectrum.bins, used, length, samples), "computing the spectrum");
+    return spectrum;
+}
+
+Signal magnitudes(const Spectrum& spectrum) {
+    Signal result;
+    check(dspu_mag(spectrum.bins, result), "computing amplitudes");
+    return result;
+}
+
+Signal amplitudes(const Spectrum& spectrum) {
+    auto result = magnitudes(spectrum);
+    for (int i = 0; i < result->points; ++i) {
+        if (spectrum.has_no_mirror(i)) result->data[i] *= 0.5;
+    }
+    return result;
+}
+
+double amplitude_to_density(const Spectrum& spectrum, int bin) {
+    double bandwidth;  // in bins of the measured samples
+    check(dsp_window_enbw(&bandwidth, spectrum.window, spectrum.samples), "measuring the window");
+    bandwidth *= spectrum.bins->delta * spectrum.length / spectrum.width;
+    const double rms = spectrum.two_sided || spectrum.has_no_mirror(bin) ? 1.0 : std::sqrt(0.5);
+    return rms / std::sqrt(bandwidth);
+}
+
+Signal densities(const Spectrum& spectrum) {
+    auto result = amplitudes(spectrum);
+    const double interior = amplitude_to_density(spectrum, std::min(1, result->points - 1));
+    for (int i = 0; i < result->points; ++i) {
+        result->data[i] *= spectrum.has_no_mirror(i) ? amplitude_to_density(spectrum, i) : interior;
+    }
+    return result;
+}
+
+}  // namespace wavkit::tool

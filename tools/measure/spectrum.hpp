@@ -1,0 +1,68 @@
+// The amplitude spectrum of a signal, through every window of the catalogue.
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "base/signal.hpp"
+
+namespace wavkit::tool {
+
+struct SpectrumSettings {
+    int window = 2;
+    int points = 0;       // length of the transform, made a power of two; 0: as many as samples
+    double fraction = 1;  // share of the transform that samples fill; zeros fill the rest
+    bool two_sided = false;
+    bool any_length = false;  // no zeros: the transform is as long as the samples
+};
+
+struct Spectrum {
+    Signal bins;   // spaced in frequency by delta; complex, but real where they are an average
+    int samples;   // measured
+    int length;    // of the transform: samples and zeros
+    double width;  // of the window, in samples, which need not be whole
+    int window;
+    bool two_sided;
+    long averaged = 1;  // spectra that went into it
+
+    /// The bin of frequency 0.
+    int origin() const { return two_sided ? length / 2 : 0; }
+    double frequency(double bin) const { return (bin - origin()) * bins->delta; }
+    /// Whether a bin of a one-sided spectrum was doubled without a negative frequency to stand for.
+    bool has_no_mirror(int bin) const { return !two_sided && (bin == 0 || 2 * bin == length); }
+    /// How finely zeros at the end resolve the bins of the measured samples.
+    double padding() const { return double(length) / samples; }
+};
+
+/// The identifier of a window's name; throws with the list of all names.
+int window_of_name(const std::string& name);
+std::vector<std::string> window_names();
+/// All names in lines of a fair length.
+std::string window_list();
+
+/// Refuses a spacing from which no frequencies follow.
+void check_spacing(double delta);
+
+/// Refuses values that are not finite; `first` is the sample that the first one belongs to.
+void check_finite(std::span<const double> values, bool complex, long first = 0);
+
+/// Measures a signal of finite samples. A complex one always has a two-sided spectrum.
+Spectrum measure(const Signal& x, const SpectrumSettings& settings);
+
+/// The magnitude of every bin, as the transform left it.
+Signal magnitudes(const Spectrum& spectrum);
+
+/// The amplitude of every bin: in a one-sided spectrum the bins without a mirror image, 0 and half
+/// the sampling rate, were doubled like the others and are halved again, so that a constant reads
+/// as itself.
+Signal amplitudes(const Spectrum& spectrum);
+
+/// What takes the amplitude of a bin to its density, see densities().
+double amplitude_to_density(const Spectrum& spectrum, int bin);
+
+/// The density of every bin, per root of the frequency: the rms value of its component over the
+/// root of the window's noise bandwidth. White noise shows the same whatever window and length, and
+/// the squares times the spacing of the bins add up to the signal's mean square.
+Signal densities(const Spectrum& spectrum);
+
+}  // namespace wavkit::tool

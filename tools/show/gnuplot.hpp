@@ -1,0 +1,17 @@
+// Scripts for gnuplot.
+#pragma once
+
+#include <cstdio>
+#include <string>
+
+#include "base/scratch.hpp"
+
+namespace wavkit::tool {
+
+/// Text as a script takes it.
+std::string quoted(const std::string& text);
+
+/// Runs gnuplot on a script; what it draws goes to `to`.
+void run_gnuplot(std::FILE* script, std::FILE* to);
+
+}  // namespace wavkit::tool

@@ -1,0 +1,148 @@
+#include "show/spectrum_report.hpp"
+
+#include <wavkit/dsp.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <filesystem>
+
+#include "base/progress.hpp"
+#include "files/output.hpp"
+#include "show/plot.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+constexpr std::size_t peaks_in_summary = 5, peaks_in_picture = 5;
+
+/// Amplitudes or densities as they were asked for, in decibels or not.
+Signal shown(const SpectrumReport& report) {
+    auto y = report.options.density ? densities(report.spectrum) : amplitudes(report.spectrum);
+    if (report.options.decibels) check(dspi_db(y, 20.0), "computing decibels");
+    return y;
+}
+
+void write_table(std::FILE* to, const SpectrumReport& report) {
+    const auto& spectrum = report.spectrum;
+    const auto write = [&](const std::string& header, const Signal& y) {
+        const std::size_t width = y->complex ? 2 : 1;
+        std::fprintf(to, "frequency,%s\n", header.c_str());
+        for (int i = 0; i < y->points; ++i) {
+            const double frequency = spectrum.frequency(i);
+            if (!report.band.contains(frequency)) continue;
+            const auto value = y.values().subspan(std::size_t(i) * width, width);
+            std::fputs(number(frequency).c_str(), to);
+            for (const double part : value) std::fprintf(to, ",%s", number(part).c_str());
+            std::fputc('\n', to);
+        }
+    };
+    if (report.options.complex) {
+        write("re,im", spectrum.bins);
+    } else {
+        const std::string quantity = report.options.density ? "density" : "amplitude";
+        write(quantity + (report.options.decibels ? "_db" : ""), shown(report));
+    }
+}
+
+/// The strongest peaks, as high as they are drawn.
+std::vector<Mark> shown_peaks(const SpectrumReport& report, std::size_t count) {
+    const auto& spectrum = report.spectrum;
+    std::vector<Mark> marks;
+    for (const auto& peak : find_peaks(spectrum, count, report.band)) {
+        double height = peak.amplitude;
+        if (report.options.density) height *= amplitude_to_density(spectrum, peak.bin);
+        if (report.options.decibels) height = 20 * std::log10(height);
+        marks.push_back({peak.frequency, height});
+    }
+    return marks;
+}
+
+}  // namespace
+
+std::string with_unit(const std::string& name, const std::string& unit) {
+    return unit.empty() ? name : name + " (" + unit + ")";
+}
+
+std::string inverse_unit(const std::string& unit) {
+    return unit == "s" ? "Hz" : unit.empty() ? "" : "1/" + unit;
+}
+
+std::string quantity_name(bool density, bool decibels, const std::string& unit) {
+    const std::string detail = decibels ? "dB" : density && unit == "s" ? "/rtHz" : "";
+    return with_unit(density ? "density" : "amplitude", detail);
+}
+
+std::string short_name(const std::string& path) {
+    return path == "-" ? "standard input" : std::filesystem::path(path).filename().string();
+}
+
+std::string SpectrumReport::frequency_unit() const { return inverse_unit(unit); }
+
+std::string SpectrumReport::quantity() const {
+    return quantity_name(options.density, options.decibels, unit);
+}
+
+void write_output(const SpectrumReport& report) {
+    const auto& options = report.options;
+    Progress progress("writing");
+    if (options.writing.format_for(options.out) == Format::csv) {
+        OutputFile output(options.out);
+        write_table(output.stream(), report);
+        return output.commit();
+    }
+    if (report.spectrum.bins->complex && !options.decibels && !options.density) {
+        return write_recording(options.out, {&report.spectrum.bins, 1}, options.writing);
+    }
+    const auto y = shown(report);
+    write_recording(options.out, {&y, 1}, options.writing);
+}
+
+void print_peaks(const SpectrumReport& report, std::size_t count) {
+    const auto peaks = shown_peaks(report, count);
+    if (peaks.empty()) {
+        std::puts("no peaks");
+        return;
+    }
+    std::printf("%18s %18s %18s\n", with_unit("frequency", report.frequency_unit()).c_str(),
+                with_unit("period", report.unit).c_str(), report.quantity().c_str());
+    for (const auto& peak : peaks) {
+        std::printf("%18.8g %18.8g %18.6g\n", peak.x, 1 / std::fabs(peak.x), peak.y);
+    }
+}
+
+void print_summary(const SpectrumReport& report) {
+    const auto& spectrum = report.spectrum;
+    const auto name = window_names()[std::size_t(spectrum.window)];
+    if (spectrum.averaged > 1) std::printf("%ld segments of ", spectrum.averaged);
+    std::printf("%d samples through %s, transform of %d points, %s spectrum\n", spectrum.samples,
+                name.c_str(), spectrum.length, spectrum.two_sided ? "two-sided" : "one-sided");
+    const auto unit = report.frequency_unit();
+    std::printf("bins every %s%s, from %s to %s; strongest peaks:\n\n",
+                number(spectrum.bins->delta).c_str(), unit.empty() ? "" : (" " + unit).c_str(),
+                number(spectrum.frequency(0)).c_str(),
+                number(spectrum.frequency(spectrum.bins->points - 1)).c_str());
+    print_peaks(report, peaks_in_summary);
+}
+
+void draw_spectrum(const SpectrumReport& report) {
+    const auto& options = report.options;
+    const auto y = shown(report);
+    Curve curve;
+    curve.title =
+        short_name(options.in) + ", " + window_names()[std::size_t(report.spectrum.window)];
+    curve.x_label = with_unit("frequency", report.frequency_unit());
+    curve.y_label = report.quantity();
+    curve.decibels = options.decibels;
+    curve.unit = report.unit;
+    for (int i = 0; i < y->points; ++i) {
+        if (!report.band.contains(report.spectrum.frequency(i))) continue;
+        curve.x.push_back(report.spectrum.frequency(i));
+        curve.y.push_back(y->data[i]);
+    }
+    const auto count = std::min(options.peaks, peaks_in_picture);
+    if (count > 0) curve.marked = shown_peaks(report, count);
+    draw(curve, options.plot);
+}
+
+}  // namespace wavkit::tool

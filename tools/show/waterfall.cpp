@@ -1,0 +1,143 @@
+#include "show/waterfall.hpp"
+
+#include <algorithm>
+#include <cmath>
+
+#include "base/error.hpp"
+#include "base/progress.hpp"
+#include "files/csv.hpp"
+#include "files/output.hpp"
+#include "show/gnuplot.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+constexpr std::size_t most_columns = 1024;  // more than the picture has pixels
+constexpr int most_rows = 512;
+constexpr double deepest = 120;  // decibels of the colour scale at most
+
+/// The colours' range: the quietest hundredth may be darker than the scale.
+std::pair<double, double> colour_range(std::vector<double> cells) {
+    const auto quiet = cells.begin() + std::ptrdiff_t(cells.size() / 100);
+    std::ranges::nth_element(cells, quiet);
+    const double floor = *quiet, top = *std::ranges::max_element(cells);
+    const double low = std::max(floor, top - deepest);
+    return {low < top ? low : top - 1, top};
+}
+
+}  // namespace
+
+Waterfall::Waterfall(const Band& band, bool density, double step)
+    : band_(band), density_(density), step_(step) {}
+
+/// Settles, with the first spectrum, which bins make which row.
+void Waterfall::lay_out(const Spectrum& spectrum) {
+    const int points = spectrum.bins->points;
+    int end = 0;
+    first_bin_ = points;
+    for (int i = 0; i < points; ++i) {
+        if (!band_.contains(spectrum.frequency(i))) continue;
+        first_bin_ = std::min(first_bin_, i);
+        end = i + 1;
+    }
+    if (end - first_bin_ < 2) throw Error("there are too few frequencies to draw");
+    const double interior = density_ ? amplitude_to_density(spectrum, first_bin_ + 1) : 1.0;
+    for (int i = first_bin_; i < end; ++i) {
+        const bool edge = spectrum.has_no_mirror(i);
+        scale_.push_back(edge ? 0.5 * (density_ ? amplitude_to_density(spectrum, i) : 1.0)
+                              : interior);
+    }
+    bins_in_row_ = (end - first_bin_ + most_rows - 1) / most_rows;
+    rows_ = (scale_.size() + std::size_t(bins_in_row_) - 1) / std::size_t(bins_in_row_);
+    row_height_ = bins_in_row_ * spectrum.bins->delta;
+    low_frequency_ =
+        spectrum.frequency(first_bin_) + 0.5 * (bins_in_row_ - 1) * spectrum.bins->delta;
+    first_time_ = 0.5 * spectrum.samples / (spectrum.length * spectrum.bins->delta);
+}
+
+void Waterfall::add(const Spectrum& spectrum) {
+    if (scale_.empty()) lay_out(spectrum);
+    if (columns_.empty() || columns_.back().spectra == spectra_in_column_) {
+        if (columns_.size() == most_columns) merge_neighbours();
+        columns_.push_back({std::vector<double>(rows_), 0});
+    }
+    auto& column = columns_.back();
+    const auto m = magnitudes(spectrum);
+    for (std::size_t row = 0, bin = 0; row < rows_; ++row) {
+        // The strongest bin stands for its row, so that no line grows faint.
+        double strongest = 0;
+        const auto end = std::min(bin + std::size_t(bins_in_row_), scale_.size());
+        for (; bin < end; ++bin) {
+            strongest = std::max(strongest, scale_[bin] * m->data[first_bin_ + int(bin)]);
+        }
+        column.powers[row] += strongest * strongest;
+    }
+    ++column.spectra;
+}
+
+void Waterfall::merge_neighbours() {
+    for (std::size_t c = 0; c < columns_.size(); c += 2) {
+        auto& left = columns_[c];
+        const auto& right = columns_[c + 1];
+        for (std::size_t row = 0; row < rows_; ++row) left.powers[row] += right.powers[row];
+        left.spectra += right.spectra;
+        if (c > 0) columns_[c / 2] = std::move(left);
+    }
+    columns_.resize(columns_.size() / 2);
+    spectra_in_column_ *= 2;
+}
+
+std::vector<double> Waterfall::decibels(const Column& column) const {
+    std::vector<double> result;
+    for (const double power : column.powers) {
+        result.push_back(10 * std::log10(std::max(power / double(column.spectra), 1e-300)));
+    }
+    return result;
+}
+
+void Waterfall::draw(const std::string& path, const Labels& labels) const {
+    if (columns_.size() < 2) throw Error("there are too few segments to draw over time");
+    OutputFile picture(path);
+    {
+        Progress progress("drawing");
+        std::vector<double> cells;
+        for (const auto& column : columns_) {
+            const auto levels = decibels(column);
+            cells.insert(cells.end(), levels.begin(), levels.end());
+        }
+        const auto [low, high] = colour_range(cells);
+        const double width = step_ * double(spectra_in_column_);
+        const double left = first_time_ - 0.5 * step_;  // where the first column begins
+        const double bottom = low_frequency_ - 0.5 * row_height_;
+
+        const auto script = scratch();
+        std::FILE* const to = script.get();
+        std::fputs(
+            "set encoding utf8\nset key off\nset tics out nomirror\n"
+            "set terminal pngcairo noenhanced size 1000,560 font 'Sans,11'\n"
+            "set palette defined (0 '#000004', 1 '#1b0c41', 2 '#4a0c6b', 3 '#781c6d', "
+            "4 '#a52c60', 5 '#cf4446', 6 '#ed6925', 7 '#fb9b06', 8 '#f7d13d', 9 '#fcffa4')\n",
+            to);
+        std::fprintf(to, "set title %s\nset xlabel %s\nset ylabel %s\nset cblabel %s\n",
+                     quoted(labels.title).c_str(), quoted(labels.x).c_str(),
+                     quoted(labels.y).c_str(), quoted(labels.colour).c_str());
+        std::fprintf(to, "set xrange [%s:%s]\nset yrange [%s:%s]\nset cbrange [%s:%s]\n",
+                     number(left).c_str(), number(left + width * double(columns_.size())).c_str(),
+                     number(bottom).c_str(), number(bottom + row_height_ * double(rows_)).c_str(),
+                     number(low).c_str(), number(high).c_str());
+        std::fputs("$cells << EOD\n", to);
+        for (std::size_t row = 0; row < rows_; ++row) {
+            for (std::size_t c = 0; c < columns_.size(); ++c) {
+                std::fprintf(to, c ? " %.5g" : "%.5g", cells[c * rows_ + row]);
+            }
+            std::fputc('\n', to);
+        }
+        std::fprintf(to, "EOD\nplot $cells matrix using (%s+%s*$1):(%s+%s*$2):3 with image\n",
+                     number(left + 0.5 * width).c_str(), number(width).c_str(),
+                     number(low_frequency_).c_str(), number(row_height_).c_str());
+        run_gnuplot(to, picture.stream());
+    }
+    picture.commit();
+}
+
+}  // namespace wavkit::tool
