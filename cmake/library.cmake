@@ -2,35 +2,43 @@
 file(GLOB_RECURSE WAVKIT_SOURCES CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/*.cpp)
 file(GLOB WAVKIT_HEADERS CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/include/wavkit/*.h)
 
-# The kernels' widths are the compiler's vector extension; x86 processors get them in three forms.
-set(kernels ${PROJECT_SOURCE_DIR}/src/kernel)
-foreach(family fft convolve)
-  set_source_files_properties(${kernels}/${family}_baseline.cpp ${kernels}/${family}_avx2.cpp
-    ${kernels}/${family}_avx512.cpp PROPERTIES COMPILE_OPTIONS "-Wno-psabi;-ffp-contract=fast")
-  if(CMAKE_SYSTEM_PROCESSOR MATCHES "x86_64|AMD64")
-    set_property(SOURCE ${kernels}/${family}_avx2.cpp APPEND PROPERTY COMPILE_OPTIONS -mavx2 -mfma)
-    set_property(SOURCE ${kernels}/${family}_avx512.cpp APPEND PROPERTY COMPILE_OPTIONS
-      -mavx512f -mavx512dq -mavx512vl -mfma)
-  endif()
+include(cmake/sets.cmake)
+set(WAVKIT_GENERATED ${PROJECT_BINARY_DIR}/generated)
+wavkit_write_sets("${WAVKIT_HEADERS}" ${WAVKIT_GENERATED})
+set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${WAVKIT_HEADERS})
+
+# Objects of the library, for every processor of the target or for those of one instruction set.
+function(wavkit_add_objects name)
+  add_library(${name} OBJECT ${ARGN})
+  target_include_directories(${name} PUBLIC ${PROJECT_SOURCE_DIR}/include
+    PRIVATE ${PROJECT_SOURCE_DIR}/src ${WAVKIT_GENERATED})
+  target_compile_definitions(${name} PRIVATE WAVKIT_BUILDING)
+  # Products and sums are not fused behind the back of what stands on exact steps.
+  target_compile_options(${name} PRIVATE -fno-exceptions -fno-math-errno -fno-trapping-math
+    -ffp-contract=off -Wno-psabi $<$<CONFIG:Release>:-O3>)
+  set_target_properties(${name} PROPERTIES
+    CXX_VISIBILITY_PRESET hidden VISIBILITY_INLINES_HIDDEN ON)
+  target_link_libraries(${name} PRIVATE wavkit_options)
+endfunction()
+
+# The functions of the standard library that are not inlined have one name in all sets, of which
+# the linker takes the first: the plainest set comes first.
+set(entries ${PROJECT_SOURCE_DIR}/src/kernel/entries.cpp)
+list(REMOVE_ITEM WAVKIT_SOURCES ${entries})
+wavkit_add_objects(wavkit_entries ${entries})
+set(WAVKIT_OBJECTS $<TARGET_OBJECTS:wavkit_entries>)
+# Transforms and convolution are only the better for fused products and sums.
+file(GLOB fused ${PROJECT_SOURCE_DIR}/src/transform/*.cpp ${PROJECT_SOURCE_DIR}/src/filter/direct.cpp)
+set_source_files_properties(${fused} PROPERTIES COMPILE_OPTIONS -ffp-contract=fast)
+foreach(set IN LISTS WAVKIT_SETS)
+  wavkit_add_objects(wavkit_${set} ${WAVKIT_SOURCES})
+  target_compile_definitions(wavkit_${set} PRIVATE WAVKIT_SET=${set})
+  target_compile_options(wavkit_${set} PRIVATE ${WAVKIT_SET_OPTIONS_${set}}
+    -include ${WAVKIT_GENERATED}/names_${set}.h)
+  list(APPEND WAVKIT_OBJECTS $<TARGET_OBJECTS:wavkit_${set}>)
 endforeach()
-if(CMAKE_SYSTEM_PROCESSOR MATCHES "x86_64|AMD64")
-  set_source_files_properties(${kernels}/dispatch.cpp PROPERTIES
-    COMPILE_DEFINITIONS WAVKIT_X86_KERNELS)
-else()
-  list(FILTER WAVKIT_SOURCES EXCLUDE REGEX "src/kernel/.*_avx(2|512)\\.cpp$")
-endif()
 
-add_library(wavkit_objects OBJECT ${WAVKIT_SOURCES})
-target_include_directories(wavkit_objects
-  PUBLIC ${PROJECT_SOURCE_DIR}/include PRIVATE ${PROJECT_SOURCE_DIR}/src)
-target_compile_definitions(wavkit_objects PRIVATE WAVKIT_BUILDING)
-target_compile_options(wavkit_objects PRIVATE -fno-exceptions -fno-math-errno -fno-trapping-math
-                       -fno-semantic-interposition $<$<CONFIG:Release>:-O3>)
-set_target_properties(wavkit_objects PROPERTIES
-  CXX_VISIBILITY_PRESET hidden VISIBILITY_INLINES_HIDDEN ON)
-target_link_libraries(wavkit_objects PRIVATE wavkit_options)
-
-add_library(wavkit SHARED $<TARGET_OBJECTS:wavkit_objects>)
+add_library(wavkit SHARED ${WAVKIT_OBJECTS})
 set_target_properties(wavkit PROPERTIES VERSION ${PROJECT_VERSION} SOVERSION 2)
 target_link_libraries(wavkit PRIVATE wavkit_options)
 target_link_options(wavkit PRIVATE
@@ -42,7 +50,7 @@ set_property(TARGET wavkit APPEND PROPERTY LINK_DEPENDS ${PROJECT_SOURCE_DIR}/cm
 set(WAVKIT_TARGETS wavkit)
 
 if(WAVKIT_STATIC)
-  add_library(wavkit_static STATIC $<TARGET_OBJECTS:wavkit_objects>)
+  add_library(wavkit_static STATIC ${WAVKIT_OBJECTS})
   set_target_properties(wavkit_static PROPERTIES OUTPUT_NAME wavkit EXPORT_NAME wavkit_static)
   target_compile_definitions(wavkit_static INTERFACE WAVKIT_STATIC)
   list(APPEND WAVKIT_TARGETS wavkit_static)

@@ -5,7 +5,9 @@
 
 #include <stdint.h>
 
-#if defined(_WIN32)
+#if defined(WAVKIT_API)
+/* given */
+#elif defined(_WIN32)
 #if defined(WAVKIT_BUILDING)
 #define WAVKIT_API __declspec(dllexport)
 #elif defined(WAVKIT_STATIC)

@@ -6,6 +6,7 @@
 #include <cstring>
 
 #include "file/format.hpp"
+#include "state.hpp"
 
 namespace wavkit {
 namespace {
@@ -17,6 +18,8 @@ constexpr std::uint32_t magic_floats_only = 0xEB0220BE;   // its successor: no t
 
 constexpr std::uint32_t type_word_base = 0x0400;  // the scalar's size is its low byte
 constexpr std::uint32_t scalar_size_mask = 0xFF;
+
+constexpr std::size_t conversion_bytes = 1 << 16;
 
 constexpr std::uint32_t byte_reversed(std::uint32_t word) {
     return word >> 24 | (word >> 8 & 0xFF00) | (word << 8 & 0xFF0000) | word << 24;
@@ -51,34 +54,31 @@ struct Source {
     }
     template <class T>
     bool read(T& number) const {
-        return read(&number, 1) == 1;
+        if (std::fread(&number, sizeof number, 1, stream) != 1) return false;
+        if (reversed) reverse_bytes(number);
+        return true;
     }
 };
 
-/// Room for one load of stored scalars on their way into the other precision. It outlives the call
-/// that needed it first and goes with its thread.
-class ConversionBuffer {
-  public:
-    static constexpr std::size_t bytes = 1 << 16;
-
-    ~ConversionBuffer() { std::free(block_); }
-    void* block() {
-        if (!block_) block_ = std::malloc(bytes);
-        return block_;
+/// Room for one load of stored scalars on their way into the other precision: the thread's, which
+/// outlives the call that needed it first.
+template <Record R>
+void* conversion_buffer() {
+    auto& own = thread_state<R>;
+    if (!own.conversion) {
+        keep_until_thread_ends<R>();
+        own.conversion = std::malloc(conversion_bytes);
     }
-
-  private:
-    void* block_ = nullptr;
-};
-
-thread_local ConversionBuffer conversion_buffer;
+    return own.conversion;
+}
 
 /// Reads scalars of the other precision; returns how many came.
 template <class Stored, class T>
 std::size_t read_converted(const Source& source, T* to, std::size_t count) {
-    auto* const load = static_cast<Stored*>(conversion_buffer.block());
+    using R = std::conditional_t<sizeof(T) == 8, dsp, dspf>;
+    auto* const load = static_cast<Stored*>(conversion_buffer<R>());
     if (!load) return 0;
-    constexpr std::size_t capacity = ConversionBuffer::bytes / sizeof(Stored);
+    constexpr std::size_t capacity = conversion_bytes / sizeof(Stored);
     for (std::size_t done = 0;;) {
         const std::size_t wanted = std::min(count - done, capacity);
         const std::size_t came = source.read(load, wanted);
@@ -94,6 +94,15 @@ std::size_t read_scalars(const Source& source, std::uint32_t scalar_size, T* to,
     using Other = std::conditional_t<sizeof(T) == 8, float, double>;
     if (scalar_size == sizeof(T)) return source.read(to, count);
     return read_converted<Other>(source, to, count);
+}
+
+template <class T>
+bool read_scalar(const Source& source, std::uint32_t scalar_size, T& to) {
+    std::conditional_t<sizeof(T) == 8, float, double> other;
+    if (scalar_size == sizeof(T)) return source.read(to);
+    if (!source.read(other)) return false;
+    to = T(other);
+    return true;
 }
 
 /// Reads the magic and, in the current format, the type word: they settle the byte order of what
@@ -149,7 +158,7 @@ bool read_signal(R* x, Source source) {
     if (!read_format(source, scalar_size)) return false;
     if (!source.read(points) || !source.read(complex)) return false;
     x->complex = complex != 0;
-    if (read_scalars(source, scalar_size, &x->delta, 1) != 1) return false;
+    if (!read_scalar(source, scalar_size, x->delta)) return false;
     return read_samples(x, std::size_t(std::max(points, 0)), source, scalar_size);
 }
 

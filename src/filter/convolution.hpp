@@ -50,15 +50,6 @@ int filter_directly(const FilterCall<R>& call, R* work, scalar<R>* out);
 /// Through transforms, for real taps and blocks of no fewer samples than the order, which is at
 /// least 1.
 template <Record R>
-int filter_by_transform(const FilterCall<R>& call, R* work, scalar<R>* out);
-
-/// Release of what the filters keep between calls: the transformed taps, the taps that
-/// dspd_sfir() has expanded, the working records.
-template <Record R>
-int fir_free_cache();
-template <Record R>
-int sfir_free_cache();
-template <Record R>
-int filter_free_scratch();
+int filter_by_transform(const FilterCall<R>& call, scalar<R>* out);
 
 }  // namespace wavkit

@@ -23,16 +23,15 @@ void join_parts(const T* a, const T* b, bool complex_in, std::size_t n, Bin<T>* 
 template <Record R>
 void convolve(const FilterCall<R>& call, const scalar<R>* in, std::size_t n, scalar<R>* out) {
     using T = scalar<R>;
-    const auto kernel = kernel::convolve_kernel<T>();
     const T* taps = call.taps.data;
     const std::size_t count = length(&call.taps), w = width(&call.in);
-    if (!call.taps.complex) return kernel({taps, 1, count}, in, w, out, w * n);
+    if (!call.taps.complex) return kernel::convolve<T>({taps, 1, count}, in, w, out, w * n);
 
     std::array<T, 2 * batch> a, b;
     for (std::size_t i = 0; i < n; i += batch) {
         const std::size_t some = std::min(batch, n - i);
-        kernel({taps, 2, count}, in + w * i, w, a.data(), w * some);
-        kernel({taps + 1, 2, count}, in + w * i, w, b.data(), w * some);
+        kernel::convolve<T>({taps, 2, count}, in + w * i, w, a.data(), w * some);
+        kernel::convolve<T>({taps + 1, 2, count}, in + w * i, w, b.data(), w * some);
         join_parts(a.data(), b.data(), w == 2, some, reinterpret_cast<Bin<T>*>(out) + i);
     }
 }

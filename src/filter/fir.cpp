@@ -1,23 +1,12 @@
 // FIR filtering in blocks: which way to compute, where the output goes, what the state keeps.
 #include "filter/convolution.hpp"
+#include "state.hpp"
 
 namespace wavkit {
 namespace {
 
 /// From how many real taps on transforms are worth their while.
 constexpr std::size_t long_for_real = 46, long_for_complex = 36, long_for_symmetric = 61;
-
-template <Record R>
-struct Scratch {
-    R output;  // of filters that work in place
-    R work;
-};
-
-template <Record R>
-Scratch<R> scratch;
-
-template <Record R>
-R expanded_taps;
 
 /// Whether the samples of a record lie in the block that another one owns.
 template <Record R>
@@ -64,17 +53,19 @@ int keep_history(const FilterCall<R>& call, R* work, R* state) {
 
 template <Record R>
 int compute(const FilterCall<R>& call, std::size_t many_taps, scalar<R>* out) {
-    R* work = &scratch<R>.work;
+    R* work = &thread_state<R>.filter_scratch.work;
     const bool transforms =
         !call.taps.complex && length(&call.taps) >= many_taps && call.samples() >= call.order();
-    return transforms ? filter_by_transform(call, work, out) : filter_directly(call, work, out);
+    return transforms ? filter_by_transform(call, out) : filter_directly(call, work, out);
 }
 
 template <Record R>
 int filter(const R* in, R* out, const R* taps, R* state, std::size_t many_taps) {
     if (length(taps) == 0) return dsp_copy(out, in);
     const FilterCall<R> call{*in, *taps, state ? *state : R{}, state != nullptr};
-    R* result = overlaps(out, call) ? &scratch<R>.output : out;
+    auto& scratch = thread_state<R>.filter_scratch;
+    keep_until_thread_ends<R>();
+    R* result = overlaps(out, call) ? &scratch.output : out;
     result->delta = call.in.delta;
     if (resize(result, call.samples(), call.in.complex || call.taps.complex)) return -1;
     if (compute(call, many_taps, result->data)) return -1;
@@ -82,7 +73,7 @@ int filter(const R* in, R* out, const R* taps, R* state, std::size_t many_taps) 
     // An output that is the state keeps no history. One that owns the state's buffer leaves it.
     if (state && state != out) {
         if (state->alloc < 1 && overlaps(out, call.state) && dsp_copy(state, state)) return -1;
-        if (keep_history(call, &scratch<R>.work, state)) return -1;
+        if (keep_history(call, &scratch.work, state)) return -1;
     }
     return result == out ? 0 : dsp_copy(out, result);
 }
@@ -116,28 +107,12 @@ int expand(const R* half, bool odd, bool anti, R* taps) {
 template <Record R>
 int symmetric_fir(const R* in, R* out, const R* half, bool odd, bool anti, R* state) {
     if (length(half) == 0) return dsp_copy(out, in);
-    R* taps = &expanded_taps<R>;
+    R* taps = &thread_state<R>.expanded_taps;
     if (expand(half, odd, anti, taps)) return -1;
     return filter(in, out, taps, state, long_for_symmetric);
 }
 
 }  // namespace
-
-template <Record R>
-int sfir_free_cache() {
-    return dsp_destroy(&expanded_taps<R>);
-}
-
-template <Record R>
-int filter_free_scratch() {
-    return status(dsp_destroy(&scratch<R>.output) || dsp_destroy(&scratch<R>.work));
-}
-
-template int sfir_free_cache<dsp>();
-template int sfir_free_cache<dspf>();
-template int filter_free_scratch<dsp>();
-template int filter_free_scratch<dspf>();
-
 }  // namespace wavkit
 
 int dspd_fir(const dsp* in, dsp* out, const dsp* taps, dsp* state) {

@@ -6,27 +6,11 @@
 #include <bit>
 
 #include "filter/convolution.hpp"
+#include "state.hpp"
+#include "transform/transform.hpp"
 
 namespace wavkit {
 namespace {
-
-/// The spectrum of the taps for stretches of 2^exponent samples; 0: there is none.
-template <Record R>
-struct TapSpectrum {
-    R bins;
-    int exponent;
-};
-
-/// The taps of the last call and their spectra: the first half, for real input, and the whole one,
-/// for complex input.
-template <Record R>
-struct TapCache {
-    R taps;
-    TapSpectrum<R> half, whole;
-};
-
-template <Record R>
-TapCache<R> cache;
 
 /// Taps that differ by less than this fraction of the first one count as the same.
 constexpr double same_taps = 5 * std::numeric_limits<double>::epsilon();
@@ -66,47 +50,35 @@ bool are_finite(const R* taps) {
 /// Whether taps are those of the last call. A comparison takes a NaN for anything.
 template <Record R>
 bool are_current(const R* taps) {
-    const R* last = &cache<R>.taps;
+    const R* last = &thread_state<R>.tap_cache.taps;
     const auto tolerance = std::fabs(taps->data[0]) * scalar<R>(same_taps);
     int difference;
     return are_finite(taps) && are_finite(last) &&
            dsp_cmp(taps, last, tolerance, &difference) == 0 && difference == 0;
 }
 
-/// Transforms a stretch of 2^exponent samples: half its spectrum or, of complex samples, all of it.
-template <Record R>
-int transform(R* x) {
-    return x->complex ? dspi_fft(x, 0) : dspi_rfft(x);
-}
-
-template <Record R>
-int transform_back(R* x, bool to_complex) {
-    return to_complex ? dspi_fft(x, 1) : dspi_irfft(x);
-}
-
-/// Room for 2^exponent samples and for their spectrum.
-template <Record R>
-int make_stretch(R* x, int exponent, bool is_complex) {
-    const std::uint64_t p = std::uint64_t(1) << exponent;
-    if (resize(x, is_complex ? p : p / 2 + 1, true)) return -1;
-    x->points = int(p);
-    x->complex = is_complex;
-    x->delta = 1;
-    return 0;
-}
-
-/// The spectrum of the current taps, for products with the scaled spectra of stretches.
+/// The spectrum of the current taps, divided by the length of the stretches, which one transform
+/// there and one back multiply by.
 template <Record R>
 int fill_spectrum(TapSpectrum<R>* spectrum, int exponent, bool whole) {
+    using T = scalar<R>;
+    const int p = 1 << exponent;
+    const auto scale = T(1) / T(p);
     R* x = &spectrum->bins;
     spectrum->exponent = 0;
-    if (make_stretch(x, exponent, false)) return -1;
-    const auto points = scalar<R>(x->points);
-    const auto taps = values(&cache<R>.taps);
-    auto* end =
-        std::transform(taps.begin(), taps.end(), x->data, [=](auto h) { return h * points; });
-    std::fill(end, x->data + x->points, scalar<R>(0));
-    if ((whole && dspi_rtoc(x)) || transform(x)) return -1;
+    keep_until_thread_ends<R>();
+    if (resize(x, whole ? std::uint64_t(p) : std::uint64_t(p) / 2 + 1, true)) return -1;
+    const auto taps = values(&thread_state<R>.tap_cache.taps);
+    std::ranges::fill(values(x), T(0));
+    if (whole) {
+        for (std::size_t k = 0; k < taps.size(); ++k) bins(x)[k].re = taps[k];
+    } else {
+        std::ranges::copy(taps, x->data);
+    }
+    if (whole ? transform<R>(bins(x).data(), p, false, scale)
+              : transform_real<R>(x->data, p, scale)) {
+        return -1;
+    }
     spectrum->exponent = exponent;
     return 0;
 }
@@ -114,9 +86,10 @@ int fill_spectrum(TapSpectrum<R>* spectrum, int exponent, bool whole) {
 /// The spectrum of the taps for a call, as cached or anew; null when memory runs out.
 template <Record R>
 const TapSpectrum<R>* find_spectrum(const FilterCall<R>& call) {
-    auto& c = cache<R>;
+    auto& c = thread_state<R>.tap_cache;
     if (!are_current(&call.taps)) {
         c.half.exponent = c.whole.exponent = 0;
+        keep_until_thread_ends<R>();
         if (dsp_copy(&c.taps, &call.taps)) {
             c.taps.points = 0;
             return nullptr;
@@ -130,54 +103,57 @@ const TapSpectrum<R>* find_spectrum(const FilterCall<R>& call) {
     return spectrum;
 }
 
-/// A stretch to 2^exponent samples, filtered circularly.
+template <class T>
+void multiply(Bin<T>* x, std::span<const Bin<T>> y) {
+    for (std::size_t k = 0; k < y.size(); ++k) x[k] = x[k] * y[k];
+}
+
+/// A stretch of p samples, filtered circularly.
 template <Record R>
-int filter_stretch(R* x, const R* spectrum) {
-    const bool is_complex = x->complex;
-    return status(transform(x) || dspb_mul(x, spectrum, x) || transform_back(x, is_complex));
+int filter_stretch(scalar<R>* x, int p, bool is_complex, const R* spectrum) {
+    using T = scalar<R>;
+    auto* const z = reinterpret_cast<Bin<T>*>(x);
+    if (is_complex ? transform<R>(z, p, false, T(1)) : transform_real<R>(x, p, T(1))) return -1;
+    multiply<T>(z, bins(spectrum));
+    return is_complex ? transform<R>(z, p, true, T(1)) : transform_to_real<R>(x, p, T(1));
 }
 
 /// Copies the samples of a stretch whose outputs begin at sample `first`, zeros behind the last.
 template <Record R>
-void copy_stretch(const FilterCall<R>& call, std::size_t first, std::size_t count, R* stretch) {
+void copy_stretch(const FilterCall<R>& call, std::size_t first, std::size_t count,
+                  std::span<scalar<R>> stretch) {
     const std::size_t w = width(&call.in), order = call.order();
     if (first == 0) {
-        call.write_history(stretch->data);
+        call.write_history(stretch.data());
     } else {
-        std::copy_n(call.in.data + w * (first - order), w * order, stretch->data);
+        std::copy_n(call.in.data + w * (first - order), w * order, stretch.data());
     }
-    auto* end = std::copy_n(call.in.data + w * first, w * count, stretch->data + w * order);
-    std::fill(end, stretch->data + used(stretch), scalar<R>(0));
+    const auto end = std::copy_n(call.in.data + w * first, w * count, stretch.begin() + w * order);
+    std::fill(end, stretch.end(), scalar<R>(0));
 }
 
 }  // namespace
 
 template <Record R>
-int filter_by_transform(const FilterCall<R>& call, R* work, scalar<R>* out) {
+int filter_by_transform(const FilterCall<R>& call, scalar<R>* out) {
     const TapSpectrum<R>* spectrum = find_spectrum(call);
     if (!spectrum) return -1;
     const std::size_t w = width(&call.in), order = call.order(), n = call.samples();
-    const std::size_t fresh = (std::size_t(1) << spectrum->exponent) - order;
+    const int p = 1 << spectrum->exponent;
+    const std::size_t fresh = std::size_t(p) - order, scalars = w * std::size_t(p);
+    // A real stretch has one bin more than half its samples.
+    scalar<R>* const stretch = reserve_room<R>(int(scalars), scalars + 2);
+    if (!stretch) return -1;
     for (std::size_t first = 0; first < n; first += fresh) {
         const std::size_t count = std::min(fresh, n - first);
-        if (make_stretch(work, spectrum->exponent, call.in.complex)) return -1;
-        copy_stretch(call, first, count, work);
-        if (filter_stretch(work, &spectrum->bins)) return -1;
-        std::copy_n(work->data + w * order, w * count, out + w * first);
+        copy_stretch(call, first, count, {stretch, scalars});
+        if (filter_stretch(stretch, p, w == 2, &spectrum->bins)) return -1;
+        std::copy_n(stretch + w * order, w * count, out + w * first);
     }
     return 0;
 }
 
-template <Record R>
-int fir_free_cache() {
-    auto& c = cache<R>;
-    c.half.exponent = c.whole.exponent = 0;
-    return status(dsp_destroy(&c.taps) || dsp_destroy(&c.half.bins) || dsp_destroy(&c.whole.bins));
-}
-
-template int filter_by_transform(const FilterCall<dsp>&, dsp*, double*);
-template int filter_by_transform(const FilterCall<dspf>&, dspf*, float*);
-template int fir_free_cache<dsp>();
-template int fir_free_cache<dspf>();
+template int filter_by_transform(const FilterCall<dsp>&, double*);
+template int filter_by_transform(const FilterCall<dspf>&, float*);
 
 }  // namespace wavkit

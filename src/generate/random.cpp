@@ -1,53 +1,65 @@
 // Random samples of four distributions, and random order.
 #include <algorithm>
+#include <bit>
 #include <chrono>
 #include <cstdint>
-#include <cstdlib>
 #include <utility>
 
 #include "record_view.hpp"
+#include "state.hpp"
 
 namespace wavkit {
 namespace {
 
-/// What a precision keeps between draws.
-template <Record R>
-struct Draws {
-    bool seeded = false;
-    bool has_spare = false;
-    scalar<R> spare = 0;  // the second normal value of a pair
-};
-
-template <Record R>
-Draws<R> draws;
-
-/// The time tells runs of a process apart, the address, which systems choose at random, processes
-/// of the same time, and also the two precisions.
-template <Record R>
-unsigned fresh_seed() {
-    const auto now = std::chrono::system_clock::now().time_since_epoch().count();
-    auto bits = std::uint64_t(now) ^ std::uint64_t(reinterpret_cast<std::uintptr_t>(&draws<R>));
-    bits = (bits ^ bits >> 30) * 0xbf58476d1ce4e5b9u;  // the finaliser of Steele et al., 2014
-    bits = (bits ^ bits >> 27) * 0x94d049bb133111ebu;
-    return unsigned(bits ^ bits >> 31);
+/// Steps of a counter, mixed well (Steele, Lea and Flood, "Fast splittable pseudorandom number
+/// generators", 2014): what spreads a seed over a state.
+std::uint64_t next_mixed(std::uint64_t& counter) {
+    std::uint64_t z = counter += 0x9e3779b97f4a7c15u;
+    z = (z ^ z >> 30) * 0xbf58476d1ce4e5b9u;
+    z = (z ^ z >> 27) * 0x94d049bb133111ebu;
+    return z ^ z >> 31;
 }
 
 template <Record R>
-void seed_once() {
-    if (draws<R>.seeded) return;
-    std::srand(fresh_seed<R>());
-    draws<R>.seeded = true;
+void start_from(std::uint64_t seed) {
+    auto& draws = thread_state<R>.draws;
+    for (auto& word : draws.generator) word = next_mixed(seed);
+    draws.seeded = true;
+    draws.has_spare = false;
 }
 
-/// What the least capable of runtimes gives a call.
-unsigned draw_15_bits() { return unsigned(std::rand()) & 0x7fff; }
+/// The time tells runs and threads that follow one another apart; the address, which systems choose
+/// at random, processes and threads of the same time, and the two precisions.
+template <Record R>
+std::uint64_t fresh_seed() {
+    std::uint64_t bits = std::uint64_t(reinterpret_cast<std::uintptr_t>(&thread_state<R>.draws));
+    bits = next_mixed(bits);
+    bits ^= std::uint64_t(std::chrono::system_clock::now().time_since_epoch().count());
+    bits = next_mixed(bits);
+    return bits ^ std::uint64_t(std::chrono::steady_clock::now().time_since_epoch().count());
+}
+
+/// 64 bits of xoshiro256++ (Blackman and Vigna, "Scrambled linear pseudorandom number generators",
+/// 2021).
+template <Record R>
+std::uint64_t draw_bits() {
+    auto& draws = thread_state<R>.draws;
+    if (!draws.seeded) start_from<R>(fresh_seed<R>());
+    auto& s = draws.generator;
+    const std::uint64_t result = std::rotl(s[0] + s[3], 23) + s[0], shifted = s[1] << 17;
+    s[2] ^= s[0];
+    s[3] ^= s[1];
+    s[1] ^= s[2];
+    s[0] ^= s[3];
+    s[2] ^= shifted;
+    s[3] = std::rotl(s[3], 45);
+    return result;
+}
 
 /// An integer from 0 to 2^31 - 1.
 template <Record R>
 std::uint32_t draw_integer() {
-    seed_once<R>();
-    const std::uint32_t high = draw_15_bits(), middle = draw_15_bits() & 1, low = draw_15_bits();
-    return high << 16 | middle << 15 | low;
+    return std::uint32_t(draw_bits<R>() >> 33);
 }
 
 /// An integer from 0 to count - 1: those left over beyond the last multiple of count are drawn
@@ -61,15 +73,12 @@ std::uint32_t draw_below(std::uint32_t count) {
     }
 }
 
-/// From 0 up to, not including, 1: 60 random bits, of which the last ones may round to 1.
+/// From 0 up to, not including, 1, with all bits of the precision.
 template <Record R>
 scalar<R> draw_uniform() {
     using T = scalar<R>;
-    constexpr T below_one = 1 - std::numeric_limits<T>::epsilon() / 2;
-    seed_once<R>();
-    double u = 0;
-    for (int i = 0; i < 4; ++i) u = (u + draw_15_bits()) * 0x1p-15;
-    return std::min(T(u), below_one);
+    constexpr int digits = std::numeric_limits<T>::digits;
+    return T(draw_bits<R>() >> (64 - digits)) * (std::numeric_limits<T>::epsilon() / 2);
 }
 
 /// From -1 up to, not including, 1.
@@ -95,7 +104,7 @@ Bin<scalar<R>> draw_in_disc() {
 /// Marsaglia's polar method: two values at a time, of which one waits.
 template <Record R>
 scalar<R> draw_normal() {
-    auto& kept = draws<R>;
+    auto& kept = thread_state<R>.draws;
     if (std::exchange(kept.has_spare, false)) return kept.spare;
     const auto z = draw_in_disc<R>();
     const auto s = std::max(magnitude_squared(z), limits<R>::floor);

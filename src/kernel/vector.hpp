@@ -1,14 +1,31 @@
 // Short vectors of samples, one type for every width, on the compiler's vector extension.
-//
-// Everything here has internal linkage: the files that use it are compiled for different
-// instruction sets, and no function of one may be taken for that of another.
 #pragma once
 
 #include <cstddef>
+#include <type_traits>
 #include <utility>
 
 namespace wavkit::kernel {
-namespace {
+
+/// Bytes of a vector register of the instruction set that this is compiled for.
+#if defined(__AVX512F__)
+inline constexpr int register_bytes = 64;
+#elif defined(__AVX2__)
+inline constexpr int register_bytes = 32;
+#else
+inline constexpr int register_bytes = 16;
+#endif
+
+/// Samples that a register holds.
+template <class T>
+inline constexpr int lanes = register_bytes / int(sizeof(T));
+
+/// Calls f(0), f(1), ... f(N - 1) with constants.
+template <int N, class F>
+inline void unrolled(F f) {
+    [&]<int... I>(std::integer_sequence<int, I...>) { (f(std::integral_constant<int, I>{}), ...); }
+    (std::make_integer_sequence<int, N>{});
+}
 
 template <class T, int V>
 struct VectorType {
@@ -28,6 +45,11 @@ inline Vec<T, V> load(const T* p) {
 template <class T, int V>
 inline void store(T* p, Vec<T, V> v) {
     __builtin_memcpy(p, &v, sizeof v);
+}
+
+template <class T, int V>
+inline Vec<T, V> broadcast(T value) {
+    return value - Vec<T, V>{};
 }
 
 /// V complex samples, real and imaginary parts apart.
@@ -149,5 +171,4 @@ inline void transpose(Vec<T, V>* rows) {
     }
 }
 
-}  // namespace
 }  // namespace wavkit::kernel

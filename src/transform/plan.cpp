@@ -1,227 +1,296 @@
-// Lays out, once a length, what the transform kernels read: twiddles in the order of their use.
+// Lays out, once a length, what the passes read: radices, and twiddles in the order of their use.
 #include "transform/plan.hpp"
 
-#include <algorithm>
+#include <bit>
+#include <new>
 
-#include "transform/mixed.hpp"
-#include "transform/tables.hpp"
+#include "transform/roots.hpp"
 
 namespace wavkit {
 namespace {
 
-using kernel::direct_limit;
-using kernel::FftPlan;
+using kernel::has_twiddles_by_lanes;
+using kernel::lanes;
+using kernel::Matrix;
+using kernel::narrow_lanes;
+using kernel::Passes;
 using kernel::strip_width;
 
-template <Record R>
-struct Plans {
-    std::array<Fft<scalar<R>>, exponents> ffts{};
-    std::array<bool, exponents> ready{};
-    TableCache<scalar<R>> tables, split_roots;
-    const kernel::FftKernels<scalar<R>>* chosen = nullptr;
-    scalar<R>* work = nullptr;
-    std::size_t work_scalars = 0;
-};
+/// The longest powers of two that go through passes: data and workspace then fit the second-level
+/// cache.
+template <class T>
+constexpr std::size_t longest_direct = std::size_t(1) << (sizeof(T) == 8 ? 14 : 15);
 
-template <Record R>
-Plans<R> plans;
+/// Whether butterflies of eight samples and their twiddles have room in the registers.
+constexpr bool many_registers = kernel::register_bytes == 64;
 
-/// Writes roots of unity of n points one after the other, as pairs or in blocks of lanes; or, on a
-/// dry run without memory, counts them.
+/// The values that tables hold, one after the other; or, on a dry run without memory, their number.
 template <class T>
 class Writer {
   public:
-    Writer(const T* twiddle_table, std::size_t n, T* memory)
-        : table_(twiddle_table), n_(n), memory_(memory) {}
+    explicit Writer(T* memory) : memory_(memory) {}
 
-    const T* here() const { return memory_ ? memory_ + used_ : nullptr; }
+    T* here() const { return memory_ ? memory_ + used_ : nullptr; }
     std::size_t used() const { return used_; }
+    void skip(std::size_t scalars) { used_ += scalars; }
+    void align() { used_ = aligned_count<T>(used_); }
 
-    void pair(std::size_t k) { put(used_, used_ + 1, k), used_ += 2; }
-
-    /// Lanes of the roots k(0), k(1), ...: all cosines, then all negated sines.
-    template <class Index>
-    void block(std::size_t lanes, Index k) {
-        for (std::size_t lane = 0; lane < lanes; ++lane) {
-            put(used_ + lane, used_ + lanes + lane, k(lane));
+    void put(Bin<T> root) {
+        if (memory_) memory_[used_] = root.re, memory_[used_ + 1] = root.im;
+        used_ += 2;
+    }
+    /// All cosines of lanes(0), lanes(1), ..., then all negated sines.
+    template <class Lane>
+    void put_lanes(std::size_t count, Lane lane) {
+        for (std::size_t i = 0; memory_ && i < count; ++i) {
+            const Bin<T> root = lane(i);
+            memory_[used_ + i] = root.re;
+            memory_[used_ + count + i] = root.im;
         }
-        used_ += 2 * lanes;
+        used_ += 2 * count;
     }
 
   private:
-    void put(std::size_t re, std::size_t im, std::size_t k) {
-        if (!memory_) return;
-        const Bin<T> root = root_of_unity(table_, n_, k & (n_ - 1));
-        memory_[re] = root.re;
-        memory_[im] = root.im;
-    }
-
-    const T* table_;
-    std::size_t n_;
     T* memory_;
     std::size_t used_ = 0;
 };
 
-/// Twiddles of the radix-4 passes over blocks of n, n / 4, ... points: those of a pass shorter than
-/// a vector lane by lane, those of the others one triple a rotation. `step` is how far apart the
-/// roots of n points lie among those that the writer knows.
+/// Appends the radices of 2^exponent: as many eights as leave fours only, the eights first.
 template <class T>
-void write_passes(Writer<T>& out, std::size_t n, std::size_t step, std::size_t stride,
-                  std::size_t lanes) {
-    for (; n > 8; n /= 4, step *= 4, stride *= 4) {
-        if (stride < lanes) {
-            for (std::size_t i = 0; i < n / 4 * stride; i += lanes) {
-                for (std::size_t power = 1; power <= 3; ++power) {
-                    out.block(lanes,
-                              [&](std::size_t lane) { return (i + lane) / stride * power * step; });
+void add_eights(Passes<T>& passes, int exponent) {
+    while (exponent > 4 || exponent == 3) {
+        passes.radices[std::size_t(passes.count++)] = 8;
+        exponent -= 3;
+    }
+    for (; exponent > 1; exponent -= 2) passes.radices[std::size_t(passes.count++)] = 4;
+    if (exponent == 1) passes.radices[std::size_t(passes.count++)] = 2;
+}
+
+/// The same as fours, and a last eight or two where the exponent is odd.
+template <class T>
+void add_fours(Passes<T>& passes, int exponent, bool alone) {
+    const bool eight = alone && exponent % 2 == 1 && exponent >= 3;
+    for (int left = eight ? exponent - 3 : exponent; left > 1; left -= 2) {
+        passes.radices[std::size_t(passes.count++)] = 4;
+    }
+    if (exponent % 2 == 1) passes.radices[std::size_t(passes.count++)] = eight ? 8 : 2;
+}
+
+/// The passes of a length, powers of two first.
+template <class T>
+Passes<T> factorised(std::size_t n, bool eights) {
+    Passes<T> passes{.points = n};
+    const int exponent = std::countr_zero(n);
+    std::size_t odd = n >> exponent;
+    if (eights) {
+        add_eights(passes, exponent);
+    } else {
+        add_fours(passes, exponent, odd == 1);
+    }
+    for (const std::size_t radix : {3, 5, 7}) {
+        for (; odd % radix == 0; odd /= radix) {
+            passes.radices[std::size_t(passes.count++)] = static_cast<unsigned char>(radix);
+        }
+    }
+    return passes;
+}
+
+/// Whether whole vectors of so many lanes go through all passes: the first one fills them, and what
+/// follows brings the stride to a multiple of them.
+template <class T>
+bool fills(const Passes<T>& passes, std::size_t vector) {
+    std::size_t stride = passes.radices[0];
+    if (passes.count < 2 || (stride != 4 && stride != 8) || passes.points / stride < vector) {
+        return false;
+    }
+    for (int i = 1; stride % vector != 0; ++i) {
+        const std::size_t radix = passes.radices[std::size_t(i)];
+        const bool short_pass = (radix == 4 || radix == 8) && (stride == 4 || stride == 8);
+        if (i + 1 >= passes.count || !short_pass || passes.points / radix % vector != 0) {
+            return false;
+        }
+        stride *= radix;
+    }
+    return true;
+}
+
+template <class T>
+Passes<T> passes_of(std::size_t n) {
+    for (const int vector : {lanes<T>, narrow_lanes<T>}) {
+        for (const bool eights : {true, false}) {
+            if (eights && !many_registers) continue;
+            auto passes = factorised<T>(n, eights);
+            passes.vector = vector;
+            passes.blocks = fills(passes, std::size_t(vector));
+            if (passes.blocks) return passes;
+        }
+    }
+    auto passes = factorised<T>(n, false);
+    passes.vector = narrow_lanes<T>;
+    return passes;
+}
+
+/// Twiddles of all passes but the last, those of a pass shorter than a vector lane by lane. `stride`
+/// samples side by side belong to transforms of their own; `step` is how far apart the roots of the
+/// passes lie among those of the whole.
+template <class T>
+void write_twiddles(Passes<T>& passes, const Roots<T>& roots, std::size_t stride, std::size_t step,
+                    Writer<T>& to) {
+    to.align();
+    passes.twiddles = to.here();
+    std::size_t n = passes.points;
+    const auto vector = std::size_t(passes.vector);
+    for (int i = 0; i + 1 < passes.count; ++i) {
+        const std::size_t radix = passes.radices[std::size_t(i)], part = n / radix;
+        const std::size_t butterflies = part * stride;
+        if (has_twiddles_by_lanes(passes, part, stride)) {
+            for (std::size_t first = 0; first < butterflies; first += vector) {
+                const auto start = kernel::vector_start(first, vector, butterflies);
+                for (std::size_t k = 1; k < radix; ++k) {
+                    to.put_lanes(vector, [&](std::size_t lane) {
+                        return roots(std::int64_t((start + lane) / stride * k * step));
+                    });
                 }
             }
         } else {
-            for (std::size_t p = 1; p < n / 4; ++p) {
-                for (std::size_t power = 1; power <= 3; ++power) out.pair(p * power * step);
+            for (std::size_t p = 1; p < part; ++p) {
+                for (std::size_t k = 1; k < radix; ++k) {
+                    to.put(to.here() ? roots(std::int64_t(p * k * step)) : Bin<T>{});
+                }
             }
         }
+        n = part;
+        stride *= radix;
+        step *= radix;
     }
 }
 
 template <class T>
-void lay_out_direct(FftPlan<T>& plan, Writer<T>& out, std::size_t lanes) {
-    plan.twiddles = out.here();
-    write_passes(out, plan.points, 1, 1, lanes);
-}
-
-template <class T>
-void lay_out_matrix(FftPlan<T>& plan, Writer<T>& out, int exponent, std::size_t lanes) {
-    plan.columns = std::size_t(1) << exponent / 2;
-    plan.rows = plan.points / plan.columns;
-    plan.fine_bits = exponent / 2;
-
-    plan.row_twiddles = out.here();
-    write_passes(out, plan.rows, plan.columns, strip_width<T>, lanes);
-    plan.column_twiddles = out.here();
-    write_passes(out, plan.columns, plan.rows, strip_width<T>, lanes);
-    while (out.used() % (alignment / sizeof(T)) != 0) out.pair(0);
-    plan.rotations = out.here();
-    for (std::size_t k = 0; k < plan.rows; ++k) {
-        for (std::size_t b = 0; b < strip_width<T>; b += lanes) {
-            out.block(lanes, [&](std::size_t lane) { return (b + lane) * k; });
+void write_matrix(Matrix<T>& matrix, const Roots<T>& roots, Writer<T>& to) {
+    const std::size_t n = matrix.points(), mask = n - 1, width = strip_width<T>;
+    const auto root = [&](std::size_t k) {
+        return to.here() ? roots(std::int64_t(k & mask)) : Bin<T>{};
+    };
+    write_twiddles(matrix.of_rows, roots, width, matrix.columns, to);
+    write_twiddles(matrix.of_columns, roots, width, matrix.rows, to);
+    to.align();
+    matrix.rotations = to.here();
+    for (std::size_t k = 0; k < matrix.rows; ++k) {
+        for (std::size_t b = 0; b < width; b += lanes<T>) {
+            to.put_lanes(lanes<T>, [&](std::size_t lane) { return root((b + lane) * k); });
         }
     }
-    plan.coarse_roots = out.here();
-    for (std::size_t k = 0; k < plan.points; k += std::size_t(1) << plan.fine_bits) out.pair(k);
-    plan.fine_roots = out.here();
-    for (std::size_t k = 0; k < std::size_t(1) << plan.fine_bits; ++k) out.pair(k);
+    matrix.coarse_roots = to.here();
+    for (std::size_t k = 0; k < n; k += std::size_t(1) << matrix.fine_bits) to.put(root(k));
+    matrix.fine_roots = to.here();
+    for (std::size_t k = 0; k < std::size_t(1) << matrix.fine_bits; ++k) to.put(root(k));
 }
 
 template <class T>
-void lay_out(FftPlan<T>& plan, Writer<T>& out, int exponent, const kernel::FftKernels<T>& kernels) {
-    const bool wide = plan.points >= kernel::wide_from;
-    const auto lanes = std::size_t(wide ? kernels.wide_lanes : kernels.narrow_lanes);
-    if (plan.points <= direct_limit<T>) {
-        lay_out_direct(plan, out, lanes);
+Matrix<T> matrix_of(std::size_t n) {
+    const int exponent = std::countr_zero(n);
+    Matrix<T> matrix;
+    matrix.columns = std::size_t(1) << exponent / 2;
+    matrix.rows = n / matrix.columns;
+    matrix.fine_bits = exponent / 2;
+    for (auto* passes : {&matrix.of_rows, &matrix.of_columns}) {
+        *passes = factorised<T>(passes == &matrix.of_rows ? matrix.rows : matrix.columns,
+                                many_registers);
+        passes->vector = lanes<T>;
+    }
+    return matrix;
+}
+
+/// e^(-pi i k^2 / n), and its conjugate around index 0 of the convolution, wrapped at its end.
+template <class T>
+void write_chirp(Transform<T>& t, const Roots<T>& roots, Writer<T>& to) {
+    const auto n = std::size_t(t.points), length = t.convolution_points;
+    to.align();
+    auto* const chirp = reinterpret_cast<Bin<T>*>(to.here());
+    t.chirp = to.here();
+    to.skip(2 * n);
+    to.align();
+    auto* const filter = reinterpret_cast<Bin<T>*>(to.here());
+    t.filter = to.here();
+    to.skip(2 * length);
+    if (!chirp) return;
+    std::size_t square = 0;  // k^2 mod 2n, carried so that it never overflows
+    for (std::size_t k = 0; k < n; ++k) {
+        chirp[k] = roots(std::int64_t(square));
+        square = (square + 2 * k + 1) % (2 * n);
+    }
+    std::fill(filter, filter + length, Bin<T>{0, 0});
+    filter[0] = {1, 0};
+    for (std::size_t k = 1; k < n; ++k) filter[k] = filter[length - k] = conj(chirp[k]);
+}
+
+template <class T>
+void write_tables(Transform<T>& t, const Roots<T>& roots, const Roots<T>& chirp_roots,
+                  Writer<T>& to) {
+    if (t.matrix.rows) {
+        write_matrix(t.matrix, roots, to);
     } else {
-        lay_out_matrix(plan, out, exponent, lanes);
+        write_twiddles(t.passes, roots, 1, 1, to);
     }
+    if (t.convolution_points) write_chirp(t, chirp_roots, to);
 }
 
-/// The workspace is one for all lengths; it grows to what the longest of them needs.
-template <Record R>
-bool reserve_work(std::size_t count) {
-    using T = scalar<R>;
-    auto& all = plans<R>;
-    if (count <= all.work_scalars) return true;
-    T* grown = new_aligned<T>(count);
-    if (!grown) return false;
-    std::free(all.work);
-    all.work = grown;
-    all.work_scalars = count;
-    for (auto& fft : all.ffts) fft.work = grown;
-    return true;
-}
-
-template <Record R>
-bool build(int exponent) {
-    using T = scalar<R>;
-    auto& fft = plans<R>.ffts[std::size_t(exponent)];
-    fft.kernels = &kernels_in_use<R>();
-    FftPlan<T> plan{.points = std::size_t(1) << exponent};
-    if (plan.points >= 16) {
-        const T* twiddle_table;
-        if (fft_twiddle_table<R>(1 << exponent, &twiddle_table)) return false;
-        Writer<T> count(twiddle_table, plan.points, nullptr);
-        lay_out(plan, count, exponent, *fft.kernels);
-        if (!reserve_work<R>(kernel::work_scalars(plan))) return false;
-        T* memory = new_aligned<T>(count.used());
-        if (!memory) return false;
-        Writer<T> out(twiddle_table, plan.points, memory);
-        lay_out(plan, out, exponent, *fft.kernels);
-        plans<R>.tables.keep(exponent, memory);
+/// The header of the block: everything but the tables.
+template <class T>
+Transform<T> shape_of(int n) {
+    Transform<T> t{};
+    t.points = n;
+    t.convolution_points = is_smooth(n) ? 0 : convolution_points(n);
+    const std::size_t inner = t.convolution_points ? t.convolution_points : std::size_t(n);
+    if (std::has_single_bit(inner) && inner > longest_direct<T>) {
+        t.matrix = matrix_of<T>(inner);
+        t.work_scalars = kernel::work_scalars(t.matrix);
+    } else {
+        t.passes = passes_of<T>(inner);
+        t.work_scalars = 2 * inner;
     }
-    fft.plan = plan;
-    fft.work = plans<R>.work;
-    plans<R>.ready[std::size_t(exponent)] = true;
-    return true;
+    t.work_scalars = aligned_count<T>(t.work_scalars) + 2 * t.convolution_points;
+    return t;
 }
 
 }  // namespace
 
-template <Record R>
-const Fft<scalar<R>>* find_fft(int exponent) {
-    if (!plans<R>.ready[std::size_t(exponent)] && !build<R>(exponent)) return nullptr;
-    return &plans<R>.ffts[std::size_t(exponent)];
-}
-
-template <Record R>
-const scalar<R>* find_split_roots(int exponent) {
-    using T = scalar<R>;
-    T* roots = plans<R>.split_roots.find(exponent);
-    if (roots) return roots;
-    const std::size_t n = std::size_t(1) << exponent, count = n / 4 + 1;
-    const T* twiddle_table;
-    if (fft_twiddle_table<R>(1 << exponent, &twiddle_table)) return nullptr;
-    roots = new_aligned<T>(2 * count);
-    if (!roots) return nullptr;
-    for (std::size_t k = 0; k < count; ++k) {
-        const Bin<T> root = root_of_unity(twiddle_table, n, k);
-        roots[k] = root.re;
-        roots[count + k] = -root.im;
+bool is_smooth(int n) {
+    if (n < 1) return false;
+    for (const int radix : {2, 3, 5, 7}) {
+        while (n % radix == 0) n /= radix;
     }
-    plans<R>.split_roots.keep(exponent, roots);
-    return roots;
+    return n == 1;
 }
 
-template <Record R>
-void free_plans() {
-    auto& all = plans<R>;
-    all.ready.fill(false);
-    all.tables.release();
-    all.split_roots.release();
-    std::free(all.work);
-    all.work = nullptr;
-    all.work_scalars = 0;
+std::size_t convolution_points(int n) {
+    constexpr std::size_t shortest = 512;  // below it other lengths than powers of two cost more
+    const std::size_t least = 2 * std::size_t(n) - 2, power = std::bit_ceil(least);
+    for (const std::size_t sixteenths : {9, 10, 12}) {
+        const std::size_t shorter = power / 16 * sixteenths;
+        if (shorter >= std::max(least, shortest)) return shorter;
+    }
+    return power;
 }
 
-template <Record R>
-const kernel::FftKernels<scalar<R>>& kernels_in_use() {
-    return plans<R>.chosen ? *plans<R>.chosen : kernel::fft_kernels<scalar<R>>();
+template <class T>
+Transform<T>* plan_transform(int n) {
+    auto t = shape_of<T>(n);
+    const Roots<T> roots(t.convolution_points ? std::int64_t(t.convolution_points) : n);
+    const Roots<T> chirp_roots(t.convolution_points ? 2 * std::int64_t(n) : 1);
+    if (!roots || !chirp_roots) return nullptr;
+    Writer<T> count(nullptr);
+    write_tables(t, roots, chirp_roots, count);
+
+    constexpr std::size_t header = aligned_count<T>(sizeof(Transform<T>) / sizeof(T) + 1);
+    T* const block = new_aligned<T>(header + count.used());
+    if (!block) return nullptr;
+    Writer<T> to(block + header);
+    write_tables(t, roots, chirp_roots, to);
+    return new (block) Transform<T>(t);
 }
 
-template <Record R>
-void use_kernels(const kernel::FftKernels<scalar<R>>* kernels) {
-    free_plans<R>();
-    free_mixed_ffts<R>();
-    plans<R>.chosen = kernels;
-}
-
-template const Fft<double>* find_fft<dsp>(int);
-template const Fft<float>* find_fft<dspf>(int);
-template const double* find_split_roots<dsp>(int);
-template const float* find_split_roots<dspf>(int);
-template const kernel::FftKernels<double>& kernels_in_use<dsp>();
-template const kernel::FftKernels<float>& kernels_in_use<dspf>();
-template void free_plans<dsp>();
-template void free_plans<dspf>();
-template void use_kernels<dsp>(const kernel::FftKernels<double>*);
-template void use_kernels<dspf>(const kernel::FftKernels<float>*);
+template Transform<double>* plan_transform(int);
+template Transform<float>* plan_transform(int);
 
 }  // namespace wavkit

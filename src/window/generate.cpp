@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <array>
 
+#include "state.hpp"
 #include "window/catalogue.hpp"
 #include "window/tolerance.hpp"
 
@@ -12,25 +13,6 @@ namespace {
 
 /// What of `scale_type` decides the samples of a window; the rest is about rotation.
 constexpr int shape_options = 15;
-
-template <Record R>
-struct CachedWindow {
-    R samples;
-    int window;
-    int options;  // -1: no window fits this slot, whatever is asked for
-    scalar<R> win_length;
-};
-
-/// The windows made last, the oldest of which makes room for the next.
-template <Record R>
-struct WindowCache {
-    std::array<CachedWindow<R>, 16> slots;
-    int filled = 0;
-    int newest = 0;
-};
-
-template <Record R>
-WindowCache<R> window_cache;
 
 template <Record R>
 int cosine_window_fill(R* w, int window, int scale_type, scalar<R> win_length) {
@@ -48,7 +30,7 @@ int cosine_window_fill(R* w, int window, int scale_type, scalar<R> win_length) {
 
 template <Record R>
 CachedWindow<R>* find(int points, int window, int options, scalar<R> win_length) {
-    auto& cache = window_cache<R>;
+    auto& cache = thread_state<R>.windows;
     const auto end = cache.slots.begin() + cache.filled;
     const auto found = std::find_if(cache.slots.begin(), end, [&](const CachedWindow<R>& slot) {
         return slot.samples.points == points && slot.window == window && slot.options == options &&
@@ -61,11 +43,12 @@ CachedWindow<R>* find(int points, int window, int options, scalar<R> win_length)
 /// runs out, in which case the slot is the next one's again and matches nothing meanwhile.
 template <Record R>
 CachedWindow<R>* claim(int points) {
-    auto& cache = window_cache<R>;
+    auto& cache = thread_state<R>.windows;
     const int slots = int(cache.slots.size());
     const bool unused = cache.filled < slots;
     const int index = unused ? cache.filled : (cache.newest + 1) % slots;
     CachedWindow<R>& slot = cache.slots[std::size_t(index)];
+    keep_until_thread_ends<R>();
     if (unused) dsp_init(&slot.samples);
     slot.options = -1;
     slot.samples.points = points;
@@ -141,18 +124,8 @@ int window_fill(R* w, int window, int scale_type, scalar<R> win_length) {
     return cosine_window_fill(w, window, scale_type, win_length);
 }
 
-template <Record R>
-int window_free_cache() {
-    auto& cache = window_cache<R>;
-    for (int i = 0; i < cache.filled; ++i) dsp_destroy(&cache.slots[std::size_t(i)].samples);
-    cache.filled = 0;
-    return 0;
-}
-
 template int window_fill(dsp*, int, int, double);
 template int window_fill(dspf*, int, int, float);
-template int window_free_cache<dsp>();
-template int window_free_cache<dspf>();
 
 }  // namespace wavkit
 

@@ -46,8 +46,4 @@ double bartlett_peak(int mode, int n);
 template <Record R>
 int normalise(R* w, int mode, scalar<R> mean = 1);
 
-/// Releases the cached windows of this precision.
-template <Record R>
-int window_free_cache();
-
 }  // namespace wavkit

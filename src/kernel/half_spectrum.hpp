@@ -1,0 +1,67 @@
+// Real transforms from complex ones of half the length, and the product of two spectra.
+#pragma once
+
+#include "kernel/vector.hpp"
+
+namespace wavkit::kernel {
+
+/// Bins k and half - k of a real signal's spectrum from those of its half-length transform, or the
+/// other way round.
+template <bool Split, class T, int V>
+inline void combine(Complexes<T, V>& a, Complexes<T, V>& b, Vec<T, V> cosine, Vec<T, V> sine) {
+    const auto mirrored = conj(b);
+    const auto sum = a + mirrored;
+    const Complexes<T, V> factor{-sine, Split ? -cosine : cosine};
+    const auto rest = (a - mirrored) * factor;
+    a = sum + rest;
+    b = conj(sum - rest);
+}
+
+template <bool Split, class T, int V>
+inline void combine_pair(T* low, T* high, const T* cosines, const T* sines) {
+    auto a = load_complex<T, V, Layout::pairs>(low);
+    auto b = load_complex<T, V, Layout::pairs>(high);
+    b = {reversed<T, V>(b.re), reversed<T, V>(b.im)};
+    combine<Split, T, V>(a, b, load<T, V>(cosines), load<T, V>(sines));
+    store_complex<T, V, Layout::pairs>(high, {reversed<T, V>(b.re), reversed<T, V>(b.im)});
+    store_complex<T, V, Layout::pairs>(low, a);
+}
+
+template <bool Split, class T>
+inline void combine_halves(T* data, std::size_t half, const T* cosines) {
+    constexpr int V = lanes<T>;
+    const T* sines = cosines + half / 2 + 1;
+    std::size_t k = 1;
+    for (; 2 * (k + V) < half + 2; k += V) {
+        combine_pair<Split, T, V>(data + 2 * k, data + 2 * (half - k - V + 1), cosines + k,
+                                  sines + k);
+    }
+    for (; 2 * k <= half; ++k) {
+        combine_pair<Split, T, 1>(data + 2 * k, data + 2 * (half - k), cosines + k, sines + k);
+    }
+}
+
+/// Turns the transform Z of a real signal's even and odd samples, `half` points, into its spectrum,
+/// half + 1 points: X[k] = Z[k] + conj Z[half - k] - i w^k (Z[k] - conj Z[half - k]) with
+/// w = e^(-2 pi i / (2 half)). `roots` holds cos(2 pi k / (2 half)) for k = 0 .. half / 2, then as
+/// many sines.
+template <class T>
+void split(T* data, std::size_t half, const T* roots) {
+    const T even = data[0] + data[0], odd = data[1] + data[1];
+    data[0] = even + odd;
+    data[1] = 0;
+    data[2 * half] = even - odd;
+    data[2 * half + 1] = 0;
+    combine_halves<true>(data, half, roots);
+}
+
+/// The way back: Z[k] = X[k] + conj X[half - k] + i conj(w^k) (X[k] - conj X[half - k]).
+template <class T>
+void join(T* data, std::size_t half, const T* roots) {
+    const T first = data[0], last = data[2 * half];
+    data[0] = first + last;
+    data[1] = first - last;
+    combine_halves<false>(data, half, roots);
+}
+
+}  // namespace wavkit::kernel

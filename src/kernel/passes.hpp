@@ -1,0 +1,299 @@
+// Transforms as passes over vectors: the autosort form of Stockham (Cochran et al., 1967),
+// decimation in frequency. A pass of radix r at stride s turns blocks of n samples into r blocks of
+// n / r; samples that belong together lie s apart, so that from the stride of a vector on every load
+// and store is contiguous, and no permutation is left to do at the end.
+//
+// Between the passes samples lie in whole vectors ("blocks") where all strides but the first are
+// multiples of four, else in pairs; what is left of a run beside its vectors is then done by a
+// vector that overlaps the one before, or sample by sample.
+#pragma once
+
+#include <algorithm>
+#include <array>
+
+#include "kernel/butterfly.hpp"
+
+namespace wavkit::kernel {
+
+/// The passes of one length, in their order, and the roots of unity that they read.
+template <class T>
+struct Passes {
+    std::size_t points = 1;
+    int count = 0;
+    std::array<unsigned char, 31> radices{};
+    int vector = 1;       // lanes of the vectors that go through the passes
+    bool blocks = false;  // the samples between passes lie in whole vectors
+    const T* twiddles = nullptr;  // pass by pass; none for the last
+};
+
+/// Whether the twiddles of a pass stand lane by lane, one vector of each for a vector of
+/// butterflies; else there is one of each a run.
+template <class T>
+inline bool has_twiddles_by_lanes(const Passes<T>& passes, std::size_t part, std::size_t stride) {
+    const auto vector = std::size_t(passes.vector);
+    return stride == 1 ? part >= vector : passes.blocks && stride < vector;
+}
+
+/// The first of the butterflies that the vector from the i-th on holds: the last vector ends with
+/// the samples.
+constexpr std::size_t vector_start(std::size_t i, std::size_t vector, std::size_t count) {
+    return i + vector <= count ? i : count - vector;
+}
+
+/// The rotations of a run of butterflies, the same for all lanes.
+template <class T, int V, int Radix>
+struct Rotation {
+    const T* twiddles;
+
+    void turn(Complexes<T, V>* z) const {
+        for (int k = 1; k < Radix; ++k) {
+            z[k] = z[k] * Complexes<T, V>{broadcast<T, V>(twiddles[2 * k - 2]),
+                                          broadcast<T, V>(twiddles[2 * k - 1])};
+        }
+    }
+};
+
+/// Nothing to rotate.
+struct Unrotated {
+    template <class Z>
+    void turn(Z*) const {}
+};
+
+/// Multiplies by the factor of the whole transform.
+template <class T, int Radix>
+struct Scaling {
+    T scale;
+    template <class Z>
+    void turn(Z* z) const {
+        for (int k = 0; k < Radix; ++k) z[k] = z[k] * scale;
+    }
+};
+
+/// One vector of butterflies.
+template <int V, int Radix, Layout In, Layout Out, class T, class Turn>
+inline void column(const T* in, std::size_t in_distance, T* out, std::size_t out_distance,
+                   const Turn& turn) {
+    Complexes<T, V> z[Radix];
+    for (std::size_t k = 0; k < Radix; ++k) z[k] = load_complex<T, V, In>(in + k * in_distance);
+    butterfly<Radix>(z);
+    turn.turn(z);
+    for (std::size_t k = 0; k < Radix; ++k) store_complex<T, V, Out>(out + k * out_distance, z[k]);
+}
+
+/// The butterflies of one rotation over a run of samples. `one` is the turn for single samples.
+template <int V, int Radix, Layout In, Layout Out, class T, class Turn, class TurnOne>
+inline void columns(const T* in, std::size_t in_distance, T* out, std::size_t out_distance,
+                    std::size_t run, const Turn& turn, const TurnOne& one) {
+    const std::size_t whole = run - run % V;
+    const auto several = [&](std::size_t q) {
+        column<V, Radix, In, Out>(in + 2 * q, in_distance, out + 2 * q, out_distance, turn);
+    };
+    for (std::size_t q = 0; q < whole; q += V) several(q);
+    if constexpr (In != Layout::blocks && V > 1) {
+        if (whole < run && run > V && in != out) return several(run - V);
+        for (std::size_t q = whole; q < run; ++q) {
+            column<1, Radix, In, Out>(in + 2 * q, in_distance, out + 2 * q, out_distance, one);
+        }
+    }
+}
+
+/// A pass of blocks of n samples at a stride, from input runs that begin `row` samples apart.
+/// Returns the twiddles of the next pass.
+template <int V, int Radix, Layout In, Layout Out, class T>
+inline const T* pass(const T* in, std::size_t row, T* out, std::size_t n, std::size_t stride,
+                     const T* twiddles) {
+    const std::size_t part = n / Radix, distance = 2 * row * part;
+    columns<V, Radix, In, Out>(in, distance, out, 2 * stride, stride, Unrotated(), Unrotated());
+    for (std::size_t p = 1; p < part; ++p, twiddles += 2 * (Radix - 1)) {
+        columns<V, Radix, In, Out>(in + 2 * row * p, distance, out + 2 * stride * Radix * p,
+                                   2 * stride, stride, Rotation<T, V, Radix>{twiddles},
+                                   Rotation<T, 1, Radix>{twiddles});
+    }
+    return twiddles;
+}
+
+/// One part of the bins of V butterflies, brought side by side: bin after bin of a butterfly, then
+/// the next one, `Stride` lanes at a time. Each step interleaves the halves of the whole sequence.
+template <class T, int V, int Radix, int Stride>
+inline void interleave(Vec<T, V>* bins) {
+    Vec<T, V> turned[Radix];
+    for (int span = Radix; span > 1; span /= 2) {
+        for (int i = 0; i < Radix / 2; ++i) {
+            turned[2 * i] = first_in_turn<V, Stride>(bins[i], bins[i + Radix / 2]);
+            turned[2 * i + 1] = second_in_turn<V, Stride>(bins[i], bins[i + Radix / 2]);
+        }
+        for (int i = 0; i < Radix; ++i) bins[i] = turned[i];
+    }
+}
+
+/// A vector of butterflies at a stride below that of a vector, with twiddles lane by lane; the bins
+/// come out side by side.
+template <int V, int Radix, int Stride, Layout In, class T>
+inline void short_column(const T* in, std::size_t distance, T* out, const T* twiddles) {
+    Complexes<T, V> z[Radix];
+    for (std::size_t k = 0; k < Radix; ++k) z[k] = load_complex<T, V, In>(in + k * distance);
+    butterfly<Radix>(z);
+    for (std::size_t k = 1; k < Radix; ++k) {
+        z[k] = z[k] * load_complex<T, V, Layout::blocks>(twiddles + (k - 1) * 2 * V);
+    }
+    Vec<T, V> re[Radix], im[Radix];
+    for (int k = 0; k < Radix; ++k) re[k] = z[k].re, im[k] = z[k].im;
+    interleave<T, V, Radix, Stride>(re);
+    interleave<T, V, Radix, Stride>(im);
+    for (int k = 0; k < Radix; ++k) {
+        store_complex<T, V, Layout::blocks>(out + k * 2 * V, {re[k], im[k]});
+    }
+}
+
+/// A pass at a stride below that of a vector, over all samples, for any number of butterflies from a
+/// vector on.
+template <int V, int Radix, int Stride, Layout In, class T>
+inline const T* short_pass(const T* in, T* out, std::size_t points, const T* twiddles) {
+    const std::size_t part = points / Radix;
+    for (std::size_t i = 0; i < part; i += V, twiddles += 2 * (Radix - 1) * V) {
+        const auto first = Stride == 1 ? vector_start(i, V, part) : i;
+        short_column<V, Radix, Stride, In>(in + 2 * first, 2 * part, out + 2 * Radix * first,
+                                           twiddles);
+    }
+    return twiddles;
+}
+
+/// The first pass into pairs, with a vector of butterflies side by side where there is one.
+template <int V, int Radix, Layout In, class T>
+inline const T* first_pass_into_pairs(const T* in, T* out, std::size_t n, const T* twiddles) {
+    const std::size_t part = n / Radix;
+    if (part < V) return pass<V, Radix, In, Layout::pairs>(in, 1, out, n, 1, twiddles);
+    for (std::size_t i = 0; i < part; i += V) {
+        const auto p = vector_start(i, V, part);
+        Complexes<T, V> z[Radix];
+        for (std::size_t k = 0; k < Radix; ++k) {
+            z[k] = load_complex<T, V, In>(in + 2 * (p + k * part));
+        }
+        butterfly<Radix>(z);
+        for (std::size_t k = 1; k < Radix; ++k, twiddles += 2 * V) {
+            z[k] = z[k] * load_complex<T, V, Layout::blocks>(twiddles);
+        }
+        for (std::size_t lane = 0; lane < V; ++lane) {
+            T* const to = out + 2 * Radix * (p + lane);
+            for (std::size_t k = 0; k < Radix; ++k) {
+                to[2 * k] = z[k].re[lane];
+                to[2 * k + 1] = z[k].im[lane];
+            }
+        }
+    }
+    return twiddles;
+}
+
+/// Calls f with the radix as a constant.
+template <class F>
+inline auto with_radix(int radix, F f) {
+    switch (radix) {
+        case 2:
+            return f(std::integral_constant<int, 2>());
+        case 3:
+            return f(std::integral_constant<int, 3>());
+        case 4:
+            return f(std::integral_constant<int, 4>());
+        case 5:
+            return f(std::integral_constant<int, 5>());
+        case 7:
+            return f(std::integral_constant<int, 7>());
+        default:
+            return f(std::integral_constant<int, 8>());
+    }
+}
+
+/// The same for the radices of passes into blocks that begin at a stride below that of a vector.
+template <class F>
+inline auto with_power(int radix, F f) {
+    return radix == 4 ? f(std::integral_constant<int, 4>()) : f(std::integral_constant<int, 8>());
+}
+
+/// The first pass into blocks, then one more where it leaves runs shorter than a vector.
+template <int V, Layout In, class T>
+inline const T* next_pass_into_blocks(int radix, const T* in, T* out, std::size_t n,
+                                      std::size_t stride, const T* twiddles) {
+    if (stride == 1) {
+        return with_power(radix, [&](auto r) {
+            return short_pass<V, r, 1, In>(in, out, n, twiddles);
+        });
+    }
+    if constexpr (V > 4) {
+        if (stride == 4) {
+            return with_power(radix, [&](auto r) {
+                return short_pass<V, r, 4, Layout::blocks>(in, out, n * stride, twiddles);
+            });
+        }
+    }
+    if constexpr (V > 8) {
+        if (stride == 8) {
+            return with_power(radix, [&](auto r) {
+                return short_pass<V, r, 8, Layout::blocks>(in, out, n * stride, twiddles);
+            });
+        }
+    }
+    return with_radix(radix, [&](auto r) {
+        return pass<V, r, Layout::blocks, Layout::blocks>(in, stride, out, n, stride, twiddles);
+    });
+}
+
+template <int V, Layout In, class T>
+inline const T* next_pass_into_pairs(int radix, const T* in, T* out, std::size_t n,
+                                     std::size_t stride, const T* twiddles) {
+    return with_radix(radix, [&](auto r) {
+        return stride == 1
+                   ? first_pass_into_pairs<V, r, In>(in, out, n, twiddles)
+                   : pass<V, r, Layout::pairs, Layout::pairs>(in, stride, out, n, stride, twiddles);
+    });
+}
+
+/// Runs the passes between data and workspace to and fro; the last one, which writes where it
+/// reads, ends in the data.
+template <int V, Layout Outside, Layout Between, class T>
+void run_passes(const Passes<T>& passes, T* data, T* work, T scale) {
+    const T* twiddles = passes.twiddles;
+    T *from = data, *to = work;
+    std::size_t n = passes.points, stride = 1;
+    for (int i = 0; i + 1 < passes.count; ++i) {
+        const int radix = passes.radices[std::size_t(i)];
+        if constexpr (Between == Layout::blocks) {
+            twiddles = next_pass_into_blocks<V, Outside>(radix, from, to, n, stride, twiddles);
+        } else {
+            twiddles = next_pass_into_pairs<V, Outside>(radix, from, to, n, stride, twiddles);
+        }
+        n /= std::size_t(radix);
+        stride *= std::size_t(radix);
+        from = to;
+        to = from == work ? data : work;
+    }
+    with_radix(int(n), [&](auto r) {
+        const Scaling<T, r> turn{scale};
+        const std::size_t row = 2 * stride;
+        if (passes.count == 1) {
+            column<1, r, Outside, Outside>(data, row, data, row, turn);
+        } else {
+            columns<V, r, Between, Outside>(from, row, data, row, stride, turn, turn);
+        }
+    });
+}
+
+/// The lanes of vectors for short lengths, where wide ones would not fill.
+template <class T>
+inline constexpr int narrow_lanes = std::min(lanes<T>, 4);
+
+template <Layout Outside, class T>
+inline void run_passes(const Passes<T>& passes, T* data, T* work, T scale) {
+    constexpr int narrow = narrow_lanes<T>, wide = lanes<T>;
+    if constexpr (narrow != wide) {
+        if (passes.vector == wide) {
+            return run_passes<wide, Outside, Layout::blocks>(passes, data, work, scale);
+        }
+    }
+    if (passes.blocks) {
+        run_passes<narrow, Outside, Layout::blocks>(passes, data, work, scale);
+    } else {
+        run_passes<narrow, Outside, Layout::pairs>(passes, data, work, scale);
+    }
+}
+
+}  // namespace wavkit::kernel
