@@ -27,8 +27,6 @@ constexpr T root_two = T(1.414213562373095048801688724209698079L);
 template <class T>
 constexpr T half_root_two = T(0.707106781186547524400844362104849039L);
 
-constexpr int inverse_flag = 1, normalised_flag = 2;
-
 /// Sizes the scratch record, initialised on its first use.
 template <Record R>
 R* scratch(int points, int complex, scalar<R> delta) {
@@ -124,8 +122,8 @@ int dct(R* x, int flags) {
         x->delta = x->delta == 0 ? limits<R>::big : T(0.5) / x->delta;
         return 0;
     }
-    const bool normalised = flags & normalised_flag;
-    return flags & inverse_flag ? inverse(x, n, normalised) : forward(x, n, normalised);
+    const bool normalised = flags & DSP_DCT_NORMALISED;
+    return flags & DSP_DCT_INVERSE ? inverse(x, n, normalised) : forward(x, n, normalised);
 }
 
 }  // namespace
