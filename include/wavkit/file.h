@@ -85,11 +85,11 @@ WAVKIT_API int dspff_fclose(FILE *stream);
  *
  *  A text signal that declares its points ends after the last of them: the next character that is
  *  not white space stays in the stream, a "#" too. (One that declares 0 points takes "#" lines
- * until it has its points, complex and delta.) Where a complex one has an odd number of values, the
- * last imaginary part is 0.
+ *  until it has its points, complex and delta.) Where a complex one has an odd number of values,
+ *  the last imaginary part is 0.
  *
- *  One signal may be read at a time from a stream. Threads that convert between the precisions
- *  keep 64 KiB each until they end.
+ *  One signal may be read at a time from a stream. A thread that converts between the precisions
+ *  keeps 64 KiB until it ends.
  *  @return 1 when a signal was read; 0 at the end of the stream, with no points; -1 when a binary
  *          signal is cut short or of unknown kind, when something in a text is no number, when the
  *          values are not as many as declared, or when memory runs out. `points` then tells how

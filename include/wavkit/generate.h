@@ -58,8 +58,8 @@ enum {
  *
  *  Random bits come from the C runtime's rand(), 15 of each call. The first draw in a precision
  *  seeds it with srand(), differently in every process; a host that wants reproducible samples
- * calls srand() after a first draw. Normal samples come in pairs: a real record that takes one of a
- * pair leaves the other one to the next real record of the precision.
+ *  calls srand() after a first draw. Normal samples come in pairs: a real record that takes one of
+ *  a pair leaves the other one to the next real record of the precision.
  *
  *  Normal samples follow G. Marsaglia's polar method (Marsaglia and Bray, 1964) in a real record,
  *  G. E. P. Box and M. E. Muller (1958) in a complex one.

@@ -227,7 +227,8 @@ WAVKIT_API int dspfi_shift(dspf *x, int n);
  *  @{ */
 
 /** Backward difference over the spacing: out[i] = (x[i] - x[i-1]) / delta with x[-1] = 0; of
- * complex records each part by itself. A `delta` of 0 makes the factor BIG. Undone by dspi_integ().
+ *  complex records each part by itself. A `delta` of 0 makes the factor BIG. Undone by
+ *  dspi_integ().
  *  @return 0 */
 WAVKIT_API int dspi_differ(dsp *x);
 WAVKIT_API int dspfi_differ(dspf *x);
@@ -282,7 +283,7 @@ WAVKIT_API int dspi_atan(dsp *x);
 WAVKIT_API int dspfi_atan(dspf *x);
 
 /** Hyperbolic functions; where |x| exceeds ln(BIG), the sine is BIG with the sign of x and the
- * cosine BIG. */
+ *  cosine BIG. */
 WAVKIT_API int dspi_sinh(dsp *x);
 WAVKIT_API int dspfi_sinh(dspf *x);
 WAVKIT_API int dspi_cosh(dsp *x);

@@ -6,8 +6,7 @@
  *  amplitude A shows A in its bin; dsph_dft() does so at the record's own length; dsph_avg() folds
  *  spectrum after spectrum into an average; dsph_corr() slides one signal along another.
  *
- *  They use the windows and tables that transforms and windows keep, so no two of one precision may
- *  run at the same time. A step that fails ends the call with -1 and leaves the output part-way. */
+ *  A step that fails ends the call with -1 and leaves the output part-way. */
 #ifndef WAVKIT_MEASURE_H
 #define WAVKIT_MEASURE_H
 
@@ -84,8 +83,8 @@ WAVKIT_API int dspfh_fft(const dspf *in, dspf *out, int npts, float fraction, in
  *  negative one too. DSP_SPECTRUM_RAW transforms the record as it is.
  *
  *  **Inverse.** Undoes the transform, the rotation and the scaling of the same `window` and
- * `flags`, not the window itself. A half spectrum of M bins gives a real record of 2M - 2 points,
- * or of 2M - 1 with DSP_SPECTRUM_ODD.
+ *  `flags`, not the window itself. A half spectrum of M bins gives a real record of 2M - 2 points,
+ *  or of 2M - 1 with DSP_SPECTRUM_ODD.
  *
  *  @param in      real or complex
  *  @param out     the result; `delta` = 1 / (N delta). May be in, or share its buffer.

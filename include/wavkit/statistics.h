@@ -106,7 +106,7 @@ WAVKIT_API int dspfs_gmean(const dspf *x, dspf *out);
  *
  *  A real signal with a zero gives 0, one whose reciprocals cancel gives B. The parts of complex
  *  points are held within +-B, and 1 / |z|^2 is B for a vanishing |z|^2, for the points as for
- * their sum.
+ *  their sum.
  *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_hmean(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_hmean(const dspf *x, dspf *out);
@@ -114,9 +114,9 @@ WAVKIT_API int dspfs_hmean(const dspf *x, dspf *out);
 /** Histogram: counts the values, or the magnitudes of a complex signal, in bins of equal width.
  *
  *  A value v counts in bin floor((v - lo) / width). The upper edge lo + nbins * width, and what
- * lies within ten rounding steps above it, counts in the last bin; other values outside and NaN are
- *  dropped. With a width of 0 only values equal to `lo` count, in bin 0. A complex point with a
- * part beyond +-1e100 (1e15 in single precision) has that magnitude.
+ *  lies within ten rounding steps above it, counts in the last bin; other values outside and NaN
+ *  are dropped. With a width of 0 only values equal to `lo` count, in bin 0. A complex point with a
+ *  part beyond +-1e100 (1e15 in single precision) has that magnitude.
  *  @param x      real or complex signal
  *  @param out    `nbins` real points, the counts; `delta` is the bin width. May be x
  *  @param lo     lower edge of the first bin

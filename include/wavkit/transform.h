@@ -13,10 +13,9 @@
  *  stays one.
  *
  *  All functions work in place and return 0, or -1 on failure. The first transform of a length
- *  builds tables that later ones of that length read: those of powers of two are kept for every
- *  length, those of other lengths and of cosine transforms for the last one. dsp_free_internal()
- *  releases them. Transforms of one precision must not run at the same time, nor while that
- *  function does.
+ *  builds tables that all threads read from then on: those of powers of two are kept for every
+ *  length, those of other lengths and of cosine transforms for a bounded number of them.
+ *  dsp_free_internal() releases them.
  *
  *  The passes are those of the autosort transform (Cochran, Cooley, Favin et al., "What is the fast
  *  Fourier transform?", 1967); long signals are transformed as a matrix (Bailey, "FFTs in external
