@@ -20,12 +20,11 @@ static void acquire(double* volts, double delta) {
 /* The strongest line: through the logarithms of the magnitudes of three bins, a parabola meets the
  * top of this window's lobe to a few thousandths of a bin. */
 static int find_line(const dsp* spectrum, double* frequency, double* amplitude) {
-    enum { parabola = 0x100 };
     dsp levels, peak;
     dsp_init(&levels);
     dsp_init(&peak);
-    const int failed =
-        dspu_mag(spectrum, &levels) || dspi_log(&levels) || dsps_peak(&levels, &peak, parabola, 0);
+    const int failed = dspu_mag(spectrum, &levels) || dspi_log(&levels) ||
+                       dsps_peak(&levels, &peak, DSP_PEAK_PARABOLIC, 0);
     if (!failed) {
         *frequency = peak.data[1] * spectrum->delta;
         *amplitude = exp(peak.data[0]);

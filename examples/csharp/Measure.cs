@@ -10,9 +10,6 @@ using Corvane.QuillonInternal.DataAnalysis;
 
 internal static unsafe class Measure
 {
-    private const int Gausstop = 7;
-    private const int KeepAmplitude = 0;
-
     private record struct Peak(double Frequency, double Amplitude);
 
     private static int Main(string[] arguments)
@@ -69,7 +66,7 @@ internal static unsafe class Measure
             using var signal = new DspInput { Delta = spacing, Data = pinned, Points = changes.Length };
             try
             {
-                Check(DspApi.dspi_window2(signal, Gausstop, KeepAmplitude, 0));
+                Check(DspApi.dspi_window2(signal, (int)DspWindow.Gausstop, (int)DspScale.Mean, 0));
                 Check(DspApi.dspi_scale(signal, 2)); // half of each component is at its negative frequency
                 Check(DspApi.dspi_rdft(signal));
                 resolution = signal.Delta;

@@ -85,11 +85,11 @@ WAVKIT_API int dspff_fclose(FILE *stream);
  *
  *  A text signal that declares its points ends after the last of them: the next character that is
  *  not white space stays in the stream, a "#" too. (One that declares 0 points takes "#" lines
- * until it has its points, complex and delta.) Where a complex one has an odd number of values, the
- * last imaginary part is 0.
+ *  until it has its points, complex and delta.) Where a complex one has an odd number of values,
+ *  the last imaginary part is 0.
  *
- *  One signal may be read at a time from a stream. Threads that convert between the precisions
- *  keep 64 KiB each until they end.
+ *  One signal may be read at a time from a stream. A thread that converts between the precisions
+ *  keeps 64 KiB until it ends.
  *  @return 1 when a signal was read; 0 at the end of the stream, with no points; -1 when a binary
  *          signal is cut short or of unknown kind, when something in a text is no number, when the
  *          values are not as many as declared, or when memory runs out. `points` then tells how
@@ -102,17 +102,23 @@ WAVKIT_API int dspff_fread(dspf *record, FILE *stream);
 WAVKIT_API int dspf_fwrite(const dsp *record, FILE *stream);
 WAVKIT_API int dspff_fwrite(const dspf *record, FILE *stream);
 
+/** What `flags` of dspf_fwrite2() is put together from: a format, and a part to leave out. */
+enum {
+    DSP_FILE_BINARY = 0,        /**< the binary format */
+    DSP_FILE_TEXT = 1,          /**< the text format */
+    DSP_FILE_LINE = 2,          /**< one line for people, not for the readers */
+    DSP_FILE_NO_HEADER = 0x100, /**< leave out the header; of the line, its bracket */
+    DSP_FILE_NO_DATA = 0x200    /**< leave out the data; of the line, the rest with its end */
+};
+
 /** Writes a record, or one part of it, in one of three formats.
  *
- *  The low byte of `flags` is the format:
- *  - 0 binary;
- *  - 1 text;
- *  - 2 one line for people, not for the readers: `[points/delta] ` and the first 32 points, re,im
- *    where they are complex, with ` ...` behind them if there are more. Numbers of a magnitude from
- *    9999 to 999999999 are shown as whole ones (`%.0f`), others with four digits (`%.4g`).
+ *  The line is `[points/delta] ` and the first 32 points, re,im where they are complex, with ` ...`
+ *  behind them if there are more. Its numbers of a magnitude from 9999 to 999999999 are shown as
+ *  whole ones (`%.0f`), others with four digits (`%.4g`).
  *
- *  Add 0x100 to leave out the header (of the line: its bracket) or 0x200 to leave out the data (of
- *  the line: the rest with its end). The header alone followed by the data alone make the whole.
+ *  The header alone followed by the data alone make the whole.
+ *  @param flags  DSP_FILE_... constants
  *  @return 0, or -1 for another format and when the stream does not take all of a binary signal;
  *          errors while text is written are left for ferror() or fclose() to tell */
 WAVKIT_API int dspf_fwrite2(const dsp *record, FILE *stream, int flags);

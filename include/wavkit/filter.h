@@ -85,7 +85,7 @@ enum {
  *  @param type   one of the designs above
  *  @param f1,f2  what the design calls so; f2 counts for band-pass, band-stop and delay only
  *  @return 0; -1 when memory runs out, for another type, or for an even length where it must be
- * odd; the record is then real */
+ *          odd; the record is then real */
 WAVKIT_API int dspc_fir(dsp *h, int type, double f1, double f2);
 WAVKIT_API int dspfc_fir(dspf *h, int type, float f1, float f2);
 
@@ -119,13 +119,12 @@ WAVKIT_API int dspfi_window_fir(dspf *h, int window, float bw);
  *
  *  Few taps are applied one by one; from 46 real taps on (36 with complex input) blocks of no fewer
  *  than M - 1 samples go through transforms, whose cost hardly grows with M, and whose spectrum of
- *  the taps is kept for the next call. Taps that differ from those of that call by no more than
- *  1.1e-15 of the first one then count as the same. A NaN or an infinity spoils the M outputs that
- *  it takes part in; with transforms it spoils those around them as well.
+ *  the taps is kept for the thread's next call. Taps that differ from those of that call by no more
+ *  than 1.1e-15 of the first one then count as the same. A NaN or an infinity spoils the M outputs
+ *  that it takes part in; with transforms it spoils those around them as well.
  *
  *  Any of the records may be the same or share their buffers; the result is that of separate
- * copies. An output that is the state record holds the output in the end. The caches are shared by
- * all filters of a precision, which must not run at the same time.
+ *  copies. An output that is the state record holds the output in the end.
  *
  *  @param in     N samples, real or complex
  *  @param out    N points, complex if input or taps are; `delta` of the input

@@ -45,24 +45,27 @@ WAVKIT_API int dspfi_addcos(dspf *x, float amplitude, float freq, float phase);
 WAVKIT_API int dspc_line(dsp *x, double slope, double offset);
 WAVKIT_API int dspfc_line(dspf *x, float slope, float offset);
 
-/** Random samples of one of four distributions:
- *
- *  | type | real record                                  | complex record                         |
- *  |------|----------------------------------------------|----------------------------------------|
- *  | 0    | uniform from -1 up to, not including, 1      | uniform over the unit disc without rim |
- *  | 1    | standard normal                              | both parts standard normal             |
- *  | 2    | exponential with mean 1                      | fails                                  |
- *  | 3    | Laplace: exponential with a random sign      | fails                                  |
+/** The distributions of dspc_rand(). */
+enum {
+    DSP_RANDOM_UNIFORM = 0,     /**< from -1 up to, not including, 1 */
+    DSP_RANDOM_NORMAL = 1,      /**< mean 0, variance 1 */
+    DSP_RANDOM_EXPONENTIAL = 2, /**< mean 1; real records only */
+    DSP_RANDOM_LAPLACE = 3      /**< exponential with a random sign; real records only */
+};
+
+/** Random samples of one of four distributions. In a complex record, DSP_RANDOM_UNIFORM is uniform
+ *  over the unit disc without its rim, and with DSP_RANDOM_NORMAL both parts are standard normal.
  *
  *  Random bits come from the C runtime's rand(), 15 of each call. The first draw in a precision
  *  seeds it with srand(), differently in every process; a host that wants reproducible samples
- * calls srand() after a first draw. Normal samples come in pairs: a real record that takes one of a
- * pair leaves the other one to the next real record of the precision.
+ *  calls srand() after a first draw. Normal samples come in pairs: a real record that takes one of
+ *  a pair leaves the other one to the next real record of the precision.
  *
  *  Normal samples follow G. Marsaglia's polar method (Marsaglia and Bray, 1964) in a real record,
  *  G. E. P. Box and M. E. Muller (1958) in a complex one.
- *  @return 0; -1 for another type, for types 2 and 3 with a complex record (its samples are then
- *          not set), or when memory runs out */
+ *  @param type  DSP_RANDOM_... constant
+ *  @return 0; -1 for another type, for the last two with a complex record (its samples are then not
+ *          set), or when memory runs out */
 WAVKIT_API int dspc_rand(dsp *x, int type);
 WAVKIT_API int dspfc_rand(dspf *x, int type);
 

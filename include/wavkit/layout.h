@@ -36,23 +36,27 @@ WAVKIT_API int dspfi_swap_halves2(dspf *x);
 WAVKIT_API int dspi_zpad(dsp *x, int n);
 WAVKIT_API int dspfi_zpad(dspf *x, int n);
 
+/** What `mode` of dspi_zpad2() and dspi_unzpad() is put together from: a scaling, and where a short
+ *  signal lies in a long one. */
+enum {
+    DSP_PAD_KEEP_AMPLITUDE = 0, /**< by n / P: a transform of the result shows the amplitudes */
+    DSP_PAD_KEEP_POWER = 1,     /**< by sqrt(n / P): it shows the power */
+    DSP_PAD_UNSCALED = 2,       /**< as it is */
+    DSP_PAD_AT_START = 0x000,   /**< at the start */
+    DSP_PAD_IN_MIDDLE = 0x100,  /**< in the middle; the point at half the length stays there */
+    DSP_PAD_AT_END = 0x200,     /**< at the end */
+    DSP_PAD_SPLIT = 0x300       /**< one half at the start and one at the end, as in a spectrum with
+                                     the negative frequencies behind the positive ones */
+};
+
 /** Grows a signal of P points to `n` points, with a choice of where its points lie among the zeros
  *  and of how they are scaled. A record that has `n` points or more stays as it is, whatever
  *  the mode.
  *
- *  Bits 0 and 1 of `mode` choose the scaling:
- *  - 0: by n / P, which keeps the amplitude of what a transform of the result shows
- *  - 1: by sqrt(n / P), which keeps its power
- *  - 2: none
- *
- *  Bits 8 to 10 choose the place:
- *  - 0x000: at the start, zeros after
- *  - 0x100: in the middle; point P / 2 becomes point n / 2
- *  - 0x200: at the end, zeros before
- *  - 0x300: split as in a spectrum with the negative frequencies behind the positive ones: the
- *    first (P + 1) / 2 points at the start, the last P / 2 points at the end
- *
- *  Other bits are ignored.
+ *  DSP_PAD_IN_MIDDLE makes point P / 2 point n / 2; DSP_PAD_SPLIT leaves the first (P + 1) / 2
+ *  points at the start and takes the last P / 2 points to the end.
+ *  @param mode  DSP_PAD_... constants, one of the first three and one of the others; bits that
+ *               belong to neither are ignored
  *  @return 0, or -1 when memory runs out or the mode is none of these; with such a mode the record
  *          has grown already, and its new points are not set */
 WAVKIT_API int dspi_zpad2(dsp *x, int n, int mode);
@@ -60,10 +64,10 @@ WAVKIT_API int dspfi_zpad2(dspf *x, int n, int mode);
 
 /** Shrinks a signal of P points to `n` points (a negative `n`: none), the inverse of dspi_zpad2():
  *  `mode` means the same, n / P being below 1, and tells which points are kept:
- *  - 0x000: the first n
- *  - 0x100: n points of which point P / 2 becomes point n / 2
- *  - 0x200: the last n
- *  - 0x300: the first (n + 1) / 2 and the last n / 2
+ *  - DSP_PAD_AT_START: the first n
+ *  - DSP_PAD_IN_MIDDLE: n points of which point P / 2 becomes point n / 2
+ *  - DSP_PAD_AT_END: the last n
+ *  - DSP_PAD_SPLIT: the first (n + 1) / 2 and the last n / 2
  *
  *  A record that has `n` points or fewer stays as it is. The capacity does not change.
  *  @return 0, or -1 for an invalid mode (the record is then untouched) */

@@ -227,7 +227,8 @@ WAVKIT_API int dspfi_shift(dspf *x, int n);
  *  @{ */
 
 /** Backward difference over the spacing: out[i] = (x[i] - x[i-1]) / delta with x[-1] = 0; of
- * complex records each part by itself. A `delta` of 0 makes the factor BIG. Undone by dspi_integ().
+ *  complex records each part by itself. A `delta` of 0 makes the factor BIG. Undone by
+ *  dspi_integ().
  *  @return 0 */
 WAVKIT_API int dspi_differ(dsp *x);
 WAVKIT_API int dspfi_differ(dspf *x);
@@ -244,11 +245,18 @@ WAVKIT_API int dspfi_integ(dspf *x);
 WAVKIT_API int dspi_pdiffer(dsp *x);
 WAVKIT_API int dspfi_pdiffer(dspf *x);
 
+/** Directions of the crossings that dspi_edge() looks for. */
+enum {
+    DSP_EDGE_FALLING = -1, /**< downwards */
+    DSP_EDGE_EITHER = 0,   /**< both */
+    DSP_EDGE_RISING = 1    /**< upwards */
+};
+
 /** Replaces a real signal by the positions, counted in samples, at which it crosses `level`.
  *  Between x[i] and x[i+1] it rises across when x[i] < level <= x[i+1] and falls across when
  *  x[i] > level >= x[i+1]; the position is interpolated linearly, or halfway between samples whose
  *  difference is infinite. A NaN crosses nothing.
- *  @param direction  above 0: rising crossings, below 0: falling ones, 0: both
+ *  @param direction  DSP_EDGE_... constant; the sign alone counts
  *  @return 0, or -1 for a complex record (untouched) */
 WAVKIT_API int dspi_edge(dsp *x, int direction, double level);
 WAVKIT_API int dspfi_edge(dspf *x, int direction, float level);
@@ -275,7 +283,7 @@ WAVKIT_API int dspi_atan(dsp *x);
 WAVKIT_API int dspfi_atan(dspf *x);
 
 /** Hyperbolic functions; where |x| exceeds ln(BIG), the sine is BIG with the sign of x and the
- * cosine BIG. */
+ *  cosine BIG. */
 WAVKIT_API int dspi_sinh(dsp *x);
 WAVKIT_API int dspfi_sinh(dspf *x);
 WAVKIT_API int dspi_cosh(dsp *x);

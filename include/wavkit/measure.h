@@ -6,8 +6,7 @@
  *  amplitude A shows A in its bin; dsph_dft() does so at the record's own length; dsph_avg() folds
  *  spectrum after spectrum into an average; dsph_corr() slides one signal along another.
  *
- *  They use the windows and tables that transforms and windows keep, so no two of one precision may
- *  run at the same time. A step that fails ends the call with -1 and leaves the output part-way. */
+ *  A step that fails ends the call with -1 and leaves the output part-way. */
 #ifndef WAVKIT_MEASURE_H
 #define WAVKIT_MEASURE_H
 
@@ -84,8 +83,8 @@ WAVKIT_API int dspfh_fft(const dspf *in, dspf *out, int npts, float fraction, in
  *  negative one too. DSP_SPECTRUM_RAW transforms the record as it is.
  *
  *  **Inverse.** Undoes the transform, the rotation and the scaling of the same `window` and
- * `flags`, not the window itself. A half spectrum of M bins gives a real record of 2M - 2 points,
- * or of 2M - 1 with DSP_SPECTRUM_ODD.
+ *  `flags`, not the window itself. A half spectrum of M bins gives a real record of 2M - 2 points,
+ *  or of 2M - 1 with DSP_SPECTRUM_ODD.
  *
  *  @param in      real or complex
  *  @param out     the result; `delta` = 1 / (N delta). May be in, or share its buffer.
@@ -95,30 +94,48 @@ WAVKIT_API int dspfh_fft(const dspf *in, dspf *out, int npts, float fraction, in
 WAVKIT_API int dsph_dft(const dsp *in, dsp *out, int window, int flags);
 WAVKIT_API int dspfh_dft(const dspf *in, dspf *out, int window, int flags);
 
+/** What `flags` of dsph_avg() is put together from: one type and any of the last two. */
+enum {
+    DSP_AVG_NONE = 0,        /**< the last spectrum alone */
+    DSP_AVG_LINEAR = 1,      /**< mean, arithmetic or exponential */
+    DSP_AVG_MAX_HOLD = 2,    /**< largest values so far */
+    DSP_AVG_MIN_HOLD = 3,    /**< smallest values so far */
+    DSP_AVG_HARMONIC = 4,    /**< reciprocal of the mean of reciprocals */
+    DSP_AVG_LOGARITHMIC = 5, /**< geometric mean: that of decibels */
+    DSP_AVG_EVERY_NTH = 6,   /**< one spectrum out of `every` */
+    DSP_AVG_LIMITED = 0x10,  /**< a true mean up to `limit` spectra, then one that forgets */
+    DSP_AVG_POWER = 0x20     /**< average the squared magnitudes of the input in its place */
+};
+
 /** Folds a spectrum into a running average.
  *
- *  `flags` bits 0 to 3 choose what the average becomes, w being the share of the new spectrum:
+ *  The type says what the average becomes, w being the share of the new spectrum:
  *
- *      0  none          the input
- *      1  linear        w input + (1 - w) avg
- *      2  maximum hold  the larger of both, by magnitude where either is complex (dspb_max())
- *      3  minimum hold  the smaller of both (dspb_min())
- *      4  harmonic      1 / (w / input + (1 - w) / avg)
- *      5  logarithmic   exp(w ln input + (1 - w) ln avg)
- *      6  every n-th    the input at the counts 1, 1 + every, 1 + 2 every, ...; otherwise unchanged
- *      7 to 15          unchanged
+ *      DSP_AVG_NONE         the input
+ *      DSP_AVG_LINEAR       w input + (1 - w) avg
+ *      DSP_AVG_MAX_HOLD     the larger of both, by magnitude where either is complex (dspb_max())
+ *      DSP_AVG_MIN_HOLD     the smaller of both (dspb_min())
+ *      DSP_AVG_HARMONIC     1 / (w / input + (1 - w) / avg)
+ *      DSP_AVG_LOGARITHMIC  exp(w ln input + (1 - w) ln avg)
+ *      DSP_AVG_EVERY_NTH    the input at the counts 1, 1 + every, 1 + 2 every, ...; else unchanged
+ *      7 to 15              unchanged
  *
  *  A `weight` that is not negative is w itself. With a negative one w is 1 / count, a true mean of
- *  all spectra so far; with 0x10 in `flags`, and 0 < limit <= count, it is 1 / limit, an
- *  exponential average that forgets. With 0x20 the squared magnitudes of the input are averaged in
- *  its place. With a `count` of 1 or less the input starts the average, whatever the type.
+ *  all spectra so far; with DSP_AVG_LIMITED, and 0 < limit <= count, it is 1 / limit, an
+ *  exponential average that forgets. With a `count` of 1 or less the input starts the average,
+ *  whatever the type.
  *
  *  @param input    the new spectrum, only read unless it is also `scratch`
  *  @param avg      the average; delta = mean of both where they are combined, else the input's
  *  @param scratch  room for intermediate values, or null
+ *  @param flags    DSP_AVG_... constants
  *  @param count    how many spectra there are with this one
+ *  @param every    for DSP_AVG_EVERY_NTH; below 1: the first spectrum stays
+ *  @param weight   share of the new spectrum, or negative
+ *  @param limit    for DSP_AVG_LIMITED
  *  @return 0; -1 when memory runs out or the two have different lengths, as long as they have to be
- *          combined. All steps of types 4 and 5 run even then, so that the average comes back. */
+ *          combined. All steps of a harmonic or logarithmic average run even then, so that the
+ *          average comes back. */
 WAVKIT_API int dsph_avg(dsp *input, dsp *avg, dsp *scratch, int flags, int count, int every,
                         double weight, double limit);
 WAVKIT_API int dspfh_avg(dspf *input, dspf *avg, dspf *scratch, int flags, int count, int every,

@@ -95,10 +95,15 @@ typedef void (*dspf_realloc_hook)(dspf *record, int old_points, int old_complex)
 typedef void (*dsp_free_hook)(dsp *record);
 typedef void (*dspf_free_hook)(dspf *record);
 
-/** Install a hook for this precision's records; null restores malloc, realloc or free. The hook
- *  that was installed is stored through `previous` unless that is null. Install hooks before the
- *  first operation, and call dsp_free_internal() before removing them: cached buffers came from
- *  them.
+/** Install a hook for this precision's records; null restores the library's own allocation. The
+ *  hook that was installed is stored through `previous` unless that is null. Install hooks before
+ *  the first operation. Call dsp_free_internal() before removing them, once other threads that used
+ *  the library have ended: what is kept between calls came from them. Threads may be inside a hook
+ *  at the same time.
+ *
+ *  Without a hook, blocks come from the C runtime and may be given to its free() and realloc().
+ *  Those that the library allocates are aligned to 64 bytes where the runtime has aligned blocks
+ *  that these two take, and as malloc() gives them elsewhere.
  *  @return 0 */
 WAVKIT_API int dsp_lib_alloc(dsp_alloc_hook hook, dsp_alloc_hook *previous);
 WAVKIT_API int dspf_lib_alloc(dspf_alloc_hook hook, dspf_alloc_hook *previous);

@@ -106,7 +106,7 @@ WAVKIT_API int dspfs_gmean(const dspf *x, dspf *out);
  *
  *  A real signal with a zero gives 0, one whose reciprocals cancel gives B. The parts of complex
  *  points are held within +-B, and 1 / |z|^2 is B for a vanishing |z|^2, for the points as for
- * their sum.
+ *  their sum.
  *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_hmean(const dsp *x, dsp *out);
 WAVKIT_API int dspfs_hmean(const dspf *x, dspf *out);
@@ -114,9 +114,9 @@ WAVKIT_API int dspfs_hmean(const dspf *x, dspf *out);
 /** Histogram: counts the values, or the magnitudes of a complex signal, in bins of equal width.
  *
  *  A value v counts in bin floor((v - lo) / width). The upper edge lo + nbins * width, and what
- * lies within ten rounding steps above it, counts in the last bin; other values outside and NaN are
- *  dropped. With a width of 0 only values equal to `lo` count, in bin 0. A complex point with a
- * part beyond +-1e100 (1e15 in single precision) has that magnitude.
+ *  lies within ten rounding steps above it, counts in the last bin; other values outside and NaN
+ *  are dropped. With a width of 0 only values equal to `lo` count, in bin 0. A complex point with a
+ *  part beyond +-1e100 (1e15 in single precision) has that magnitude.
  *  @param x      real or complex signal
  *  @param out    `nbins` real points, the counts; `delta` is the bin width. May be x
  *  @param lo     lower edge of the first bin
@@ -126,23 +126,29 @@ WAVKIT_API int dspfs_hmean(const dspf *x, dspf *out);
 WAVKIT_API int dsps_hist(const dsp *x, dsp *out, double lo, double width, int nbins);
 WAVKIT_API int dspfs_hist(const dspf *x, dspf *out, float lo, float width, int nbins);
 
+/** What `flags` of dsps_peak() is put together from: which point, and one rule that refines it. */
+enum {
+    DSP_PEAK_SAMPLE = 0x000,             /**< the point as it stands */
+    DSP_PEAK_PARABOLIC = 0x100,          /**< a parabola through three points */
+    DSP_PEAK_GAUSSIAN = 0x200,           /**< a bell curve through two points */
+    DSP_PEAK_GAUSSIAN_CORRECTED = 0x300, /**< the same for the lobe of DSP_WINDOW_GAUSSTOP */
+    DSP_PEAK_AT_INDEX = 0x1000,          /**< take the point at `index` instead of searching */
+    DSP_PEAK_SMALLEST = 0x2000           /**< search the smallest point instead of the largest */
+};
+
 /** Finds the largest point of a signal and refines its height and position between the samples. A
  *  complex signal is measured by its squared magnitude |x[n]|^2.
  *
- *  Bits of `flags`; the others are ignored:
- *  - 0x1000: take the point at `index` (held within the record) instead of searching
- *  - 0x2000: search for the smallest point instead of the largest
- *
- *  and one of four interpolations, with y[k] the point that was taken:
- *  - 0x000: none
- *  - 0x100: the vertex of the parabola through y[k - 1], y[k] and y[k + 1]; none at either end. Not
- *    guarded against three points in a line.
- *  - 0x200: a bell curve through y[k] and its larger neighbour, from the logarithm of their ratio.
- *    From the lower j of the two, the position is j + d with
+ *  The rules, with y[k] the point that was taken:
+ *  - DSP_PEAK_PARABOLIC: the vertex of the parabola through y[k - 1], y[k] and y[k + 1]; at either
+ *    end the point as it stands. Not guarded against three points in a line.
+ *  - DSP_PEAK_GAUSSIAN: a bell curve through y[k] and its larger neighbour, from the logarithm of
+ *    their ratio. From the lower j of the two, the position is j + d with
  *    d = ln(y[j + 1] / y[j]) / (4 c) + 1/2 and the height exp(c d^2) y[j], c = 0.315563649157834.
  *    d is held within [-0.5, 1.5]; where it had to be, the call returns -1 with the result written.
- *    None for a record of one point.
- *  - 0x300: the same, with d' = d - 1/2 replaced by d' (1 - 0.02036 (d'^2 - 1/4))
+ *    The only point of a record stays as it stands.
+ *  - DSP_PEAK_GAUSSIAN_CORRECTED: the same, with d' = d - 1/2 replaced by
+ *    d' (1 - 0.02036 (d'^2 - 1/4))
  *
  *  The search takes the first of equal points and passes over NaN and over values beyond +-1e100
  *  (1e15 in single precision) on the far side; where nothing is found it takes the first point. A
@@ -150,10 +156,10 @@ WAVKIT_API int dspfs_hist(const dspf *x, dspf *out, float lo, float width, int n
  *  @param x      real or complex signal
  *  @param out    two real points: the height, and the position in samples (`delta` is not applied);
  *                0 and 0 for an empty record. `delta` is kept, but becomes 1 when out is x.
- *  @param flags  see above
- *  @param index  the point to take with 0x1000
- *  @return 0, or -1 when memory runs out, d was held or the interpolation is none of these (the
- *          result is then 0 and 0) */
+ *  @param flags  DSP_PEAK_... constants; other bits than 0x3700 are ignored
+ *  @param index  the point to take with DSP_PEAK_AT_INDEX, held within the record
+ *  @return 0, or -1 when memory runs out, d was held or the rule is none of these (the result is
+ *          then 0 and 0) */
 WAVKIT_API int dsps_peak(const dsp *x, dsp *out, unsigned flags, int index);
 WAVKIT_API int dspfs_peak(const dspf *x, dspf *out, unsigned flags, int index);
 

@@ -13,10 +13,9 @@
  *  stays one.
  *
  *  All functions work in place and return 0, or -1 on failure. The first transform of a length
- *  builds tables that later ones of that length read: those of powers of two are kept for every
- *  length, those of other lengths and of cosine transforms for the last one. dsp_free_internal()
- *  releases them. Transforms of one precision must not run at the same time, nor while that
- *  function does.
+ *  builds tables that all threads read from then on: those of powers of two are kept for every
+ *  length, those of other lengths and of cosine transforms for a bounded number of them.
+ *  dsp_free_internal() releases them.
  *
  *  The passes are those of the autosort transform (Cochran, Cooley, Favin et al., "What is the fast
  *  Fourier transform?", 1967); long signals are transformed as a matrix (Bailey, "FFTs in external
@@ -30,10 +29,23 @@
 extern "C" {
 #endif
 
+/** Directions of dspi_fft() and dspi_dft(). */
+enum {
+    DSP_TRANSFORM_FORWARD = 0, /**< from samples to bins */
+    DSP_TRANSFORM_INVERSE = 1  /**< from bins to samples */
+};
+
+/** What `flags` of dspi_dct() is put together from. */
+enum {
+    DSP_DCT_FORWARD = 0,   /**< type 2, from samples to coefficients */
+    DSP_DCT_INVERSE = 1,   /**< type 3, from coefficients to samples */
+    DSP_DCT_NORMALISED = 2 /**< coefficients times 2, the first one times sqrt 2 */
+};
+
 /** Transforms a signal of N = 2^m points; a real one becomes complex first.
  *  One point is its own transform: it is left as it is, a real record stays real, and only `delta`
  *  changes. `points` never does. A borrowed complex buffer is transformed where it lies.
- *  @param inverse  0 forward, anything else inverse
+ *  @param inverse  DSP_TRANSFORM_FORWARD, or anything else for the inverse
  *  @return 0; -1 when `points` is no power of two (the record is then untouched) or memory runs
  *          out */
 WAVKIT_API int dspi_fft(dsp *x, int inverse);
@@ -63,7 +75,7 @@ WAVKIT_API int dspfi_irfft(dspf *x);
  *  computation of discrete Fourier transform", 1970), some ten times as long. For all but powers of
  *  two the record grows to 2^m >= 2N - 2 complex points; it keeps that capacity, and `points` is N
  *  again. The relative error in the L2 norm stays below 10 epsilon log2(N).
- *  @param inverse  0 forward, anything else inverse
+ *  @param inverse  DSP_TRANSFORM_FORWARD, or anything else for the inverse
  *  @return 0, or -1 when memory runs out or N exceeds 2^29 + 1 */
 WAVKIT_API int dspi_dft(dsp *x, int inverse);
 WAVKIT_API int dspfi_dft(dspf *x, int inverse);
@@ -94,7 +106,7 @@ WAVKIT_API int dspfi_irdft(dspf *x, int odd);
  *  same scaling give the signal and its `delta` back. `delta` becomes 1 / (2 N delta), and half of
  *  the large value where it was 0.0; for an empty record 1 / (2 delta), and the large value itself
  *  where it was 0.0.
- *  @param flags  bit 0 inverse, bit 1 normalised
+ *  @param flags  DSP_DCT_... constants
  *  @return 0; -1 for a complex record (then untouched) or when memory runs out */
 WAVKIT_API int dspi_dct(dsp *x, int flags);
 WAVKIT_API int dspfi_dct(dspf *x, int flags);

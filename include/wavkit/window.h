@@ -146,11 +146,10 @@ WAVKIT_API int dspf_window_from_str(const char *name, int *window);
  *  In DSP_SCALE_MEAN and DSP_SCALE_RMS, windows too short to sample their own cosines are corrected
  *  so that the mean and the mean square hold all the same, down to one point.
  *
- *  The sixteen windows generated last are kept, so that windowing frame after frame of one length
- *  costs one multiplication. Where a window could not be generated for a combination of identifier
- *  and flags that it refuses, its place is kept as well: the call fails, and the same call made
- *  again finds a window of zeros. dsp_free_internal() releases them all. Must not run at the same
- *  time as another window function of the same precision.
+ *  A thread keeps the sixteen windows that it generated last, so that windowing frame after frame
+ *  of one length costs one multiplication. Where a window could not be generated for a combination
+ *  of identifier and flags that it refuses, its place is kept as well: the call fails, and the same
+ *  call made again finds a window of zeros. They go with the thread, or by dsp_free_internal().
  *
  *  @param x           real or complex, any length; `delta`, `points` and `complex` do not change.
  *                     A record that borrows its buffer owns a copy afterwards, unless the window is

@@ -13,9 +13,8 @@ namespace Corvane.QuillonInternal.DataAnalysis;
 /// <see cref="NullReferenceException"/>; there are no other exceptions.
 /// </para>
 /// <para>
-/// Inputs and outputs may be the same record. Transforms, windows and filters share tables that nothing
-/// locks: they must not run at the same time, even on distinct records. All other functions may, on
-/// distinct records.
+/// Inputs and outputs may be the same record. Any number of threads may call any functions at once, on
+/// different records.
 /// </para>
 /// </remarks>
 public static unsafe class DspApi
@@ -30,12 +29,10 @@ public static unsafe class DspApi
     /// of the window lies at sample 0.</summary>
     /// <param name="x">The signal, changed in place; a borrowed buffer is exchanged for one of the
     /// library's.</param>
-    /// <param name="window">0 to 23, for example 0 none, 2 Hann, 7 Gausstop, 9 Flattop.</param>
-    /// <param name="scaleType">0 keeps the amplitude of a sine, 1 the power of noise, 2 leaves the
-    /// centre at 1; added to that 4 for equal samples at both ends (Kaiser, Gauss and sinc only), 8
-    /// for a width (sums of cosines and none only), 16 to rotate without a window too, 32 not to
-    /// rotate.</param>
-    /// <param name="winLength">Width of the window in samples; heeded only with 8.</param>
+    /// <param name="window">A <see cref="DspWindow"/>.</param>
+    /// <param name="scaleType">A <see cref="DspScale"/>.</param>
+    /// <param name="winLength">Width of the window in samples; heeded only with
+    /// <see cref="DspScale.Width"/>.</param>
     /// <returns>0, or -1 for a window or a scale that does not exist, or when memory runs
     /// out.</returns>
     public static int dspi_window2(DspInput x, int window, int scaleType, double winLength)
@@ -71,7 +68,7 @@ public static unsafe class DspApi
     /// <summary>Fourier transform of N = 2^m samples; a forward one is divided by N.</summary>
     /// <param name="x">The signal, which becomes complex, and its <see cref="DspInput.Delta"/> 1 /
     /// (N delta).</param>
-    /// <param name="inverse">0 forward, anything else inverse.</param>
+    /// <param name="inverse">A <see cref="DspDirection"/>.</param>
     /// <returns>0; -1 when the length is no power of two (nothing is then changed), or when memory
     /// runs out.</returns>
     public static int dspi_fft(DspInput x, int inverse) => Call(NativeMethods.dspi_fft, x, inverse);
@@ -94,7 +91,7 @@ public static unsafe class DspApi
     /// <summary>Fourier transform of any length N; a forward one is divided by N.</summary>
     /// <param name="x">The signal, which becomes complex, and its <see cref="DspInput.Delta"/> 1 /
     /// (N delta).</param>
-    /// <param name="inverse">0 forward, anything else inverse.</param>
+    /// <param name="inverse">A <see cref="DspDirection"/>.</param>
     /// <returns>0, or -1 when memory runs out.</returns>
     public static int dspi_dft(DspInput x, int inverse) => Call(NativeMethods.dspi_dft, x, inverse);
 

@@ -17,7 +17,7 @@ namespace Corvane.QuillonInternal.DataAnalysis;
 /// The properties do not check whether the object was disposed and must not be used after that. Every
 /// function of <see cref="DspApi"/> throws <see cref="ObjectDisposedException"/> for a disposed object.
 /// </para>
-/// <para>Nothing is locked: an object belongs to one thread at a time.</para>
+/// <para>An object belongs to one thread at a time.</para>
 /// </remarks>
 public unsafe class DspInput : IDisposable
 {

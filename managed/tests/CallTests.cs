@@ -1,129 +1,110 @@
 using System;
+using System.Collections.Generic;
+using System.Linq;
+using System.Reflection;
+using System.Runtime.InteropServices;
 using Xunit;
 
 namespace Corvane.QuillonInternal.DataAnalysis.Tests;
 
-/// <summary>Each call by a result that no other function and no other arguments give.</summary>
-public class CallTests
+/// <summary>The facade beside the native library, whose own tests say what is right.</summary>
+public unsafe class CallTests
 {
-    private static readonly double Root = Math.Sqrt(3) / 2; // sin(pi / 3)
+    private static readonly nint Library =
+        NativeLibrary.Load("libwavkit.so.2", typeof(CallTests).Assembly, null);
 
-    private static void Check(Signal x, Func<DspInput, int> call, int complex, params double[] expected)
+    /// <summary>The record as C lays it out.</summary>
+    private struct Record
     {
-        using (x)
+        internal double Delta;
+        internal double* Data;
+        internal int Alloc, Points, Complex;
+        internal ulong Extra;
+    }
+
+    private static int CallNative(string name, Record* r, object?[] arguments)
+    {
+        void* f = (void*)NativeLibrary.GetExport(Library, name);
+        return arguments switch
         {
-            Assert.Equal(0, call(x));
-            x.ShouldBe(complex, expected);
+            [_] => ((delegate* unmanaged[Cdecl]<Record*, int>)f)(r),
+            [_, int n] => ((delegate* unmanaged[Cdecl]<Record*, int, int>)f)(r, n),
+            [_, double v] => ((delegate* unmanaged[Cdecl]<Record*, double, int>)f)(r, v),
+            [_, int w, int s, double l] =>
+                ((delegate* unmanaged[Cdecl]<Record*, int, int, double, int>)f)(r, w, s, l),
+            [_, _] => ((delegate* unmanaged[Cdecl]<Record*, Record*, int>)f)(r, r + 1),
+            _ => ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, Record*, int>)f)(
+                r, r + 1, r + 2, arguments[3] == null ? null : r + 3),
+        };
+    }
+
+    private static readonly List<double[]> Lent = [];
+
+    private static double* Samples(int place)
+    {
+        Lent.Add(GC.AllocateArray<double>(8, pinned: true));
+        new[] { 1.5 + place, -4, 7 - place, 2, 0.25, 3, -1, 5 }.CopyTo(Lent[^1], 0);
+        return (double*)Marshal.UnsafeAddrOfPinnedArrayElement(Lent[^1], 0);
+    }
+
+    public static TheoryData<string> Functions => [.. typeof(DspApi)
+        .GetMethods(BindingFlags.Static | BindingFlags.Public).Select(function => function.Name)];
+
+    /// <summary>Over lengths, kinds and flags among which no two functions do the same.</summary>
+    [Theory]
+    [MemberData(nameof(Functions))]
+    public void EveryCallIsTheNativeOneOfItsName(string name)
+    {
+        for (int i = 0; i < 8; ++i) Compare(name, 3 + i % 2, i / 2 % 2, i / 4);
+    }
+
+    private static void Compare(string name, int points, int complex, int flag)
+    {
+        MethodInfo function = typeof(DspApi).GetMethod(name)!;
+        Record* records = stackalloc Record[4];
+        object?[] arguments = [.. function.GetParameters().Select(parameter =>
+        {
+            int place = parameter.Position;
+            if (parameter.ParameterType == typeof(double)) return (object?)2.5;
+            if (parameter.Name == "window") return (int)DspWindow.Hann;
+            if (parameter.Name == "scaleType") return (int)(DspScale.Peak | DspScale.Width);
+            if (parameter.ParameterType == typeof(int)) return 4 * flag;
+            records[place] = new Record
+                { Delta = 0.5, Data = Samples(place), Alloc = 0, Points = points, Complex = complex, Extra = 7 };
+            if (place == 3 && flag == 0) return null; // the filter's state, which may be missing
+            return new DspInput
+                { Delta = 0.5, Data = Samples(place), Points = points, Complex = complex, Extra = (void*)7 };
+        })];
+
+        Assert.Equal(CallNative(name, records, arguments), function.Invoke(null, arguments));
+        for (int place = 0; place < arguments.Length; ++place)
+        {
+            if (arguments[place] is not DspInput x) continue;
+            Record* y = records + place;
+            Assert.Equal((y->Delta, y->Alloc, y->Points, y->Complex, y->Extra),
+                (x.Delta, x.Alloc, x.Points, x.Complex, (ulong)x.Extra));
+            int count = x.Points * (1 + x.Complex);
+            Assert.Equal(new Span<double>(y->Data, count), new Span<double>(x.Data, count));
+            Assert.Equal(0, CallNative("dsp_destroy", y, [null]));
+            Assert.Equal(0, DspApi.dsp_destroy(x));
+            x.Dispose();
         }
     }
 
+    /// <summary>Names whose numbers the library knows.</summary>
     [Fact]
-    public void LayoutAndScale()
+    public void WindowsHaveTheNumbersOfTheirNames()
     {
-        Check(Signal.Real(1, 2, 3, 4, 5), DspApi.dspi_swap_halves, 0, 4, 5, 1, 2, 3);
-        Check(Signal.Real(1, 2, 3, 4, 5), DspApi.dspi_rev, 0, 5, 4, 3, 2, 1);
-        Check(Signal.Real(1, 2), x => DspApi.dspi_zpad(x, 5), 0, 1, 2, 0, 0, 0);
-        Check(Signal.Interleaved(1, 2, -3, -4), DspApi.dspi_conj, 1, 1, -2, -3, 4);
-        Check(Signal.Interleaved(1, 2, -3, -4), x => DspApi.dspi_scale(x, -0.75), 1, -0.75, -1.5, 2.25, 3);
-    }
-
-    /// <summary>Abramowitz and Stegun, tables 9.1 and 9.8.</summary>
-    [Fact]
-    public void BesselFunctions()
-    {
-        Check(Signal.Real(0, 1.5), DspApi.dspi_besi0, 0, 1, 1.6467231897728904);
-        Check(Signal.Real(0, 1.5), DspApi.dspi_besj0, 0, 1, 0.5118276717359181);
-        Check(Signal.Real(0, 1.5), DspApi.dspi_besj1, 0, 0, 0.5579365079100996);
-        Check(Signal.Real(0, 1.5), DspApi.dspi_besy0, 0, 0, 0.3824489237977589);
-        Check(Signal.Real(0, 1.5), DspApi.dspi_besy1, 0, 0, -0.4123086269739113);
-    }
-
-    /// <summary>A pulse at sample 1 of 4, whose bins turn by a quarter, also where a length that is no
-    /// power of two tells these transforms from those of any length.</summary>
-    [Fact]
-    public void TransformsOfPowersOfTwo()
-    {
-        double[] bins = [0.25, 0, 0, -0.25, -0.25, 0, 0, 0.25];
-        Check(Signal.Real(0, 1, 0, 0), x => DspApi.dspi_fft(x, 0), 1, bins);
-        Check(Signal.Interleaved(bins), x => DspApi.dspi_fft(x, 1), 1, 0, 0, 1, 0, 0, 0, 0, 0);
-        Check(Signal.Real(0, 1, 0, 0), DspApi.dspi_rfft, 1, bins[..6]);
-        Check(Signal.Interleaved(bins[..6]), DspApi.dspi_irfft, 0, 0, 1, 0, 0);
-
-        using Signal three = Signal.Real(0, 1, 0), four = Signal.Interleaved(0, 0, 1, 0, 0, 0, 0, 0);
-        Assert.Equal(-1, DspApi.dspi_fft(three, 0));
-        Assert.Equal(-1, DspApi.dspi_rfft(three));
-        three.ShouldBe(0, 0, 1, 0);
-        four.Delta = 0.5;
-        Assert.Equal(0, DspApi.dspi_fft(four, 0));
-        Assert.Equal(0.5, four.Delta); // 1 / (4 * 0.5)
-        Assert.Equal(-1, DspApi.dspi_irfft(four)); // of 6 samples
-    }
-
-    /// <summary>The same with 3 samples, whose bins turn by a third.</summary>
-    [Fact]
-    public void TransformsOfAnyLength()
-    {
-        double[] bins = [1 / 3.0, 0, -1 / 6.0, -Root / 3, -1 / 6.0, Root / 3];
-        Check(Signal.Real(0, 1, 0), x => DspApi.dspi_dft(x, 0), 1, bins);
-        Check(Signal.Interleaved(bins), x => DspApi.dspi_dft(x, 1), 1, 0, 0, 1, 0, 0, 0);
-        Check(Signal.Real(0, 1, 0), DspApi.dspi_rdft, 1, bins[..4]);
-        Check(Signal.Interleaved(bins[..4]), x => DspApi.dspi_irdft(x, 1), 0, 0, 1, 0);
-        Check(Signal.Interleaved(0.5, 0, -0.5, 0), x => DspApi.dspi_irdft(x, 0), 0, 0, 1);
-    }
-
-    /// <summary>A Hann window of 8 samples about sample 4, in three scales and two layouts, and one of 4
-    /// samples.</summary>
-    [Fact]
-    public void Windows()
-    {
-        const int hann = 2, rms = 1, peak = 2, width = 8, still = 32;
-        double a = (1 - Math.Sqrt(0.5)) / 2, b = (1 + Math.Sqrt(0.5)) / 2, power = Math.Sqrt(8 / 3.0);
-        double[] window = [0, a, 0.5, b, 1, b, 0.5, a];
-        double[] ones = [1, 1, 1, 1, 1, 1, 1, 1];
-        Check(Signal.Real(ones), x => DspApi.dspi_window2(x, hann, peak + still, 0), 0, window);
-        Check(Signal.Real(ones), x => DspApi.dspi_window2(x, hann, peak, 0), 0,
-            [.. window[4..], .. window[..4]]);
-        Check(Signal.Real(ones), x => DspApi.dspi_window2(x, hann, rms + still, 0), 0,
-            Array.ConvertAll(window, w => w * power));
-        Check(Signal.Real(ones), x => DspApi.dspi_window2(x, hann, peak + still + width, 4), 0,
-            0, 0, 0, 0.5, 1, 0.5, 0, 0);
-        using Signal unknown = Signal.Real(ones);
-        Assert.Equal(-1, DspApi.dspi_window2(unknown, 24, 0, 0));
-    }
-
-    /// <summary>A block by itself, and two blocks of a stream.</summary>
-    [Fact]
-    public void Filters()
-    {
-        using Signal first = Signal.Real(1, 2, 3), second = Signal.Real(4, 5), taps = Signal.Real(1, 10, 100);
-        using Signal output = Signal.Real(), state = Signal.Real();
-        Assert.Equal(0, DspApi.dspd_fir(first, output, taps, null));
-        output.ShouldBe(0, 1, 12, 123);
-        Assert.Equal(0, DspApi.dspd_fir(first, output, taps, state));
-        Assert.Equal(0, DspApi.dspd_fir(second, output, taps, state));
-        output.ShouldBe(0, 234, 345);
-        state.ShouldBe(0, 4, 5);
-        first.ShouldBe(0, 1, 2, 3);
-        taps.ShouldBe(0, 1, 10, 100);
-    }
-
-    /// <summary>A signal in which all of them differ, also from those of a population.</summary>
-    [Fact]
-    public void Statistics()
-    {
-        static void Check(Func<DspInput, DspInput, int> function, double expected)
+        var find = (delegate* unmanaged[Cdecl]<byte*, int*, int>)
+            NativeLibrary.GetExport(Library, "dsp_window_from_str");
+        foreach (DspWindow window in Enum.GetValues<DspWindow>())
         {
-            using Signal input = Signal.Real(2, -4, 7, 1, 9), output = Signal.Real(5, 5);
-            Assert.Equal(0, function(input, output));
-            output.ShouldBe(0, expected);
-            input.ShouldBe(0, 2, -4, 7, 1, 9);
+            int number;
+            fixed (byte* name = System.Text.Encoding.ASCII.GetBytes($"{window}\0".Replace("nH", "n_H")))
+            {
+                Assert.Equal((0, (int)window), (find(name, &number), number));
+            }
         }
-        Check(DspApi.dsps_mean, 3);
-        Check(DspApi.dsps_median, 2);
-        Check(DspApi.dsps_rms, Math.Sqrt(30.2));
-        Check(DspApi.dsps_samp_stddev, Math.Sqrt(26.5));
-        Check(DspApi.dsps_samp_var, 26.5);
-        Check(DspApi.dsps_min, -4);
-        Check(DspApi.dsps_max, 9);
+        Assert.Equal(24, Enum.GetValues<DspWindow>().Length);
     }
 }

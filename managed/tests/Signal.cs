@@ -1,7 +1,7 @@
 using System;
 using Xunit;
 
-// Transforms, windows and filters must not run at the same time.
+// The library has one set of hooks, and the counters of the tests are everybody's.
 [assembly: CollectionBehavior(DisableTestParallelization = true)]
 
 namespace Corvane.QuillonInternal.DataAnalysis.Tests;

@@ -9,9 +9,7 @@
 namespace wavkit {
 namespace {
 
-constexpr int keep_power = 1, unscaled = 2, scale_bits = 3;  // 0 keeps the amplitude
-constexpr int at_start = 0x000, in_middle = 0x100, at_end = 0x200, split = 0x300,
-              placement_bits = 0x700;
+constexpr int scale_bits = 3, placement_bits = 0x700;
 
 /// Where the points of a short signal lie in a long one: the first `head` points from point `lead`
 /// on, the others at the very end.
@@ -21,13 +19,13 @@ struct Placement {
 
 std::optional<Placement> placement(int mode, std::size_t longer, std::size_t shorter) {
     switch (mode & placement_bits) {
-        case at_start:
+        case DSP_PAD_AT_START:
             return Placement{0, shorter};
-        case in_middle:  // point count / 2, the zero frequency of a rotated spectrum, stays that
+        case DSP_PAD_IN_MIDDLE:  // half the length, the zero frequency of a spectrum, stays so
             return Placement{longer / 2 - shorter / 2, shorter};
-        case at_end:
+        case DSP_PAD_AT_END:
             return Placement{0, 0};
-        case split:
+        case DSP_PAD_SPLIT:
             return Placement{0, (shorter + 1) / 2};
         default:
             return std::nullopt;
@@ -38,9 +36,9 @@ template <class T>
 std::optional<T> scale_factor(int mode, std::size_t old_count, std::size_t new_count) {
     const int kept = mode & scale_bits;
     if (kept == scale_bits) return std::nullopt;
-    if (kept == unscaled || old_count == 0 || new_count == 0) return T(1);
+    if (kept == DSP_PAD_UNSCALED || old_count == 0 || new_count == 0) return T(1);
     const double ratio = double(new_count) / double(old_count);
-    return T(kept == keep_power ? std::sqrt(ratio) : ratio);
+    return T(kept == DSP_PAD_KEEP_POWER ? std::sqrt(ratio) : ratio);
 }
 
 template <Record R>
@@ -147,8 +145,8 @@ int dspfi_swap_halves(dspf* x) { return wavkit::rotate(x, (wavkit::length(x) + 1
 int dspi_swap_halves2(dsp* x) { return wavkit::rotate(x, wavkit::length(x) / 2); }
 int dspfi_swap_halves2(dspf* x) { return wavkit::rotate(x, wavkit::length(x) / 2); }
 
-int dspi_zpad(dsp* x, int n) { return wavkit::pad(x, n, wavkit::at_start | wavkit::unscaled); }
-int dspfi_zpad(dspf* x, int n) { return wavkit::pad(x, n, wavkit::at_start | wavkit::unscaled); }
+int dspi_zpad(dsp* x, int n) { return wavkit::pad(x, n, DSP_PAD_AT_START | DSP_PAD_UNSCALED); }
+int dspfi_zpad(dspf* x, int n) { return wavkit::pad(x, n, DSP_PAD_AT_START | DSP_PAD_UNSCALED); }
 
 int dspi_zpad2(dsp* x, int n, int mode) { return wavkit::pad(x, n, mode); }
 int dspfi_zpad2(dspf* x, int n, int mode) { return wavkit::pad(x, n, mode); }

@@ -4,16 +4,14 @@
 namespace wavkit {
 namespace {
 
-enum Type { none, linear, maximum, minimum, harmonic, logarithmic, every_nth };
-
-constexpr int type_field = 0x0F, limited_flag = 0x10, power_flag = 0x20;
+constexpr int type_field = 0x0F;
 
 /// The share of a new spectrum: the caller's, or 1 / count for a true mean, from `limit` spectra on
 /// 1 / limit for one that forgets exponentially.
 template <class T>
 T avg_weight(int flags, int count, T weight, T limit) {
     if (weight >= 0) return weight;
-    const bool limited = flags & limited_flag && limit > 0 && limit <= T(count);
+    const bool limited = flags & DSP_AVG_LIMITED && limit > 0 && limit <= T(count);
     const T divisor = limited ? limit : T(count);
     return divisor == 0 ? T(1) : T(1) / divisor;
 }
@@ -44,19 +42,19 @@ int fold(const R* input, R* avg, R* scratch, int type, int count, int every, sca
     const auto logarithm = [](R* x) { return dspi_log(x); };
     const auto exponential = [](R* x) { return dspi_exp(x); };
     switch (type) {
-        case none:
+        case DSP_AVG_NONE:
             return dsp_copy(avg, input);
-        case linear:
+        case DSP_AVG_LINEAR:
             return dspb_avg_add(input, avg, avg, weight);
-        case maximum:
+        case DSP_AVG_MAX_HOLD:
             return dspb_max(input, avg, avg);
-        case minimum:
+        case DSP_AVG_MIN_HOLD:
             return dspb_min(input, avg, avg);
-        case harmonic:
+        case DSP_AVG_HARMONIC:
             return transformed_mean(input, avg, scratch, weight, reciprocal, reciprocal);
-        case logarithmic:
+        case DSP_AVG_LOGARITHMIC:
             return transformed_mean(input, avg, scratch, weight, logarithm, exponential);
-        case every_nth:
+        case DSP_AVG_EVERY_NTH:
             if (every == 1 || (every > 0 && count % every == 1)) return dsp_copy(avg, input);
             return 0;
         default:
@@ -70,7 +68,7 @@ int average(R* input, R* avg, R* scratch, int flags, int count, int every, scala
     Temporary<R> local;
     R* const work = scratch ? scratch : local.get();
     bool failed = false;
-    if (flags & power_flag) {
+    if (flags & DSP_AVG_POWER) {
         failed = fails_into(work, dspu_magsq(input, work));
         input = work;
     }

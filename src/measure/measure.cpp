@@ -12,8 +12,6 @@ namespace {
 constexpr int rotated = DSP_SPECTRUM_SUM | DSP_SPECTRUM_ROTATED;
 constexpr int whole_record = DSP_SPECTRUM_SUM | DSP_SPECTRUM_ROTATED | DSP_SPECTRUM_RAW;
 
-constexpr int pad_unscaled = 2, pad_split = 0x300;
-
 constexpr std::uint64_t longest_transform = 1u << 30;
 
 /// The points of a transform and the share of them that is measured.
@@ -37,7 +35,7 @@ Frame<R> frame(int npts, scalar<R> fraction, std::int64_t available, int flags) 
 
 /// Zeros go amid the points where a window has been rotated to the start, else behind them.
 constexpr int padding(int window, int flags) {
-    return pad_unscaled | (window > 0 || flags & DSP_SPECTRUM_SUM ? pad_split : 0);
+    return DSP_PAD_UNSCALED | (window > 0 || flags & DSP_SPECTRUM_SUM ? DSP_PAD_SPLIT : 0);
 }
 
 template <Record R>

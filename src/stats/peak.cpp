@@ -6,10 +6,7 @@
 namespace wavkit {
 namespace {
 
-constexpr unsigned at_given_index = 0x1000, smallest = 0x2000;
-
-constexpr unsigned interpolation_field = 0x700;
-enum Interpolation : unsigned { none = 0, parabolic = 0x100, gaussian = 0x200, corrected = 0x300 };
+constexpr unsigned rule_field = 0x700;
 
 /// What was found; the result is -1 when the interpolation failed.
 template <class T>
@@ -36,9 +33,9 @@ std::size_t search(const R* x, scalar<R> start, Beats beats) {
 
 template <Record R>
 std::size_t select(const R* x, unsigned flags, int index) {
-    if (flags & at_given_index) return std::size_t(std::clamp(index, 0, x->points - 1));
-    return flags & smallest ? search(x, limits<R>::big, std::less<>())
-                            : search(x, -limits<R>::big, std::greater<>());
+    if (flags & DSP_PEAK_AT_INDEX) return std::size_t(std::clamp(index, 0, x->points - 1));
+    return flags & DSP_PEAK_SMALLEST ? search(x, limits<R>::big, std::less<>())
+                                     : search(x, -limits<R>::big, std::greater<>());
 }
 
 /// Vertex of the parabola through three points.
@@ -77,14 +74,14 @@ Peak<scalar<R>> locate(const R* x, unsigned flags, int index) {
     if (n == 0) return {0, 0, 0};
     const std::size_t k = select(x, flags, index);
     const Peak<scalar<R>> sample = {height_at(x, k), scalar<R>(k), 0};
-    switch (const unsigned rule = flags & interpolation_field) {
-        case none:
+    switch (const unsigned rule = flags & rule_field) {
+        case DSP_PEAK_SAMPLE:
             return sample;
-        case parabolic:
+        case DSP_PEAK_PARABOLIC:
             return k == 0 || k == n - 1 ? sample : parabola(x, k);
-        case gaussian:
-        case corrected:
-            return n < 2 ? sample : bell_curve(x, k, rule == corrected);
+        case DSP_PEAK_GAUSSIAN:
+        case DSP_PEAK_GAUSSIAN_CORRECTED:
+            return n < 2 ? sample : bell_curve(x, k, rule == DSP_PEAK_GAUSSIAN_CORRECTED);
         default:
             return {0, 0, -1};
     }

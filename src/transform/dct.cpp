@@ -17,8 +17,6 @@ constexpr T root_two = T(1.414213562373095048801688724209698079L);
 template <class T>
 constexpr T half_root_two = T(0.707106781186547524400844362104849039L);
 
-constexpr int inverse_flag = 1, normalised_flag = 2;
-
 /// What a transform of n points reads and works in: the turns, and room for n samples and their
 /// bins.
 template <class T>
@@ -81,8 +79,8 @@ int dct(R* x, int flags) {
         x->delta = x->delta == 0 ? limits<R>::big : T(0.5) / x->delta;
         return 0;
     }
-    const bool normalised = flags & normalised_flag;
-    const bool failed = flags & inverse_flag ? inverse<R>(x->data, n, normalised)
+    const bool normalised = flags & DSP_DCT_NORMALISED;
+    const bool failed = flags & DSP_DCT_INVERSE ? inverse<R>(x->data, n, normalised)
                                              : forward<R>(x->data, n, normalised);
     if (!failed) x->delta = reciprocal_spacing<R>(n, x->delta) * T(0.5);
     return status(failed);

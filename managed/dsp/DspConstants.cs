@@ -1,0 +1,87 @@
+using System;
+
+namespace Corvane.QuillonInternal.DataAnalysis;
+
+/// <summary>The windows of <see cref="DspApi.dspi_window2"/>; its parameter takes their
+/// numbers.</summary>
+public enum DspWindow
+{
+    /// <summary>No window; also Rectangular.</summary>
+    Uniform = 0,
+    /// <summary>Triangle.</summary>
+    Bartlett = 1,
+    /// <summary>Two cosine terms, sidelobes -31 dB.</summary>
+    Hann = 2,
+    /// <summary>Two cosine terms, sidelobes -43 dB.</summary>
+    Hamming = 3,
+    /// <summary>Three cosine terms, sidelobes -58 dB.</summary>
+    Blackman = 4,
+    /// <summary>Three cosine terms, sidelobes -71 dB.</summary>
+    BlackmanHarris3 = 5,
+    /// <summary>Four cosine terms, sidelobes -93 dB.</summary>
+    BlackmanHarris4 = 6,
+    /// <summary>Five cosine terms, sidelobes -125 dB.</summary>
+    Gausstop = 7,
+    /// <summary>Flat top of four cosine terms.</summary>
+    Flat4 = 8,
+    /// <summary>Flat top of five cosine terms.</summary>
+    Flattop = 9,
+    /// <summary>Flat top of six cosine terms.</summary>
+    Flat6 = 10,
+    /// <summary>Flat top of seven cosine terms.</summary>
+    Flat7 = 11,
+    /// <summary>Flat top of six cosine terms, sidelobes -121 dB.</summary>
+    P501 = 12,
+    /// <summary>Flat top of seven cosine terms, sidelobes -147 dB.</summary>
+    P601 = 13,
+    /// <summary>Kaiser's with sidelobes of -70 dB.</summary>
+    Kaiser70 = 14,
+    /// <summary>Kaiser's with sidelobes of -80 dB.</summary>
+    Kaiser80 = 15,
+    /// <summary>Kaiser's with sidelobes of -90 dB.</summary>
+    Kaiser90 = 16,
+    /// <summary>Kaiser's with sidelobes of -100 dB.</summary>
+    Kaiser100 = 17,
+    /// <summary>Kaiser's with sidelobes of -110 dB.</summary>
+    Kaiser110 = 18,
+    /// <summary>Kaiser's with sidelobes of -120 dB.</summary>
+    Kaiser120 = 19,
+    /// <summary>Gaussian with sidelobes of -60 dB.</summary>
+    Gauss60 = 20,
+    /// <summary>Gaussian with sidelobes of -70 dB.</summary>
+    Gauss70 = 21,
+    /// <summary>Gaussian with sidelobes of -80 dB.</summary>
+    Gauss80 = 22,
+    /// <summary>The main lobe of sin(x) / x.</summary>
+    Riemann = 23,
+}
+
+/// <summary>What the scale type of <see cref="DspApi.dspi_window2"/> is put together from: one of the
+/// first three and any of the others.</summary>
+[Flags]
+public enum DspScale
+{
+    /// <summary>The window's mean is 1: a sine keeps its amplitude.</summary>
+    Mean = 0,
+    /// <summary>The window's mean square is 1: noise keeps its power.</summary>
+    Rms = 1,
+    /// <summary>The centre of the window is 1.</summary>
+    Peak = 2,
+    /// <summary>Equal samples at both ends; Kaiser, Gauss and Riemann only.</summary>
+    Symmetric = 4,
+    /// <summary>The window's length holds; sums of cosines and the uniform window only.</summary>
+    Width = 8,
+    /// <summary>Rotate under the uniform window too.</summary>
+    RotateUniform = 16,
+    /// <summary>Do not rotate under any other window.</summary>
+    NoRotation = 32,
+}
+
+/// <summary>Directions of <see cref="DspApi.dspi_fft"/> and <see cref="DspApi.dspi_dft"/>.</summary>
+public enum DspDirection
+{
+    /// <summary>From samples to bins.</summary>
+    Forward = 0,
+    /// <summary>From bins to samples.</summary>
+    Inverse = 1,
+}
