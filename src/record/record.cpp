@@ -2,7 +2,6 @@
 #include <algorithm>
 #include <cstdlib>
 #include <cstring>
-#include <functional>
 
 #include "record_view.hpp"
 
@@ -104,44 +103,23 @@ int subvec(const R* source, R* destination, int start, int count) {
     const int first = std::clamp(start, 0, available);
     const int kept = std::clamp(count, 0, available - first);
     const R from = *source;  // the two may be one record
-    const bool shared = destination->data == from.data;
-    const int had = destination->points, had_complex = destination->complex;
-
+    const std::int64_t need = std::int64_t(kept) * width(&from);
+    if (destination->alloc > 0 && need > destination->alloc && shares_memory(source, destination)) {
+        Temporary<R> range;  // the samples would go with the block that is too small
+        return status(subvec<R>(source, range, start, count) || dsp_copy(destination, range));
+    }
     destination->points = kept;
     destination->complex = from.complex;
     destination->delta = from.delta;
-    if (shared && destination->alloc < 1 && kept > 0) {
-        // A borrowed buffer may be larger than what is kept of it, and is not the record's to
-        // change: cut the range into a block of its own.
-        destination->data = nullptr;
-        if (dsp_alloc(destination)) return -1;
-        std::memcpy(destination->data, from.data + std::size_t(first) * width(&from),
-                    used(destination) * sizeof(scalar<R>));
-        return 0;
-    }
-    if (shared ? dsp_realloc(destination, had, had_complex) : dsp_alloc(destination)) return -1;
-    const scalar<R>* begin = shared ? destination->data : from.data;
-    if (kept > 0 && (!shared || first > 0)) {
-        std::memmove(destination->data, begin + std::size_t(first) * width(&from),
-                     used(destination) * sizeof(scalar<R>));
-    }
+    if (dsp_alloc(destination)) return -1;
+    if (kept == 0) return 0;
+    const scalar<R>* begin = from.data + std::size_t(first) * width(&from);
+    if (begin != destination->data) std::memmove(destination->data, begin, need * sizeof *begin);
     return 0;
 }
 
-/// Whether the samples of `x` lie in the block that `owner` may move or write to as it grows.
 template <Record R>
-bool lies_within(const R* x, const R* owner) {
-    const std::less<> before;
-    return owner->alloc > 0 && !before(x->data, owner->data) &&
-           before(x->data, owner->data + owner->alloc);
-}
-
-template <Record R>
-int append(R* destination, const R* source) {
-    if (lies_within(source, destination)) {
-        Temporary<R> copy;
-        return status(dsp_copy(copy, source) || append<R>(destination, copy));
-    }
+int append_apart(R* destination, const R* source) {
     if (source->complex && !destination->complex && dspi_rtoc(destination)) return -1;
     const int old = int(length(destination));
     const int added = int(length(source));
@@ -157,6 +135,13 @@ int append(R* destination, const R* source) {
                     used(source) * sizeof(scalar<R>));
     }
     return 0;
+}
+
+template <Record R>
+int append(R* destination, const R* source) {
+    if (!shares_memory<R>(source, destination)) return append_apart(destination, source);
+    Temporary<R> copy;
+    return status(dsp_copy(copy, source) || append_apart<R>(destination, copy));
 }
 
 template <Record R>
