@@ -1,7 +1,8 @@
-// A record seen as its samples, and records of the library's own.
+// A record seen as its samples, the memory that records share, and records of the library's own.
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <span>
 
 #include "bin.hpp"
@@ -49,6 +50,29 @@ std::span<const Bin<scalar<R>>> bins(const R* x) {
     return {reinterpret_cast<const Bin<scalar<R>>*>(x->data), length(x)};
 }
 
+/// Scalars that a record may touch: all of a block that it owns, of a borrowed one those in use.
+template <Record R>
+std::size_t extent(const R* x) {
+    return x->alloc > 0 ? std::size_t(x->alloc) : used(x);
+}
+
+/// Whether two records have memory in common. One record does with itself, empty or not.
+template <Record R>
+bool shares_memory(const R* x, const R* y) {
+    if (x == y) return true;
+    if (!x->data || !y->data) return false;
+    const auto address = [](const scalar<R>* p) { return reinterpret_cast<std::uintptr_t>(p); };
+    return address(x->data) < address(y->data + extent(y)) &&
+           address(y->data) < address(x->data + extent(x));
+}
+
+/// Whether an operand shares the memory of an output without beginning where it does: the output
+/// then lands on samples that have not had their turn, and may move away from under them.
+template <Record R>
+bool overlaps_shifted(const R* x, const R* out) {
+    return x->data != out->data && shares_memory(x, out);
+}
+
 /// A record of the library's own, released when it leaves the scope.
 template <Record R>
 class Temporary {
@@ -65,5 +89,14 @@ class Temporary {
   private:
     R record_;
 };
+
+/// Has `call` write to `out`, or where that would spoil what it reads, to a record apart from it
+/// that `out` then becomes a copy of.
+template <Record R, class Call>
+int write_to(R* out, bool spoils, Call call) {
+    if (!spoils) return call(out);
+    Temporary<R> result;
+    return status(call(result.get()) || dsp_copy(out, result));
+}
 
 }  // namespace wavkit

@@ -25,7 +25,7 @@ void interleave(Out* out, const A* a, const B* b, std::size_t n) {
 }
 
 template <Record R>
-int take_turns(const R* first, const R* second, R* out) {
+int take_turns_from_start(const R* first, const R* second, R* out) {
     R a = *first, b = *second;
     if (length(&a) != length(&b)) return -1;
     const std::size_t n = length(&a);
@@ -42,6 +42,11 @@ int take_turns(const R* first, const R* second, R* out) {
         interleave(out->data, a.data, b.data, n);
     }
     return 0;
+}
+
+template <Record R>
+int take_turns(const R* a, const R* b, R* out) {
+    return write_beside(a, b, out, [=](R* result) { return take_turns_from_start(a, b, result); });
 }
 
 }  // namespace

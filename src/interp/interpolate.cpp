@@ -162,7 +162,7 @@ void continue_knot(const Knots<T>& at, std::span<const T> times, T* out, unsigne
     }
 }
 
-/// `out` may share the buffer of t, not those of the knots.
+/// `out` may begin with t, and shares no memory with the knots.
 template <Record R>
 int sample(const Knots<scalar<R>>& at, const R* abscissae, R* out, unsigned flags) {
     using T = scalar<R>;
@@ -187,7 +187,7 @@ int sample(const Knots<scalar<R>>& at, const R* abscissae, R* out, unsigned flag
 
 template <Record R>
 int interpolate(const R* x, const R* y, const R* moments, const R* t, R* out, unsigned flags) {
-    Temporary<R> own_moments, result;
+    Temporary<R> own_moments;
     const std::size_t n = length(x);
     if (x->complex || y->complex || t->complex || length(y) != n) return -1;
     if ((flags & method_bits) != DSP_INTERP_SPLINE) {
@@ -199,9 +199,9 @@ int interpolate(const R* x, const R* y, const R* moments, const R* t, R* out, un
         return -1;
     }
     const Knots<scalar<R>> at{n, x->data, y->data, moments ? moments->data : nullptr};
-    const auto shares = [&](const auto* data) { return data && out->data == data; };
-    if (!shares(at.x) && !shares(at.y) && !shares(at.moments)) return sample(at, t, out, flags);
-    return status(sample<R>(at, t, result, flags) || dsp_copy(out, result));
+    const bool spoils = shares_memory(x, out) || shares_memory(y, out) ||
+                        (moments && shares_memory(moments, out)) || overlaps_shifted(t, out);
+    return write_to(out, spoils, [&](R* result) { return sample(at, t, result, flags); });
 }
 
 }  // namespace

@@ -122,8 +122,8 @@ void solve(const Knots<T>& knots, int start, int end, T d0, T dn, Row<T>* rows, 
 }
 
 template <Record R>
-int find_moments(const R* abscissae, const R* ordinates, R* out, scalar<R> d0, scalar<R> dn,
-                 int start, int end) {
+int find_from_start(const R* abscissae, const R* ordinates, R* out, scalar<R> d0, scalar<R> dn,
+                    int start, int end) {
     using T = scalar<R>;
     R x = *abscissae, y = *ordinates;
     if (x.complex || y.complex || prepare_output(x, y, out)) return -1;
@@ -135,6 +135,12 @@ int find_moments(const R* abscissae, const R* ordinates, R* out, scalar<R> d0, s
     if (!rows) return -1;
     solve(knots, start, end, d0, dn, rows.get(), out->data);
     return 0;
+}
+
+template <Record R>
+int find_moments(const R* x, const R* y, R* out, scalar<R> d0, scalar<R> dn, int start, int end) {
+    return write_beside(
+        x, y, out, [=](R* moments) { return find_from_start(x, y, moments, d0, dn, start, end); });
 }
 
 }  // namespace

@@ -9,9 +9,16 @@
 
 namespace wavkit {
 
+/// Has `call` write to `out`, or apart from it where an operand lies in its memory but does not
+/// begin with it. What is left to be done in place is done from equal starts.
+template <Record R, class Call>
+int write_beside(const R* a, const R* b, R* out, Call call) {
+    return write_to(out, overlaps_shifted(a, out) || overlaps_shifted(b, out), call);
+}
+
 /// Makes `out` `points` samples, complex or real, for two operands of one length. `a` and `b` are
-/// copies of the operands' records, taken on entry; they stay readable afterwards also where `out`
-/// shares their buffer: an owned block keeps its contents and may move, then they follow it; a
+/// copies of the operands' records, taken on entry; they stay readable afterwards also where they
+/// begin with `out`: an owned block keeps its contents and may move, then they follow it; a
 /// borrowed one stays as it was, and `out` leaves it.
 template <Record R>
 int size_output(R& a, R& b, R* out, std::int64_t points, bool complex) {
@@ -61,8 +68,9 @@ void widen(const T* reals, const Bin<T>* out, std::size_t n, Block combine_block
 }
 
 /// out[n] = operation(a[n], b[n]); the operation takes every pairing of real and complex samples.
+/// An operand that shares the memory of `out` begins with it.
 template <Record R, class Operation>
-int pointwise(const R* first, const R* second, R* out, Operation operation) {
+int pointwise_from_start(const R* first, const R* second, R* out, Operation operation) {
     R a = *first, b = *second;
     if (prepare_output(a, b, out)) return -1;
     const std::size_t n = length(&a);
@@ -81,6 +89,12 @@ int pointwise(const R* first, const R* second, R* out, Operation operation) {
         combine(a.data, b.data, out->data, n, operation);
     }
     return 0;
+}
+
+template <Record R, class Operation>
+int pointwise(const R* a, const R* b, R* out, Operation operation) {
+    return write_beside(a, b, out,
+                        [=](R* result) { return pointwise_from_start(a, b, result, operation); });
 }
 
 }  // namespace wavkit

@@ -7,7 +7,7 @@ namespace wavkit {
 namespace {
 
 template <Record R>
-int join_parts(const R* real_parts, const R* imaginary_parts, R* out) {
+int join_from_start(const R* real_parts, const R* imaginary_parts, R* out) {
     R a = *real_parts, b = *imaginary_parts;
     if (a.complex || b.complex || length(&a) != length(&b)) return -1;
     out->delta = (a.delta + b.delta) * scalar<R>(0.5);
@@ -15,6 +15,11 @@ int join_parts(const R* real_parts, const R* imaginary_parts, R* out) {
     // Backwards: in place, point i overwrites the samples 2i and 2i + 1 of either operand.
     for (std::size_t i = length(&a); i-- > 0;) bins(out)[i] = {a.data[i], b.data[i]};
     return 0;
+}
+
+template <Record R>
+int join_parts(const R* a, const R* b, R* out) {
+    return write_beside(a, b, out, [=](R* result) { return join_from_start(a, b, result); });
 }
 
 /// out[i + j] += a[i] * b[j], the longer operand in the inner loop.
@@ -47,9 +52,8 @@ int multiply_apart(const R* a, const R* b, R* out) {
 
 template <Record R>
 int multiply_polynomials(const R* a, const R* b, R* out) {
-    if (out->data != a->data && out->data != b->data) return multiply_apart(a, b, out);
-    Temporary<R> product;
-    return status(multiply_apart<R>(a, b, product) || dsp_copy(out, product));
+    return write_to(out, shares_memory(a, out) || shares_memory(b, out),
+                    [=](R* product) { return multiply_apart(a, b, product); });
 }
 
 template <Record R>

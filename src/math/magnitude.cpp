@@ -156,10 +156,13 @@ int take_square_root(const R* from, R* to) {
     return 0;
 }
 
-/// Runs `operation` from the source to a destination of its shape. A destination over the source's
-/// buffer keeps the samples when it has to move, and is then what they are read from.
 template <Record R>
-int out_of_place(const R* source, R* destination, int (*operation)(const R*, R*)) {
+using Operation = int (*)(const R* from, R* to);
+
+/// Runs `operation` from the source to a destination of its shape. A destination that begins with
+/// the source keeps the samples when it has to move, and is then what they are read from.
+template <Record R>
+int run_from_start(const R* source, R* destination, Operation<R> operation) {
     R from = *source;  // the two may be one record
     const bool shared = destination->data == from.data;
     destination->delta = from.delta;
@@ -170,6 +173,12 @@ int out_of_place(const R* source, R* destination, int (*operation)(const R*, R*)
     }
     if (shared) from.data = destination->data;
     return operation(&from, destination);
+}
+
+template <Record R>
+int out_of_place(const R* source, R* destination, Operation<R> operation) {
+    return write_to(destination, overlaps_shifted(source, destination),
+                    [=](R* to) { return run_from_start(source, to, operation); });
 }
 
 }  // namespace

@@ -24,15 +24,21 @@ bool fails_into(R* scratch, int result) {
     return result != 0;
 }
 
+/// Whether a failed growth took the samples, which leaves the number of points and nothing to read.
+template <Record R>
+bool lost(const R* x) {
+    return !x->data && x->points > 0;
+}
+
 /// The weighted mean of what `forth` makes of the spectra, turned back by `back`. All steps run
-/// even after a failure: an average that has gone forth comes back.
+/// even after a failure, as far as there are samples: an average that has gone forth comes back.
 template <Record R, class Forth, class Back>
 int transformed_mean(const R* input, R* avg, R* scratch, scalar<R> weight, Forth forth, Back back) {
     bool failed = fails_into(scratch, dsp_copy(scratch, input));
     failed |= forth(scratch) != 0;
     if (avg != scratch) failed |= forth(avg) != 0;
     failed |= dspb_avg_add(scratch, avg, avg, weight) != 0;
-    failed |= back(avg) != 0;
+    failed |= lost(avg) || back(avg) != 0;
     return status(failed);
 }
 
@@ -66,7 +72,8 @@ template <Record R>
 int average(R* input, R* avg, R* scratch, int flags, int count, int every, scalar<R> weight,
             scalar<R> limit) {
     Temporary<R> local;
-    R* const work = scratch ? scratch : local.get();
+    const bool usable = scratch && (scratch == avg || !shares_memory(scratch, avg));
+    R* const work = usable ? scratch : local.get();
     bool failed = false;
     if (flags & DSP_AVG_POWER) {
         failed = fails_into(work, dspu_magsq(input, work));

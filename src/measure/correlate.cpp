@@ -10,11 +10,6 @@ namespace {
 constexpr unsigned longest = 1u << 30;
 
 template <Record R>
-bool shares_buffer(const R* x, const R* y) {
-    return x == y || (x->data && x->data == y->data);
-}
-
-template <Record R>
 int forward(R* x, bool complex) {
     return complex ? dspi_fft(x, 0) : dspi_rfft(x);
 }
@@ -30,8 +25,8 @@ template <Record R>
 int correlate(const R* a, const R* b, R* out, R* scratch, int m, int half) {
     using T = scalar<R>;
     Temporary<R> local;
-    if (!scratch || shares_buffer(scratch, a) || shares_buffer(scratch, b) ||
-        shares_buffer<R>(scratch, out)) {
+    if (!scratch || shares_memory<R>(scratch, a) || shares_memory<R>(scratch, b) ||
+        shares_memory(scratch, out)) {
         scratch = local;
     }
     const int n = b->points;

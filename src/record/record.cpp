@@ -2,7 +2,6 @@
 #include <algorithm>
 #include <cstdlib>
 #include <cstring>
-#include <functional>
 
 #include "record_view.hpp"
 
@@ -19,7 +18,61 @@ struct Hooks {
 template <Record R>
 Hooks<R> hooks;
 
-constexpr std::size_t largest_block = std::numeric_limits<int>::max();
+/// Scalars that a count of type int can express and an address can reach.
+template <Record R>
+constexpr std::size_t largest_block = std::min<std::uint64_t>(std::numeric_limits<int>::max(),
+                                                              PTRDIFF_MAX / sizeof(scalar<R>));
+
+/// Blocks begin with a cache line, so that vectors of their samples do not lie across two, where
+/// the platform's free() and realloc() take aligned blocks as well.
+#if defined(__unix__) || defined(__APPLE__)
+constexpr std::size_t alignment = 64;
+
+void* obtain_aligned(std::size_t bytes) {
+    void* block = nullptr;
+    return posix_memalign(&block, alignment, bytes) ? nullptr : block;
+}
+#else
+constexpr std::size_t alignment = 1;
+
+void* obtain_aligned(std::size_t bytes) { return std::malloc(bytes); }
+#endif
+
+bool is_aligned(const void* block) {
+    return reinterpret_cast<std::uintptr_t>(block) % alignment == 0;
+}
+
+/// Up to this size, blocks that were released wait with the allocator for the next of their size.
+constexpr std::size_t small_block = 1024;
+
+/// A small block that waits is had in less time than a new aligned one, and is one itself once
+/// these come back.
+void* obtain(std::size_t bytes) {
+    if (bytes > small_block) return obtain_aligned(bytes);
+    void* const waiting = std::malloc(bytes);
+    if (is_aligned(waiting)) return waiting;
+    std::free(waiting);
+    return obtain_aligned(bytes);
+}
+
+/// A larger block with the contents of another one, which it replaces.
+void* move(void* block, std::size_t kept, std::size_t bytes) {
+    void* const moved = obtain(bytes);
+    if (!moved) return nullptr;
+    std::memcpy(moved, block, kept);
+    std::free(block);
+    return moved;
+}
+
+/// The same, without a copy and still aligned where the block can grow in its place or pages can
+/// be moved; that is rare for small blocks.
+void* enlarge(void* block, std::size_t kept, std::size_t bytes) {
+    if (bytes <= small_block) return move(block, kept, bytes);
+    void* const grown = std::realloc(block, bytes);
+    if (!grown || is_aligned(grown)) return grown;
+    void* const moved = move(grown, kept, bytes);
+    return moved ? moved : grown;
+}
 
 template <Record R>
 bool fits(const R* x) {
@@ -53,7 +106,7 @@ template <Record R>
 int allocate(R* x) {
     if (fits(x)) return 0;
     const std::size_t need = used(x);
-    if (need > largest_block) {
+    if (need > largest_block<R>) {
         release(x);
         return without_memory(x);
     }
@@ -61,7 +114,7 @@ int allocate(R* x) {
         hooks<R>.alloc(x);
     } else {
         if (x->alloc > 0) std::free(x->data);
-        x->data = static_cast<scalar<R>*>(std::malloc(need * sizeof(scalar<R>)));
+        x->data = static_cast<scalar<R>*>(obtain(need * sizeof(scalar<R>)));
     }
     if (!x->data) return without_memory(x);
     x->alloc = int(need);
@@ -71,8 +124,8 @@ int allocate(R* x) {
 template <Record R>
 int reallocate(R* x, int old_points, int old_complex) {
     if (fits(x)) return 0;
-    const std::size_t need = used(x);
-    if (need > largest_block) return without_memory(x);
+    const std::size_t need = used(x), bytes = need * sizeof(scalar<R>);
+    if (need > largest_block<R>) return without_memory(x);
     const scalar<R>* borrowed = nullptr;
     if (x->alloc < 1) {
         borrowed = x->data;
@@ -81,7 +134,8 @@ int reallocate(R* x, int old_points, int old_complex) {
     if (hooks<R>.realloc) {
         hooks<R>.realloc(x, old_points, old_complex);
     } else {
-        x->data = static_cast<scalar<R>*>(std::realloc(x->data, need * sizeof(scalar<R>)));
+        const std::size_t had = std::size_t(std::max(x->alloc, 0)) * sizeof(scalar<R>);
+        x->data = static_cast<scalar<R>*>(x->data ? enlarge(x->data, had, bytes) : obtain(bytes));
     }
     if (!x->data) return without_memory(x);
     if (borrowed && old_points > 0) {
@@ -104,44 +158,23 @@ int subvec(const R* source, R* destination, int start, int count) {
     const int first = std::clamp(start, 0, available);
     const int kept = std::clamp(count, 0, available - first);
     const R from = *source;  // the two may be one record
-    const bool shared = destination->data == from.data;
-    const int had = destination->points, had_complex = destination->complex;
-
+    const std::int64_t need = std::int64_t(kept) * width(&from);
+    if (destination->alloc > 0 && need > destination->alloc && shares_memory(source, destination)) {
+        Temporary<R> range;  // the samples would go with the block that is too small
+        return status(subvec<R>(source, range, start, count) || dsp_copy(destination, range));
+    }
     destination->points = kept;
     destination->complex = from.complex;
     destination->delta = from.delta;
-    if (shared && destination->alloc < 1 && kept > 0) {
-        // A borrowed buffer may be larger than what is kept of it, and is not the record's to
-        // change: cut the range into a block of its own.
-        destination->data = nullptr;
-        if (dsp_alloc(destination)) return -1;
-        std::memcpy(destination->data, from.data + std::size_t(first) * width(&from),
-                    used(destination) * sizeof(scalar<R>));
-        return 0;
-    }
-    if (shared ? dsp_realloc(destination, had, had_complex) : dsp_alloc(destination)) return -1;
-    const scalar<R>* begin = shared ? destination->data : from.data;
-    if (kept > 0 && (!shared || first > 0)) {
-        std::memmove(destination->data, begin + std::size_t(first) * width(&from),
-                     used(destination) * sizeof(scalar<R>));
-    }
+    if (dsp_alloc(destination)) return -1;
+    if (kept == 0) return 0;
+    const scalar<R>* begin = from.data + std::size_t(first) * width(&from);
+    if (begin != destination->data) std::memmove(destination->data, begin, need * sizeof *begin);
     return 0;
 }
 
-/// Whether the samples of `x` lie in the block that `owner` may move or write to as it grows.
 template <Record R>
-bool lies_within(const R* x, const R* owner) {
-    const std::less<> before;
-    return owner->alloc > 0 && !before(x->data, owner->data) &&
-           before(x->data, owner->data + owner->alloc);
-}
-
-template <Record R>
-int append(R* destination, const R* source) {
-    if (lies_within(source, destination)) {
-        Temporary<R> copy;
-        return status(dsp_copy(copy, source) || append<R>(destination, copy));
-    }
+int append_apart(R* destination, const R* source) {
     if (source->complex && !destination->complex && dspi_rtoc(destination)) return -1;
     const int old = int(length(destination));
     const int added = int(length(source));
@@ -157,6 +190,13 @@ int append(R* destination, const R* source) {
                     used(source) * sizeof(scalar<R>));
     }
     return 0;
+}
+
+template <Record R>
+int append(R* destination, const R* source) {
+    if (!shares_memory<R>(source, destination)) return append_apart(destination, source);
+    Temporary<R> copy;
+    return status(dsp_copy(copy, source) || append_apart<R>(destination, copy));
 }
 
 template <Record R>

@@ -59,9 +59,8 @@ int histogram_apart(const R* x, R* out, scalar<R> lo, scalar<R> width, int bin_c
 
 template <Record R>
 int histogram(const R* x, R* out, scalar<R> lo, scalar<R> width, int bin_count) {
-    if (out != x && out->data != x->data) return histogram_apart(x, out, lo, width, bin_count);
-    Temporary<R> counts;
-    return status(histogram_apart<R>(x, counts, lo, width, bin_count) || dsp_copy(out, counts));
+    return write_to(out, shares_memory(x, out),
+                    [=](R* counts) { return histogram_apart(x, counts, lo, width, bin_count); });
 }
 
 }  // namespace

@@ -105,6 +105,21 @@ TYPED_TEST(AverageTest, FailureLeavesTheAverageAsItWas) {
     }
 }
 
+TYPED_TEST(AverageTest, AnAverageThatCannotGrowIsNotRead) {
+    using R = TypeParam;
+    for (const int flags : {0, 1, 2, 3, 4, 5, 0x14, 0x15, 0x25}) {
+        auto x = complex<R>({{1, 2}, {3, 4}});
+        const auto start = real<R>({4, 2});
+        EXPECT_GE(fail_each_growth<R>([&] {
+                      Borrowed<R> avg(start);
+                      Signal<R> scratch;
+                      return average<R>(x, avg, scratch, flags, 2, 0, -1, 3);
+                  }),
+                  1)
+            << flags;
+    }
+}
+
 /// (1/m) sum of conj(a[n]) b[n + k]
 Samples correlation(const Samples& a, const Samples& b, std::size_t m) {
     Samples sums(b.size() - m + 1);

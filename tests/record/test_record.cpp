@@ -69,6 +69,28 @@ TYPED_TEST(RecordTest, BorrowedBufferIsNeverTouchedByGrowth) {
     EXPECT_EQ(z->alloc, 4);
 }
 
+TYPED_TEST(RecordTest, BlocksBeginWithACacheLineAndKeepTheirContents) {
+#ifdef _WIN32
+    GTEST_SKIP() << "the platform's free() takes no aligned blocks";
+#endif
+    using R = TypeParam;
+    const auto aligned = [](const R* x) {
+        return reinterpret_cast<std::uintptr_t>(x->data) % 64 == 0;
+    };
+    for (int size = 1; size < 1 << 20; size = size * 3 / 2 + 1) {
+        Signal<R> x, between;  // which keeps x from growing in its place
+        x->points = between->points = size;
+        ASSERT_EQ(dsp_alloc(x) || dsp_alloc(between), 0);
+        EXPECT_TRUE(aligned(x) && aligned(between)) << size;
+        for (int i = 0; i < size; ++i) x[i] = scalar<R>(i);
+        ASSERT_EQ(dspi_rtoc(x), 0);
+        EXPECT_TRUE(aligned(x)) << size;
+        int wrong = 0;
+        for (int i = 0; i < size; ++i) wrong += x[2 * i] != scalar<R>(i) || x[2 * i + 1] != 0;
+        EXPECT_EQ(wrong, 0) << size;
+    }
+}
+
 TYPED_TEST(RecordTest, NeedBeyondTheLargestBlockFails) {
     using R = TypeParam;
     auto x = real<R>({1});
