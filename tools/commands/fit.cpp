@@ -118,7 +118,7 @@ void run(const FitOptions& options) {
     if (options.json && options.plot == "-") {
         throw UsageError("standard output takes only one of --json and --plot -");
     }
-    auto x = first_signal(read_recording(options.in, options.reading));
+    auto x = first_signal(options.in, options.reading);
     if (x->points < 1) throw Error("the signal has no samples");
     check_finite(x.values(), x->complex);
     Signal table;

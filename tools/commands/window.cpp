@@ -8,9 +8,9 @@
 #include <optional>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/options.hpp"
 #include "commands/commands.hpp"
-#include "files/csv.hpp"
 #include "files/recording.hpp"
 #include "measure/spectrum.hpp"
 #include "show/plot.hpp"

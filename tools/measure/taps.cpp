@@ -7,8 +7,8 @@
 #include <map>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/options.hpp"
-#include "files/csv.hpp"
 #include "measure/spectrum.hpp"
 
 namespace wavkit::tool {

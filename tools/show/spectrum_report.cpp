@@ -7,6 +7,7 @@
 #include <cstdio>
 #include <filesystem>
 
+#include "base/number.hpp"
 #include "base/progress.hpp"
 #include "files/output.hpp"
 #include "show/plot.hpp"

@@ -4,8 +4,8 @@
 #include <cmath>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/progress.hpp"
-#include "files/csv.hpp"
 #include "files/output.hpp"
 #include "show/gnuplot.hpp"
 
