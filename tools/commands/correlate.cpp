@@ -12,7 +12,7 @@
 #include "files/output.hpp"
 #include "files/recording.hpp"
 #include "measure/peaks.hpp"
-#include "measure/segments.hpp"
+#include "measure/prepare.hpp"
 
 namespace wavkit::tool {
 namespace {

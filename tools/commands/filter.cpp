@@ -13,11 +13,13 @@
 #include "commands/commands.hpp"
 #include "files/block_writer.hpp"
 #include "files/output.hpp"
+#include "files/recording.hpp"
 #include "measure/channel_filter.hpp"
+#include "measure/prepare.hpp"
 #include "measure/spectrum.hpp"
 #include "measure/taps.hpp"
+#include "show/labels.hpp"
 #include "show/outline.hpp"
-#include "show/spectrum_report.hpp"
 
 namespace wavkit::tool {
 namespace {

@@ -10,10 +10,10 @@
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
-#include "measure/spectrum.hpp"
+#include "measure/prepare.hpp"
 #include "show/json.hpp"
+#include "show/labels.hpp"
 #include "show/plot.hpp"
-#include "show/spectrum_report.hpp"
 
 namespace wavkit::tool {
 namespace {

@@ -12,8 +12,8 @@
 #include "commands/commands.hpp"
 #include "files/output.hpp"
 #include "files/recording.hpp"
+#include "show/labels.hpp"
 #include "show/plot.hpp"
-#include "show/spectrum_report.hpp"
 
 namespace wavkit::tool {
 namespace {

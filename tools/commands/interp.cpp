@@ -15,7 +15,7 @@
 #include "commands/commands.hpp"
 #include "files/output.hpp"
 #include "files/recording.hpp"
-#include "measure/spectrum.hpp"
+#include "measure/prepare.hpp"
 
 namespace wavkit::tool {
 namespace {

@@ -11,9 +11,8 @@
 #include "base/number.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
-#include "files/output.hpp"
 #include "files/recording.hpp"
-#include "measure/spectrum.hpp"
+#include "measure/prepare.hpp"
 
 namespace wavkit::tool {
 namespace {

@@ -8,11 +8,10 @@
 #include <optional>
 
 #include "base/error.hpp"
-#include "base/number.hpp"
 #include "base/options.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
-#include "measure/spectrum.hpp"
+#include "measure/windows.hpp"
 #include "show/plot.hpp"
 
 namespace wavkit::tool {
