@@ -155,6 +155,62 @@ TEST_F(ConvertTest, TheFormatIsToldFromTheContents) {
     expect_near(through("columns", "--from csv"), {complex<dsp>({{1, 2}, {3, 4}})}, 0);
 }
 
+TEST_F(ConvertTest, ReadingWholeAndBlockByBlockAreOne) {
+    const auto same = [&](const std::string& name, const std::string& want) {
+        EXPECT_EQ(printed("convert " + name + " - --to csv"), want);
+        EXPECT_EQ(printed("filter " + name + " --taps one.txt --to csv"), want);
+    };
+    write("one.txt", "1");
+    const std::pair<std::string, std::string> texts[] = {
+        {"1 2 3\n#DSP delta = 2\n4 5 6\n", "# delta = 2\nvalue\n1\n2\n3\n4\n5\n6\n"},
+        {"1 2 3 #DSP complex = 1\n4 5 # end", "re,im\n1,2\n3,4\n5,0\n"},
+        {"#DSP points = 0\n#DSP delta = 2\n#DSP points = 1\n7", "# delta = 2\nvalue\n7\n"},
+        {"#DSP points = 2\n1-2-3 # b\n4", "value\n1\n-2\n\nvalue\n-3\n4\n"},
+        {"#DSP points = 2\n1 # a\n2 #DSP points = 1\n3", "value\n1\n2\n\nvalue\n3\n"},
+    };
+    for (const auto& [text, want] : texts) {
+        write("x.txt", text);
+        same("x.txt", want);
+    }
+    write("x.csv", "v\n1\n\nno other\n\n");
+    same("x.csv", "value\n1\n");
+    write("x.dsp", Signals{real<dsp>({5}), real<dsp>({6})});
+    write("mixed.dsp", contents("x.dsp") + "7 8");
+    same("mixed.dsp", "value\n5\n\nvalue\n6\n\nvalue\n7\n8\n");
+
+    // What nobody asked for may be damaged; what comes late counts for the whole.
+    write("x.txt", "#DSP points = 1\n4\n#DSP points = 9\n5 worse");
+    EXPECT_EQ(printed("convert x.txt - --to csv --signal 1"), "value\n4\n");
+    EXPECT_NE(shell("wavkit hist x.txt").err.find("several signals"), std::string::npos);
+    std::string text, want = "# delta = 4\nvalue\n";
+    for (int i = 0; i < 40000; ++i) {
+        text += std::to_string(i) + (i % 9000 ? " " : "\n# a note\n");
+        want += std::to_string(i) + "\n";
+    }
+    write("x.txt", text + "#DSP delta = 4");
+    same("x.txt", want);
+}
+
+TEST_F(ConvertTest, ManySignalsAreReadOnce) {
+    Signals signals;
+    for (int i = 0; i < 100; ++i) signals.push_back(sine(300, 3 + i / 100.0, 1));
+    write("x.dsp", signals);
+    write("one.txt", "1");
+    for (const std::string name : {"x.dsp", "x.txt", "x.csv"}) {
+        if (name != "x.dsp") printed("convert x.dsp " + name);
+        const auto done = shell("read -r _ before </proc/$$/io; wavkit filter " + name +
+                                " --taps one.txt -o y.dsp; read -r _ after </proc/$$/io;"
+                                "echo $((after - before))");
+        expect_near(read("y.dsp"), signals, 1e-15);
+        // Where the system counts the bytes that a program reads, they are a few times the file.
+        if (std::filesystem::exists("/proc/self/io")) {
+            const auto bytes = std::stod(done.out), size = double(contents(name).size());
+            EXPECT_GE(bytes, size) << name;
+            EXPECT_LT(bytes, 10 * size) << name;
+        }
+    }
+}
+
 TEST_F(ConvertTest, SoundKeepsWhatItCanAndSaysWhatItCannot) {
     write("loud.dsp", Signals{real<dsp>({0.5L, 1.5L, -3.0L}, 0.5)});
     const auto done = shell("wavkit convert loud.dsp loud.wav --bits 16");

@@ -211,7 +211,6 @@ TEST_F(SegmentsTest, DamagedAndUnfitSourcesAreRefused) {
     for (int i = 0; i < 3000; ++i) times += std::to_string(i + i / 2000) + ",1\n";
     write("times.csv", times);
     write("short.txt", "#DSP points = 1000\n" + text.substr(0, 1800));
-    write("order.txt", "1 2 3\n#DSP delta = 2\n4 5 6\n");
     write("word.txt", "1 2 3 four");
     write("many.txt", "#DSP points = 9223372036854775807\n#DSP complex = 1\n1 2 3 4");
     const auto before = files();
@@ -222,7 +221,6 @@ TEST_F(SegmentsTest, DamagedAndUnfitSourcesAreRefused) {
         {"short.txt --average 512", "signal 1 is damaged"},
         {"word.txt --average 2", "signal 1 is damaged"},
         {"many.txt --average 2", "fewer values than it says"},
-        {"order.txt --average 2", "header lines between its values"},
         {"times.csv --average 512", "the time column is not equally spaced"},
         {"inf.txt --average 512", "sample 2500 is not a finite number"},
         {"x.dsp --average 5001", "5000 samples, fewer than one segment of 5001"},

@@ -6,12 +6,13 @@
 #include <memory>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
 #include "files/output.hpp"
 #include "files/recording.hpp"
 #include "measure/peaks.hpp"
-#include "measure/segments.hpp"
+#include "measure/prepare.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -42,15 +43,15 @@ void check_usage(const CorrelateOptions& options) {
 
 /// The two signals: of two files, or the first two of one.
 std::pair<Signal, Signal> read_pair(const CorrelateOptions& options) {
-    auto first = read_recording(options.a, options.reading);
     if (!options.b.empty()) {
-        auto a = first_signal(std::move(first));
-        return {std::move(a), first_signal(read_recording(options.b, options.reading))};
+        auto a = first_signal(options.a, options.reading);
+        return {std::move(a), first_signal(options.b, options.reading)};
     }
-    if (first.signals.size() < 2) {
+    auto signals = read_recording(options.a, options.reading).signals;
+    if (signals.size() < 2) {
         throw Error("there is one signal in " + options.a + "; name a second file");
     }
-    return {std::move(first.signals[0]), std::move(first.signals[1])};
+    return {std::move(signals[0]), std::move(signals[1])};
 }
 
 void prepare(Signal& x, const CorrelateOptions& options) {

@@ -7,9 +7,9 @@
 #include <memory>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/options.hpp"
 #include "commands/commands.hpp"
-#include "files/csv.hpp"
 #include "files/recording.hpp"
 #include "measure/response.hpp"
 #include "measure/taps.hpp"

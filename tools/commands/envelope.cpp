@@ -10,7 +10,7 @@
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
-#include "measure/segments.hpp"
+#include "measure/prepare.hpp"
 
 namespace wavkit::tool {
 namespace {

@@ -8,16 +8,18 @@
 #include <memory>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
 #include "files/block_writer.hpp"
-#include "files/csv.hpp"
 #include "files/output.hpp"
+#include "files/recording.hpp"
 #include "measure/channel_filter.hpp"
+#include "measure/prepare.hpp"
 #include "measure/spectrum.hpp"
 #include "measure/taps.hpp"
+#include "show/labels.hpp"
 #include "show/outline.hpp"
-#include "show/spectrum_report.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -108,7 +110,7 @@ Signal designed_taps(const FilterOptions& options, double delta) {
 }
 
 Signal given_taps(const FilterOptions& options) {
-    auto taps = first_signal(read_recording(options.taps, {}));
+    auto taps = first_signal(options.taps, {});
     if (taps->points < 1) throw Error("there are no taps in " + options.taps);
     check_finite(taps.values(), taps->complex);
     return taps;
@@ -155,9 +157,9 @@ class Filters {
 /// A signal before and after, as a picture.
 class Comparison {
   public:
-    Comparison(const FilterOptions& options, const SampleStream& stream)
+    Comparison(const FilterOptions& options, const SampleStream& stream, bool sound)
         : options_(options),
-          seconds_(stream.sound || options.reading.rate),
+          seconds_(sound || options.reading.rate),
           before_(outline(stream.delta)),
           after_(before_),
           width_(stream.channels) {}
@@ -199,34 +201,23 @@ class FilterRun {
             output_.emplace(options_.out);
             writer_ = block_writer(output_->stream(), *format_, options_.writing);
         }
-        filter_signals();
+        // The channels of a sound file belong together in another one, and are signals one after
+        // the other elsewhere.
+        const bool together = format_ && is_sound(*format_);
+        const auto source = together ? open_channels(input_, options_.reading)
+                                     : open_signals(input_, options_.reading);
+        while (auto* const stream = source->next()) filter(*stream, source->sound);
         if (comparison_) comparison_->draw();
         if (output_) output_->commit();
     }
 
   private:
-    /// The channels of a sound file belong together in another one, and are signals one after the
-    /// other elsewhere.
-    void filter_signals() {
-        const bool together = format_ && is_sound(*format_);
-        auto reading = options_.reading;
-        const bool chosen = reading.signal || reading.channel;
-        for (int number = 1;; ++number) {
-            if (!chosen && (!together || number > 1)) reading.signal = number;
-            std::rewind(input_.stream());
-            const auto stream =
-                together ? open_channels(input_, reading) : open_stream(input_, reading);
-            filter(*stream);
-            if (chosen || stream->last) return;
-        }
-    }
-
-    void filter(SampleStream& stream) {
+    void filter(SampleStream& stream, bool sound) {
         const auto& filtering = filters_.at(stream.delta);
         ChannelFilter filter(filtering, stream);
         const bool draws = !options_.plot.empty() && !comparison_;
         if (draws && filter.complex_output()) throw Error("--plot draws real signals only");
-        if (draws) comparison_.emplace(options_, stream);
+        if (draws) comparison_.emplace(options_, stream, sound);
         if (writer_)
             writer_->begin({stream.delta, filter.complex_output(), stream.channels, stream.length});
         {

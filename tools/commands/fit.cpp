@@ -10,10 +10,10 @@
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
-#include "measure/spectrum.hpp"
+#include "measure/prepare.hpp"
 #include "show/json.hpp"
+#include "show/labels.hpp"
 #include "show/plot.hpp"
-#include "show/spectrum_report.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -118,7 +118,7 @@ void run(const FitOptions& options) {
     if (options.json && options.plot == "-") {
         throw UsageError("standard output takes only one of --json and --plot -");
     }
-    auto x = first_signal(read_recording(options.in, options.reading));
+    auto x = first_signal(options.in, options.reading);
     if (x->points < 1) throw Error("the signal has no samples");
     check_finite(x.values(), x->complex);
     Signal table;

@@ -1,7 +1,6 @@
 // wavkit generate: test signals as sums of cosines, lines and noise.
 #include <wavkit/dsp.h>
 
-#include <charconv>
 #include <cmath>
 #include <cstdlib>
 #include <map>
@@ -9,6 +8,7 @@
 #include <numbers>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/options.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
@@ -37,13 +37,9 @@ struct Term {
 };
 
 double value_of(const std::string& text) {
-    double value = 0;
-    const char* const end = text.data() + text.size();
-    const auto [rest, error] = std::from_chars(text.data(), end, value);
-    if (rest != end || error != std::errc() || !std::isfinite(value)) {
-        throw UsageError("'" + text + "' is not a number");
-    }
-    return value;
+    const auto value = number_in(text);
+    if (!value || !std::isfinite(*value)) throw UsageError("'" + text + "' is not a number");
+    return *value;
 }
 
 double Term::value(const std::string& name, double otherwise) const {

@@ -7,12 +7,13 @@
 #include <memory>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
 #include "files/output.hpp"
 #include "files/recording.hpp"
+#include "show/labels.hpp"
 #include "show/plot.hpp"
-#include "show/spectrum_report.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -125,7 +126,7 @@ void draw(const Histogram& histogram, bool magnitudes, const std::string& in,
 
 void run(const HistOptions& options) {
     check_usage(options);
-    auto x = first_signal(read_recording(options.in, options.reading));
+    auto x = first_signal(options.in, options.reading);
     const bool magnitudes = x->complex;
     const auto histogram = [&] {
         Progress progress("counting");

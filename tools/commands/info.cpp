@@ -4,6 +4,7 @@
 #include <memory>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
 

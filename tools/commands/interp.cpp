@@ -9,12 +9,13 @@
 #include <numeric>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/options.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
 #include "files/output.hpp"
 #include "files/recording.hpp"
-#include "measure/spectrum.hpp"
+#include "measure/prepare.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -99,7 +100,7 @@ Signal places_at_rate(const Table& table, double rate) {
 }
 
 Signal read_places(const std::string& path) {
-    auto places = first_signal(read_recording(path, {}));
+    auto places = first_signal(path, {});
     if (places->complex) throw Error("the places of --at are one column, real numbers");
     check_finite(places.values(), false);
     return places;

@@ -2,18 +2,17 @@
 #include <wavkit/dsp.h>
 
 #include <algorithm>
-#include <charconv>
 #include <cmath>
 #include <complex>
 #include <cstdio>
 #include <memory>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
-#include "files/output.hpp"
 #include "files/recording.hpp"
-#include "measure/spectrum.hpp"
+#include "measure/prepare.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -52,30 +51,22 @@ Signal signal_of(const std::vector<Complex>& points) {
 
 // ---- input ----
 
-/// Takes a number, signed or not, off the front of a text.
-bool take_number(std::string_view& text, double& value) {
-    if (text.starts_with('+')) text.remove_prefix(1);
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value);
-    text.remove_prefix(std::size_t(end - text.data()));
-    return error == std::errc();
-}
-
 /// "2", "-1.5e3", "1+2i", "-2i"
 std::optional<Complex> parsed(std::string_view text) {
-    double first = 0, second = 0;
-    if (!take_number(text, first)) return std::nullopt;
-    if (text.empty()) return first;
-    if (text == "i") return Complex(0, first);
+    const auto first = take_number(text);
+    if (!first || text.empty()) return first;
+    if (text == "i") return Complex(0, *first);
     if (text.front() != '+' && text.front() != '-') return std::nullopt;
-    if (!take_number(text, second) || text != "i") return std::nullopt;
-    return Complex(first, second);
+    const auto second = take_number(text);
+    if (!second || text != "i") return std::nullopt;
+    return Complex(*first, *second);
 }
 
 /// The numbers that the command line holds, or the signal of the file that it names.
 Signal read_values(const RootsOptions& options) {
     const auto& values = options.values;
     if (values.size() == 1 && !parsed(values[0])) {
-        return first_signal(read_recording(values[0], options.reading));
+        return first_signal(values[0], options.reading);
     }
     std::vector<Complex> points;
     for (const auto& value : values) {

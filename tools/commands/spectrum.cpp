@@ -7,7 +7,12 @@
 #include "base/options.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
+#include "files/recording.hpp"
+#include "measure/prepare.hpp"
 #include "measure/segments.hpp"
+#include "measure/spectrum.hpp"
+#include "measure/windows.hpp"
+#include "show/labels.hpp"
 #include "show/plot.hpp"
 #include "show/spectrum_report.hpp"
 #include "show/waterfall.hpp"
@@ -89,21 +94,22 @@ SpectrumReport report_of(const SpectrumOptions& options, Spectrum spectrum, bool
 }
 
 SpectrumReport measured_whole(const SpectrumOptions& options) {
-    auto recording = read_recording(options.report.in, options.reading);
-    const bool sound = recording.sound;
-    auto x = first_signal(std::move(recording));
+    InputFile input(options.report.in);
+    const auto source = open_signals(input, options.reading);
+    auto x = first_signal(*source);
     Progress progress("transforming");
     if (options.segments.slope) take_slope(x);
     if (options.segments.detrend) remove_mean(x);
     check_finite(x.values(), x->complex);
-    return report_of(options, measure(x, options.settings), sound);
+    return report_of(options, measure(x, options.settings), source->sound);
 }
 
 SpectrumReport measured_in_segments(const SpectrumOptions& options) {
     InputFile input(options.report.in);
-    const auto stream = open_stream(input, options.reading);
+    const auto source = open_signals(input, options.reading);
+    auto* const stream = source->next();
     SpectrumAverage average(options.averaging);
-    auto report = report_of(options, {}, stream->sound);
+    auto report = report_of(options, {}, source->sound);
     std::optional<Waterfall> waterfall;
     if (!options.waterfall.empty()) {
         waterfall.emplace(report.band, options.report.density,
@@ -117,7 +123,7 @@ SpectrumReport measured_in_segments(const SpectrumOptions& options) {
             progress.done(stream->done());
         });
     }
-    tell_of_others(*stream, options.reading);
+    tell_of_others(*source);
     report.spectrum = average.result();
     if (waterfall) {
         waterfall->draw(

@@ -10,9 +10,8 @@
 #include "base/error.hpp"
 #include "base/options.hpp"
 #include "commands/commands.hpp"
-#include "files/csv.hpp"
 #include "files/recording.hpp"
-#include "measure/spectrum.hpp"
+#include "measure/windows.hpp"
 #include "show/plot.hpp"
 
 namespace wavkit::tool {

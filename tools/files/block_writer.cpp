@@ -7,10 +7,10 @@
 #include <vector>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/scratch.hpp"
-#include "files/csv.hpp"
-#include "files/recording.hpp"
 #include "files/sound.hpp"
+#include "files/writing.hpp"
 
 namespace wavkit::tool {
 namespace {

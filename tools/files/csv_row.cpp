@@ -1,9 +1,9 @@
 #include "files/csv_row.hpp"
 
 #include <algorithm>
-#include <charconv>
-#include <cstdlib>
 #include <string>
+
+#include "base/number.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -46,15 +46,7 @@ std::optional<double> value_of(std::string_view field, char separator) {
         std::ranges::replace(with_point, ',', '.');
         field = with_point;
     }
-    if (!field.empty() && field.front() == '+') field.remove_prefix(1);
-    double value = 0;
-    const auto [end, error] = std::from_chars(field.data(), field.data() + field.size(), value);
-    if (end != field.data() + field.size()) return std::nullopt;
-    if (error == std::errc::result_out_of_range) {
-        return std::strtod(std::string(field).c_str(), nullptr);
-    }
-    if (error != std::errc()) return std::nullopt;
-    return value;
+    return number_in(field);
 }
 
 }  // namespace wavkit::tool

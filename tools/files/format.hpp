@@ -9,10 +9,13 @@ namespace wavkit::tool {
 
 enum class Format { binary, text, csv, wav, flac };
 
+/// What the samples of a sound file are.
+enum class SampleType { pcm16, pcm24, float32 };
+
 /// What --from and --to accept.
 const std::map<std::string, Format>& formats();
 
-/// How `info` calls a format.
+/// How `info` calls a format, of which libsndfile knows more where it is sound.
 std::string description(Format format);
 
 /// The format that a file's name asks for, by its extension.

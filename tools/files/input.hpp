@@ -15,7 +15,7 @@ class InputFile {
     InputFile(const InputFile&) = delete;
     InputFile& operator=(const InputFile&) = delete;
 
-    std::FILE* stream() { return stream_; }
+    std::FILE* stream() const { return stream_; }
     /// The name to use in messages.
     const std::string& name() const { return name_; }
     long size() const { return size_; }

@@ -11,9 +11,7 @@
 #include <utility>
 
 #include "base/error.hpp"
-#include "base/progress.hpp"
-#include "files/csv.hpp"
-#include "files/stream.hpp"
+#include "base/number.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -37,10 +35,13 @@ Handle open_sound(std::FILE* stream, int mode, SF_INFO& info, const std::string&
     return handle;
 }
 
-std::string format_name(int command, int format) {
+/// How libsndfile calls a part of a format.
+std::string format_name(int format) {
     SF_FORMAT_INFO info{};
     info.format = format;
-    return sf_command(nullptr, command, &info, sizeof info) == 0 && info.name ? info.name : "sound";
+    return sf_command(nullptr, SFC_GET_FORMAT_INFO, &info, sizeof info) == 0 && info.name
+               ? info.name
+               : "sound";
 }
 
 /// The sampling rate of a file for signals of this spacing.
@@ -78,47 +79,30 @@ int container_of(Format format, const SignalShape& shape, int channels) {
     return fits ? SF_FORMAT_WAV : SF_FORMAT_RF64;
 }
 
-/// The channel that was asked for, if the file has it.
-std::optional<int> chosen_channel(const SF_INFO& info, const std::string& name,
-                                  std::optional<int> channel) {
-    if (channel && (*channel < 1 || *channel > info.channels)) {
-        throw Error(name + " has " + std::to_string(info.channels) + " channel" +
-                    (info.channels == 1 ? "" : "s") + ", no channel " + std::to_string(*channel));
-    }
-    return channel;
-}
-
-void check_complete(SNDFILE* file, const std::string& name) {
-    if (sf_error(file) == SF_ERR_NO_ERROR) return;
-    throw Error("cannot read " + name + ": " + sf_strerror(file));
-}
-
-/// One channel of a sound file, or all of them.
+/// One channel of a sound file, from 0, or all of them.
 class SoundStream : public SampleStream {
   public:
-    explicit SoundStream(InputFile& input)
+    SoundStream(InputFile& input, std::optional<std::size_t> channel)
         : name_(input.name()),
-          file_(open_sound(input.stream(), SFM_READ, info_, "cannot read " + name_)) {
+          file_(open_sound(input.stream(), SFM_READ, info_, "cannot read " + name_)),
+          channel_(channel) {
         delta = 1.0 / info_.samplerate;
-        sound = true;
-        channels = std::size_t(info_.channels);
         if (info_.frames >= 0) length = std::size_t(info_.frames);
+        if (!channel) channels = std::size_t(info_.channels);
     }
 
-    /// Reads one channel alone, the first without a choice.
-    void choose(std::optional<int> channel) {
-        first_ = std::size_t(chosen_channel(info_, name_, channel).value_or(1) - 1);
-        last = first_ + 1 == channels;
-        channels = 1;
-        frames_.resize(block_frames * std::size_t(info_.channels));
-    }
+    const SF_INFO& info() const { return info_; }
 
     std::size_t read(std::span<double> values) override {
-        const std::size_t done = frames_.empty() ? read_all(values) : read_chosen(values);
-        check_complete(file_.get(), name_);
+        const std::size_t done = channel_ ? read_channel(values) : read_all(values);
+        if (sf_error(file_.get()) != SF_ERR_NO_ERROR) {
+            throw Error("cannot read " + name_ + ": " + sf_strerror(file_.get()));
+        }
         taken_ += sf_count_t(done / channels);
         return done;
     }
+
+    void skip() override {}  // each channel is opened by itself
 
     double done() const override { return double(taken_) / double(info_.frames); }
 
@@ -129,15 +113,16 @@ class SoundStream : public SampleStream {
             std::max<sf_count_t>(sf_read_double(file_.get(), values.data(), wanted), 0));
     }
 
-    std::size_t read_chosen(std::span<double> values) {
+    std::size_t read_channel(std::span<double> values) {
         const auto width = std::size_t(info_.channels);
+        frames_.resize(block_frames * width);
         std::size_t done = 0;
         while (done < values.size()) {
             const auto wanted = std::min(values.size() - done, block_frames);
             const auto got = sf_readf_double(file_.get(), frames_.data(), sf_count_t(wanted));
             if (got <= 0) break;
             for (std::size_t i = 0; i < std::size_t(got); ++i) {
-                values[done++] = frames_[i * width + first_];
+                values[done++] = frames_[i * width + *channel_];
             }
         }
         return done;
@@ -146,9 +131,40 @@ class SoundStream : public SampleStream {
     SF_INFO info_{};
     std::string name_;
     Handle file_;
-    std::size_t first_ = 0;
-    std::vector<double> frames_;  // of all channels, where one is chosen
+    std::optional<std::size_t> channel_;
+    std::vector<double> frames_;  // of all channels, where one is read
     sf_count_t taken_ = 0;
+};
+
+/// The channels of a sound file one after the other, the chosen one alone, or all together.
+class SoundFile : public SignalSource {
+  public:
+    SoundFile(InputFile& file, const ReadOptions& reading, bool together)
+        : SignalSource(file, reading) {
+        const auto info = SoundStream(file, std::nullopt).info();
+        description = format_name(info.format & SF_FORMAT_TYPEMASK) + ", " +
+                      format_name(info.format & SF_FORMAT_SUBMASK);
+        sound = true;
+        const int channel = reading.channel.value_or(1);
+        if (channel < 1 || channel > info.channels) {
+            throw Error(name() + " has " + std::to_string(info.channels) + " channel" +
+                        (info.channels == 1 ? "" : "s") + ", no channel " +
+                        std::to_string(channel));
+        }
+        const auto first = std::size_t(channel - 1);
+        const std::size_t count = reading.channel ? 1 : std::size_t(info.channels);
+        if (together) streams_ = {std::nullopt};
+        for (std::size_t i = 0; i < count && !together; ++i) streams_.emplace_back(first + i);
+    }
+
+  private:
+    std::unique_ptr<SampleStream> following() override {
+        const auto index = std::size_t(number() - 1);
+        if (index == streams_.size()) return nullptr;
+        return std::make_unique<SoundStream>(input(), streams_[index]);
+    }
+
+    std::vector<std::optional<std::size_t>> streams_;  // the channels of each
 };
 
 /// The channels of one sound file. What is lost on the way is told on standard error.
@@ -220,53 +236,9 @@ bool looks_like_sound(const std::string& head) {
     return std::ranges::any_of(magics, [&](const char* magic) { return head.starts_with(magic); });
 }
 
-Sound read_sound(InputFile& input, std::optional<int> channel) {
-    SF_INFO info{};
-    const auto file = open_sound(input.stream(), SFM_READ, info, "cannot read " + input.name());
-    const auto channels = std::size_t(info.channels);
-    chosen_channel(info, input.name(), channel);
-    Sound sound;
-    sound.format =
-        (info.format & SF_FORMAT_TYPEMASK) == SF_FORMAT_FLAC ? Format::flac : Format::wav;
-    sound.description = format_name(SFC_GET_FORMAT_INFO, info.format & SF_FORMAT_TYPEMASK) + ", " +
-                        format_name(SFC_GET_FORMAT_INFO, info.format & SF_FORMAT_SUBMASK);
-    const std::size_t first = channel ? std::size_t(*channel - 1) : 0;
-    const std::size_t count = channel ? 1 : channels;
-    for (std::size_t c = 0; c < count; ++c) sound.channels.emplace_back(1.0 / info.samplerate);
-
-    Progress progress("reading " + input.name());
-    std::vector<double> frames(block_frames * channels), samples;
-    sf_count_t done = 0;
-    while (true) {
-        const auto got = sf_readf_double(file.get(), frames.data(), block_frames);
-        if (got <= 0) break;
-        for (std::size_t c = 0; c < count; ++c) {
-            samples.clear();
-            for (sf_count_t i = 0; i < got; ++i) {
-                samples.push_back(frames[std::size_t(i) * channels + first + c]);
-            }
-            sound.channels[c].append(samples);
-        }
-        done += got;
-        progress.done(double(done) / double(info.frames));
-    }
-    check_complete(file.get(), input.name());
-    return sound;
-}
-
-std::unique_ptr<SampleStream> stream_sound(InputFile& input, std::optional<int> channel,
-                                           std::optional<int> signal) {
-    if (channel && signal && *signal != 1) {
-        throw Error(input.name() + " holds 1 signal in that channel, no signal " +
-                    std::to_string(*signal));
-    }
-    auto stream = std::make_unique<SoundStream>(input);
-    stream->choose(channel ? channel : signal);
-    return stream;
-}
-
-std::unique_ptr<SampleStream> stream_channels(InputFile& input) {
-    return std::make_unique<SoundStream>(input);
+std::unique_ptr<SignalSource> open_sound_file(InputFile& input, const ReadOptions& options,
+                                              bool together) {
+    return std::make_unique<SoundFile>(input, options, together);
 }
 
 std::unique_ptr<BlockWriter> sound_writer(std::FILE* to, Format format,

@@ -1,17 +1,19 @@
-// A signal taken in block by block, so that a recording may be longer than memory.
+// Signals taken in block by block, so that a recording may be longer than memory.
 #pragma once
 
 #include <cstddef>
 #include <memory>
 #include <optional>
 #include <span>
+#include <string>
 #include <vector>
 
 #include "files/input.hpp"
-#include "files/recording.hpp"
+#include "files/reading.hpp"
 
 namespace wavkit::tool {
 
+/// The samples of a signal.
 class SampleStream {
   public:
     virtual ~SampleStream() = default;
@@ -20,14 +22,15 @@ class SampleStream {
     /// than asked for only at the end. Throws where the source is damaged.
     virtual std::size_t read(std::span<double> values) = 0;
 
-    /// How much has been read, 0 to 1.
+    /// Passes over what is left.
+    virtual void skip();
+
+    /// How much of the source has been read, 0 to 1.
     virtual double done() const = 0;
 
     double delta = 1.0;
     bool complex = false;
-    bool sound = false;                 // the spacing is in seconds
     std::optional<std::size_t> length;  // in points, where it is known before the end
-    bool last = true;                   // no other signal follows; certain once all has been read
     std::size_t channels = 1;           // side by side, of a sound file: a scalar of each in turn
 };
 
@@ -44,17 +47,47 @@ class BlockStream : public SampleStream {
     std::size_t used_ = 0;
 };
 
-/// One signal of a text signal file, the first without a choice.
-std::unique_ptr<SampleStream> stream_text(InputFile& input, std::optional<int> signal);
+/// The signals of a file that were asked for, one after the other. None is read again for those
+/// behind it.
+class SignalSource {
+  public:
+    SignalSource(InputFile& input, const ReadOptions& options) : input_(input), options_(options) {}
+    virtual ~SignalSource() = default;
+    SignalSource(const SignalSource&) = delete;
+    SignalSource& operator=(const SignalSource&) = delete;
 
-/// Opens the signal that the options choose, the first without a choice; it is read as it is
-/// needed.
-std::unique_ptr<SampleStream> open_stream(InputFile& input, const ReadOptions& options);
+    /// The next signal, wherever the one before was left, which is gone then; null where there is
+    /// no other. Throws where the file does not hold the one that was asked for, or none at all.
+    SampleStream* next();
 
-/// Opens the signal that the options choose; of a sound file without a choice all channels.
-std::unique_ptr<SampleStream> open_channels(InputFile& input, const ReadOptions& options);
+    const std::string& name() const { return input_.name(); }
 
-/// Tells, on standard error, of a stream read to its end that others follow and none was chosen.
-void tell_of_others(const SampleStream& stream, const ReadOptions& options);
+    std::string description;  // of the file
+    bool sound = false;       // its spacing is in seconds
+
+  protected:
+    InputFile& input() { return input_; }
+    const ReadOptions& options() const { return options_; }
+    /// How the next signal is counted, from 1.
+    int number() const { return held_ + 1; }
+
+  private:
+    /// The signal that follows in the file, or null.
+    virtual std::unique_ptr<SampleStream> following() = 0;
+
+    InputFile& input_;
+    const ReadOptions options_;
+    std::unique_ptr<SampleStream> current_;
+    int held_ = 0;  // signals so far
+};
+
+/// Opens the signals that the options ask for, each channel of a sound file a signal of its own.
+std::unique_ptr<SignalSource> open_signals(InputFile& input, const ReadOptions& options);
+
+/// The same, but the channels of a sound file are one stream unless the options choose one.
+std::unique_ptr<SignalSource> open_channels(InputFile& input, const ReadOptions& options);
+
+/// Tells, on standard error, of a source whose first signal was used that there are others.
+void tell_of_others(SignalSource& source);
 
 }  // namespace wavkit::tool

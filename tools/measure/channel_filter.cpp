@@ -4,7 +4,7 @@
 
 #include <algorithm>
 
-#include "measure/spectrum.hpp"
+#include "measure/prepare.hpp"
 #include "measure/taps.hpp"
 
 namespace wavkit::tool {

@@ -145,8 +145,7 @@ std::vector<Peak> find_peaks(const Spectrum& spectrum, std::size_t count, const 
     std::vector<Peak> peaks;
     for (const int i : kept) {
         const auto peak = refine(spectrum, magnitudes, i);
-        peaks.push_back({spectrum.frequency(peak.bin),
-                         peak.height * (spectrum.has_no_mirror(i) ? 0.5 : 1.0), i});
+        peaks.push_back({spectrum.frequency(peak.bin), spectrum.amplitude(peak.height, i), i});
     }
     std::ranges::stable_sort(peaks, std::greater(), &Peak::amplitude);
     return peaks;

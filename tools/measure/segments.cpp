@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "base/error.hpp"
+#include "measure/prepare.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -48,21 +49,6 @@ class SlopeStream : public SampleStream {
 
 int Segmentation::step() const {
     return std::max(1, int(std::lround(length * (1 - overlap / 100))));
-}
-
-void remove_mean(Signal& x) {
-    Signal mean;
-    check(dsps_mean(x, mean) || dspi_neg(mean), "removing the mean");
-    const auto values = x.values();
-    const auto offset = mean.values();
-    for (std::size_t i = 0; i < values.size(); ++i) values[i] += offset[i % offset.size()];
-}
-
-void take_slope(Signal& x) {
-    check(dspi_differ(x), "computing the slope");
-    // The first difference is one to nothing, a step that the signal does not have.
-    check(dspu_subvec(x, x, 1, x->points), "computing the slope");
-    check(x->complex ? dspi_mag(x) : dspi_abs(x), "computing the slope");
 }
 
 void measure_segments(SampleStream& source, const Segmentation& segmentation,

@@ -28,12 +28,6 @@ struct Averaging {
     int forget = 0;  // 0: all spectra count alike; otherwise each weighs 1/forget when it comes
 };
 
-/// The signal without its mean.
-void remove_mean(Signal& x);
-
-/// The size of the slope at every sample but the first.
-void take_slope(Signal& x);
-
 /// Measures segment after segment; what is left at the end and fills none is dropped. Throws where
 /// there is not even one.
 void measure_segments(SampleStream& stream, const Segmentation& segmentation,

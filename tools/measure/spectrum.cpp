@@ -3,7 +3,6 @@
 #include <wavkit/dsp.h>
 
 #include <algorithm>
-#include <array>
 #include <bit>
 #include <cmath>
 
@@ -59,47 +58,10 @@ int transform(const Signal& x, Signal& bins, const SpectrumSettings& settings, i
 
 }  // namespace
 
-std::vector<std::string> window_names() {
-    std::vector<std::string> names;
-    std::array<char, 64> name;
-    for (int id = 0; dsp_window_to_str(id, name.data(), int(name.size())) == 0; ++id) {
-        names.emplace_back(name.data());
-    }
-    return names;
-}
-
-std::string window_list() {
-    std::string list = " ";
-    std::size_t line = 0;
-    for (const auto& name : window_names()) {
-        if (list.size() - line + name.size() > 90) {
-            list += "\n ";
-            line = list.size();
-        }
-        list += " " + name;
-    }
-    return list;
-}
-
-int window_of_name(const std::string& name) {
-    int window;
-    if (dsp_window_from_str(name.c_str(), &window) == 0) return window;
-    std::string known;
-    for (const auto& other : window_names()) known += (known.empty() ? "" : ", ") + other;
-    throw UsageError("there is no window '" + name + "'; there are " + known);
-}
-
 void check_spacing(double delta) {
     if (delta > 0) return;
     throw Error("a sample spacing of " + std::to_string(delta) +
                 " gives no frequencies; set --delta or --rate");
-}
-
-void check_finite(std::span<const double> values, bool complex, long first) {
-    const auto bad = std::ranges::find_if_not(values, [](double v) { return std::isfinite(v); });
-    if (bad == values.end()) return;
-    const auto sample = first + (bad - values.begin()) / (complex ? 2 : 1);
-    throw Error("sample " + std::to_string(sample) + " is not a finite number");
 }
 
 Spectrum measure(const Signal& x, const SpectrumSettings& settings) {
@@ -125,7 +87,7 @@ Signal magnitudes(const Spectrum& spectrum) {
 Signal amplitudes(const Spectrum& spectrum) {
     auto result = magnitudes(spectrum);
     for (int i = 0; i < result->points; ++i) {
-        if (spectrum.has_no_mirror(i)) result->data[i] *= 0.5;
+        result->data[i] = spectrum.amplitude(result->data[i], i);
     }
     return result;
 }

@@ -1,15 +1,14 @@
 // The amplitude spectrum of a signal, through every window of the catalogue.
 #pragma once
 
-#include <string>
-#include <vector>
+#include <wavkit/dsp.h>
 
 #include "base/signal.hpp"
 
 namespace wavkit::tool {
 
 struct SpectrumSettings {
-    int window = 2;
+    int window = DSP_WINDOW_HANN;
     int points = 0;       // length of the transform, made a power of two; 0: as many as samples
     double fraction = 1;  // share of the transform that samples fill; zeros fill the rest
     bool two_sided = false;
@@ -30,21 +29,16 @@ struct Spectrum {
     double frequency(double bin) const { return (bin - origin()) * bins->delta; }
     /// Whether a bin of a one-sided spectrum was doubled without a negative frequency to stand for.
     bool has_no_mirror(int bin) const { return !two_sided && (bin == 0 || 2 * bin == length); }
+    /// The amplitude that a magnitude stands for: half of it where there is no mirror image.
+    double amplitude(double magnitude, int bin) const {
+        return has_no_mirror(bin) ? 0.5 * magnitude : magnitude;
+    }
     /// How finely zeros at the end resolve the bins of the measured samples.
     double padding() const { return double(length) / samples; }
 };
 
-/// The identifier of a window's name; throws with the list of all names.
-int window_of_name(const std::string& name);
-std::vector<std::string> window_names();
-/// All names in lines of a fair length.
-std::string window_list();
-
 /// Refuses a spacing from which no frequencies follow.
 void check_spacing(double delta);
-
-/// Refuses values that are not finite; `first` is the sample that the first one belongs to.
-void check_finite(std::span<const double> values, bool complex, long first = 0);
 
 /// Measures a signal of finite samples. A complex one always has a two-sided spectrum.
 Spectrum measure(const Signal& x, const SpectrumSettings& settings);
@@ -52,9 +46,8 @@ Spectrum measure(const Signal& x, const SpectrumSettings& settings);
 /// The magnitude of every bin, as the transform left it.
 Signal magnitudes(const Spectrum& spectrum);
 
-/// The amplitude of every bin: in a one-sided spectrum the bins without a mirror image, 0 and half
-/// the sampling rate, were doubled like the others and are halved again, so that a constant reads
-/// as itself.
+/// The amplitude of every bin, also of 0 and half the sampling rate, so that a constant reads as
+/// itself.
 Signal amplitudes(const Spectrum& spectrum);
 
 /// What takes the amplitude of a bin to its density, see densities().

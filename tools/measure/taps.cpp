@@ -7,9 +7,9 @@
 #include <map>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/options.hpp"
-#include "files/csv.hpp"
-#include "measure/spectrum.hpp"
+#include "measure/windows.hpp"
 
 namespace wavkit::tool {
 namespace {

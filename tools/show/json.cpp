@@ -2,7 +2,7 @@
 
 #include <cmath>
 
-#include "files/csv.hpp"
+#include "base/number.hpp"
 
 namespace wavkit::tool {
 

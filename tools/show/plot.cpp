@@ -9,8 +9,8 @@
 #include <filesystem>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/progress.hpp"
-#include "files/csv.hpp"
 #include "files/output.hpp"
 #include "show/gnuplot.hpp"
 

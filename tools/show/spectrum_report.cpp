@@ -7,8 +7,12 @@
 #include <cstdio>
 #include <filesystem>
 
+#include "base/number.hpp"
 #include "base/progress.hpp"
 #include "files/output.hpp"
+#include "files/recording.hpp"
+#include "measure/windows.hpp"
+#include "show/labels.hpp"
 #include "show/plot.hpp"
 
 namespace wavkit::tool {
@@ -59,23 +63,6 @@ std::vector<Mark> shown_peaks(const SpectrumReport& report, std::size_t count) {
 }
 
 }  // namespace
-
-std::string with_unit(const std::string& name, const std::string& unit) {
-    return unit.empty() ? name : name + " (" + unit + ")";
-}
-
-std::string inverse_unit(const std::string& unit) {
-    return unit == "s" ? "Hz" : unit.empty() ? "" : "1/" + unit;
-}
-
-std::string quantity_name(bool density, bool decibels, const std::string& unit) {
-    const std::string detail = decibels ? "dB" : density && unit == "s" ? "/rtHz" : "";
-    return with_unit(density ? "density" : "amplitude", detail);
-}
-
-std::string short_name(const std::string& path) {
-    return path == "-" ? "standard input" : std::filesystem::path(path).filename().string();
-}
 
 std::string SpectrumReport::frequency_unit() const { return inverse_unit(unit); }
 

@@ -3,7 +3,7 @@
 
 #include <string>
 
-#include "files/recording.hpp"
+#include "files/writing.hpp"
 #include "measure/peaks.hpp"
 #include "measure/spectrum.hpp"
 
@@ -34,17 +34,5 @@ void write_output(const SpectrumReport& report);
 void print_peaks(const SpectrumReport& report, std::size_t count);
 void print_summary(const SpectrumReport& report);
 void draw_spectrum(const SpectrumReport& report);
-
-/// What heights are, with their unit.
-std::string quantity_name(bool density, bool decibels, const std::string& unit);
-
-/// How titles call a source.
-std::string short_name(const std::string& path);
-
-/// "time (s)", or only "time" where the unit is not known.
-std::string with_unit(const std::string& name, const std::string& unit);
-
-/// The unit of frequencies for one of time.
-std::string inverse_unit(const std::string& unit);
 
 }  // namespace wavkit::tool

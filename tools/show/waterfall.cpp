@@ -4,8 +4,8 @@
 #include <cmath>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/progress.hpp"
-#include "files/csv.hpp"
 #include "files/output.hpp"
 #include "show/gnuplot.hpp"
 
@@ -43,9 +43,9 @@ void Waterfall::lay_out(const Spectrum& spectrum) {
     if (end - first_bin_ < 2) throw Error("there are too few frequencies to draw");
     const double interior = density_ ? amplitude_to_density(spectrum, first_bin_ + 1) : 1.0;
     for (int i = first_bin_; i < end; ++i) {
-        const bool edge = spectrum.has_no_mirror(i);
-        scale_.push_back(edge ? 0.5 * (density_ ? amplitude_to_density(spectrum, i) : 1.0)
-                              : interior);
+        const bool alone = density_ && spectrum.has_no_mirror(i);
+        const double density = alone ? amplitude_to_density(spectrum, i) : interior;
+        scale_.push_back(spectrum.amplitude(density, i));
     }
     bins_in_row_ = (end - first_bin_ + most_rows - 1) / most_rows;
     rows_ = (scale_.size() + std::size_t(bins_in_row_) - 1) / std::size_t(bins_in_row_);

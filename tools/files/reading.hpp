@@ -1,0 +1,34 @@
+// Options that say how a source is to be read.
+#pragma once
+
+#include <CLI/CLI.hpp>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "files/format.hpp"
+
+namespace wavkit::tool {
+
+struct CsvLayout {
+    bool time = false;  // the first column holds the time of each sample
+    /// Value columns, by number from 1 or by name in the header: one real, two complex.
+    std::vector<std::string> columns;
+};
+
+/// How a source is to be read.
+struct ReadOptions {
+    std::optional<Format> format;  // otherwise told from the contents
+    std::optional<double> delta, rate;
+    CsvLayout csv;
+    std::optional<int> channel;  // of a sound file, from 1
+    std::optional<int> signal;   // the only one wanted, from 1
+
+    /// Adds the options to a subcommand; without --rate where that means another one's rate.
+    void declare(CLI::App& command, bool with_rate = true);
+
+    /// The spacing of a signal, whatever its source told.
+    double spacing(double told) const;
+};
+
+}  // namespace wavkit::tool

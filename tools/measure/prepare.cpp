@@ -1,0 +1,34 @@
+#include "measure/prepare.hpp"
+
+#include <wavkit/dsp.h>
+
+#include <algorithm>
+#include <cmath>
+
+#include "base/error.hpp"
+
+namespace wavkit::tool {
+
+void check_finite(std::span<const double> values, bool complex, long first) {
+    const auto bad = std::ranges::find_if_not(values, [](double v) { return std::isfinite(v); });
+    if (bad == values.end()) return;
+    const auto sample = first + (bad - values.begin()) / (complex ? 2 : 1);
+    throw Error("sample " + std::to_string(sample) + " is not a finite number");
+}
+
+void remove_mean(Signal& x) {
+    Signal mean;
+    check(dsps_mean(x, mean) || dspi_neg(mean), "removing the mean");
+    const auto values = x.values();
+    const auto offset = mean.values();
+    for (std::size_t i = 0; i < values.size(); ++i) values[i] += offset[i % offset.size()];
+}
+
+void take_slope(Signal& x) {
+    check(dspi_differ(x), "computing the slope");
+    // The first difference is one to nothing, a step that the signal does not have.
+    check(dspu_subvec(x, x, 1, x->points), "computing the slope");
+    check(x->complex ? dspi_mag(x) : dspi_abs(x), "computing the slope");
+}
+
+}  // namespace wavkit::tool
