@@ -11,16 +11,11 @@ using Values = std::vector<long double>;
 using Complex = std::complex<long double>;
 
 template <Record R>
-constexpr auto fir = pick<R>(dspc_fir, dspfc_fir);
-template <Record R>
-constexpr auto taper = pick<R>(dspi_window_fir, dspfi_window_fir);
-
-template <Record R>
 Signal<R> designed(int type, int points, double f1, double f2 = 0) {
     Signal<R> h;
     h->points = points;
     h->delta = 7;
-    EXPECT_EQ(fir<R>(h, type, scalar<R>(f1), scalar<R>(f2)), 0) << type << ' ' << points;
+    EXPECT_EQ(dspc_fir(h, type, scalar<R>(f1), scalar<R>(f2)), 0) << type << ' ' << points;
     EXPECT_TRUE(h->points == points && !h->complex && h->delta == 7);
     return h;
 }
@@ -46,12 +41,7 @@ Complex ideal(int type, long double f, bool inside) {
     return inside ? gains[type] : 0;
 }
 
-template <class R>
-class DesignTest : public ::testing::Test {};
-TYPED_TEST_SUITE(DesignTest, Precisions);
-
-TYPED_TEST(DesignTest, ResponsesAreWhatTheDesignsPromise) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Design, ResponsesAreWhatTheDesignsPromise) {
     // Type, f1, f2, and the band: next to its edges the response is on its way.
     const double designs[][5] = {
         {3, 0.2, 0, 0, 0.2},      {2, 0.3, 0, 0, 0.3},   {0, 0.25, 0.1, 0.2, 0.3},
@@ -61,7 +51,7 @@ TYPED_TEST(DesignTest, ResponsesAreWhatTheDesignsPromise) {
         const int type = int(kind);
         for (int points = type == 1 || type == 2 ? 401 : 400; points <= 401; ++points) {
             auto h = designed<R>(type, points, f1, f2);
-            ASSERT_EQ(type == 7 ? 0 : taper<R>(h, 101, scalar<R>(0.016)), 0);
+            ASSERT_EQ(type == 7 ? 0 : dspi_window_fir(h, 101, T(0.016)), 0);
             for (double f = 0.001; f < 0.5; f += 0.0097) {
                 if (std::fabs(f - low) < 0.009 || std::fabs(f - high) < 0.009) continue;
                 const auto error = response<R>(h, f) - ideal(type, f, f > low && f < high);
@@ -71,8 +61,7 @@ TYPED_TEST(DesignTest, ResponsesAreWhatTheDesignsPromise) {
     }
 }
 
-TYPED_TEST(DesignTest, FewTapsByHand) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Design, FewTapsByHand) {
     const long double p = 1 / pi<long double>, root = std::sqrt(0.5L);
     const Values five{0.03913965L, 0.2486703L, 0.4243801L, 0.2486703L, 0.03913965L},
         seven{0.00532055L, 0.06829975L, 0.24458875L, 0.3635819L,
@@ -127,8 +116,7 @@ Values smoothing_kernel(int type, int n, long double alpha) {
     return h;
 }
 
-TYPED_TEST(DesignTest, SmoothingKernelsFollowTheirShapes) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Design, SmoothingKernelsFollowTheirShapes) {
     // Lengths and the parameters that suit them; a parameter of 0 asks for those.
     const double half_pi = pi<double> / 2, slope = 1.610830415, start = 1.386795655;
     const double by_sinh[] = {
@@ -156,12 +144,10 @@ TYPED_TEST(DesignTest, SmoothingKernelsFollowTheirShapes) {
         EXPECT_NEAR(double(response<R>(designed<R>(type, 2000, 0), 0).real()), 1, 1e-5);
 }
 
-TYPED_TEST(DesignTest, FixedSetsAreHalvesOfFilters) {
-    using R = TypeParam;
-    const auto fir2 = pick<R>(dspc_fir2, dspfc_fir2);
+BOTH_PRECISIONS(Design, FixedSetsAreHalvesOfFilters) {
     for (const auto& [type, points] : {std::pair(100, 12), {101, 20}}) {
         auto h = complex<R>({1, 2}, 5);
-        ASSERT_EQ(fir2(h, type), 0);
+        ASSERT_EQ(dspc_fir2(h, type), 0);
         Signal<R> taps = h, mirrored;
         ASSERT_EQ(dspi_real(taps) || dspi_rtoc(taps), 0);
         EXPECT_TRUE(matches<R>(h, taps) && h->points == points);
@@ -173,12 +159,11 @@ TYPED_TEST(DesignTest, FixedSetsAreHalvesOfFilters) {
         }
     }
     auto h = complex<R>({1});
-    EXPECT_EQ(fir2(h, 102), -1);
+    EXPECT_EQ(dspc_fir2(h, 102), -1);
     EXPECT_TRUE(is_complex<R>(h, {1}));
 }
 
-TYPED_TEST(DesignTest, RecordsKeepTheirKindUnlessTheDesignFails) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Design, RecordsKeepTheirKindUnlessTheDesignFails) {
     for (int type = -1; type <= 11; ++type) {
         for (const int points : {0, 1, 4, 7, 9}) {
             const bool possible =
@@ -186,28 +171,26 @@ TYPED_TEST(DesignTest, RecordsKeepTheirKindUnlessTheDesignFails) {
             Signal<R> h, z;
             h->points = z->points = points;
             z->complex = 1;
-            const scalar<R> f1 = scalar<R>(type == 4 ? 0 : 0.1), f2 = scalar<R>(0.05);
-            ASSERT_EQ(fir<R>(h, type, f1, f2), possible ? 0 : -1) << type << ' ' << points;
-            ASSERT_EQ(fir<R>(z, type, f1, f2), possible ? 0 : -1);
+            const T f1 = T(type == 4 ? 0 : 0.1), f2 = T(0.05);
+            ASSERT_EQ(dspc_fir(h, type, f1, f2), possible ? 0 : -1) << type << ' ' << points;
+            ASSERT_EQ(dspc_fir(z, type, f1, f2), possible ? 0 : -1);
             EXPECT_EQ(z->complex, possible);
             ASSERT_EQ(dspi_rtoc(h), 0);
             EXPECT_TRUE(!possible || matches<R>(z, h)) << type << ' ' << points;
         }
     }
     Borrowed<R> host(real<R>({1, 2, 3}));
-    ASSERT_EQ(fir<R>(host, 3, scalar<R>(0.1), 0), 0);
-    EXPECT_EQ(host.host, (std::vector<scalar<R>>{1, 2, 3}));
+    ASSERT_EQ(dspc_fir(host, 3, T(0.1), 0), 0);
+    EXPECT_EQ(host.host, (std::vector<T>{1, 2, 3}));
     const int growths = fail_each_growth<R>([&] {
         Signal<R> h;
         h->points = 9;
-        return fir<R>(h, 7, scalar<R>(0.1), 0);
+        return dspc_fir(h, 7, T(0.1), 0);
     });
     EXPECT_EQ(growths, 2);
 }
 
-TYPED_TEST(DesignTest, TapersAreWindowsForABandwidth) {
-    using R = TypeParam;
-    using T = scalar<R>;
+BOTH_PRECISIONS(Design, TapersAreWindowsForABandwidth) {
     const int flags = DSP_SCALE_PEAK | DSP_SCALE_SYMMETRIC | DSP_SCALE_NO_ROTATION;
     const auto kaiser = [&](T beta) {
         return [=](R* h) { return dspi_window_kaiser(h, beta, flags); };
@@ -236,14 +219,14 @@ TYPED_TEST(DesignTest, TapersAreWindowsForABandwidth) {
     };
     for (const auto& c : tapers) {
         auto h = Noise().complex<R>(21), expected = h;
-        ASSERT_EQ(taper<R>(h, c.window, T(c.bandwidth)) || c.expected(expected), 0);
+        ASSERT_EQ(dspi_window_fir(h, c.window, T(c.bandwidth)) || c.expected(expected), 0);
         EXPECT_TRUE(matches<R>(h, expected, 16)) << c.window << ' ' << c.bandwidth;
         Signal<R> empty;
-        EXPECT_EQ(taper<R>(empty, c.window, T(c.bandwidth)), 0);
+        EXPECT_EQ(dspi_window_fir(empty, c.window, T(c.bandwidth)), 0);
     }
     auto h = real<R>({1, 2, 3});
     for (const int window : {-1, 1, 2, 9, 13, 24, 99, 104})
-        EXPECT_EQ(taper<R>(h, window, T(0.1)), -1);
+        EXPECT_EQ(dspi_window_fir(h, window, T(0.1)), -1);
     EXPECT_TRUE(is_real<R>(h, {1, 2, 3}));
 }
 

@@ -6,11 +6,6 @@ namespace wavkit::test {
 namespace {
 
 template <Record R>
-constexpr auto fir = pick<R>(dspd_fir, dspfd_fir);
-template <Record R>
-constexpr auto sfir = pick<R>(dspd_sfir, dspfd_sfir);
-
-template <Record R>
 Signal<R> noise(int points, bool is_complex, int seed) {
     return is_complex ? Noise(std::uint64_t(seed)).complex<R>(points)
                       : Noise(std::uint64_t(seed)).real<R>(points);
@@ -49,31 +44,25 @@ void expect_filtered(Filter filter, R* x, R* y, const R* taps, R* state) {
     EXPECT_EQ(samples_of<R>(state), before);
 }
 
-template <class R>
-class FirTest : public ::testing::Test {};
-TYPED_TEST_SUITE(FirTest, Precisions);
-
-TYPED_TEST(FirTest, MatchesTheDefinitionBlockByBlock) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fir, MatchesTheDefinitionBlockByBlock) {
     for (const int count : {1, 2, 17, 35, 36, 45, 46, 200, 1000}) {
         for (int kinds = 0; kinds < 4; ++kinds) {
             const auto h = noise<R>(count, kinds & 1, count);
             Signal<R> state, y;
             for (const int points : {100, 1, 0, 45, 44, 7, 700, 198, 1500, 1500}) {
                 auto x = noise<R>(points, kinds & 2, points + 1);
-                x->delta = scalar<R>(0.25);
+                x->delta = T(0.25);
                 for (R* s : {state.get(), static_cast<R*>(nullptr)}) {
                     SCOPED_TRACE(testing::Message() << count << ' ' << kinds << ' ' << points);
-                    expect_filtered<R>([&](R* in, R* out, R* st) { return fir<R>(in, out, h, st); },
-                                       x, y, h, s);
+                    expect_filtered<R>(
+                        [&](R* in, R* out, R* st) { return dspd_fir(in, out, h, st); }, x, y, h, s);
                 }
             }
         }
     }
 }
 
-TYPED_TEST(FirTest, StatesOfAnyLengthAndKindAreTaken) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fir, StatesOfAnyLengthAndKindAreTaken) {
     for (const int count : {1, 5, 50}) {
         const auto h = noise<R>(count, false, 1);
         for (const int had : {0, 2, count - 1, count + 6}) {
@@ -81,18 +70,17 @@ TYPED_TEST(FirTest, StatesOfAnyLengthAndKindAreTaken) {
                 auto x = noise<R>(variant & 4 ? 60 : 3, variant & 1, 2),
                      state = noise<R>(had, variant & 2, 4);
                 Signal<R> y;
-                expect_filtered<R>([&](R* in, R* out, R* s) { return fir<R>(in, out, h, s); }, x, y,
-                                   h, state);
+                expect_filtered<R>([&](R* in, R* out, R* s) { return dspd_fir(in, out, h, s); }, x,
+                                   y, h, state);
             }
         }
     }
     auto state = complex<R>({{1, 2}}, 5), x = real<R>({3, 4}), y = real<R>({});
-    ASSERT_EQ(fir<R>(x, y, Signal<R>(), state) || sfir<R>(x, y, Signal<R>(), 1, 1, state), 0);
+    ASSERT_EQ(dspd_fir(x, y, Signal<R>(), state) || dspd_sfir(x, y, Signal<R>(), 1, 1, state), 0);
     EXPECT_TRUE(is_complex<R>(state, {{1, 2}}) && matches<R>(y, x));
 }
 
-TYPED_TEST(FirTest, HalvesAreMirrored) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fir, HalvesAreMirrored) {
     for (const int given : {1, 2, 20, 30, 31, 90}) {
         for (int variant = 0; variant < 16; ++variant) {
             const bool odd = variant & 1, anti = variant & 2;
@@ -104,15 +92,14 @@ TYPED_TEST(FirTest, HalvesAreMirrored) {
             for (const int points : {100, 1, 250}) {
                 auto x = noise<R>(points, variant & 8, points);
                 expect_filtered<R>(
-                    [&](R* in, R* out, R* s) { return sfir<R>(in, out, half, odd, anti, s); }, x, x,
-                    taps, state);
+                    [&](R* in, R* out, R* s) { return dspd_sfir(in, out, half, odd, anti, s); }, x,
+                    x, taps, state);
             }
         }
     }
 }
 
-TYPED_TEST(FirTest, RecordsMayShareTheirBuffers) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fir, RecordsMayShareTheirBuffers) {
     enum Role { input, output, tap, state };
     const std::pair<Role, Role> pairs[] = {{output, input}, {output, tap}, {output, state},
                                            {state, input},  {state, tap},  {tap, input}};
@@ -125,7 +112,7 @@ TYPED_TEST(FirTest, RecordsMayShareTheirBuffers) {
                              noise<R>(count, false, 2), noise<R>(count + 5, is_complex, 3)};
             r[one] = r[other];
             Signal<R> apart[] = {r[0], r[1], r[2], r[3]};
-            ASSERT_EQ(fir<R>(apart[0], apart[1], apart[2], apart[3]), 0);
+            ASSERT_EQ(dspd_fir(apart[0], apart[1], apart[2], apart[3]), 0);
 
             Borrowed<R> host(r[other]);
             const auto before = host.host;
@@ -136,7 +123,7 @@ TYPED_TEST(FirTest, RecordsMayShareTheirBuffers) {
             records[other] = view == 2 ? &shared : owner;
             records[one] = view == 1 ? &shared : owner;
             SCOPED_TRACE(testing::Message() << one << ' ' << other << ' ' << variant);
-            ASSERT_EQ(fir<R>(records[0], records[1], records[2], records[3]), 0);
+            ASSERT_EQ(dspd_fir(records[0], records[1], records[2], records[3]), 0);
             EXPECT_TRUE(matches<R>(records[output], apart[output]));
             if (records[state] != records[output]) {
                 EXPECT_TRUE(matches<R>(records[state], apart[state]));
@@ -147,47 +134,44 @@ TYPED_TEST(FirTest, RecordsMayShareTheirBuffers) {
     }
 }
 
-TYPED_TEST(FirTest, TransformedTapsAreKeptWhileTheyStay) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fir, TransformedTapsAreKeptWhileTheyStay) {
     auto x = noise<R>(4000, false, 1), z = noise<R>(500, true, 2), h = noise<R>(64, false, 3);
     Signal<R> y, old, few;
     ASSERT_EQ(dspu_subvec(x, few, 0, 64), 0);
-    const auto filter = [&](R* in, R* out, R*) { return fir<R>(in, out, h, nullptr); };
-    const auto expect_new_taps = [&](int changed, scalar<R> tap) {
+    const auto filter = [&](R* in, R* out, R*) { return dspd_fir(in, out, h, nullptr); };
+    const auto expect_new_taps = [&](int changed, T tap) {
         h[changed] = tap;
         for (R* in : {x.get(), few.get(), z.get()}) expect_filtered<R>(filter, in, y, h, nullptr);
     };
     expect_new_taps(63, 1);
-    expect_new_taps(63, scalar<R>(1.001));
-    expect_new_taps(0, scalar<R>(1e16));
+    expect_new_taps(63, T(1.001));
+    expect_new_taps(0, T(1e16));
     // Beside a first tap so large the change of another one disappears: the old taps remain.
-    ASSERT_EQ(fir<R>(x, old, h, nullptr), 0);
+    ASSERT_EQ(dspd_fir(x, old, h, nullptr), 0);
     h[9] += 3;
-    ASSERT_EQ(fir<R>(x, y, h, nullptr), 0);
+    ASSERT_EQ(dspd_fir(x, y, h, nullptr), 0);
     EXPECT_TRUE(matches<R>(y, old));
     // A NaN compares equal to every tap, but is none of them.
     expect_new_taps(0, 0);
-    h[5] = std::numeric_limits<scalar<R>>::quiet_NaN();
-    ASSERT_EQ(fir<R>(x, y, h, nullptr), 0);
+    h[5] = std::numeric_limits<T>::quiet_NaN();
+    ASSERT_EQ(dspd_fir(x, y, h, nullptr), 0);
     EXPECT_TRUE(std::isnan(y[500]));
     expect_new_taps(5, 0);
     ASSERT_EQ(free_internal<R>(), 0);
     expect_new_taps(5, 0);
 }
 
-TYPED_TEST(FirTest, WithoutAStateNothingPrecedesTheBlock) {
-    using R = TypeParam;
-    const auto inf = std::numeric_limits<scalar<R>>::infinity();
+BOTH_PRECISIONS(Fir, WithoutAStateNothingPrecedesTheBlock) {
+    const auto inf = std::numeric_limits<T>::infinity();
     for (int kinds = 0; kinds < 4; ++kinds) {
         auto h = real<R>({1, 2, inf}), x = real<R>({1, 1, 1, 1}), y = real<R>({});
         ASSERT_EQ((kinds & 1 && dspi_rtoc(h)) || (kinds & 2 && dspi_rtoc(x)), 0);
-        ASSERT_EQ(fir<R>(x, y, h, nullptr), 0);
+        ASSERT_EQ(dspd_fir(x, y, h, nullptr), 0);
         EXPECT_TRUE(y[0] == 1 && y[kinds ? 2 : 1] == 3 && y[kinds ? 4 : 2] == inf);
     }
 }
 
-TYPED_TEST(FirTest, EveryFailingGrowthIsReported) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fir, EveryFailingGrowthIsReported) {
     for (const int count : {5, 80}) {
         const auto half = noise<R>(count, false, 1);
         for (const auto& source : {noise<R>(200, false, 2), noise<R>(200, true, 2)}) {
@@ -196,11 +180,11 @@ TYPED_TEST(FirTest, EveryFailingGrowthIsReported) {
                 Signal<R> x = source, state, y;
                 if (!x->data) return -1;
                 const int result =
-                    status(fir<R>(x, x, half, state) || sfir<R>(x, x, half, 1, 0, state));
-                if (result == 0) return fir<R>(x, y, half, nullptr);
+                    status(dspd_fir(x, x, half, state) || dspd_sfir(x, x, half, 1, 0, state));
+                if (result == 0) return dspd_fir(x, y, half, nullptr);
                 Signal<R> again = source;  // what failed is made good
                 expect_filtered<R>(
-                    [&](R* in, R* out, R*) { return fir<R>(in, out, half, nullptr); }, again, y,
+                    [&](R* in, R* out, R*) { return dspd_fir(in, out, half, nullptr); }, again, y,
                     half, nullptr);
                 return result;
             });
@@ -209,7 +193,7 @@ TYPED_TEST(FirTest, EveryFailingGrowthIsReported) {
     }
     auto huge = real<R>({1});
     R taps{1, huge->data, 0, std::numeric_limits<int>::max(), 0, 0};
-    EXPECT_EQ(sfir<R>(huge, huge, &taps, 0, 0, nullptr), -1);
+    EXPECT_EQ(dspd_sfir(huge, huge, &taps, 0, 0, nullptr), -1);
 }
 
 }  // namespace

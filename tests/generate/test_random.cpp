@@ -24,18 +24,13 @@ namespace wavkit::test {
 namespace {
 
 template <Record R>
-constexpr auto fill = pick<R>(dspc_rand, dspfc_rand);
-template <Record R>
-constexpr auto shuffle = pick<R>(dspi_shuffle, dspfi_shuffle);
-
-template <Record R>
 Signal<R> drawn(int type, bool is_complex, int points, const std::vector<int>& deal = {}) {
     dealt = deal;
     next_dealt = 0;
     Signal<R> x;
     x->points = points;
     x->complex = is_complex;
-    EXPECT_EQ(fill<R>(x, type), 0);
+    EXPECT_EQ(dspc_rand(x, type), 0);
     dealt.clear();
     return x;
 }
@@ -44,14 +39,10 @@ template <Record R>
 Signal<R> shuffled(Signal<R> x, const std::vector<int>& deal) {
     dealt = deal;
     next_dealt = 0;
-    EXPECT_EQ(shuffle<R>(x), 0);
+    EXPECT_EQ(dspi_shuffle(x), 0);
     dealt.clear();
     return x;
 }
-
-template <class R>
-class RandomTest : public ::testing::Test {};
-TYPED_TEST_SUITE(RandomTest, Precisions);
 
 struct Law {
     double mean, variance, kurtosis;
@@ -75,8 +66,7 @@ void expect_law(std::vector<double> x, const Law& law) {
     EXPECT_LT(root * distance, 1.95);
 }
 
-TYPED_TEST(RandomTest, SamplesFollowTheirDistribution) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Random, SamplesFollowTheirDistribution) {
     noise.seed(7);
     const Law uniform{0, 1.0 / 3, 1.8, [](double x) { return (x + 1) / 2; }};
     const Law normal{0, 1, 3, [](double x) { return std::erfc(-x / std::sqrt(2.0)) / 2; }};
@@ -101,8 +91,7 @@ TYPED_TEST(RandomTest, SamplesFollowTheirDistribution) {
     }
 }
 
-TYPED_TEST(RandomTest, DrawsKeepFromTheirOpenBounds) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Random, DrawsKeepFromTheirOpenBounds) {
     const std::vector<int> most{0x7fffffff};  // bits beyond the fifteenth do not count
     EXPECT_EQ(drawn<R>(0, false, 1, most)[0], 1 - epsilon<R>);
     EXPECT_EQ(drawn<R>(2, false, 1, most)[0], -std::log(1 - epsilon<R> / 2));
@@ -119,8 +108,7 @@ TYPED_TEST(RandomTest, DrawsKeepFromTheirOpenBounds) {
     EXPECT_TRUE(is_complex<R>(drawn<R>(0, true, 1, rim), {{-0.5L, 0.5L}}));
 }
 
-TYPED_TEST(RandomTest, DrawsAreMadeInOrder) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Random, DrawsAreMadeInOrder) {
     const long double u = 4 * 0x1p-15L + 3 * 0x1p-30L + 2 * 0x1p-45L + 0x1p-60L;
     EXPECT_TRUE(is_real<R>(drawn<R>(0, false, 1, {1, 2, 3, 4}), {2 * u - 1}, 1));
     // Polar pairs: the second value first, the other one for the next record.
@@ -142,10 +130,9 @@ TYPED_TEST(RandomTest, DrawsAreMadeInOrder) {
     EXPECT_TRUE(is_real<R>(shuffled<R>(three, {32767, 1, 32766, 0, 0, 1, 0, 0, 0}), {3, 1, 2}));
 }
 
-TYPED_TEST(RandomTest, RefusesWhatThereIsNot) {
-    using R = TypeParam;
-    for (const int type : {-1, 4}) EXPECT_EQ(fill<R>(real<R>({1}), type), -1);
-    for (const int type : {2, 3}) EXPECT_EQ(fill<R>(complex<R>({1}), type), -1);
+BOTH_PRECISIONS(Random, RefusesWhatThereIsNot) {
+    for (const int type : {-1, 4}) EXPECT_EQ(dspc_rand(real<R>({1}), type), -1);
+    for (const int type : {2, 3}) EXPECT_EQ(dspc_rand(complex<R>({1}), type), -1);
     for (int type = 0; type < 4; ++type) EXPECT_EQ(drawn<R>(type, false, 0)->data, nullptr);
 }
 

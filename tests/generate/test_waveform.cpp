@@ -6,13 +6,6 @@ namespace wavkit::test {
 namespace {
 
 template <Record R>
-constexpr auto cosine = pick<R>(dspc_cos, dspfc_cos);
-template <Record R>
-constexpr auto exponential = pick<R>(dspc_cexp, dspfc_cexp);
-template <Record R>
-constexpr auto add_cosine = pick<R>(dspi_addcos, dspfi_addcos);
-
-template <Record R>
 Signal<R> blank(int points, bool is_complex, double delta) {
     Signal<R> x;
     x->points = points;
@@ -29,20 +22,15 @@ std::complex<long double> wave(long double freq, long double delta, long double 
     return std::polar(1.0L, two_pi<long double> * (std::fmod(turns, 1.0L) + lost) + phase);
 }
 
-template <class R>
-class WaveformTest : public ::testing::Test {};
-TYPED_TEST_SUITE(WaveformTest, Precisions);
-
-TYPED_TEST(WaveformTest, OscillatorsStayInPhase) {
-    using R = TypeParam;
-    const scalar<R> waves[][3] = {
+BOTH_PRECISIONS(Waveform, OscillatorsStayInPhase) {
+    const T waves[][3] = {
         {50, 1e-4f, 0.3f}, {-3.7f, 0.01f, -2}, {1e3, 1.5e-3f, 1}, {0.11f, 1, 100}, {7, 0, 2}};
     for (const auto& [freq, delta, phase] : waves) {
         for (const int n : {-4, 0, 1, 15, 17, 256, 257, 1000000}) {
             auto x = blank<R>(n, false, delta), same = blank<R>(n, false, delta);
             auto z = blank<R>(n, true, delta), flat = blank<R>(n, true, delta);
-            ASSERT_EQ(exponential<R>(z, freq, phase) || cosine<R>(x, freq, phase), 0);
-            ASSERT_EQ(cosine<R>(flat, freq, phase) || exponential<R>(same, freq, phase), 0);
+            ASSERT_EQ(dspc_cexp(z, freq, phase) || dspc_cos(x, freq, phase), 0);
+            ASSERT_EQ(dspc_cos(flat, freq, phase) || dspc_cexp(same, freq, phase), 0);
             EXPECT_TRUE(matches<R>(same, x) && z->delta == delta);
             EXPECT_TRUE(dspi_rtoc(same) == 0 && matches<R>(flat, same));
             for (int i = 0; i < n; i += 1 + n / 900) {
@@ -55,11 +43,10 @@ TYPED_TEST(WaveformTest, OscillatorsStayInPhase) {
     }
 }
 
-TYPED_TEST(WaveformTest, QuartersOfATurnAreExact) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Waveform, QuartersOfATurnAreExact) {
     auto x = blank<R>(1000, false, 0.5), z = blank<R>(1000, true, 0.5);
-    ASSERT_EQ(cosine<R>(x, 1, 0) || exponential<R>(z, scalar<R>(-0.5), 0), 0);
-    const Bin<scalar<R>> turns[] = {{1, 0}, {0, -1}, {-1, 0}, {0, 1}};
+    ASSERT_EQ(dspc_cos(x, 1, 0) || dspc_cexp(z, T(-0.5), 0), 0);
+    const Bin<T> turns[] = {{1, 0}, {0, -1}, {-1, 0}, {0, 1}};
     for (int i = 0; i < 1000; ++i) {
         ASSERT_EQ(x[i], i % 2 ? -1 : 1);
         ASSERT_EQ(z[2 * i], turns[i % 4].re);
@@ -67,14 +54,13 @@ TYPED_TEST(WaveformTest, QuartersOfATurnAreExact) {
     }
 }
 
-TYPED_TEST(WaveformTest, CosinesAddUpInPlace) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Waveform, CosinesAddUpInPlace) {
     const auto noise = Noise().complex<R>(700);
     Borrowed<R> z(noise), x(noise);
     x->points = 1400;
     x->complex = 0;
-    x->delta = z->delta = scalar<R>(0.25);
-    ASSERT_EQ(add_cosine<R>(z, -3, 0.75, 1) || add_cosine<R>(x, -3, 0.75, 1), 0);
+    x->delta = z->delta = T(0.25);
+    ASSERT_EQ(dspi_addcos(z, -3, 0.75, 1) || dspi_addcos(x, -3, 0.75, 1), 0);
     for (int i = 0; i < 700; ++i) {
         const auto added = -3 * wave(0.75L, 0.25L, 1, i).real();
         ASSERT_NEAR(z.host[2 * i], double(noise[2 * i] + added), 16 * epsilon<R>);
@@ -83,22 +69,21 @@ TYPED_TEST(WaveformTest, CosinesAddUpInPlace) {
     }
 }
 
-TYPED_TEST(WaveformTest, LineAddsItsStepSampleBySample) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Waveform, LineAddsItsStepSampleBySample) {
     Borrowed<R> host(real<R>({7, 8, 9}, 0.5));
     auto z = blank<R>(3, true, -2), y = blank<R>(999, false, 0.1);
-    const auto slope = scalar<R>(0.7), step = slope * y->delta;
+    const auto slope = T(0.7), step = slope * y->delta;
     ASSERT_EQ(dspc_line(host, 2, 1) || dspc_line(z, 3, 4) || dspc_line(y, slope, -5), 0);
     EXPECT_TRUE(is_real<R>(host, {1, 2, 3}));
-    EXPECT_EQ(host.host, (std::vector<scalar<R>>{7, 8, 9}));
+    EXPECT_EQ(host.host, (std::vector<T>{7, 8, 9}));
     EXPECT_TRUE(is_complex<R>(z, {4, -2, -8}));
     for (int i = 1; i < 999; ++i) ASSERT_EQ(y[i], y[i - 1] + step);
     const auto failing = [](auto f) {
         return fail_each_growth<R>([&] { return f(blank<R>(5, true, 1)); });
     };
     EXPECT_EQ(failing([](R* x) { return dspc_line(x, 1, 2); }), 1);
-    EXPECT_EQ(failing([](R* x) { return cosine<R>(x, 1, 2); }), 1);
-    EXPECT_EQ(failing([](R* x) { return exponential<R>(x, 1, 2); }), 1);
+    EXPECT_EQ(failing([](R* x) { return dspc_cos(x, 1, 2); }), 1);
+    EXPECT_EQ(failing([](R* x) { return dspc_cexp(x, 1, 2); }), 1);
 }
 
 }  // namespace

@@ -10,15 +10,7 @@ namespace {
 constexpr auto nan = std::numeric_limits<long double>::quiet_NaN();
 using List = std::vector<long double>;
 
-template <class R>
-struct InterpolateTest : ::testing::Test {
-    static constexpr auto interpolate = pick<R>(dsp_interp, dspf_interp);
-    static constexpr auto interleave = pick<R>(dspb_inter, dspfb_inter);
-};
-TYPED_TEST_SUITE(InterpolateTest, Precisions);
-
-TYPED_TEST(InterpolateTest, EveryMethodInsideAndOutsideTheTable) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Interpolate, EveryMethodInsideAndOutsideTheTable) {
     constexpr unsigned ends = DSP_INTERP_HOLD_ENDS, other_bits = 0xffffffe8;
     const List x{0, 1, 2, 4}, y{0, 10, 0, 4}, t{-2, -1, 0, 0.5L, 1, 1.75L, 3.5L, 4, 6};
     // The spline follows x^3, whose second derivatives are 6 x.
@@ -55,15 +47,14 @@ TYPED_TEST(InterpolateTest, EveryMethodInsideAndOutsideTheTable) {
         auto moments = real<R>(c.x);
         ASSERT_EQ(dspi_scale(moments, 6), 0);
         in_every_place(real<R>(c.t, 0.5), [&](const R* in, R* out) {
-            ASSERT_EQ(this->interpolate(real<R>(c.x), real<R>(c.y), moments, in, out, c.flags), 0);
+            ASSERT_EQ(dsp_interp(real<R>(c.x), real<R>(c.y), moments, in, out, c.flags), 0);
             EXPECT_TRUE(is_real<R>(out, c.want, 4)) << &c - cases;
-            EXPECT_EQ(out->delta, scalar<R>(0.5));
+            EXPECT_EQ(out->delta, T(0.5));
         });
     }
 }
 
-TYPED_TEST(InterpolateTest, OutputInPlaceOfATableColumn) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Interpolate, OutputInPlaceOfATableColumn) {
     const auto x = real<R>({0, 1, 3, 4, 6}), y = real<R>({1, 5, 2, 2, 7});
     const auto t = real<R>({0.5L, 1, 2.5L, 3.5L, 5, 7, 8}, 3);
     Signal<R> moments, all = x;
@@ -71,33 +62,32 @@ TYPED_TEST(InterpolateTest, OutputInPlaceOfATableColumn) {
     for (const unsigned flags : {0u, 1u, 3u, 5u}) {
         Signal<R> want, a = x, b = y, c = moments;
         Borrowed<R> host(y);
-        ASSERT_EQ(this->interpolate(x, y, nullptr, t, want, flags), 0);
-        ASSERT_EQ(this->interpolate(a, y, moments, t, a, flags), 0);
-        ASSERT_EQ(this->interpolate(x, b, moments, t, b, flags), 0);
-        ASSERT_EQ(this->interpolate(x, y, c, t, c, flags), 0);
-        ASSERT_EQ(this->interpolate(x, host, nullptr, t, host, flags), 0);
+        ASSERT_EQ(dsp_interp(x, y, nullptr, t, want, flags), 0);
+        ASSERT_EQ(dsp_interp(a, y, moments, t, a, flags), 0);
+        ASSERT_EQ(dsp_interp(x, b, moments, t, b, flags), 0);
+        ASSERT_EQ(dsp_interp(x, y, c, t, c, flags), 0);
+        ASSERT_EQ(dsp_interp(x, host, nullptr, t, host, flags), 0);
         for (const R* got : {a.get(), b.get(), c.get(), &host.record}) {
             EXPECT_TRUE(matches<R>(got, want)) << flags;
             EXPECT_EQ(got->delta, 3);
         }
         EXPECT_EQ(host.host, scalars<R>(y));
     }
-    ASSERT_EQ(this->interpolate(all, all, nullptr, all, all, 5), 0);  // y = x at t = x
+    ASSERT_EQ(dsp_interp(all, all, nullptr, all, all, 5), 0);  // y = x at t = x
     EXPECT_TRUE(matches<R>(all, x, 4));
 }
 
-TYPED_TEST(InterpolateTest, Refusals) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Interpolate, Refusals) {
     const auto x = real<R>({0, 1, 2, 3, 4}), z = complex<R>({0, 1, 2, 3, 4});
     const auto four = real<R>({0, 1, 2, 3});
     auto out = real<R>({7}, 3);
-    EXPECT_EQ(this->interpolate(z, x, nullptr, x, out, 1), -1);
-    EXPECT_EQ(this->interpolate(x, z, nullptr, x, out, 1), -1);
-    EXPECT_EQ(this->interpolate(x, x, nullptr, z, out, 1), -1);
-    EXPECT_EQ(this->interpolate(x, four, nullptr, x, out, 1), -1);
-    EXPECT_EQ(this->interpolate(x, x, four, x, out, 5), -1);
-    EXPECT_EQ(this->interpolate(x, x, z, x, out, 5), -1);
-    EXPECT_EQ(this->interpolate(four, four, nullptr, x, out, 5), -1);
+    EXPECT_EQ(dsp_interp(z, x, nullptr, x, out, 1), -1);
+    EXPECT_EQ(dsp_interp(x, z, nullptr, x, out, 1), -1);
+    EXPECT_EQ(dsp_interp(x, x, nullptr, z, out, 1), -1);
+    EXPECT_EQ(dsp_interp(x, four, nullptr, x, out, 1), -1);
+    EXPECT_EQ(dsp_interp(x, x, four, x, out, 5), -1);
+    EXPECT_EQ(dsp_interp(x, x, z, x, out, 5), -1);
+    EXPECT_EQ(dsp_interp(four, four, nullptr, x, out, 5), -1);
     EXPECT_TRUE(is_real<R>(out, {7}));
 
     // A segment without a length fails when the search enters it, even in passing, not before.
@@ -106,21 +96,20 @@ TYPED_TEST(InterpolateTest, Refusals) {
     early->points = 2;
     for (const unsigned method : {0u, 1u, 2u, 4u, 5u, 6u, 7u}) {
         const bool moves = method < 2 || method == 5;
-        EXPECT_EQ(this->interpolate(step, four, four, early, out, method), 0) << method;
-        EXPECT_EQ(this->interpolate(step, four, four, inside, out, method), moves ? -1 : 0);
-        EXPECT_EQ(this->interpolate(step, four, four, real<R>({1}), out, method), -1) << method;
+        EXPECT_EQ(dsp_interp(step, four, four, early, out, method), 0) << method;
+        EXPECT_EQ(dsp_interp(step, four, four, inside, out, method), moves ? -1 : 0);
+        EXPECT_EQ(dsp_interp(step, four, four, real<R>({1}), out, method), -1) << method;
     }
-    EXPECT_EQ(this->interpolate(step, four, nullptr, early, out, 3), -1);
-    EXPECT_EQ(this->interpolate(real<R>({1, 1}), real<R>({1, 1}), nullptr, early, out, 17), 0);
+    EXPECT_EQ(dsp_interp(step, four, nullptr, early, out, 3), -1);
+    EXPECT_EQ(dsp_interp(real<R>({1, 1}), real<R>({1, 1}), nullptr, early, out, 17), 0);
     EXPECT_EQ(fail_each_growth<R>([&] {
                   Borrowed<R> y(x);
-                  return this->interpolate(x, y, nullptr, x, y, 5);
+                  return dsp_interp(x, y, nullptr, x, y, 5);
               }),
               3);
 }
 
-TYPED_TEST(InterpolateTest, InterleavesAllKinds) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Interpolate, InterleavesAllKinds) {
     const auto a = real<R>({1, 2, 3}, 1), b = complex<R>({{4, 5}, {6, -0.0L}, {8, 9}}, 3);
     const auto c = real<R>({-1, -2, -3}, 1);
     const struct {
@@ -131,24 +120,24 @@ TYPED_TEST(InterpolateTest, InterleavesAllKinds) {
                  {b, a, complex<R>({{4, 5}, 1, {6, -0.0L}, 2, {8, 9}, 3}, 1)}};
     for (const auto& k : cases) {
         in_every_place(k.first, [&](const R* first, R* out) {
-            ASSERT_EQ(this->interleave(first, k.second, out), 0);
+            ASSERT_EQ(dspb_inter(first, k.second, out), 0);
             EXPECT_TRUE(matches<R>(out, k.want));
             EXPECT_EQ(out->delta, k.want->delta);
         });
         in_every_place(k.second, [&](const R* second, R* out) {
-            ASSERT_EQ(this->interleave(k.first, second, out), 0);
+            ASSERT_EQ(dspb_inter(k.first, second, out), 0);
             EXPECT_TRUE(matches<R>(out, k.want));
         });
     }
     in_every_place(a, [&](const R* in, R* out) {
-        ASSERT_EQ(this->interleave(in, in, out), 0);
+        ASSERT_EQ(dspb_inter(in, in, out), 0);
         EXPECT_TRUE(is_real<R>(out, {1, 1, 2, 2, 3, 3}));
     });
     auto out = real<R>({7});
-    EXPECT_EQ(this->interleave(a, real<R>({1}), out), -1);
+    EXPECT_EQ(dspb_inter(a, real<R>({1}), out), -1);
     EXPECT_TRUE(is_real<R>(out, {7}));
     R endless{1, nullptr, 0, INT_MAX / 2 + 1, 0, 0};
-    EXPECT_EQ(this->interleave(&endless, &endless, out), -1);
+    EXPECT_EQ(dspb_inter(&endless, &endless, out), -1);
 }
 
 }  // namespace

@@ -7,10 +7,6 @@ namespace {
 
 using List = std::vector<long double>;
 
-template <class R>
-class SplineTest : public ::testing::Test {};
-TYPED_TEST_SUITE(SplineTest, Precisions);
-
 /// How far the cubics between the knots are from joining as they should, beside the terms: equal
 /// first derivatives at inner knots; at an end equal third ones across the second knot, or the
 /// given first or second derivative.
@@ -39,14 +35,13 @@ long double misfit(const List& x, const List& y, const R* moments, long double d
     return worst;
 }
 
-TYPED_TEST(SplineTest, AllEndsOnUnevenKnots) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Spline, AllEndsOnUnevenKnots) {
     Noise noise(9);
     for (const int n : {5, 6, 7, 40}) {
         List x{-3}, y{0.5L};
         while (int(x.size()) < n) {
-            x.push_back(scalar<R>(x.back() + 0.05L + std::pow(noise(), 2)));
-            y.push_back(scalar<R>(noise()));
+            x.push_back(T(x.back() + 0.05L + std::pow(noise(), 2)));
+            y.push_back(T(noise()));
         }
         const auto knots = real<R>(x, 1), ordinates = real<R>(y, 4);
         for (int codes = 0; codes < 16; ++codes) {
@@ -61,7 +56,7 @@ TYPED_TEST(SplineTest, AllEndsOnUnevenKnots) {
             for (const auto v : values(m.get()))
                 largest = std::max<long double>(largest, std::fabs(v));
             EXPECT_LT(misfit<R>(x, y, m, 2, -3, start, end), 40 * epsilon<R> * largest) << codes;
-            EXPECT_EQ(m->delta, scalar<R>(2.5));
+            EXPECT_EQ(m->delta, T(2.5));
             ASSERT_EQ(call(in_x, ordinates, in_x) || call(knots, in_y, in_y), 0);
             ASSERT_EQ(call(knots, host, host), 0);
             for (const R* got : {in_x.get(), in_y.get(), &host.record}) {
@@ -73,8 +68,7 @@ TYPED_TEST(SplineTest, AllEndsOnUnevenKnots) {
     }
 }
 
-TYPED_TEST(SplineTest, CubicsComeBack) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Spline, CubicsComeBack) {
     const auto cubic = [](long double t) { return ((2 * t - 3) * t + 1) * t - 4; };
     List x{-2, -1.5L, -0.25L, 0, 1, 1.125L, 3}, y, t, want;
     for (const auto v : x) y.push_back(cubic(v));
@@ -82,14 +76,12 @@ TYPED_TEST(SplineTest, CubicsComeBack) {
         t.push_back(i / 8.0L);
         want.push_back(cubic(t.back()));
     }
-    const auto spline = pick<R>(dsp_cspline, dspf_cspline);
     Signal<R> out;
-    ASSERT_EQ(spline(real<R>(x), real<R>(y), nullptr, real<R>(t), out), 0);
+    ASSERT_EQ(dsp_cspline(real<R>(x), real<R>(y), nullptr, real<R>(t), out), 0);
     EXPECT_TRUE(is_real<R>(out, want, 8));
 }
 
-TYPED_TEST(SplineTest, RefusalsLeaveTheTable) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Spline, RefusalsLeaveTheTable) {
     const auto x = real<R>({0, 1, 3, 4, 6}), y = real<R>({1, 5, 2, 2, 7});
     const auto four = real<R>({0, 1, 2, 3}), z = complex<R>({0, 1, 2, 3, 4});
     auto out = real<R>({7}, 3);

@@ -4,17 +4,10 @@
 #include "support/failing_allocator.hpp"
 #include "support/signals.hpp"
 
-inline int dspi_zinter(dspf* x) { return dspfi_zinter(x); }
-
 namespace wavkit::test {
 namespace {
 
-template <class R>
-class LayoutTest : public ::testing::Test {};
-TYPED_TEST_SUITE(LayoutTest, Precisions);
-
-TYPED_TEST(LayoutTest, RotationsBringThePointsToTheMiddleAndBack) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Layout, RotationsBringThePointsToTheMiddleAndBack) {
     EXPECT_TRUE(turns(dspi_swap_halves2, real<R>({1, 2, 3, 4, 5}), real<R>({3, 4, 5, 1, 2})));
     for (int n = 0; n < 20; ++n) {
         const auto x = Noise().complex<R>(n);
@@ -26,8 +19,7 @@ TYPED_TEST(LayoutTest, RotationsBringThePointsToTheMiddleAndBack) {
     }
 }
 
-TYPED_TEST(LayoutTest, PaddingAndTrimmingAreInverse) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Layout, PaddingAndTrimmingAreInverse) {
     const struct {
         int mode;
         std::vector<long double> padded, in_odd;
@@ -49,8 +41,7 @@ TYPED_TEST(LayoutTest, PaddingAndTrimmingAreInverse) {
     }
 }
 
-TYPED_TEST(LayoutTest, ModesScaleOrFail) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Layout, ModesScaleOrFail) {
     auto amplitude = complex<R>({{1, -2}, {3, 4}}), power = amplitude;
     ASSERT_EQ(dspi_zpad2(amplitude, 6, 0x300) || dspi_zpad2(power, 6, 0x301), 0);
     EXPECT_TRUE(is_complex<R>(amplitude, {{3, -6}, 0, 0, 0, 0, {9, 12}}));
@@ -67,13 +58,12 @@ TYPED_TEST(LayoutTest, ModesScaleOrFail) {
     }
 }
 
-TYPED_TEST(LayoutTest, GrowthLeavesTheHostsArrayAndReportsFailure) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Layout, GrowthLeavesTheHostsArrayAndReportsFailure) {
     Borrowed<R> x(complex<R>({{1, 2}, {3, 4}}));
     const auto before = x.host;
     ASSERT_EQ(dspi_zpad(x, 1) || dspi_zpad(x, 3) || dspi_zinter(x), 0);
     EXPECT_TRUE(is_complex<R>(x, {{1, 2}, 0, {3, 4}, 0, 0, 0}));
-    EXPECT_EQ(x->delta, scalar<R>(0.5));
+    EXPECT_EQ(x->delta, T(0.5));
     EXPECT_EQ(x.host, before);
     EXPECT_TRUE(turns(dspi_zinter, real<R>({1, 2}), real<R>({1, 0, 2, 0})));
     x->points = -3;

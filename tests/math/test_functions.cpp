@@ -14,12 +14,7 @@ constexpr auto nan = std::numeric_limits<long double>::quiet_NaN();
 constexpr auto inf = std::numeric_limits<long double>::infinity();
 const long double pi_exact = std::acos(-1.0L), ln_10 = std::log(10.0L);
 
-template <class R>
-class FunctionsTest : public ::testing::Test {};
-TYPED_TEST_SUITE(FunctionsTest, Precisions);
-
-TYPED_TEST(FunctionsTest, AgreeWithTheExactFunctions) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Functions, AgreeWithTheExactFunctions) {
     const long double big = limits<R>::big, last = limits<R>::exp_limit, floor = limits<R>::floor;
     const auto plain = [](long double (*f)(long double)) { return Exact(f); };
     const auto within_1 = [](long double (*f)(long double)) {
@@ -41,30 +36,26 @@ TYPED_TEST(FunctionsTest, AgreeWithTheExactFunctions) {
         bool refuses_complex = true;
     } cases[] = {
         {dspi_log, log, {0, -0.0L, -3, floor / 2, floor, 1, 2.5L, inf, -inf}, false},
-        {pick<R>(dspi_log10, dspfi_log10), log10, {0, -3, floor / 2, 1, 2.5L, inf, -inf}, false},
+        {dspi_log10, log10, {0, -3, floor / 2, 1, 2.5L, inf, -inf}, false},
         {dspi_exp, exp, {-1000, 0, 1, 2.5L}, false},
         {dspi_exp, exp, {last * 1.0001L, 231}, false},
-        {pick<R>(dspi_abs, dspfi_abs), plain(std::fabs), {-2, -0.0L, 3}},
-        {pick<R>(dspi_sin, dspfi_sin), plain(std::sin), {-2, 0, 0.5L, 30}},
-        {pick<R>(dspi_cos, dspfi_cos), plain(std::cos), {-2, 0, 0.5L, 30}},
-        {pick<R>(dspi_tan, dspfi_tan), plain(std::tan), {-2, 0, 0.5L, 30}},
-        {pick<R>(dspi_atan, dspfi_atan), plain(std::atan), {-2, 0, 0.5L, 1e9L}},
-        {pick<R>(dspi_tanh, dspfi_tanh), plain(std::tanh), {-2, 0, 0.5L, 1e9L}},
-        {pick<R>(dspi_acos, dspfi_acos), within_1(std::acos), {-1, 0, 0.5L, 1, 1.5L, -1.5L}},
-        {pick<R>(dspi_asin, dspfi_asin), within_1(std::asin), {-1, 0, 0.5L, 1, 1.5L, -1.5L}},
-        {pick<R>(dspi_cosh, dspfi_cosh), cosh, {0, -0.5L, 2}},
-        {pick<R>(dspi_cosh, dspfi_cosh), cosh, {231, -231}},
-        {pick<R>(dspi_sinh, dspfi_sinh), sinh, {0, -0.5L, 2}},
-        {pick<R>(dspi_sinh, dspfi_sinh), sinh, {231, -231}},
-        {pick<R>(dspi_sinc, dspfi_sinc), sinc, {0, -0.0L, 0.5L, -2}},
-        {pick<R>(dspi_besj0, dspfi_besj0),
-         std::bind_front(std::cyl_bessel_jl, 0),
-         {0, 0.5L, 2, 12}},
-        {pick<R>(dspi_besj1, dspfi_besj1),
-         std::bind_front(std::cyl_bessel_jl, 1),
-         {0, 0.5L, 2, 12}},
-        {pick<R>(dspi_besy0, dspfi_besy0), y(0), {-1, 0, 0.5L, 2, 12}},
-        {pick<R>(dspi_besy1, dspfi_besy1), y(1), {-1, 0, 0.5L, 2, 12}},
+        {dspi_abs, plain(std::fabs), {-2, -0.0L, 3}},
+        {dspi_sin, plain(std::sin), {-2, 0, 0.5L, 30}},
+        {dspi_cos, plain(std::cos), {-2, 0, 0.5L, 30}},
+        {dspi_tan, plain(std::tan), {-2, 0, 0.5L, 30}},
+        {dspi_atan, plain(std::atan), {-2, 0, 0.5L, 1e9L}},
+        {dspi_tanh, plain(std::tanh), {-2, 0, 0.5L, 1e9L}},
+        {dspi_acos, within_1(std::acos), {-1, 0, 0.5L, 1, 1.5L, -1.5L}},
+        {dspi_asin, within_1(std::asin), {-1, 0, 0.5L, 1, 1.5L, -1.5L}},
+        {dspi_cosh, cosh, {0, -0.5L, 2}},
+        {dspi_cosh, cosh, {231, -231}},
+        {dspi_sinh, sinh, {0, -0.5L, 2}},
+        {dspi_sinh, sinh, {231, -231}},
+        {dspi_sinc, sinc, {0, -0.0L, 0.5L, -2}},
+        {dspi_besj0, std::bind_front(std::cyl_bessel_jl, 0), {0, 0.5L, 2, 12}},
+        {dspi_besj1, std::bind_front(std::cyl_bessel_jl, 1), {0, 0.5L, 2, 12}},
+        {dspi_besy0, y(0), {-1, 0, 0.5L, 2, 12}},
+        {dspi_besy1, y(1), {-1, 0, 0.5L, 2, 12}},
     };
     for (std::size_t k = 0; k < std::size(cases); ++k) {
         const auto& c = cases[k];
@@ -77,9 +68,8 @@ TYPED_TEST(FunctionsTest, AgreeWithTheExactFunctions) {
     }
 }
 
-TYPED_TEST(FunctionsTest, ComplexLogarithmsClampTheirOwnWay) {
-    using R = TypeParam;
-    const auto db = [](R* x) { return pick<R>(dspi_db, dspfi_db)(x, 10); };
+BOTH_PRECISIONS(Functions, ComplexLogarithmsClampTheirOwnWay) {
+    const auto db = [](R* x) { return dspi_db(x, 10); };
     const long double big = limits<R>::big, floor = limits<R>::floor;
     const long double lowest = std::log(floor), tiny = std::sqrt(floor) / 2;
     const auto in =
@@ -100,41 +90,36 @@ TYPED_TEST(FunctionsTest, ComplexLogarithmsClampTheirOwnWay) {
     EXPECT_TRUE(turns(db, real<R>({10, 0}), real<R>({10, 10 * lowest / ln_10}), 1));
 }
 
-TYPED_TEST(FunctionsTest, ExponentialsSaturateAndPowersOfTenStall) {
-    using R = TypeParam;
-    const auto exp10 = pick<R>(dspi_exp10, dspfi_exp10);
+BOTH_PRECISIONS(Functions, ExponentialsSaturateAndPowersOfTenStall) {
     const long double big = limits<R>::big, beyond = limits<R>::exp10_limit + 1;
     EXPECT_TRUE(turns(dspi_exp, complex<R>({{0.75L, -2}, {0, pi_exact}}),
                       complex<R>({std::exp(Complex(0.75L, -2)), -1}), 1));
     EXPECT_TRUE(turns(dspi_exp, complex<R>({{231, 3}}), complex<R>({std::polar(big, 3.0L)}), 1));
-    EXPECT_TRUE(
-        turns(exp10, real<R>({1, -2, 0.5L, nan}), real<R>({10, 0.01L, std::sqrt(10.0L), nan}), 4));
-    EXPECT_TRUE(turns(exp10, real<R>({beyond, -big, -2 * big, 2, beyond}),
+    EXPECT_TRUE(turns(dspi_exp10, real<R>({1, -2, 0.5L, nan}),
+                      real<R>({10, 0.01L, std::sqrt(10.0L), nan}), 4));
+    EXPECT_TRUE(turns(dspi_exp10, real<R>({beyond, -big, -2 * big, 2, beyond}),
                       real<R>({big, 0, -2 * big, 2, beyond})));
-    EXPECT_TRUE(turns(exp10, complex<R>({{1, 0.25L}, {-1, 0}}),
+    EXPECT_TRUE(turns(dspi_exp10, complex<R>({{1, 0.25L}, {-1, 0}}),
                       complex<R>({std::polar(10.0L, ln_10 / 4), 0.1L}), 4));
-    EXPECT_TRUE(turns(exp10, complex<R>({{beyond, 0}, {-2 * big, 1}}),
+    EXPECT_TRUE(turns(dspi_exp10, complex<R>({{beyond, 0}, {-2 * big, 1}}),
                       complex<R>({big, std::polar(big, ln_10 + pi_exact)}), 4));
 }
 
-TYPED_TEST(FunctionsTest, ModifiedBesselIsExactOverItsRange) {
-    using R = TypeParam;
-    const auto besi0 = pick<R>(dspi_besi0, dspfi_besi0);
+BOTH_PRECISIONS(Functions, ModifiedBesselIsExactOverItsRange) {
     for (long double t = 0; t < (std::same_as<R, dsp> ? 700 : 91); t += 0.375L) {
         long double term = 1, exact = 1;  // the power series, which has positive terms only
         for (int k = 1; term > exact * 1e-21L; ++k) exact += term *= t * t / 4 / k / k;
-        EXPECT_TRUE(turns(besi0, real<R>({-t}), real<R>({exact}), 4)) << double(t);
+        EXPECT_TRUE(turns(dspi_besi0, real<R>({-t}), real<R>({exact}), 4)) << double(t);
     }
     const long double big = limits<R>::big;
-    EXPECT_TRUE(turns(besi0, real<R>({700.5L, -1e9L, nan}), real<R>({big, big, nan})));
+    EXPECT_TRUE(turns(dspi_besi0, real<R>({700.5L, -1e9L, nan}), real<R>({big, big, nan})));
     EXPECT_TRUE(turns(dspfi_besi0, real<dspf>({92.5L, 699}), real<dspf>({1e15L, 1e15L})));
 }
 
-TYPED_TEST(FunctionsTest, UnavailableOnesFail) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Functions, UnavailableOnesFail) {
     auto x = real<R>({1});
-    EXPECT_EQ(pick<R>(dspi_gamma, dspfi_gamma)(x) + pick<R>(dspi_lgamma, dspfi_lgamma)(x), -2);
-    EXPECT_EQ(pick<R>(dspi_erf, dspfi_erf)(x) + pick<R>(dspi_erfc, dspfi_erfc)(x), -2);
+    EXPECT_EQ(dspi_gamma(x) + dspi_lgamma(x), -2);
+    EXPECT_EQ(dspi_erf(x) + dspi_erfc(x), -2);
     EXPECT_TRUE(is_real<R>(x, {1}));
 }
 

@@ -11,14 +11,9 @@ namespace {
 constexpr auto nan = std::numeric_limits<long double>::quiet_NaN();
 constexpr auto inf = std::numeric_limits<long double>::infinity();
 
-template <class R>
-class ScalingTest : public ::testing::Test {};
-TYPED_TEST_SUITE(ScalingTest, Precisions);
-
-TYPED_TEST(ScalingTest, SignsScaleAndOffset) {
-    using R = TypeParam;
-    const auto halve = [](R* x) { return dspi_scale(x, scalar<R>(0.5)); };
-    const auto raise = [](R* x) { return pick<R>(dspi_offset, dspfi_offset)(x, 4); };
+BOTH_PRECISIONS(Scaling, SignsScaleAndOffset) {
+    const auto halve = [](R* x) { return dspi_scale(x, T(0.5)); };
+    const auto raise = [](R* x) { return dspi_offset(x, 4); };
     const auto x = real<R>({0, -1.5L, nan, inf});
     const auto z = complex<R>({{1, 2}, {-3, 0}});
     EXPECT_TRUE(turns(dspi_neg, x, real<R>({-0.0L, 1.5L, nan, -inf})));
@@ -31,8 +26,7 @@ TYPED_TEST(ScalingTest, SignsScaleAndOffset) {
     EXPECT_TRUE(turns(raise, z, complex<R>({{5, 2}, {1, 0}})));
 }
 
-TYPED_TEST(ScalingTest, ZeroLeavesTheHostsArray) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Scaling, ZeroLeavesTheHostsArray) {
     const auto z = complex<R>({{1, 2}, {3, 4}});
     Borrowed<R> borrowed(z);
     EXPECT_EQ(dspi_zero(borrowed), 0);
@@ -42,9 +36,7 @@ TYPED_TEST(ScalingTest, ZeroLeavesTheHostsArray) {
     EXPECT_TRUE(turns(dspi_zero, z, complex<R>({0, 0})));
 }
 
-TYPED_TEST(ScalingTest, LimitTellsWhetherAValueMoved) {
-    using R = TypeParam;
-    const auto limit = pick<R>(dspi_limit, dspfi_limit);
+BOTH_PRECISIONS(Scaling, LimitTellsWhetherAValueMoved) {
     const struct {
         std::vector<long double> in, out;
         long double a, b;
@@ -57,17 +49,16 @@ TYPED_TEST(ScalingTest, LimitTellsWhetherAValueMoved) {
     for (const auto& c : cases) {
         auto x = real<R>(c.in);
         int clipped = 7;
-        ASSERT_EQ(limit(x, scalar<R>(c.a), scalar<R>(c.b), &clipped), 0);
+        ASSERT_EQ(dspi_limit(x, T(c.a), T(c.b), &clipped), 0);
         EXPECT_TRUE(is_real<R>(x, c.out));
         EXPECT_EQ(clipped, c.clipped);
     }
     auto z = complex<R>({{0, 3}, {-4, 1}});
-    ASSERT_EQ(limit(z, -1, 1, nullptr), 0);
+    ASSERT_EQ(dspi_limit(z, -1, 1, nullptr), 0);
     EXPECT_TRUE(is_complex<R>(z, {{0, 1}, {-1, 1}}));
 }
 
-TYPED_TEST(ScalingTest, ReciprocalSaturates) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Scaling, ReciprocalSaturates) {
     const long double big = limits<R>::big;
     EXPECT_TRUE(
         turns(dspi_recip, real<R>({0, -0.0L, -4, inf, nan}), real<R>({big, big, -0.25L, 0, nan})));
@@ -77,8 +68,7 @@ TYPED_TEST(ScalingTest, ReciprocalSaturates) {
                       complex<R>({{0.12L, 0.16L}, {2, -1}, {nan, nan}}), 1));
 }
 
-TYPED_TEST(ScalingTest, SortKeepsEveryValue) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Scaling, SortKeepsEveryValue) {
     const long double big = limits<R>::big;
     EXPECT_TRUE(turns(dspi_sort, real<R>({3, -inf, nan, 1, 2, -7, inf, nan, 1}),
                       real<R>({-inf, -7, 1, 1, 2, 3, inf, nan, nan})));
@@ -92,17 +82,15 @@ TYPED_TEST(ScalingTest, SortKeepsEveryValue) {
     EXPECT_TRUE(turns(dspi_sort, noise, expected));
 }
 
-TYPED_TEST(ScalingTest, ReversalAndShiftKeepPointsWhole) {
-    using R = TypeParam;
-    const auto shift = pick<R>(dspi_shift, dspfi_shift);
+BOTH_PRECISIONS(Scaling, ReversalAndShiftKeepPointsWhole) {
     auto z = complex<R>({{1, 2}, {3, 4}, {5, 6}});
-    ASSERT_EQ(dspi_rev(z) || shift(z, 1) || shift(z, INT_MIN), 0);
+    ASSERT_EQ(dspi_rev(z) || dspi_shift(z, 1) || dspi_shift(z, INT_MIN), 0);
     EXPECT_TRUE(is_complex<R>(z, {{3, 4}, {1, 2}}));
     Borrowed<R> x(real<R>({1, 2, 3, 4}));
-    ASSERT_EQ(dspi_rev(x) || shift(x, 1), 0);
+    ASSERT_EQ(dspi_rev(x) || dspi_shift(x, 1), 0);
     EXPECT_TRUE(is_real<R>(x, {3, 2, 1}));
-    EXPECT_EQ(x.host, (std::vector<scalar<R>>{4, 3, 2, 1}));
-    EXPECT_EQ(shift(x, INT_MAX) || shift(z, 3), 0);
+    EXPECT_EQ(x.host, (std::vector<T>{4, 3, 2, 1}));
+    EXPECT_EQ(dspi_shift(x, INT_MAX) || dspi_shift(z, 3), 0);
     EXPECT_EQ(x->points + z->points, 0);
 }
 

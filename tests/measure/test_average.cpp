@@ -9,32 +9,19 @@ namespace {
 
 template <class R>
 constexpr R* null = nullptr;
-template <class R>
-constexpr auto average = pick<R>(dsph_avg, dspfh_avg);
-template <class R>
-constexpr auto slide = pick<R>(dsph_corr, dspfh_corr);
-template <class R>
-constexpr auto correlate = pick<R>(dspb_corr, dspfb_corr);
-
-template <class R>
-class AverageTest : public ::testing::Test {};
-TYPED_TEST_SUITE(AverageTest, Precisions);
-
-TYPED_TEST(AverageTest, TheFirstSpectrumStartsEveryAverage) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Average, TheFirstSpectrumStartsEveryAverage) {
     for (int type = 0; type < 16; ++type) {
         for (const int count : {1, 0, -3}) {
             auto x = complex<R>({{1, 2}, {3, 4}}, 0.5);
             auto avg = real<R>({9});
-            ASSERT_EQ(average<R>(x, avg, null<R>, type, count, 0, -1, 0), 0);
+            ASSERT_EQ(dsph_avg(x, avg, null<R>, type, count, 0, -1, 0), 0);
             EXPECT_TRUE(is_complex<R>(avg, {{1, 2}, {3, 4}}));
-            EXPECT_EQ(avg->delta, scalar<R>(0.5));
+            EXPECT_EQ(avg->delta, T(0.5));
         }
     }
 }
 
-TYPED_TEST(AverageTest, EachTypeByHand) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Average, EachTypeByHand) {
     const struct {
         int flags, count, every;
         double weight, limit;
@@ -64,8 +51,8 @@ TYPED_TEST(AverageTest, EachTypeByHand) {
             auto x = real<R>({2, 8});
             auto avg = real<R>({4, 2});
             Signal<R> scratch;
-            ASSERT_EQ(average<R>(x, avg, with_scratch ? scratch.get() : null<R>, c.flags, c.count,
-                                 c.every, scalar<R>(c.weight), scalar<R>(c.limit)),
+            ASSERT_EQ(dsph_avg(x, avg, with_scratch ? scratch.get() : null<R>, c.flags, c.count,
+                               c.every, T(c.weight), T(c.limit)),
                       0);
             EXPECT_TRUE(is_real<R>(avg, c.expected, 8)) << c.flags << ' ' << c.count;
             EXPECT_TRUE(is_real<R>(x, {2, 8}));
@@ -73,31 +60,29 @@ TYPED_TEST(AverageTest, EachTypeByHand) {
     }
 }
 
-TYPED_TEST(AverageTest, TheInputMayServeAsScratch) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Average, TheInputMayServeAsScratch) {
     auto x = complex<R>({{3, 4}, {0, 2}});
     auto avg = real<R>({5, 0});
-    ASSERT_EQ(average<R>(x, avg, x, 0x21, 2, 0, -1, 0), 0);
+    ASSERT_EQ(dsph_avg(x, avg, x, 0x21, 2, 0, -1, 0), 0);
     EXPECT_TRUE(is_real<R>(avg, {15, 2}));
     auto y = real<R>({2, 8});
     auto harmonic = real<R>({4, 2});
-    ASSERT_EQ(average<R>(y, harmonic, y, 4, 2, 0, -1, 0), 0);
+    ASSERT_EQ(dsph_avg(y, harmonic, y, 4, 2, 0, -1, 0), 0);
     EXPECT_TRUE(is_real<R>(harmonic, {8 / 3.0L, 16 / 5.0L}, 4));
 }
 
-TYPED_TEST(AverageTest, FailureLeavesTheAverageAsItWas) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Average, FailureLeavesTheAverageAsItWas) {
     for (const int flags : {1, 2, 4, 5, 0x21}) {
         auto x = real<R>({2, 8});
         auto avg = real<R>({4, 2, 1});
-        EXPECT_EQ(average<R>(x, avg, null<R>, flags, 2, 0, -1, 0), -1);
+        EXPECT_EQ(dsph_avg(x, avg, null<R>, flags, 2, 0, -1, 0), -1);
         EXPECT_TRUE(is_real<R>(avg, {4, 2, 1}, 4)) << flags;
     }
     for (const int flags : {4, 5, 0x21, 0x24}) {
         auto x = real<R>({2, 8});
         auto avg = real<R>({4, 2});
         fail_each_growth<R>([&] {
-            const int result = average<R>(x, avg, null<R>, flags, 2, 0, 0, 0);
+            const int result = dsph_avg(x, avg, null<R>, flags, 2, 0, 0, 0);
             EXPECT_NEAR(avg[0], 4, 16 * epsilon<R>) << flags;
             EXPECT_NEAR(avg[1], 2, 16 * epsilon<R>) << flags;
             return result;
@@ -130,8 +115,7 @@ Samples correlation(const Samples& a, const Samples& b, std::size_t m) {
     return sums;
 }
 
-TYPED_TEST(AverageTest, CorrelationBySlidingSums) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Average, CorrelationBySlidingSums) {
     Noise noise;
     for (const auto& sizes : {std::pair{1, 1}, {2, 1}, {5, 5}, {8, 3}, {100, 37}, {129, 1}}) {
         const int points = sizes.first, m = sizes.second;  // clang 14 captures no bindings
@@ -145,44 +129,43 @@ TYPED_TEST(AverageTest, CorrelationBySlidingSums) {
             const auto check = [&](R* out, const char* what) {
                 EXPECT_EQ(bool(out->complex), kinds != 0) << what;
                 ASSERT_EQ(out->points, points - m + 1);
-                EXPECT_EQ(out->delta, scalar<R>(1.5));
+                EXPECT_EQ(out->delta, T(1.5));
                 const Samples got = samples_of<R>(out);
                 for (std::size_t k = 0; k < got.size(); ++k) {
                     EXPECT_LT(std::abs(got[k] - expected[k]), 16 * epsilon<R>) << what << points;
                 }
             };
             Signal<R> out, scratch;
-            ASSERT_EQ(correlate<R>(a, b, out, scratch, m), 0);
+            ASSERT_EQ(dspb_corr(a, b, out, scratch, m), 0);
             check(out, "apart");
             // The output, or the scratch record, may be any of the operands.
             const Signal<R> first = a, second = b;
-            ASSERT_EQ(correlate<R>(a, b, a, null<R>, m), 0);
+            ASSERT_EQ(dspb_corr(a, b, a, null<R>, m), 0);
             check(a, "over a");
             a = first;
-            ASSERT_EQ(correlate<R>(a, b, b, a, m), 0);
+            ASSERT_EQ(dspb_corr(a, b, b, a, m), 0);
             check(b, "over b");
             EXPECT_TRUE(matches<R>(a, first));
             b = second;
             Borrowed<R> host(b);
-            ASSERT_EQ(correlate<R>(a, host, host, host, m), 0);
+            ASSERT_EQ(dspb_corr(a, host, host, host, m), 0);
             check(host, "over a host's array");
             EXPECT_EQ(host.host, scalars<R>(second));
         }
     }
 }
 
-TYPED_TEST(AverageTest, CorrelationLimits) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Average, CorrelationLimits) {
     auto a = real<R>({1, 2, 3}), b = real<R>({4, 5});
     Signal<R> out;
-    for (const int m : {0, -1, 3}) EXPECT_EQ(slide<R>(a, b, out, null<R>, m, 0), -1);
-    EXPECT_EQ(slide<R>(b, a, out, null<R>, 3, 0), -1);
+    for (const int m : {0, -1, 3}) EXPECT_EQ(dsph_corr(a, b, out, null<R>, m, 0), -1);
+    EXPECT_EQ(dsph_corr(b, a, out, null<R>, 3, 0), -1);
     EXPECT_EQ(out->points, 0);
-    ASSERT_EQ(slide<R>(a, b, out, null<R>, 2, 1), 0);
+    ASSERT_EQ(dsph_corr(a, b, out, null<R>, 2, 1), 0);
     EXPECT_TRUE(is_real<R>(out, {3.5L}, 2));
     EXPECT_GE(fail_each_growth<R>([&] {
                   Signal<R> result;
-                  return slide<R>(a, b, result, null<R>, 1, 0);
+                  return dsph_corr(a, b, result, null<R>, 1, 0);
               }),
               2);
 }

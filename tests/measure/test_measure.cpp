@@ -9,10 +9,6 @@
 namespace wavkit::test {
 namespace {
 
-template <class R>
-class MeasurementSpectrum : public ::testing::Test {};
-TYPED_TEST_SUITE(MeasurementSpectrum, Precisions);
-
 struct Setting {
     int points, npts;
     double fraction;
@@ -21,8 +17,7 @@ struct Setting {
 
 template <Record R>
 int measure(const R* in, R* out, Setting s) {
-    const auto fft = pick<R>(dsph_fft, dspfh_fft);
-    return fft(in, out, s.npts, scalar<R>(s.fraction), s.window, s.flags);
+    return dsph_fft(in, out, s.npts, scalar<R>(s.fraction), s.window, s.flags);
 }
 
 /// Whether the call gives this result into a record apart, in place, and into one that borrows the
@@ -69,8 +64,7 @@ Samples spectrum(const Signal<R>& in, Setting s) {
     return x;
 }
 
-TYPED_TEST(MeasurementSpectrum, FollowsItsDefinition) {
-    using R = TypeParam;
+BOTH_PRECISIONS(MeasurementSpectrum, FollowsItsDefinition) {
     // npts, fraction, window, flags
     const double settings[][4] = {
         {0, 1, 0, 0},       {0, std::nan(""), 2, 0}, {100, 1, 9, 0},     {32, 0.7, 6, 2},
@@ -87,8 +81,7 @@ TYPED_TEST(MeasurementSpectrum, FollowsItsDefinition) {
     }
 }
 
-TYPED_TEST(MeasurementSpectrum, ASineReadsItsAmplitude) {
-    using R = TypeParam;
+BOTH_PRECISIONS(MeasurementSpectrum, ASineReadsItsAmplitude) {
     std::vector<long double> sine;
     for (int i = 0; i < 256; ++i) sine.push_back(3 * unit_root(40 * i, 256).imag());
     for (int window : {0, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13}) {
@@ -97,13 +90,12 @@ TYPED_TEST(MeasurementSpectrum, ASineReadsItsAmplitude) {
             auto x = real<R>(sine, 0.5);
             ASSERT_EQ(measure<R>(x, x, {256, 0, 1, window, flags}), 0);
             EXPECT_NEAR(2 * std::abs(samples_of<R>(x)[bin]), amplitude, window < 8 ? 1e-5 : 4e-3);
-            EXPECT_EQ(x->delta, scalar<R>(1.0 / 128));
+            EXPECT_EQ(x->delta, T(1.0 / 128));
         }
     }
 }
 
-TYPED_TEST(MeasurementSpectrum, InverseReturnsTheRecord) {
-    using R = TypeParam;
+BOTH_PRECISIONS(MeasurementSpectrum, InverseReturnsTheRecord) {
     // points, npts, fraction, window, flags
     const double settings[][5] = {
         {64, 0, 1, 0, 8},          {64, 0, 1, 2, 8},    {64, 0, 1, 0, 0x0c},   {64, 0, 1, 0, 0x18},
@@ -126,12 +118,11 @@ TYPED_TEST(MeasurementSpectrum, InverseReturnsTheRecord) {
         for (int i = 0; i < n; ++i) {
             EXPECT_NEAR(out[i], 2 + (n > 4 ? 3 * unit_root(3 * i, n).real() : 0), 20 * epsilon<R>);
         }
-        EXPECT_EQ(out->delta, scalar<R>(4.0 / n));
+        EXPECT_EQ(out->delta, T(4.0 / n));
     }
 }
 
-TYPED_TEST(MeasurementSpectrum, EdgesAndFailures) {
-    using R = TypeParam;
+BOTH_PRECISIONS(MeasurementSpectrum, EdgesAndFailures) {
     auto x = real<R>({1, 2, 3, 4, 5});
     const auto before = x;
     for (int flags : {0, 1, 2, 3}) {

@@ -7,13 +7,9 @@
 namespace wavkit::test {
 namespace {
 
-template <class R>
-class AnyLengthSpectrum : public ::testing::Test {};
-TYPED_TEST_SUITE(AnyLengthSpectrum, Precisions);
-
 template <Record R>
 int measure(const R* in, R* out, int window, int flags) {
-    return pick<R>(dsph_dft, dspfh_dft)(in, out, window, flags);
+    return dsph_dft(in, out, window, flags);
 }
 
 /// The forward direction by a direct sum; the window's samples are the library's.
@@ -37,15 +33,14 @@ Samples spectrum(const Signal<R>& in, int window, int flags) {
     return bins;
 }
 
-TYPED_TEST(AnyLengthSpectrum, MatchesItsDefinitionAndComesBack) {
-    using R = TypeParam;
+BOTH_PRECISIONS(AnyLengthSpectrum, MatchesItsDefinitionAndComesBack) {
     Noise noise;
     for (const int n : {2, 5, 12, 16, 31}) {
         for (const int window : {0, 1, 2, 9, 14, 20, 23, -1}) {
             for (const int flags : {0, 2, 4, 6, 8, 0x0A, 0x0C, 0x10, 0x12, 0x18, 0x80}) {
                 if (window < 0 && !(flags & 0x88)) continue;
                 for (auto in : {noise.real<R>(n), noise.complex<R>(n)}) {
-                    in->delta = scalar<R>(0.5);
+                    in->delta = T(0.5);
                     Signal<R> apart, in_place = in, back;
                     ASSERT_EQ(measure<R>(in, apart, window, flags), 0);
                     ASSERT_EQ(measure<R>(in_place, in_place, window, flags), 0);
@@ -69,8 +64,7 @@ TYPED_TEST(AnyLengthSpectrum, MatchesItsDefinitionAndComesBack) {
     }
 }
 
-TYPED_TEST(AnyLengthSpectrum, RefusesWhatItCannotDo) {
-    using R = TypeParam;
+BOTH_PRECISIONS(AnyLengthSpectrum, RefusesWhatItCannotDo) {
     auto x = real<R>({1, 2, 3});
     EXPECT_EQ(measure<R>(nullptr, x, 0, 0), -1);
     EXPECT_EQ(measure<R>(x, nullptr, 0, 1), -1);
@@ -81,8 +75,7 @@ TYPED_TEST(AnyLengthSpectrum, RefusesWhatItCannotDo) {
 
 /// A sine of amplitude A reads A in its bin under every window, and half way between two bins no
 /// less than the window's scalloping allows.
-TYPED_TEST(AnyLengthSpectrum, SinesReadTheirAmplitude) {
-    using R = TypeParam;
+BOTH_PRECISIONS(AnyLengthSpectrum, SinesReadTheirAmplitude) {
     const int n = 300;
     const double scalloping[] = {0.63,  0.8,   0.84,  0.81,  0.87,  0.87,  0.9,  0.92,
                                  0.998, 0.998, 0.998, 0.998, 0.998, 0.998, 0.88, 0.89,
@@ -109,9 +102,7 @@ TYPED_TEST(AnyLengthSpectrum, SinesReadTheirAmplitude) {
 
 /// White noise of variance s^2 has the one-sided density 2 s^2 delta, whatever the window, once its
 /// noise bandwidth is taken into account.
-TYPED_TEST(AnyLengthSpectrum, NoiseReadsItsDensity) {
-    using R = TypeParam;
-    using T = scalar<R>;
+BOTH_PRECISIONS(AnyLengthSpectrum, NoiseReadsItsDensity) {
     const int n = 250, records = 80;
     const double delta = 0.01, variance = 1 / 3.0;  // of values spread evenly over [-1, 1)
     for (int window = 0; window < 24; ++window) {
@@ -121,11 +112,10 @@ TYPED_TEST(AnyLengthSpectrum, NoiseReadsItsDensity) {
             auto x = noise.real<R>(n);
             x->delta = T(delta);
             ASSERT_EQ(measure<R>(x, spectrum, window, 0), 0);
-            ASSERT_EQ(pick<R>(dsph_avg, dspfh_avg)(spectrum, average, power, 0x21, count, 0, -1, 0),
-                      0);
+            ASSERT_EQ(dsph_avg(spectrum, average, power, 0x21, count, 0, -1, 0), 0);
         }
         T enbw;
-        ASSERT_EQ(pick<R>(dsp_window_enbw, dspf_window_enbw)(&enbw, window, n), 0);
+        ASSERT_EQ(dsp_window_enbw(&enbw, window, n), 0);
         double mean = 0;
         for (int k = 10; k < 115; ++k) mean += average[k] / 105;
         const double density = mean / 2 / (double(enbw) * double(average->delta));

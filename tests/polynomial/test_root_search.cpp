@@ -8,19 +8,12 @@ namespace {
 using Z = std::complex<long double>;
 using List = std::vector<long double>;
 
-template <class R>
-struct RootSearchTest : ::testing::Test {
-    static constexpr auto evaluate = pick<R>(dsps_peval, dspfs_peval);
-};
-TYPED_TEST_SUITE(RootSearchTest, Precisions);
-
 /// Its root lies so far out that rounding its place leaves a residual above the tolerance, which
 /// vanishes in the arithmetic of the samples.
 const List far_out{400, std::ldexp(3.0L, -50)};
 const long double far_root = std::ldexp(-400 / 3.0L, 50);
 
-TYPED_TEST(RootSearchTest, RealRootsFollowTheStart) {
-    using R = TypeParam;
+BOTH_PRECISIONS(RootSearch, RealRootsFollowTheStart) {
     const struct {
         List c;
         double start;
@@ -42,15 +35,14 @@ TYPED_TEST(RootSearchTest, RealRootsFollowTheStart) {
     for (const auto& c : cases) {
         in_every_place(real<R>(c.c, 0.5), [&](const R* in, R* out) {
             const auto delta = in == out ? 1 : out->delta;
-            EXPECT_EQ(dsps_psolve(in, out, scalar<R>(c.start)), c.result);
+            EXPECT_EQ(dsps_psolve(in, out, T(c.start)), c.result);
             EXPECT_TRUE(is_real<R>(out, c.root, 2)) << &c - cases;
             EXPECT_EQ(out->delta, delta);
         });
     }
 }
 
-TYPED_TEST(RootSearchTest, ComplexRootsTellTheirKind) {
-    using R = TypeParam;
+BOTH_PRECISIONS(RootSearch, ComplexRootsTellTheirKind) {
     const struct {
         List c;
         Z start, root;
@@ -68,7 +60,7 @@ TYPED_TEST(RootSearchTest, ComplexRootsTellTheirKind) {
     for (const auto& c : cases) {
         in_every_place(real<R>(c.c, 0.5), [&](const R* in, R* out) {
             const auto delta = in == out ? 1 : out->delta;
-            const auto re = scalar<R>(c.start.real()), im = scalar<R>(c.start.imag());
+            const auto re = T(c.start.real()), im = T(c.start.imag());
             EXPECT_EQ(dsps_pcsolve(in, out, re, im), c.result);
             EXPECT_EQ(out->complex, c.complex) << &c - cases;
             ASSERT_GE(out->alloc, 2);
@@ -79,12 +71,11 @@ TYPED_TEST(RootSearchTest, ComplexRootsTellTheirKind) {
     }
 }
 
-TYPED_TEST(RootSearchTest, RandomPolynomialsFromRandomStarts) {
-    using R = TypeParam;
+BOTH_PRECISIONS(RootSearch, RandomPolynomialsFromRandomStarts) {
     Noise noise(3);
     for (int round = 0; round < 400; ++round) {
         const auto c = noise.real<R>(2 + round % 20);
-        const auto re = scalar<R>(3 * noise()), im = scalar<R>(3 * noise());
+        const auto re = T(3 * noise()), im = T(3 * noise());
         Signal<R> z, x;
         ASSERT_EQ(dsps_pcsolve(c, z, re, im), 0) << round;
         EXPECT_LT(residual(c, {z[0], z[1]}), 8) << round;
@@ -94,19 +85,18 @@ TYPED_TEST(RootSearchTest, RandomPolynomialsFromRandomStarts) {
     }
 }
 
-TYPED_TEST(RootSearchTest, ValuesRefusalsAndFailingMemory) {
-    using R = TypeParam;
+BOTH_PRECISIONS(RootSearch, ValuesRefusalsAndFailingMemory) {
     for (const auto& [c, want] : {std::pair<List, List>{{}, {0}}, {{5}, {5}}, {{1, 2, 3}, {17}}}) {
         in_every_place(real<R>(c, 0.5), [&, &value = want](const R* in, R* out) {
             const auto delta = out->delta;
-            EXPECT_EQ(this->evaluate(in, out, 2), 0);
+            EXPECT_EQ(dsps_peval(in, out, 2), 0);
             EXPECT_TRUE(is_real<R>(out, value));
             EXPECT_EQ(out->delta, delta);
         });
     }
     const auto z = complex<R>({{1, 2}, {3, 4}}, 7), c = real<R>({-1, 1});
     const std::pair<int (*)(const R*, R*), int> calls[] = {
-        {[](const R* in, R* out) { return RootSearchTest<R>::evaluate(in, out, 1); }, 1},
+        {[](const R* in, R* out) { return dsps_peval(in, out, 1); }, 1},
         {[](const R* in, R* out) { return dsps_psolve(in, out, 1); }, 1},
         {[](const R* in, R* out) { return dsps_pcsolve(in, out, 1, 1); }, 1}};
     for (const auto& [call, growths] : calls) {

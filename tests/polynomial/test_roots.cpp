@@ -10,16 +10,7 @@ namespace {
 using Z = std::complex<long double>;
 using List = std::vector<long double>;
 
-template <class R>
-struct RootsTest : ::testing::Test {
-    static constexpr auto solve = pick<R>(dsps_proots, dspfs_proots);
-    static constexpr auto solve_any = pick<R>(dspi_proots, dspfi_proots);
-    static constexpr auto expand = pick<R>(dspi_pztoc, dspfi_pztoc);
-};
-TYPED_TEST_SUITE(RootsTest, Precisions);
-
-TYPED_TEST(RootsTest, ClosedFormsInTheirOrder) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Roots, ClosedFormsInTheirOrder) {
     const long double h = std::sqrt(3.0L) / 2, d = std::sqrt(0.5L);
     const struct {
         List c, real;
@@ -51,7 +42,7 @@ TYPED_TEST(RootsTest, ClosedFormsInTheirOrder) {
     for (const auto& c : cases) {
         in_every_place(real<R>(c.c, 0.5), [&](const R* in, R* out) {
             const auto delta = in == out ? 1 : out->delta;
-            ASSERT_EQ(this->solve(in, out), 0);
+            ASSERT_EQ(dsps_proots(in, out), 0);
             EXPECT_TRUE(c.complex.empty() ? is_real<R>(out, c.real, 2)
                                           : is_complex<R>(out, c.complex, 2))
                 << &c - cases;
@@ -60,32 +51,30 @@ TYPED_TEST(RootsTest, ClosedFormsInTheirOrder) {
     }
 }
 
-TYPED_TEST(RootsTest, RandomPolynomials) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Roots, RandomPolynomials) {
     Noise noise(4);
     for (int round = 0; round < 2000; ++round) {
         auto c = noise.real<R>(2 + round % 5);
-        for (auto& v : values(c.get())) v *= scalar<R>(std::pow(1000.0L, noise()));
+        for (auto& v : values(c.get())) v *= T(std::pow(1000.0L, noise()));
         Signal<R> closed;
-        ASSERT_EQ(this->solve(c, closed), 0) << round;
+        ASSERT_EQ(dsps_proots(c, closed), 0) << round;
         EXPECT_LT(misfit<R>(c, closed), 2) << round;
         if (round >= 200) continue;
         const auto any_degree = noise.real<R>(2 + round % 40);
         auto roots = any_degree;
-        ASSERT_EQ(this->solve_any(roots), 0) << round;
+        ASSERT_EQ(dspi_proots(roots), 0) << round;
         EXPECT_LT(misfit<R>(any_degree, roots), 12) << round;
     }
     // (x^2 + s x + s^2)(x^2 + s x + 2 s^2): what the quartic is split by vanishes, at any scale.
     for (const long double s : {1e-6L, 1.0L, 3e6L}) {
         const auto c = real<R>({2 * s * s * s * s, 3 * s * s * s, 4 * s * s, 2 * s, 1});
         Signal<R> roots;
-        ASSERT_EQ(this->solve(c, roots), 0);
+        ASSERT_EQ(dsps_proots(c, roots), 0);
         EXPECT_LT(misfit<R>(c, roots), 2) << s;
     }
 }
 
-TYPED_TEST(RootsTest, NoiseOfDivisionsIsNoCoefficient) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Roots, NoiseOfDivisionsIsNoCoefficient) {
     // What is 0 in an even polynomial is rounding noise in its factors; left there, it would stand
     // for the smallest coefficient and soften every test by 1 / epsilon.
     Noise noise(5);
@@ -98,14 +87,13 @@ TYPED_TEST(RootsTest, NoiseOfDivisionsIsNoCoefficient) {
         two_terms.back() = std::ldexp(1.0L, degree * unit);  // at places 2^-1, 1 and 2
         for (const auto& c : {even, real<R>(two_terms)}) {
             auto roots = c;
-            ASSERT_EQ(this->solve_any(roots), 0) << round;
+            ASSERT_EQ(dspi_proots(roots), 0) << round;
             EXPECT_LT(misfit<R>(c, roots), 64) << round;
         }
     }
 }
 
-TYPED_TEST(RootsTest, AnyDegreeIsSorted) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Roots, AnyDegreeIsSorted) {
     const struct {
         List c;
         Samples roots;
@@ -117,13 +105,13 @@ TYPED_TEST(RootsTest, AnyDegreeIsSorted) {
     for (const auto& c : cases) {
         Borrowed<R> x(real<R>(c.c, 0.5));
         const auto before = x.host;
-        ASSERT_EQ(this->solve_any(x), 0);
+        ASSERT_EQ(dspi_proots(x), 0);
         EXPECT_TRUE(is_complex<R>(x, c.roots, 2)) << &c - cases;
         EXPECT_EQ(x->delta, 1);
         EXPECT_EQ(x.host, before);
     }
     for (auto none : {real<R>({}), real<R>({5, 0, 0}), real<R>({0, 0, 0})}) {
-        ASSERT_EQ(this->solve_any(none), 0);
+        ASSERT_EQ(dspi_proots(none), 0);
         EXPECT_TRUE(is_real<R>(none, {}));
     }
 }
@@ -141,8 +129,7 @@ long double distance(const R* got, Samples want) {
     return farthest;
 }
 
-TYPED_TEST(RootsTest, MultipleAndClusteredRoots) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Roots, MultipleAndClusteredRoots) {
     const long double e = epsilon<R>;
     const std::pair<Samples, long double> cases[] = {
         {{1, 1, -2}, std::sqrt(e)},
@@ -155,14 +142,13 @@ TYPED_TEST(RootsTest, MultipleAndClusteredRoots) {
         for (const auto& v : expanded(roots)) coefficients.push_back(v.real());
         auto any = real<R>(coefficients);
         Signal<R> closed;
-        ASSERT_EQ(this->solve(any, closed) || this->solve_any(any), 0);
+        ASSERT_EQ(dsps_proots(any, closed) || dspi_proots(any), 0);
         EXPECT_LT(distance<R>(closed, roots), tolerance) << roots[2];
         EXPECT_LT(distance<R>(any, roots), tolerance) << roots[2];
     }
 }
 
-TYPED_TEST(RootsTest, CoefficientsFromRoots) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Roots, CoefficientsFromRoots) {
     const std::pair<Signal<R>, Signal<R>> cases[] = {
         {real<R>({2, 3}), real<R>({6, -5, 1})},
         {real<R>({}), real<R>({1})},
@@ -172,26 +158,25 @@ TYPED_TEST(RootsTest, CoefficientsFromRoots) {
         Borrowed<R> x(roots);
         const auto before = x.host;
         x->delta = 3;
-        ASSERT_EQ(this->expand(x), 0);
+        ASSERT_EQ(dspi_pztoc(x), 0);
         EXPECT_TRUE(matches<R>(x, want, 1));
         EXPECT_EQ(x->delta, 1);
         EXPECT_EQ(x.host, before);
     }
     const auto roots = Noise(6).complex<R>(30);
     auto x = roots;
-    ASSERT_EQ(this->expand(x), 0);
+    ASSERT_EQ(dspi_pztoc(x), 0);
     EXPECT_LT(relative_error<R>(x, expanded(samples_of<R>(roots))), 100 * epsilon<R>);
 }
 
-TYPED_TEST(RootsTest, RefusalsAndFailingMemory) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Roots, RefusalsAndFailingMemory) {
     const auto z = complex<R>({{1, 2}, {3, 4}});
     auto out = real<R>({8}, 3), in_place = z;
-    EXPECT_EQ(this->solve(z, out), -1);
-    EXPECT_EQ(this->solve(real<R>({1, 2, 3, 4, 5, 6, 0}), out), -1);
+    EXPECT_EQ(dsps_proots(z, out), -1);
+    EXPECT_EQ(dsps_proots(real<R>({1, 2, 3, 4, 5, 6, 0}), out), -1);
     EXPECT_TRUE(is_real<R>(out, {8}));
-    EXPECT_EQ(this->solve(in_place, in_place), -1);
-    EXPECT_EQ(this->solve_any(in_place), -1);
+    EXPECT_EQ(dsps_proots(in_place, in_place), -1);
+    EXPECT_EQ(dspi_proots(in_place), -1);
     EXPECT_TRUE(matches<R>(in_place, z));
 
     const auto quintic = real<R>({-4, 4, -5, 5, -1, 1});
@@ -201,9 +186,9 @@ TYPED_TEST(RootsTest, RefusalsAndFailingMemory) {
             return call(x);
         });
     };
-    EXPECT_EQ(growths([&](R* x) { return this->solve(x, x); }), 2);
-    EXPECT_EQ(growths(this->solve_any), 5);
-    EXPECT_EQ(growths(this->expand), 2);
+    EXPECT_EQ(growths([&](R* x) { return dsps_proots(x, x); }), 2);
+    EXPECT_EQ(growths(dspi_proots), 5);
+    EXPECT_EQ(growths(dspi_pztoc), 2);
 }
 
 }  // namespace

@@ -7,12 +7,7 @@
 namespace wavkit::test {
 namespace {
 
-template <class R>
-class RecordTest : public ::testing::Test {};
-TYPED_TEST_SUITE(RecordTest, Precisions);
-
-TYPED_TEST(RecordTest, StartsAndEndsWithDefaults) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Record, StartsAndEndsWithDefaults) {
     R x{7, nullptr, 3, 4, 1, 99};
     EXPECT_EQ(dsp_init(&x), 0);
     for (int round = 0; round < 2; ++round) {
@@ -28,8 +23,7 @@ TYPED_TEST(RecordTest, StartsAndEndsWithDefaults) {
     }
 }
 
-TYPED_TEST(RecordTest, CapacityOnlyGrows) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Record, CapacityOnlyGrows) {
     Signal<R> x;
     x->points = 5;
     x->complex = 1;
@@ -45,8 +39,7 @@ TYPED_TEST(RecordTest, CapacityOnlyGrows) {
     EXPECT_EQ(x->alloc, 10);
 }
 
-TYPED_TEST(RecordTest, BorrowedBufferIsNeverTouchedByGrowth) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Record, BorrowedBufferIsNeverTouchedByGrowth) {
     Borrowed<R> x(real<R>({1, 2, 3}));
     const auto before = x.host;
     x->points = 5;
@@ -69,11 +62,10 @@ TYPED_TEST(RecordTest, BorrowedBufferIsNeverTouchedByGrowth) {
     EXPECT_EQ(z->alloc, 4);
 }
 
-TYPED_TEST(RecordTest, BlocksBeginWithACacheLineAndKeepTheirContents) {
+BOTH_PRECISIONS(Record, BlocksBeginWithACacheLineAndKeepTheirContents) {
 #ifdef _WIN32
     GTEST_SKIP() << "the platform's free() takes no aligned blocks";
 #endif
-    using R = TypeParam;
     const auto aligned = [](const R* x) {
         return reinterpret_cast<std::uintptr_t>(x->data) % 64 == 0;
     };
@@ -91,8 +83,7 @@ TYPED_TEST(RecordTest, BlocksBeginWithACacheLineAndKeepTheirContents) {
     }
 }
 
-TYPED_TEST(RecordTest, NeedBeyondTheLargestBlockFails) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Record, NeedBeyondTheLargestBlockFails) {
     auto x = real<R>({1});
     x->complex = 1;
     x->points = INT_MAX / 2 + 1;
@@ -108,15 +99,14 @@ TYPED_TEST(RecordTest, NeedBeyondTheLargestBlockFails) {
     EXPECT_EQ(y->complex, 1);
 }
 
-TYPED_TEST(RecordTest, RangesAreClippedToTheSource) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Record, RangesAreClippedToTheSource) {
     auto x = real<R>({0, 1, 2, 3, 4, 5, 6, 7, 8, 9}, 0.5);
     x->extra = 17;
     Signal<R> y;
     y->extra = 4;
     ASSERT_EQ(dspu_subvec(x, y, -3, 4), 0);
     EXPECT_TRUE(is_real<R>(y, {0, 1, 2, 3}));
-    EXPECT_EQ(y->delta, scalar<R>(0.5));
+    EXPECT_EQ(y->delta, T(0.5));
     EXPECT_EQ(y->extra, 4u);
     ASSERT_EQ(dspu_subvec(x, y, 8, 5), 0);
     EXPECT_TRUE(is_real<R>(y, {8, 9}));
@@ -133,8 +123,7 @@ TYPED_TEST(RecordTest, RangesAreClippedToTheSource) {
     EXPECT_TRUE(matches<R>(y, x));
 }
 
-TYPED_TEST(RecordTest, RangeInPlace) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Record, RangeInPlace) {
     auto x = complex<R>({{1, 2}, {3, 4}, {5, 6}, {7, 8}});
     const auto* block = x->data;
     ASSERT_EQ(dspu_subvec(x, x, 1, 2), 0);
@@ -158,14 +147,13 @@ TYPED_TEST(RecordTest, RangeInPlace) {
     EXPECT_TRUE(is_real<R>(owner, {2, 3, 4}));
 }
 
-TYPED_TEST(RecordTest, AppendPromotesAndNeverDemotes) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Record, AppendPromotesAndNeverDemotes) {
     auto x = real<R>({1, 2, 3}, 0.25);
     ASSERT_EQ(dsp_append(x, complex<R>({{4, 5}}, 9)), 0);
     EXPECT_TRUE(is_complex<R>(x, {1, 2, 3, {4, 5}}));
     ASSERT_EQ(dsp_append(x, real<R>({6})), 0);
     EXPECT_TRUE(is_complex<R>(x, {1, 2, 3, {4, 5}, 6}));
-    EXPECT_EQ(x->delta, scalar<R>(0.25));
+    EXPECT_EQ(x->delta, T(0.25));
 
     Borrowed<R> y(real<R>({1, 2}));
     ASSERT_EQ(dsp_append(y, real<R>({3})), 0);
@@ -182,8 +170,7 @@ TYPED_TEST(RecordTest, AppendPromotesAndNeverDemotes) {
     EXPECT_EQ(block[0], 1);
 }
 
-TYPED_TEST(RecordTest, AppendsWhatSharesItsBuffer) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Record, AppendsWhatSharesItsBuffer) {
     for (const bool borrowing : {false, true}) {
         for (const bool is_complex : {false, true}) {
             auto owner = real<R>({1, 2, 3, 4});
@@ -208,19 +195,18 @@ TYPED_TEST(RecordTest, AppendsWhatSharesItsBuffer) {
     }
 }
 
-TYPED_TEST(RecordTest, ComparisonFollowsDeltaThenSamples) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Record, ComparisonFollowsDeltaThenSamples) {
     const auto nan = std::numeric_limits<long double>::quiet_NaN();
     int result = 5;
     EXPECT_EQ(dsp_cmp(real<R>({1}), real<R>({1, 2}), 0, &result), -1);
     EXPECT_EQ(result, 5);
 
-    const auto compared = [](const Signal<R>& a, const Signal<R>& b, scalar<R> tolerance) {
+    const auto compared = [](const Signal<R>& a, const Signal<R>& b, T tolerance) {
         int sign = 5;
         EXPECT_EQ(dsp_cmp(a, b, tolerance, &sign), 0);
         return sign;
     };
-    EXPECT_EQ(compared(real<R>({9}, 1.0), real<R>({1}, 1.5), scalar<R>(0.1)), -1);
+    EXPECT_EQ(compared(real<R>({9}, 1.0), real<R>({1}, 1.5), T(0.1)), -1);
     EXPECT_EQ(compared(real<R>({1, 5}), real<R>({1, 3}), 1), 1);
     EXPECT_EQ(compared(real<R>({1, 5}), real<R>({1, 3}), 2), 0);
     EXPECT_EQ(compared(real<R>({nan, 1}), real<R>({0, 2}), 0), -1);
@@ -231,8 +217,7 @@ TYPED_TEST(RecordTest, ComparisonFollowsDeltaThenSamples) {
     EXPECT_EQ(compared(complex<R>({{1, 2}}), complex<R>({{1, 3}}), 0), -1);
 }
 
-TYPED_TEST(RecordTest, EveryFailingGrowthIsReported) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Record, EveryFailingGrowthIsReported) {
     const auto source = complex<R>({{1, 2}, {3, 4}});
     const auto one = real<R>({1});
     EXPECT_EQ(fail_each_growth<R>([&] {
@@ -253,17 +238,16 @@ struct Seen {
     static inline const void* block;
 };
 
-TYPED_TEST(RecordTest, HooksServeTheirPrecisionAndChain) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Record, HooksServeTheirPrecisionAndChain) {
     const auto allocate = +[](R* x) {
         Seen::block = x->data;
-        x->data = static_cast<scalar<R>*>(std::malloc(used(x) * sizeof(scalar<R>)));
+        x->data = static_cast<T*>(std::malloc(used(x) * sizeof(T)));
     };
     const auto reallocate = +[](R* x, int points, int is_complex) {
         Seen::block = x->data;
         Seen::old_points = points;
         Seen::old_complex = is_complex;
-        x->data = static_cast<scalar<R>*>(std::realloc(x->data, used(x) * sizeof(scalar<R>)));
+        x->data = static_cast<T*>(std::realloc(x->data, used(x) * sizeof(T)));
     };
     const auto release = +[](R* x) {
         ++Seen::releases;

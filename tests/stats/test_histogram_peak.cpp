@@ -11,13 +11,7 @@ constexpr auto nan = std::numeric_limits<long double>::quiet_NaN();
 constexpr auto inf = std::numeric_limits<long double>::infinity();
 constexpr long double decay = 0.315563649157834L;
 
-template <class R>
-struct HistogramTest : ::testing::Test {};
-TYPED_TEST_SUITE(HistogramTest, Precisions);
-
-TYPED_TEST(HistogramTest, CountsWhereTheEdgesSay) {
-    using R = TypeParam;
-    const auto hist = pick<R>(dsps_hist, dspfs_hist);
+BOTH_PRECISIONS(Histogram, CountsWhereTheEdgesSay) {
     const auto r = [](const std::vector<long double>& x) { return real<R>(x); };
     const long double eps = epsilon<R>, B = limits<R>::big;
     const auto pairs = complex<R>({{3, 4}, {-4, 3}, {0, -inf}, {nan, 0}, {0, 1}});
@@ -37,34 +31,27 @@ TYPED_TEST(HistogramTest, CountsWhereTheEdgesSay) {
         {pairs, 1, B / 4, 5, r({3, 0, 0, 0, 1})},
     };
     for (const auto& c : cases) {
-        const auto lo = scalar<R>(c.lo), width = scalar<R>(c.width);
+        const auto lo = T(c.lo), width = T(c.width);
         in_every_place(c.in, [&](const R* in, R* out) {
-            ASSERT_EQ(hist(in, out, lo, width, c.bins), 0);
+            ASSERT_EQ(dsps_hist(in, out, lo, width, c.bins), 0);
             EXPECT_TRUE(matches<R>(out, c.want)) << &c - cases;
             EXPECT_EQ(out->delta, width);
         });
     }
     // So many bins that the tolerance of the upper edge spans several in single precision.
     const int many = 5000000;
-    const auto above = std::nextafter(scalar<R>(many), limits<R>::big);
+    const auto above = std::nextafter(T(many), limits<R>::big);
     Signal<R> out;
-    ASSERT_EQ(hist(r({many, above, many - 1}), out, 0, 1, many), 0);
+    ASSERT_EQ(dsps_hist(r({many, above, many - 1}), out, 0, 1, many), 0);
     EXPECT_EQ(out[many - 1], 3);
     EXPECT_EQ(fail_each_growth<R>([&] {
                   Borrowed<R> x(pairs);
-                  return hist(x, x, 0, 1, 3);
+                  return dsps_hist(x, x, 0, 1, 3);
               }),
               2);
 }
 
-template <class R>
-struct PeakTest : ::testing::Test {
-    static constexpr auto peak = pick<R>(dsps_peak, dspfs_peak);
-};
-TYPED_TEST_SUITE(PeakTest, Precisions);
-
-TYPED_TEST(PeakTest, SelectsAndInterpolates) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Peak, SelectsAndInterpolates) {
     const auto r = [](const std::vector<long double>& x) { return real<R>(x, 0.5); };
     const long double B = limits<R>::big, usual = 2 * std::sqrt(B);
     const long double rise = std::exp(decay / 4), limit = std::exp(decay * 9 / 4);
@@ -103,27 +90,26 @@ TYPED_TEST(PeakTest, SelectsAndInterpolates) {
     };
     for (const auto& c : cases) {
         in_every_place(c.in, [&](const R* in, R* out) {
-            const scalar<R> delta = out == in ? 1 : out->delta;
-            EXPECT_EQ(this->peak(in, out, c.flags, c.index), c.result);
+            const T delta = out == in ? 1 : out->delta;
+            EXPECT_EQ(dsps_peak(in, out, c.flags, c.index), c.result);
             EXPECT_TRUE(is_real<R>(out, {c.height, c.position}, 4)) << &c - cases;
             EXPECT_EQ(out->delta, delta);
         });
     }
-    EXPECT_EQ(fail_each_growth<R>([&] { return this->peak(capped, Signal<R>(), 0, 0); }), 1);
+    EXPECT_EQ(fail_each_growth<R>([&] { return dsps_peak(capped, Signal<R>(), 0, 0); }), 1);
 }
 
-TYPED_TEST(PeakTest, BellCurveIsFoundBetweenItsSamples) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Peak, BellCurveIsFoundBetweenItsSamples) {
     const auto amplitude = [](long double t) { return 2 * std::exp(-decay * t * t); };
     const std::pair<long double, int> centres[] = {{0.1L, 0}, {1.5L, 1}, {2.8L, 2}, {4.75L, 4}};
     for (const auto& [centre, lower] : centres) {
         std::vector<std::complex<long double>> lobe;
         for (int i = 0; i < 6; ++i) lobe.push_back(std::polar(amplitude(i - centre), 1.0L + i));
         Signal<R> out;
-        ASSERT_EQ(this->peak(complex<R>(lobe), out, 0x200, 0), 0);
+        ASSERT_EQ(dsps_peak(complex<R>(lobe), out, 0x200, 0), 0);
         EXPECT_TRUE(is_real<R>(out, {2 * amplitude(centre - lower), centre}, 32));
         // The cubic correction vanishes half a sample beside the centre of the pair.
-        ASSERT_EQ(this->peak(complex<R>(lobe), out, 0x300, 0), 0);
+        ASSERT_EQ(dsps_peak(complex<R>(lobe), out, 0x300, 0), 0);
         const auto d = centre - lower - 0.5L;
         EXPECT_NEAR(out[1], centre - d * (d * d - 0.25L) * 0.02036L, 64 * epsilon<R>);
     }

@@ -7,13 +7,6 @@ namespace {
 
 using List = std::vector<long double>;
 
-template <class R>
-struct RegressionTest : ::testing::Test {
-    static constexpr auto fit = pick<R>(dsps_lin_regres, dspfs_lin_regres);
-    static constexpr auto fit_in_full = pick<R>(dsps_lin_regres2, dspfs_lin_regres2);
-};
-TYPED_TEST_SUITE(RegressionTest, Precisions);
-
 /// Line of v on u by its normal equations, a n + b sum u = sum v and a sum u + b sum u^2 = sum u v;
 /// the inverse of their matrix times the residual variance is the covariance of the estimates.
 List line(const List& u, const List& v) {
@@ -44,8 +37,7 @@ List table(const List& x, const List& y) {
     return entries;
 }
 
-TYPED_TEST(RegressionTest, NoisyLinesInFull) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Regression, NoisyLinesInFull) {
     Noise noise(8);
     for (const int n : {3, 4, 100, 2048, 2049, 6000}) {
         for (const long double delta : {-1.0L, 0.0L, 0.25L}) {  // below 0: pairs
@@ -53,8 +45,8 @@ TYPED_TEST(RegressionTest, NoisyLinesInFull) {
             std::vector<std::complex<long double>> pairs;
             for (int i = 0; i < n; ++i) {
                 const long double ramp = i % 2048 * (delta > 0 ? delta : 1);  // begins anew
-                x.push_back(delta < 0 ? scalar<R>(2 + noise()) : ramp);
-                y.push_back(scalar<R>(5 + (delta < 0 ? -3 : 0.003L) * x.back() + noise()));
+                x.push_back(delta < 0 ? T(2 + noise()) : ramp);
+                y.push_back(T(5 + (delta < 0 ? -3 : 0.003L) * x.back() + noise()));
                 pairs.emplace_back(x.back(), y.back());
             }
             const List want = table(x, y);
@@ -62,7 +54,7 @@ TYPED_TEST(RegressionTest, NoisyLinesInFull) {
             in_every_place(data, [&](const R* in, R* out) {
                 Signal<R> both;
                 both->delta = 3;
-                ASSERT_EQ(this->fit(in, both) || this->fit_in_full(in, out), 0);
+                ASSERT_EQ(dsps_lin_regres(in, both) || dsps_lin_regres2(in, out), 0);
                 ASSERT_EQ(out->points, 20);
                 const auto tolerance = 32 * epsilon<R> / double(1 - want[19] * want[19]);
                 for (std::size_t i = 0; i < 20; ++i) {
@@ -79,8 +71,7 @@ TYPED_TEST(RegressionTest, NoisyLinesInFull) {
     }
 }
 
-TYPED_TEST(RegressionTest, SmallAndDegenerateSpreads) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Regression, SmallAndDegenerateSpreads) {
     const long double B = limits<R>::big;
     const std::pair<Signal<R>, std::vector<std::pair<int, long double>>> cases[] = {
         {real<R>({1, 3, 5}, 0.5), {{0, 4}, {1, 1}, {2, 0}, {7, 0.25L}, {8, -0.25L}, {19, 1}}},
@@ -95,13 +86,13 @@ TYPED_TEST(RegressionTest, SmallAndDegenerateSpreads) {
         {real<R>({0, 3 * B, 0}), {{15, 2 * B / 3}}}};  // deviations stay within B
     for (const auto& [data, want] : cases) {
         Signal<R> out;
-        ASSERT_EQ(this->fit_in_full(data, out), 0);
+        ASSERT_EQ(dsps_lin_regres2(data, out), 0);
         for (const auto& [entry, value] : want) {
             const auto tolerance = 8 * epsilon<R> * std::max(std::fabs(value), 1.0L);
             EXPECT_LE(std::fabs(out[entry] - value), tolerance) << data->points << ' ' << entry;
         }
     }
-    for (const auto call : {this->fit, this->fit_in_full}) {
+    for (const auto call : {dsps_lin_regres, dsps_lin_regres2}) {
         EXPECT_EQ(fail_each_growth<R>([&] {
                       Borrowed<R> x(cases[0].first);
                       return call(x, x);

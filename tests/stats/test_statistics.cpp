@@ -26,37 +26,20 @@ enum {
 };
 constexpr int count = excess + 1;
 
-template <class R>
-struct StatisticsTest : ::testing::Test {
-    using Call = int (*)(const R*, R*);
-    static constexpr Call of[count] = {
-        dsps_sum,
-        dsps_mean,
-        pick<R>(dsps_min, dspfs_min),
-        pick<R>(dsps_max, dspfs_max),
-        pick<R>(dsps_median, dspfs_median),
-        pick<R>(dsps_gmean, dspfs_gmean),
-        pick<R>(dsps_hmean, dspfs_hmean),
-        dsps_magsq_sum,
-        dsps_rms,
-        dsps_pop_var,
-        pick<R>(dsps_samp_var, dspfs_samp_var),
-        pick<R>(dsps_pop_stddev, dspfs_pop_stddev),
-        pick<R>(dsps_samp_stddev, dspfs_samp_stddev),
-        pick<R>(dsps_skew, dspfs_skew),
-        pick<R>(dsps_excess, dspfs_excess),
-    };
+template <Record R>
+constexpr int (*statistics[count])(const R*, R*) = {
+    dsps_sum,      dsps_mean,       dsps_min,         dsps_max,  dsps_median,
+    dsps_gmean,    dsps_hmean,      dsps_magsq_sum,   dsps_rms,  dsps_pop_var,
+    dsps_samp_var, dsps_pop_stddev, dsps_samp_stddev, dsps_skew, dsps_excess};
 
-    /// Runs `check(k, x)` for every statistic that takes this signal.
-    template <class Check>
-    static void each(const Signal<R>& x, Check check) {
-        for (int k = 0; k < (x->complex ? reals_only : count); ++k) {
-            SCOPED_TRACE(::testing::Message() << "statistic " << k << " complex " << x->complex);
-            check(k, x);
-        }
+/// Runs `check(k, x)` for every statistic that takes this signal.
+template <Record R, class Check>
+void each(const Signal<R>& x, Check check) {
+    for (int k = 0; k < (x->complex ? reals_only : count); ++k) {
+        SCOPED_TRACE(::testing::Message() << "statistic " << k << " complex " << x->complex);
+        check(k, x);
     }
-};
-TYPED_TEST_SUITE(StatisticsTest, Precisions);
+}
 
 /// All of them by their definitions.
 Samples definitions(Samples x) {
@@ -85,21 +68,20 @@ Samples definitions(Samples x) {
     return all;
 }
 
-TYPED_TEST(StatisticsTest, FollowTheirDefinitions) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Statistics, FollowTheirDefinitions) {
     Noise noise;
     for (const int n : {3, 40, 2049, 5000}) {
         for (auto x : {noise.real<R>(n), noise.complex<R>(n)}) {
             for (int i = 0; i < n; ++i) {  // skewed, and of arguments that add up to little
                 auto* z = x->data + i * width<R>(x);
-                z[0] = scalar<R>(0.75) + z[0] * z[0] / 2;
+                z[0] = T(0.75) + z[0] * z[0] / 2;
                 if (x->complex) z[1] /= 8;
             }
-            this->each(x, [want = definitions(samples_of<R>(x))](int k, const Signal<R>& in) {
+            each(x, [want = definitions(samples_of<R>(x))](int k, const Signal<R>& in) {
                 if (k == gmean && in->points > 40) return;  // its product vanishes
                 Signal<R> out;
                 out->delta = 5;
-                ASSERT_EQ(TestFixture::of[k](in, out), 0);
+                ASSERT_EQ(statistics<R>[k](in, out), 0);
                 EXPECT_EQ(out->delta, 5);
                 EXPECT_TRUE(in->complex && k < first_real ? is_complex<R>(out, {want[k]}, 32)
                                                           : is_real<R>(out, {want[k].real()}, 32));
@@ -108,8 +90,7 @@ TYPED_TEST(StatisticsTest, FollowTheirDefinitions) {
     }
 }
 
-TYPED_TEST(StatisticsTest, EdgesAndSaturation) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Statistics, EdgesAndSaturation) {
     const long double B = limits<R>::big, tiny = limits<R>::floor;
     const long double offset = 1 / (16.0L * epsilon<R>);
     const auto r = [](const std::vector<long double>& x) { return real<R>(x); };
@@ -157,34 +138,33 @@ TYPED_TEST(StatisticsTest, EdgesAndSaturation) {
     };
     for (const auto& [statistic, in, want, units] : cases) {
         Signal<R> out;
-        ASSERT_EQ(this->of[statistic](in, out), 0);
+        ASSERT_EQ(statistics<R>[statistic](in, out), 0);
         EXPECT_TRUE(matches<R>(out, want, units)) << statistic << listed(scalars<R>(in));
     }
 }
 
-TYPED_TEST(StatisticsTest, OutputsEmptyInputsAndFailures) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Statistics, OutputsEmptyInputsAndFailures) {
     const auto reals = real<R>({3, 1, 4, 1.5L}), pairs = complex<R>({{3, 1}, {4, 1}, {-5, 9}});
     for (const auto& x : {reals, pairs}) {
-        this->each(x, [call = TestFixture::of](int k, const Signal<R>& signal) {
+        each(x, [](int k, const Signal<R>& signal) {
             Signal<R> want, none, out;
-            ASSERT_EQ(call[k](signal, want), 0);
+            ASSERT_EQ(statistics<R>[k](signal, want), 0);
             in_every_place(signal, [&](const R* in, R* shared) {
-                EXPECT_EQ(call[k](in, shared), 0);
+                EXPECT_EQ(statistics<R>[k](in, shared), 0);
                 EXPECT_TRUE(matches<R>(shared, want));
             });
-            EXPECT_EQ(fail_each_growth<R>([&] { return call[k](signal, Signal<R>()); }),
+            EXPECT_EQ(fail_each_growth<R>([&] { return statistics<R>[k](signal, Signal<R>()); }),
                       k == median ? 2 : 1);
             none->points = -1;
             none->complex = signal->complex;
-            ASSERT_EQ(call[k](none, out), 0);
+            ASSERT_EQ(statistics<R>[k](none, out), 0);
             dspi_scale(want, 0);
             if (k == excess) want[0] = -3;
             EXPECT_TRUE(matches<R>(out, want, 1));
         });
     }
     Signal<R> untouched = reals;
-    EXPECT_EQ(this->of[skew](pairs, untouched) + this->of[excess](pairs, untouched), -2);
+    EXPECT_EQ(statistics<R>[skew](pairs, untouched) + statistics<R>[excess](pairs, untouched), -2);
     EXPECT_TRUE(matches<R>(untouched, reals));
 }
 

@@ -1,22 +1,61 @@
-// The library through one set of names in both precisions, for typed tests.
+// The library through one set of names in both precisions, for tests that run in both.
 #pragma once
 
 #include <gtest/gtest.h>
 
+#include <tuple>
+
 #include "../../src/record_view.hpp"
 
-// The remaining names that tests call on both precisions; the library's own sources need fewer.
-inline int dsp_lib_alloc(dspf_alloc_hook hook, dspf_alloc_hook* previous) {
-    return dspf_lib_alloc(hook, previous);
-}
-inline int dsp_lib_realloc(dspf_realloc_hook hook, dspf_realloc_hook* previous) {
-    return dspf_lib_realloc(hook, previous);
-}
-inline int dsp_lib_free(dspf_free_hook hook, dspf_free_hook* previous) {
-    return dspf_lib_free(hook, previous);
-}
-
 namespace wavkit::test {
+
+/// The double counterpart of a type of the single-precision interface.
+template <class T>
+struct AsDouble {
+    using type = T;
+};
+template <>
+struct AsDouble<float> {
+    using type = double;
+};
+template <>
+struct AsDouble<dspf> {
+    using type = dsp;
+};
+template <class T>
+struct AsDouble<const T> {
+    using type = const typename AsDouble<T>::type;
+};
+template <class T>
+struct AsDouble<T*> {
+    using type = typename AsDouble<T>::type*;
+};
+template <class Result, class... Args>
+struct AsDouble<Result(Args...)> {
+    using type = Result(typename AsDouble<Args>::type...);
+};
+
+/// A function of the library in both precisions, called or passed on as the record at hand asks.
+template <class Double, class Single>
+struct Twins;
+template <class... D, class... S>
+struct Twins<int(D...), int(S...)> {
+    const char* name;
+    int (*of_double)(D...);
+    int (*of_single)(S...);
+
+    int operator()(D... arguments) const { return of_double(arguments...); }
+    int operator()(S... arguments) const { return of_single(arguments...); }
+    constexpr operator decltype(of_double)() const { return of_double; }
+    constexpr operator decltype(of_single)() const { return of_single; }
+};
+template <class Single>
+Twins(const char*, typename AsDouble<Single>::type*, Single*)
+    -> Twins<typename AsDouble<Single>::type, Single>;
+
+// Objects, each by the name of its double twin, for all that the public headers declare: made at
+// build time.
+#include "support/twins.hpp"
 
 using Precisions = ::testing::Types<dsp, dspf>;
 
@@ -24,23 +63,19 @@ using Precisions = ::testing::Types<dsp, dspf>;
 template <Record R>
 inline constexpr scalar<R> epsilon = std::numeric_limits<scalar<R>>::epsilon();
 
-/// The one of two twins that works on this record type, for names that have no overload.
-template <Record R, class Double, class Single>
-constexpr auto pick(Double* double_twin, Single* single_twin) {
-    if constexpr (std::same_as<R, dsp>) {
-        return double_twin;
-    } else {
-        return single_twin;
-    }
-}
-
 template <Record R>
 int free_internal() {
-    if constexpr (std::same_as<R, dsp>) {
-        return dsp_free_internal();
-    } else {
-        return dspf_free_internal();
-    }
+    return std::same_as<R, dsp> ? dsp_free_internal() : dspf_free_internal();
 }
 
 }  // namespace wavkit::test
+
+/// A test that is run in both precisions; in its body `R` is the record, `T` the type of its
+/// scalars.
+#define BOTH_PRECISIONS(suite, name)                          \
+    template <Record R, class T>                              \
+    void suite##name();                                       \
+    TEST(suite##Double, name) { suite##name<dsp, double>(); } \
+    TEST(suite##Single, name) { suite##name<dspf, float>(); } \
+    template <Record R, class T>                              \
+    void suite##name()

@@ -7,17 +7,6 @@
 namespace wavkit::test {
 namespace {
 
-template <class R>
-class DftTest : public ::testing::Test {};
-TYPED_TEST_SUITE(DftTest, Precisions);
-
-template <class R>
-constexpr auto dct = pick<R>(dspi_dct, dspfi_dct);
-template <class R>
-constexpr auto analytic = pick<R>(dspi_analytic, dspfi_analytic);
-template <class R>
-constexpr auto hilbert = pick<R>(dspi_hilbert, dspfi_hilbert);
-
 /// 10 epsilon log2(n), what any transform may lose.
 template <class R>
 long double bound(int n) {
@@ -48,8 +37,7 @@ long double error_at_some_bins(const R* spectrum, const Samples& x, int checked,
     return std::sqrt(difference / norm);
 }
 
-TYPED_TEST(DftTest, EveryLengthMeetsTheErrorBound) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Dft, EveryLengthMeetsTheErrorBound) {
     Noise noise;
     for (int n = 2; n <= 2048; ++n) {
         auto x = noise.complex<R>(n);
@@ -62,8 +50,7 @@ TYPED_TEST(DftTest, EveryLengthMeetsTheErrorBound) {
     }
 }
 
-TYPED_TEST(DftTest, DirectionsAndLengthsMayAlternate) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Dft, DirectionsAndLengthsMayAlternate) {
     Noise noise;
     // Direction changes, length changes, both, and a fresh start, over the one cached chirp.
     const int steps[][2] = {{6, 0},  {6, 1}, {6, 1},  {6, 0},  {7, 0}, {5, 1}, {5, 0},
@@ -83,12 +70,11 @@ TYPED_TEST(DftTest, DirectionsAndLengthsMayAlternate) {
     }
 }
 
-TYPED_TEST(DftTest, SpacingAndCapacity) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Dft, SpacingAndCapacity) {
     auto x = Noise().real<R>(6);
-    x->delta = scalar<R>(0.25);
+    x->delta = T(0.25);
     ASSERT_EQ(dspi_dft(x, 0), 0);
-    EXPECT_EQ(x->delta, scalar<R>(1 / 1.5));
+    EXPECT_EQ(x->delta, T(1 / 1.5));
     EXPECT_EQ(x->alloc, 2 * 16);  // the convolution's room stays
     x->delta = 0;
     ASSERT_EQ(dspi_dft(x, 0), 0);
@@ -97,7 +83,7 @@ TYPED_TEST(DftTest, SpacingAndCapacity) {
     auto one = real<R>({5}, 4);
     ASSERT_EQ(dspi_dft(one, 0), 0);
     EXPECT_TRUE(is_real<R>(one, {5}));
-    EXPECT_EQ(one->delta, scalar<R>(0.25));
+    EXPECT_EQ(one->delta, T(0.25));
     Signal<R> none;
     none->delta = 0;
     ASSERT_EQ(dspi_dft(none, 1) || dspi_rdft(none), 0);
@@ -117,14 +103,13 @@ TYPED_TEST(DftTest, SpacingAndCapacity) {
     EXPECT_EQ(host.host, before);
 }
 
-TYPED_TEST(DftTest, HalfSpectraOfRealSignals) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Dft, HalfSpectraOfRealSignals) {
     for (const int n : {1, 2, 3, 4, 5, 6, 7, 12, 16, 31, 100}) {
         const auto x = Noise().real<R>(n);
         Samples expected = forward_transform(samples_of<R>(x.operator->()));
         expected.resize(std::size_t(n) / 2 + 1);
         Signal<R> y = x;
-        y->delta = scalar<R>(0.5);
+        y->delta = T(0.5);
         ASSERT_EQ(dspi_rdft(y), 0);
         EXPECT_EQ(bool(y->complex), n > 1);
         EXPECT_LT(relative_error<R>(y, expected), bound<R>(n + 1)) << n;
@@ -133,12 +118,11 @@ TYPED_TEST(DftTest, HalfSpectraOfRealSignals) {
         EXPECT_NEAR(y->delta, 0.5, epsilon<R>);
     }
     auto refused = complex<R>({1, 2, 3});
-    EXPECT_EQ(dspi_rdft(refused) && dct<R>(refused, 0), true);
+    EXPECT_EQ(dspi_rdft(refused) && dspi_dct(refused, 0), true);
     EXPECT_TRUE(is_complex<R>(refused, {1, 2, 3}));
 }
 
-TYPED_TEST(DftTest, CosineTransformByItsDefinition) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Dft, CosineTransformByItsDefinition) {
     const long double root_two = std::sqrt(2.0L);
     for (const int n : {1, 2, 3, 4, 5, 8, 9, 30, 30, 64, 17}) {
         for (const int normalised : {0, 2}) {
@@ -153,30 +137,29 @@ TYPED_TEST(DftTest, CosineTransformByItsDefinition) {
                 expected.push_back(sum / n * scale);
             }
             Signal<R> y = x;
-            y->delta = scalar<R>(0.125);
-            ASSERT_EQ(dct<R>(y, normalised), 0);
+            y->delta = T(0.125);
+            ASSERT_EQ(dspi_dct(y, normalised), 0);
             EXPECT_TRUE(is_real<R>(y, expected, 16)) << n;
             EXPECT_NEAR(y->delta, 4.0 / n, 8 * epsilon<R>);
-            ASSERT_EQ(dct<R>(y, normalised | 1), 0);
+            ASSERT_EQ(dspi_dct(y, normalised | 1), 0);
             EXPECT_TRUE(matches<R>(y, x, 32)) << n;
             EXPECT_NEAR(y->delta, 0.125, epsilon<R>);
         }
     }
     Signal<R> none;
     none->delta = 4;
-    ASSERT_EQ(dct<R>(none, 1), 0);
-    EXPECT_EQ(none->delta, scalar<R>(0.125));
+    ASSERT_EQ(dspi_dct(none, 1), 0);
+    EXPECT_EQ(none->delta, T(0.125));
     none->delta = 0;
-    ASSERT_EQ(dct<R>(none, 0), 0);
+    ASSERT_EQ(dspi_dct(none, 0), 0);
     EXPECT_EQ(none->delta, limits<R>::big);
     auto still = real<R>({1, 2, 3}, 0);
-    ASSERT_EQ(dct<R>(still, 0), 0);
+    ASSERT_EQ(dspi_dct(still, 0), 0);
     EXPECT_EQ(still->delta, limits<R>::big / 2);
 }
 
 /// cos and sin of a cosine's bin, for every bin strictly between 0 and N/2.
-TYPED_TEST(DftTest, AnalyticSignalsOfCosines) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Dft, AnalyticSignalsOfCosines) {
     for (const int n : {7, 8, 9, 16, 50}) {
         for (int f = 1; 2 * f < n; ++f) {
             Samples turning;
@@ -188,32 +171,31 @@ TYPED_TEST(DftTest, AnalyticSignalsOfCosines) {
                 wave.push_back(cosine.back() + 5 + (n % 2 == 0 && i % 2 == 0 ? 1 : 0));
             }
             auto x = real<R>(cosine, 0.5);
-            ASSERT_EQ(analytic<R>(x), 0);
+            ASSERT_EQ(dspi_analytic(x), 0);
             EXPECT_TRUE(is_complex<R>(x, turning, 24)) << n << ' ' << f;
             EXPECT_NEAR(x->delta, 0.5, epsilon<R>);
             auto y = real<R>(wave);  // with a mean and a component at half the sampling rate
-            ASSERT_EQ(hilbert<R>(y), 0);
+            ASSERT_EQ(dspi_hilbert(y), 0);
             EXPECT_TRUE(is_real<R>(y, sine, 48)) << n << ' ' << f;
             Signal<R> z(turning);
-            ASSERT_EQ(hilbert<R>(z), 0);
+            ASSERT_EQ(dspi_hilbert(z), 0);
             for (auto& sample : turning) sample *= std::complex<long double>(0, -1);
             EXPECT_TRUE(is_complex<R>(z, turning, 24));
         }
     }
     auto one = real<R>({3}), hilbert_of_one = one;
-    ASSERT_EQ(analytic<R>(one) || hilbert<R>(hilbert_of_one), 0);
+    ASSERT_EQ(dspi_analytic(one) || dspi_hilbert(hilbert_of_one), 0);
     EXPECT_TRUE(is_real<R>(one, {3}));
     EXPECT_TRUE(is_real<R>(hilbert_of_one, {0}));
     Signal<R> none;
-    EXPECT_EQ(analytic<R>(none) || hilbert<R>(none), 0);
+    EXPECT_EQ(dspi_analytic(none) || dspi_hilbert(none), 0);
     auto constant = real<R>({2, 2, 2, 2, 2}, 0);
-    ASSERT_EQ(analytic<R>(constant), 0);
+    ASSERT_EQ(dspi_analytic(constant), 0);
     EXPECT_TRUE(is_complex<R>(constant, {2, 2, 2, 2, 2}, 8));
     EXPECT_NEAR(double(constant->delta) * double(limits<R>::big) * 5, 1, 1e-5);
 }
 
-TYPED_TEST(DftTest, FailingGrowthIsReportedAndLeavesNoHalfBuiltTable) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Dft, FailingGrowthIsReportedAndLeavesNoHalfBuiltTable) {
     const auto x = Noise().real<R>(11);
     const auto growths = [&](auto transform) {
         return fail_each_growth<R>([&] {
@@ -223,7 +205,7 @@ TYPED_TEST(DftTest, FailingGrowthIsReportedAndLeavesNoHalfBuiltTable) {
         });
     };
     EXPECT_EQ(growths([](R* y) { return dspi_dft(y, 0); }), 3);  // chirp, filter, signal
-    EXPECT_EQ(growths([](R* y) { return dct<R>(y, 0); }), 4);    // and the scratch record
+    EXPECT_EQ(growths([](R* y) { return dspi_dct(y, 0); }), 4);  // and the scratch record
 
     FailingAllocator<R> memory(1);  // the filter
     Borrowed<R> y(x), z(x);

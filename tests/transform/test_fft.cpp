@@ -7,18 +7,13 @@
 namespace wavkit::test {
 namespace {
 
-template <class R>
-class FftTest : public ::testing::Test {};
-TYPED_TEST_SUITE(FftTest, Precisions);
-
 /// What a good transform of n points may lose.
 template <class R>
 long double tolerance(int n) {
     return static_cast<long double>(epsilon<R>) * (1 + std::log2(n));
 }
 
-TYPED_TEST(FftTest, MatchesTheDirectSum) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fft, MatchesTheDirectSum) {
     Noise noise;
     for (int n = 2; n <= 512; n *= 2) {
         for (const auto& x : {noise.real<R>(n), noise.complex<R>(n)}) {
@@ -34,8 +29,7 @@ TYPED_TEST(FftTest, MatchesTheDirectSum) {
 }
 
 /// An impulse and a complex exponential: each is the other's transform.
-TYPED_TEST(FftTest, LongSignalsMatchClosedForms) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fft, LongSignalsMatchClosedForms) {
     for (int n = 1 << 10; n <= 1 << 19; n *= 2) {
         const int at = n / 3, bin = n - n / 7;
         Samples x(static_cast<std::size_t>(n)), expected(x.size());
@@ -56,24 +50,22 @@ TYPED_TEST(FftTest, LongSignalsMatchClosedForms) {
     EXPECT_EQ(free_internal<R>(), 0);
 }
 
-TYPED_TEST(FftTest, TwoPointsAndOne) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fft, TwoPointsAndOne) {
     auto two = real<R>({3, 1}, 0.25);
     ASSERT_EQ(dspi_fft(two, 0), 0);
     EXPECT_TRUE(is_complex<R>(two, {2, 1}));
     EXPECT_EQ(two->delta, 2);
     ASSERT_EQ(dspi_fft(two, 1), 0);
     EXPECT_TRUE(is_complex<R>(two, {3, 1}));
-    EXPECT_EQ(two->delta, scalar<R>(0.25));
+    EXPECT_EQ(two->delta, T(0.25));
 
     auto one = real<R>({5}, 4);
     ASSERT_EQ(dspi_fft(one, 0), 0);
     EXPECT_TRUE(is_real<R>(one, {5}));
-    EXPECT_EQ(one->delta, scalar<R>(0.25));
+    EXPECT_EQ(one->delta, T(0.25));
 }
 
-TYPED_TEST(FftTest, OtherLengthsAreRefusedUntouched) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fft, OtherLengthsAreRefusedUntouched) {
     for (const int n : {0, -4, 3, 6, 12, 1023}) {
         auto x = Noise().real<R>(std::max(n, 1));
         x->points = n;
@@ -94,23 +86,21 @@ TYPED_TEST(FftTest, OtherLengthsAreRefusedUntouched) {
     EXPECT_EQ(dspi_fft(huge, 0), -1);
 }
 
-TYPED_TEST(FftTest, SpacingTurnsIntoResolution) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fft, SpacingTurnsIntoResolution) {
     const auto spacing_after = [](double delta, int n) {
         auto x = Noise().complex<R>(n);
-        x->delta = scalar<R>(delta);
+        x->delta = T(delta);
         EXPECT_EQ(dspi_fft(x, 0), 0);
         return x->delta;
     };
     EXPECT_EQ(spacing_after(0.0, 8), limits<R>::big);
     EXPECT_EQ(spacing_after(0.0, 1), limits<R>::big);
-    EXPECT_EQ(spacing_after(0.125, 16), scalar<R>(0.5));
-    EXPECT_EQ(spacing_after(-2, 4), scalar<R>(-0.125));
+    EXPECT_EQ(spacing_after(0.125, 16), T(0.5));
+    EXPECT_EQ(spacing_after(-2, 4), T(-0.125));
     EXPECT_TRUE(std::isnan(spacing_after(std::nan(""), 4)));
 }
 
-TYPED_TEST(FftTest, BorrowedBuffers) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fft, BorrowedBuffers) {
     Borrowed<R> samples(Noise().real<R>(32));
     const auto before = samples.host;
     ASSERT_EQ(dspi_fft(samples, 0), 0);
@@ -123,8 +113,7 @@ TYPED_TEST(FftTest, BorrowedBuffers) {
     EXPECT_EQ(pairs->alloc, 0);
 }
 
-TYPED_TEST(FftTest, FailingGrowthIsReported) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fft, FailingGrowthIsReported) {
     const auto source = Noise().real<R>(8);
     const auto transformed = [&](auto transform) {
         return fail_each_growth<R>([&] {
@@ -136,8 +125,7 @@ TYPED_TEST(FftTest, FailingGrowthIsReported) {
     EXPECT_EQ(transformed([](R* x) { return dspi_rfft(x); }), 1);
 }
 
-TYPED_TEST(FftTest, BitReversedOrder) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Fft, BitReversedOrder) {
     auto x = real<R>({0, 1, 2, 3, 4, 5, 6, 7}, 3);
     ASSERT_EQ(dspi_bitrev(x), 0);
     EXPECT_TRUE(is_real<R>(x, {0, 4, 2, 6, 1, 5, 3, 7}));
@@ -159,32 +147,26 @@ TYPED_TEST(FftTest, BitReversedOrder) {
     EXPECT_EQ(free_internal<R>(), 0);
 }
 
-template <class R>
-class RealFftTest : public ::testing::Test {};
-TYPED_TEST_SUITE(RealFftTest, Precisions);
-
-TYPED_TEST(RealFftTest, IsTheFirstHalfOfTheComplexTransform) {
-    using R = TypeParam;
+BOTH_PRECISIONS(RealFft, IsTheFirstHalfOfTheComplexTransform) {
     for (int n = 2; n <= 512; n *= 2) {
         const auto x = Noise().real<R>(n);
         Samples expected = forward_transform(samples_of(x.operator->()));
         expected.resize(std::size_t(n) / 2 + 1);
         Signal<R> half = x;
-        half->delta = scalar<R>(0.5);
+        half->delta = T(0.5);
         ASSERT_EQ(dspi_rfft(half), 0);
         EXPECT_TRUE(half->complex);
-        EXPECT_EQ(half->delta, scalar<R>(2.0 / n));
+        EXPECT_EQ(half->delta, T(2.0 / n));
         EXPECT_LT(relative_error<R>(half, expected), tolerance<R>(n)) << n;
         EXPECT_EQ(half[1], 0);
         EXPECT_EQ(half[n + 1], 0);
         ASSERT_EQ(dspi_irfft(half), 0);
         EXPECT_TRUE(matches<R>(half, x, 8)) << n;
-        EXPECT_EQ(half->delta, scalar<R>(0.5));
+        EXPECT_EQ(half->delta, T(0.5));
     }
 }
 
-TYPED_TEST(RealFftTest, LongSignalsMatchTheComplexTransform) {
-    using R = TypeParam;
+BOTH_PRECISIONS(RealFft, LongSignalsMatchTheComplexTransform) {
     for (int n = 1 << 10; n <= 1 << 18; n *= 4) {
         const auto x = Noise().real<R>(n);
         Signal<R> half = x, whole = x;
@@ -197,8 +179,7 @@ TYPED_TEST(RealFftTest, LongSignalsMatchTheComplexTransform) {
     }
 }
 
-TYPED_TEST(RealFftTest, ShortSignals) {
-    using R = TypeParam;
+BOTH_PRECISIONS(RealFft, ShortSignals) {
     auto one = real<R>({7}, 0);
     ASSERT_EQ(dspi_rfft(one), 0);
     EXPECT_TRUE(is_real<R>(one, {7}));
@@ -209,7 +190,7 @@ TYPED_TEST(RealFftTest, ShortSignals) {
     EXPECT_TRUE(is_complex<R>(two, {2, 1}));
     ASSERT_EQ(dspi_irfft(two), 0);
     EXPECT_TRUE(is_real<R>(two, {3, 1}));
-    EXPECT_EQ(two->delta, scalar<R>(0.5));
+    EXPECT_EQ(two->delta, T(0.5));
 
     auto four = real<R>({1, 2, 4, 8});
     ASSERT_EQ(dspi_rfft(four), 0);
@@ -221,8 +202,7 @@ TYPED_TEST(RealFftTest, ShortSignals) {
     EXPECT_EQ(dspi_irfft(none), -1);
 }
 
-TYPED_TEST(RealFftTest, InverseTakesWhatARealSignalCanHave) {
-    using R = TypeParam;
+BOTH_PRECISIONS(RealFft, InverseTakesWhatARealSignalCanHave) {
     // Imaginary parts of the outer bins have no real signal.
     auto x = complex<R>({{1, 9}, {2, 3}, {4, 9}});
     ASSERT_EQ(dspi_irfft(x), 0);
@@ -243,8 +223,7 @@ TYPED_TEST(RealFftTest, InverseTakesWhatARealSignalCanHave) {
     EXPECT_EQ(host.host, before);
 }
 
-TYPED_TEST(RealFftTest, ReconstructionMirrorsAndConjugates) {
-    using R = TypeParam;
+BOTH_PRECISIONS(RealFft, ReconstructionMirrorsAndConjugates) {
     auto x = real<R>({1, 2, 3, 4}, 5);
     ASSERT_EQ(dspi_orecon(x, 0), 0);
     EXPECT_TRUE(is_real<R>(x, {1, 2, 3, 4, 3, 2}));

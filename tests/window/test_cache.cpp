@@ -9,13 +9,6 @@ namespace {
 using Values = std::vector<long double>;
 constexpr int wide = DSP_SCALE_WIDTH;
 
-template <class R>
-class Windowing : public ::testing::Test {
-  protected:
-    Windowing() { free_internal<R>(); }
-};
-TYPED_TEST_SUITE(Windowing, Precisions);
-
 template <Record R>
 int free_form(R* x, int which, int scale_type) {
     if (which == 0) return dspi_window_kaiser(x, 3, scale_type);
@@ -23,14 +16,14 @@ int free_form(R* x, int which, int scale_type) {
     return dspi_window_sinc(x, 1, 1, scale_type);
 }
 
-TYPED_TEST(Windowing, RotatesAndKeepsTheRest) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Windowing, RotatesAndKeepsTheRest) {
+    free_internal<R>();
     for (int n : {0, 1, 2, 5, 8}) {
         auto original = Noise(7).complex<R>(n);
-        original->delta = scalar<R>(0.125);
+        original->delta = T(0.125);
         const auto windowed = [&](int window, int scale_type, double w) {
             auto x = original;
-            EXPECT_EQ(dspi_window2(x, window, scale_type, scalar<R>(w)), 0);
+            EXPECT_EQ(dspi_window2(x, window, scale_type, T(w)), 0);
             EXPECT_EQ(x->delta, original->delta);
             return x;
         };
@@ -45,14 +38,14 @@ TYPED_TEST(Windowing, RotatesAndKeepsTheRest) {
         for (int window : {2, 1, 14, 23}) {
             EXPECT_TRUE(matches<R>(windowed(window, 0, 0), rotated(windowed(window, 32, 0))));
         }
-        for (int i = 0; i < 2 * n; ++i) original[i] *= scalar<R>(i < 2 ? n : 0);
+        for (int i = 0; i < 2 * n; ++i) original[i] *= T(i < 2 ? n : 0);
         EXPECT_TRUE(matches<R>(windowed(0, wide | 2, 0.3), original, 2));
         EXPECT_TRUE(matches<R>(windowed(0, wide | 2 | 16, 1), rotated(original), 2));
     }
 }
 
-TYPED_TEST(Windowing, RefusesOnceAndThenServesZeros) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Windowing, RefusesOnceAndThenServesZeros) {
+    free_internal<R>();
     const auto original = real<R>({1, 2, 3});
     for (auto [window, flags] : {std::pair{2, 4},
                                  {13, 4},
@@ -92,8 +85,8 @@ bool makes(int n, int window, int scale_type, double win_length) {
     return memory.growths() > 0;
 }
 
-TYPED_TEST(Windowing, KeepsSixteenByLengthIdentifierFlagsAndWidth) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Windowing, KeepsSixteenByLengthIdentifierFlagsAndWidth) {
+    free_internal<R>();
     const double eps = epsilon<R>;
     EXPECT_TRUE(makes<R>(8, 2, wide, 5));
     EXPECT_FALSE(makes<R>(8, 2, wide | 16 | 32 | 64, 5 * (1 + 8 * eps)));
@@ -114,8 +107,8 @@ TYPED_TEST(Windowing, KeepsSixteenByLengthIdentifierFlagsAndWidth) {
     }
 }
 
-TYPED_TEST(Windowing, EveryFailingGrowthIsReported) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Windowing, EveryFailingGrowthIsReported) {
+    free_internal<R>();
     const auto ramp = real<R>({1, 2, 3, 4, 5});
     Borrowed<R> host(ramp);
     for (int which : {0, 1, 2, 3}) {
@@ -130,8 +123,8 @@ TYPED_TEST(Windowing, EveryFailingGrowthIsReported) {
     EXPECT_EQ(host.host, scalars<R>(ramp));
 }
 
-TYPED_TEST(Windowing, AFailedWindowIsNeverHalfServed) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Windowing, AFailedWindowIsNeverHalfServed) {
+    free_internal<R>();
     Signal<R> x;
     const auto windowed = [&](int n, int fail_at) {
         x = Signal<R>(Values(std::size_t(n), 1));

@@ -6,13 +6,10 @@
 namespace wavkit::test {
 namespace {
 
-template <class R>
-class WindowNames : public ::testing::Test {
-  protected:
-    static constexpr auto to_str = pick<R>(dsp_window_to_str, dspf_window_to_str);
-    static constexpr auto from_str = pick<R>(dsp_window_from_str, dspf_window_from_str);
-};
-TYPED_TEST_SUITE(WindowNames, Precisions);
+template <Record R>
+constexpr auto to_str = std::same_as<R, dsp> ? dsp_window_to_str : dspf_window_to_str;
+template <Record R>
+constexpr auto from_str = std::same_as<R, dsp> ? dsp_window_from_str : dspf_window_from_str;
 
 struct Named {
     std::string name;
@@ -21,7 +18,7 @@ struct Named {
 #define NAMED(name, id) \
     Named { #name, DSP_WINDOW_##name, id }
 
-TYPED_TEST(WindowNames, EveryNameInAnyCaseAndTheFirstOneBack) {
+BOTH_PRECISIONS(WindowNames, EveryNameInAnyCaseAndTheFirstOneBack) {
     const Named windows[] = {NAMED(UNIFORM, 0),    NAMED(RECTANGULAR, 0),
                              NAMED(NONE, 0),       NAMED(P000, 0),
                              NAMED(BARTLETT, 1),   NAMED(TRIANGULAR, 1),
@@ -49,19 +46,19 @@ TYPED_TEST(WindowNames, EveryNameInAnyCaseAndTheFirstOneBack) {
             for (int lower : {0, 1}) {
                 int parsed = -7;
                 for (char& c : text) c = lower ? char(std::tolower(c)) : c;
-                EXPECT_EQ(TestFixture::from_str(text.c_str(), &parsed), 0) << text;
+                EXPECT_EQ(from_str<R>(text.c_str(), &parsed), 0) << text;
                 EXPECT_EQ(parsed, window.id) << text;
             }
         }
         if (window.id < next) continue;
         char first[20];
-        EXPECT_EQ(TestFixture::to_str(next++, first, sizeof first), 0);
+        EXPECT_EQ(to_str<R>(next++, first, sizeof first), 0);
         EXPECT_STRCASEEQ(first, window.name.c_str());
     }
     EXPECT_EQ(next, 24);
 }
 
-TYPED_TEST(WindowNames, BuffersAreCutTerminatedAndCleared) {
+BOTH_PRECISIONS(WindowNames, BuffersAreCutTerminatedAndCleared) {
     using namespace std::string_literals;
     for (auto [window, len, result, expected] : {std::tuple{9, 4, 0, "Fla\0xxxx"s},
                                                  {2, 5, 0, "Hann\0xxx"s},
@@ -72,21 +69,21 @@ TYPED_TEST(WindowNames, BuffersAreCutTerminatedAndCleared) {
                                                  {0, 0, -1, "xxxxxxxx"s},
                                                  {0, -3, -1, "xxxxxxxx"s}}) {
         std::string buf(8, 'x');
-        EXPECT_EQ(TestFixture::to_str(window, buf.data(), len), result) << window;
+        EXPECT_EQ(to_str<R>(window, buf.data(), len), result) << window;
         EXPECT_EQ(buf, expected) << window << " " << len;
     }
-    EXPECT_EQ(TestFixture::to_str(0, nullptr, 8), -1);
+    EXPECT_EQ(to_str<R>(0, nullptr, 8), -1);
 }
 
-TYPED_TEST(WindowNames, UnknownNamesGiveTheUniformWindowAndFail) {
+BOTH_PRECISIONS(WindowNames, UnknownNamesGiveTheUniformWindowAndFail) {
     int window = 5;
-    EXPECT_EQ(TestFixture::from_str(nullptr, &window), -1);
+    EXPECT_EQ(from_str<R>(nullptr, &window), -1);
     EXPECT_EQ(window, 5);
-    EXPECT_EQ(TestFixture::from_str("Hann", nullptr), -1);
+    EXPECT_EQ(from_str<R>("Hann", nullptr), -1);
     for (const char* name : {"", "Kaiser7", "Kaiser700", " Hann", "Hann ", "DSP_WINDOW_",
                              "DSP_WINDOW_DSP_WINDOW_HANN", "24", "H\xC4nn"}) {
         window = 5;
-        EXPECT_EQ(TestFixture::from_str(name, &window), -1) << name;
+        EXPECT_EQ(from_str<R>(name, &window), -1) << name;
         EXPECT_EQ(window, 0) << name;
     }
 }

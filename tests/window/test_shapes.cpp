@@ -6,10 +6,6 @@ namespace {
 
 using Values = std::vector<long double>;
 
-template <class R>
-class WindowShapes : public ::testing::Test {};
-TYPED_TEST_SUITE(WindowShapes, Precisions);
-
 /// The window itself: what `apply` makes of a constant.
 template <Record R, class Apply>
 Signal<R> made(int n, Apply apply) {
@@ -77,8 +73,7 @@ long double mean_of(int id) {
     return id < 8 || id > 13 ? 1 : flat[id - 8];
 }
 
-TYPED_TEST(WindowShapes, FormulaMeanMeanSquareAndBandwidth) {
-    using R = TypeParam;
+BOTH_PRECISIONS(WindowShapes, FormulaMeanMeanSquareAndBandwidth) {
     // Equivalent noise bandwidths in bins, as they are published.
     static const double enbw[] = {1.0000, 1.3333, 1.5000, 1.3628, 1.7268, 1.7037, 2.0212, 2.2153,
                                   3.4279, 3.8221, 4.2316, 4.5500, 4.1794, 4.5124, 1.7995, 1.9084,
@@ -102,17 +97,15 @@ TYPED_TEST(WindowShapes, FormulaMeanMeanSquareAndBandwidth) {
                 EXPECT_NEAR(bandwidth, enbw[id], symmetric ? 1e-3 : 1e-4) << id;
             }
             // The modes differ by a factor only.
-            dspi_scale(peak, scalar<R>(mean_of(id) / Measured(peak).mean));
+            dspi_scale(peak, T(mean_of(id) / Measured(peak).mean));
             EXPECT_TRUE(matches<R>(mean, peak, 100)) << id << " " << n;
-            dspi_scale(peak, scalar<R>(1 / std::sqrt(Measured(peak).square)));
+            dspi_scale(peak, T(1 / std::sqrt(Measured(peak).square)));
             EXPECT_TRUE(matches<R>(rms, peak, 100)) << id << " " << n;
         }
     }
 }
 
-TYPED_TEST(WindowShapes, WidthsInsideTheSignal) {
-    using R = TypeParam;
-    using T = scalar<R>;
+BOTH_PRECISIONS(WindowShapes, WidthsInsideTheSignal) {
     const long double eps = epsilon<R>, inf = std::numeric_limits<T>::infinity();
     for (int n : {1, 2, 9, 16}) {
         // Widths asked for, and those that result; at last a width just beyond the tolerance.
@@ -159,22 +152,20 @@ TYPED_TEST(WindowShapes, WidthsInsideTheSignal) {
     }
 }
 
-TYPED_TEST(WindowShapes, SumsOfAnyCosines) {
-    using R = TypeParam;
-    const auto apply = pick<R>(dspi_window_cos, dspfi_window_cos);
+BOTH_PRECISIONS(WindowShapes, SumsOfAnyCosines) {
     const auto coefs = Noise(3).real<R>(40);
     const Values a(coefs->data, coefs->data + 40);
     for (int n : {1, 6, 7, 500}) {  // often fewer samples than terms; always rotated
         Values expected;
         for (int i = 0; i < n; ++i) expected.push_back(sum_of_cosines(a, i, n));
-        const auto w = made<R>(n, [&](R* x) { return apply(x, coefs); });
+        const auto w = made<R>(n, [&](R* x) { return dspi_window_cos(x, coefs); });
         EXPECT_TRUE(is_real<R>(w, expected, 200)) << n;
     }
     auto x = real<R>({1, 2});
-    EXPECT_EQ(apply(x, x), 0);
-    EXPECT_EQ(apply(x, complex<R>({1, 2})), -1);
+    EXPECT_EQ(dspi_window_cos(x, x), 0);
+    EXPECT_EQ(dspi_window_cos(x, complex<R>({1, 2})), -1);
     EXPECT_TRUE(is_real<R>(x, {2 * 3, 1 * -1}));
-    EXPECT_EQ(apply(x, real<R>({})), 0);
+    EXPECT_EQ(dspi_window_cos(x, real<R>({})), 0);
     EXPECT_TRUE(is_real<R>(x, {-0.0L, 0}));
 }
 
@@ -195,8 +186,7 @@ Signal<R> sinc(int n, double x0, long double p, int scale_type) {
         n, [=](R* x) { return dspi_window_sinc(x, scalar<R>(x0), scalar<R>(p), scale_type); });
 }
 
-TYPED_TEST(WindowShapes, FreeParameters) {
-    using R = TypeParam;
+BOTH_PRECISIONS(WindowShapes, FreeParameters) {
     EXPECT_TRUE(is_real<R>(gauss<R>(6, 0, 38), {0, 0, 1, 1, 0, 0}));
     EXPECT_TRUE(is_real<R>(gauss<R>(6, 0, 32), {0, 0, 0, 6, 0, 0}, 4));
     EXPECT_TRUE(is_real<R>(gauss<R>(3, 0, 2), {1, 0, 0}));

@@ -7,19 +7,6 @@
 namespace wavkit::test {
 namespace {
 
-template <class R>
-class WindowScalingTest : public ::testing::Test {};
-TYPED_TEST_SUITE(WindowScalingTest, Precisions);
-
-template <class R>
-constexpr auto scale_of = pick<R>(dsp_window_scale, dspf_window_scale);
-template <class R>
-constexpr auto scale2_of = pick<R>(dsp_window2_scale, dspf_window2_scale);
-template <class R>
-constexpr auto enbw_of = pick<R>(dsp_window_enbw, dspf_window_enbw);
-template <class R>
-constexpr auto enbw2_of = pick<R>(dsp_window2_enbw, dspf_window2_enbw);
-
 constexpr int windows = 24;
 
 /// The window of n points in scale mode 2 (its centre is 1), from a signal of ones.
@@ -44,18 +31,16 @@ Means means_of(const std::vector<T>& w) {
     return m;
 }
 
-TYPED_TEST(WindowScalingTest, FactorsTakeTheWindowToMeanAndMeanSquareOne) {
-    using R = TypeParam;
-    using T = scalar<R>;
+BOTH_PRECISIONS(WindowScaling, FactorsTakeTheWindowToMeanAndMeanSquareOne) {
     for (int window = 0; window < windows; ++window) {
         // The short lengths fold the highest cosine terms onto lower ones.
         for (const int n : {1, 2, 3, 4, 5, 6, 7, 8, 9, 11, 12, 13, 14, 64, 1001}) {
             const auto m = means_of(window_samples<R>(window, n, 0, 0));
             T to_mean, to_rms, enbw, plain;
-            ASSERT_EQ(scale_of<R>(&to_mean, window, 0, n), 0);
-            ASSERT_EQ(scale_of<R>(&to_rms, window, 1, n), 0);
-            ASSERT_EQ(scale_of<R>(&plain, window, 2, n), 0);
-            ASSERT_EQ(enbw_of<R>(&enbw, window, n), 0);
+            ASSERT_EQ(dsp_window_scale(&to_mean, window, 0, n), 0);
+            ASSERT_EQ(dsp_window_scale(&to_rms, window, 1, n), 0);
+            ASSERT_EQ(dsp_window_scale(&plain, window, 2, n), 0);
+            ASSERT_EQ(dsp_window_enbw(&enbw, window, n), 0);
             // The flat windows' definition has a mean of up to 0.06 % beside 1.
             const long double defined = window >= 8 && window <= 13 ? 6e-4L : 64 * epsilon<R>;
             EXPECT_NEAR(to_mean * m.mean, 1, double(defined)) << window << ' ' << n;
@@ -68,17 +53,15 @@ TYPED_TEST(WindowScalingTest, FactorsTakeTheWindowToMeanAndMeanSquareOne) {
     }
 }
 
-TYPED_TEST(WindowScalingTest, NarrowAndSymmetricWindowsAreMeasured) {
-    using R = TypeParam;
-    using T = scalar<R>;
+BOTH_PRECISIONS(WindowScaling, NarrowAndSymmetricWindowsAreMeasured) {
     for (int window = 0; window < windows; ++window) {
         const bool takes_width = window == 0 || (window >= 2 && window <= 13);
         for (const T width : {T(50), T(17.5), T(3)}) {
             T to_mean = 7, to_rms = 7, enbw = 7;
             const int expected = takes_width ? 0 : -1;
-            ASSERT_EQ(scale2_of<R>(&to_mean, window, 8, 100, width), expected) << window;
-            ASSERT_EQ(scale2_of<R>(&to_rms, window, 9, 100, width), expected);
-            ASSERT_EQ(enbw2_of<R>(&enbw, window, 100, width), expected);
+            ASSERT_EQ(dsp_window2_scale(&to_mean, window, 8, 100, width), expected) << window;
+            ASSERT_EQ(dsp_window2_scale(&to_rms, window, 9, 100, width), expected);
+            ASSERT_EQ(dsp_window2_enbw(&enbw, window, 100, width), expected);
             if (!takes_width) {
                 EXPECT_EQ(enbw, 7);
                 continue;
@@ -90,43 +73,41 @@ TYPED_TEST(WindowScalingTest, NarrowAndSymmetricWindowsAreMeasured) {
         }
         if (window >= 14) {
             T to_rms;
-            ASSERT_EQ(scale2_of<R>(&to_rms, window, 1 | 4, 33, 0), 0);
+            ASSERT_EQ(dsp_window2_scale(&to_rms, window, 1 | 4, 33, 0), 0);
             const auto m = means_of(window_samples<R>(window, 33, 4, 0));
             EXPECT_NEAR(to_rms * std::sqrt(m.square), 1, 16 * epsilon<R>);
         }
     }
     T enbw;
-    ASSERT_EQ(enbw2_of<R>(&enbw, 0, 100, T(24.5)), 0);
+    ASSERT_EQ(dsp_window2_enbw(&enbw, 0, 100, T(24.5)), 0);
     EXPECT_NEAR(enbw, 100 / 25.0, 8 * epsilon<R>);
 }
 
-TYPED_TEST(WindowScalingTest, ClosedFormsAndRefusals) {
-    using R = TypeParam;
-    using T = scalar<R>;
+BOTH_PRECISIONS(WindowScaling, ClosedFormsAndRefusals) {
     T value = 0;
-    ASSERT_EQ(scale_of<R>(&value, 2, 0, 1024), 0);
+    ASSERT_EQ(dsp_window_scale(&value, 2, 0, 1024), 0);
     EXPECT_EQ(value, 2);
-    ASSERT_EQ(scale_of<R>(&value, 1, 0, 3), 0);
+    ASSERT_EQ(dsp_window_scale(&value, 1, 0, 3), 0);
     EXPECT_NEAR(value, 1.8, 2 * epsilon<R>);
-    ASSERT_EQ(scale_of<R>(&value, 2, 0, 1), 0);
+    ASSERT_EQ(dsp_window_scale(&value, 2, 0, 1), 0);
     EXPECT_EQ(value, 1);
-    ASSERT_EQ(enbw_of<R>(&value, 2, 3), 0);
+    ASSERT_EQ(dsp_window_enbw(&value, 2, 3), 0);
     EXPECT_NEAR(value, 1.5, 4 * epsilon<R>);
 
     // Without a window there is nothing to scale, and nothing is looked at.
     for (const auto& [window, type, n] : {std::tuple{99, 2, 10}, {99, 0, 0}, {2, 3, -5}}) {
         value = 0;
-        ASSERT_EQ(scale_of<R>(&value, window, type, n), 0);
+        ASSERT_EQ(dsp_window_scale(&value, window, type, n), 0);
         EXPECT_EQ(value, 1);
     }
-    EXPECT_EQ(scale_of<R>(&value, 2, 3, 10), -1);
-    EXPECT_EQ(scale_of<R>(&value, 2, 8, 10), -1);
-    EXPECT_EQ(scale_of<R>(&value, 24, 0, 10), -1);
-    EXPECT_EQ(scale_of<R>(&value, -1, 1, 10), -1);
-    EXPECT_EQ(scale2_of<R>(&value, 2, 8 | 4, 10, 5), -1);
-    EXPECT_EQ(enbw_of<R>((T*)nullptr, 2, 10), -1);
-    EXPECT_EQ(enbw2_of<R>((T*)nullptr, 2, 10, 5), -1);
-    EXPECT_EQ(fail_each_growth<R>([&] { return scale_of<R>(&value, 20, 1, 10); }), 2);
+    EXPECT_EQ(dsp_window_scale(&value, 2, 3, 10), -1);
+    EXPECT_EQ(dsp_window_scale(&value, 2, 8, 10), -1);
+    EXPECT_EQ(dsp_window_scale(&value, 24, 0, 10), -1);
+    EXPECT_EQ(dsp_window_scale(&value, -1, 1, 10), -1);
+    EXPECT_EQ(dsp_window2_scale(&value, 2, 8 | 4, 10, 5), -1);
+    EXPECT_EQ(dsp_window_enbw((T*)nullptr, 2, 10), -1);
+    EXPECT_EQ(dsp_window2_enbw((T*)nullptr, 2, 10, 5), -1);
+    EXPECT_EQ(fail_each_growth<R>([&] { return dsp_window_scale(&value, 20, 1, 10); }), 2);
 }
 
 }  // namespace
