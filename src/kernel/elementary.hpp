@@ -1,0 +1,6 @@
+// The elementary functions of vectors, and the loops that carry them over a signal.
+#pragma once
+
+#include "kernel/exponential.hpp"
+#include "kernel/logarithm.hpp"
+#include "kernel/map.hpp"
