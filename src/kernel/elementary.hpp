@@ -4,3 +4,4 @@
 #include "kernel/exponential.hpp"
 #include "kernel/logarithm.hpp"
 #include "kernel/map.hpp"
+#include "kernel/trigonometric.hpp"

@@ -109,14 +109,49 @@ WAVKIT_LANES V at_most(V v, V high) {
     return v > high ? high : v;
 }
 
+/// a in the lanes where the lowest bit of the integer is set, else b.
 template <class V>
-WAVKIT_LANES bool any(Bits<V> mask) {
-#if defined(__AVX512F__) && defined(__AVX512DQ__)
+WAVKIT_LANES V select_odd(Bits<V> integer, V a, V b) {
+#if defined(__AVX512F__)
     if constexpr (sizeof(V) == 64) {
-        if constexpr (is_double<V>) return _mm512_movepi64_mask((__m512i)mask) != 0;
-        return _mm512_movepi32_mask((__m512i)mask) != 0;
+        if constexpr (is_double<V>) {
+            const auto odd = _mm512_test_epi64_mask((__m512i)integer, _mm512_set1_epi64(1));
+            return (V)_mm512_mask_blend_pd(odd, (__m512d)b, (__m512d)a);
+        } else {
+            const auto odd = _mm512_test_epi32_mask((__m512i)integer, _mm512_set1_epi32(1));
+            return (V)_mm512_mask_blend_ps(odd, (__m512)b, (__m512)a);
+        }
     }
 #endif
+    return (integer & 1) != 0 ? a : b;
+}
+
+/// v with its sign flipped where the sign bit of `b` is set.
+template <class V>
+WAVKIT_LANES V flip_by_sign_of(V v, Bits<V> b) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {  // v ^ (b & sign), which is one instruction
+        const auto sign = (__m512i)(sign_bit<V> - Bits<V>{});
+        return (V)_mm512_ternarylogic_epi64((__m512i)v, (__m512i)b, sign, 0x78);
+    }
+#endif
+    return from_bits<V>(bits(v) ^ (b & sign_bit<V>));
+}
+
+/// Whether any lane's magnitude is above `limit` (no NaN is).
+template <class V>
+WAVKIT_LANES bool any_above(V v, Lane<V> limit) {
+    const V size = abs(v);
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        if constexpr (is_double<V>) {
+            return _mm512_cmp_pd_mask((__m512d)size, _mm512_set1_pd(limit), _CMP_GT_OQ) != 0;
+        } else {
+            return _mm512_cmp_ps_mask((__m512)size, _mm512_set1_ps(limit), _CMP_GT_OQ) != 0;
+        }
+    }
+#endif
+    const auto mask = size > limit;
 #if defined(__AVX2__)
     if constexpr (sizeof(V) == 32) return _mm256_movemask_epi8((__m256i)mask) != 0;
 #endif
