@@ -2,6 +2,7 @@
 #pragma once
 
 #include "kernel/exponential.hpp"
+#include "kernel/inverse_trigonometric.hpp"
 #include "kernel/logarithm.hpp"
 #include "kernel/map.hpp"
 #include "kernel/trigonometric.hpp"

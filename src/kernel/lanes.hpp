@@ -163,6 +163,26 @@ WAVKIT_LANES bool any_above(V v, Lane<V> limit) {
     return set != 0;
 }
 
+/// Whether any lane's magnitude is below `limit` (no NaN is).
+template <class V>
+WAVKIT_LANES bool any_below(V v, Lane<V> limit) {
+    return any_above(abs(v) < limit ? all<V>(Lane<V>(1)) : V{}, Lane<V>(0));
+}
+
+/// The root, rounded as one operation.
+template <class V>
+WAVKIT_LANES V sqrt(V v) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        if constexpr (is_double<V>) return (V)_mm512_maskz_sqrt_pd(0xff, (__m512d)v);
+        else return (V)_mm512_maskz_sqrt_ps(0xffff, (__m512)v);
+    }
+#endif
+    V root;
+    for (int i = 0; i < count<V>; ++i) root[i] = std::sqrt(v[i]);
+    return root;
+}
+
 #if defined(__FMA__) || defined(__aarch64__)
 inline constexpr bool fused = true;
 #else

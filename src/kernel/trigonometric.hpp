@@ -125,16 +125,16 @@ WAVKIT_LANES Bits<V> quadrant_sign(Bits<V> quadrant) {
 
 template <class V>
 WAVKIT_LANES V sin(V x) {
-    const auto angle = reduce(x);
+    const auto angle = reduce(abs(x));
     const auto [s, c] = sine_cosine_of(angle);
     const V result = flip_by_sign_of(select_odd(angle.quadrant, c, s),
-                                     quadrant_sign<V>(angle.quadrant));
+                                     quadrant_sign<V>(angle.quadrant) ^ bits(x));
     return mend_large_angles(result, x, [](Lane<V> v) { return std::sin(v); });
 }
 
 template <class V>
 WAVKIT_LANES V cos(V x) {
-    const auto angle = reduce(x);
+    const auto angle = reduce(abs(x));
     const auto [s, c] = sine_cosine_of(angle);
     const V result = flip_by_sign_of(select_odd(angle.quadrant, s, c),
                                      quadrant_sign<V>(angle.quadrant + 1));
@@ -144,10 +144,10 @@ WAVKIT_LANES V cos(V x) {
 /// Both for little more than the price of one.
 template <class V>
 WAVKIT_LANES SineCosine<V> sincos(V x) {
-    const auto angle = reduce(x);
+    const auto angle = reduce(abs(x));
     const auto [s, c] = sine_cosine_of(angle);
     const V sine = flip_by_sign_of(select_odd(angle.quadrant, c, s),
-                                   quadrant_sign<V>(angle.quadrant));
+                                   quadrant_sign<V>(angle.quadrant) ^ bits(x));
     const V cosine = flip_by_sign_of(select_odd(angle.quadrant, s, c),
                                      quadrant_sign<V>(angle.quadrant + 1));
     return {mend_large_angles(sine, x, [](Lane<V> v) { return std::sin(v); }),
