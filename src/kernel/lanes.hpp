@@ -1,0 +1,349 @@
+// What the elementary functions need of a vector beyond + - * /: selection by a mask, the bits of a
+// number, fused products, powers of two. Written on the compiler's vector extension; where an
+// instruction set has one instruction for it that the compiler would not find, that is taken.
+#pragma once
+
+#include <bit>
+#include <cmath>
+#include <cstdint>
+#include <limits>
+#include <type_traits>
+
+#if defined(__x86_64__)
+#include <immintrin.h>
+#endif
+
+#include "kernel/vector.hpp"
+
+namespace wavkit::kernel {
+namespace {
+
+#if defined(__AVX512F__) && defined(__AVX512DQ__) && defined(__AVX512VL__)
+inline constexpr int register_bytes = 64;
+#elif defined(__AVX2__)
+inline constexpr int register_bytes = 32;
+#else
+inline constexpr int register_bytes = 16;
+#endif
+
+/// Values that a register of this instruction set holds.
+template <class T>
+inline constexpr int lanes = register_bytes / int(sizeof(T));
+
+template <class T>
+using Lanes = Vec<T, lanes<T>>;
+
+/// double or float: what the lanes of V hold.
+template <class V>
+using Lane = std::remove_cvref_t<decltype(V{}[0])>;
+
+/// Integers as wide as the lanes of V, as many; also what comparing two V gives (0 or -1).
+template <class V>
+using Bits = decltype(V{} < V{});
+
+template <class V>
+inline constexpr int count = int(sizeof(V) / sizeof(Lane<V>));
+
+/// Every function here is a few instructions of a loop, and only fast as part of it.
+#define WAVKIT_LANES [[gnu::always_inline]] inline
+
+template <class V>
+inline constexpr bool is_double = sizeof(Lane<V>) == 8;
+
+/// `value` in every lane.
+template <class V>
+WAVKIT_LANES V all(Lane<V> value) {
+    return value - V{};
+}
+
+template <class V>
+WAVKIT_LANES Bits<V> bits(V v) {
+    return (Bits<V>)v;
+}
+
+template <class V>
+WAVKIT_LANES V from_bits(Bits<V> b) {
+    return (V)b;
+}
+
+template <class V>
+inline constexpr Lane<Bits<V>> sign_bit = std::numeric_limits<Lane<Bits<V>>>::min();
+
+template <class V>
+WAVKIT_LANES V abs(V v) {
+    return from_bits<V>(bits(v) & ~sign_bit<V>);
+}
+
+/// The bit of the sign and nothing else.
+template <class V>
+WAVKIT_LANES Bits<V> sign_of(V v) {
+    return bits(v) & sign_bit<V>;
+}
+
+template <class V>
+WAVKIT_LANES V flip_sign(V v, Bits<V> sign) {
+    return from_bits<V>(bits(v) ^ sign);
+}
+
+/// The larger of v and low; a NaN v stays NaN.
+template <class V>
+WAVKIT_LANES V at_least(V v, V low) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        if constexpr (is_double<V>) return (V)_mm512_maskz_max_pd(0xff, (__m512d)low, (__m512d)v);
+        else return (V)_mm512_maskz_max_ps(0xffff, (__m512)low, (__m512)v);
+    }
+#endif
+    return v < low ? low : v;
+}
+
+/// The smaller of v and high; a NaN v stays NaN.
+template <class V>
+WAVKIT_LANES V at_most(V v, V high) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        if constexpr (is_double<V>) return (V)_mm512_maskz_min_pd(0xff, (__m512d)high, (__m512d)v);
+        else return (V)_mm512_maskz_min_ps(0xffff, (__m512)high, (__m512)v);
+    }
+#endif
+    return v > high ? high : v;
+}
+
+/// a in the lanes where the lowest bit of the integer is set, else b.
+template <class V>
+WAVKIT_LANES V select_odd(Bits<V> integer, V a, V b) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        if constexpr (is_double<V>) {
+            const auto odd = _mm512_test_epi64_mask((__m512i)integer, _mm512_set1_epi64(1));
+            return (V)_mm512_mask_blend_pd(odd, (__m512d)b, (__m512d)a);
+        } else {
+            const auto odd = _mm512_test_epi32_mask((__m512i)integer, _mm512_set1_epi32(1));
+            return (V)_mm512_mask_blend_ps(odd, (__m512)b, (__m512)a);
+        }
+    }
+#endif
+    return (integer & 1) != 0 ? a : b;
+}
+
+/// v with its sign flipped where the sign bit of `b` is set.
+template <class V>
+WAVKIT_LANES V flip_by_sign_of(V v, Bits<V> b) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {  // v ^ (b & sign), which is one instruction
+        const auto sign = (__m512i)(sign_bit<V> - Bits<V>{});
+        return (V)_mm512_ternarylogic_epi64((__m512i)v, (__m512i)b, sign, 0x78);
+    }
+#endif
+    return from_bits<V>(bits(v) ^ (b & sign_bit<V>));
+}
+
+/// Whether any lane's magnitude is above `limit` (no NaN is).
+template <class V>
+WAVKIT_LANES bool any_above(V v, Lane<V> limit) {
+    const V size = abs(v);
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        if constexpr (is_double<V>) {
+            return _mm512_cmp_pd_mask((__m512d)size, _mm512_set1_pd(limit), _CMP_GT_OQ) != 0;
+        } else {
+            return _mm512_cmp_ps_mask((__m512)size, _mm512_set1_ps(limit), _CMP_GT_OQ) != 0;
+        }
+    }
+#endif
+    const auto mask = size > limit;
+#if defined(__AVX2__)
+    if constexpr (sizeof(V) == 32) return _mm256_movemask_epi8((__m256i)mask) != 0;
+#endif
+#if defined(__x86_64__)
+    if constexpr (sizeof(V) == 16) return _mm_movemask_epi8((__m128i)mask) != 0;
+#endif
+    Lane<Bits<V>> set = 0;
+    for (int i = 0; i < count<V>; ++i) set |= mask[i];
+    return set != 0;
+}
+
+/// Whether any lane's magnitude is below `limit` (no NaN is).
+template <class V>
+WAVKIT_LANES bool any_below(V v, Lane<V> limit) {
+    return any_above(abs(v) < limit ? all<V>(Lane<V>(1)) : V{}, Lane<V>(0));
+}
+
+/// The root, rounded as one operation.
+template <class V>
+WAVKIT_LANES V sqrt(V v) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        if constexpr (is_double<V>) return (V)_mm512_maskz_sqrt_pd(0xff, (__m512d)v);
+        else return (V)_mm512_maskz_sqrt_ps(0xffff, (__m512)v);
+    }
+#endif
+    V root;
+    for (int i = 0; i < count<V>; ++i) root[i] = std::sqrt(v[i]);
+    return root;
+}
+
+#if defined(__FMA__) || defined(__aarch64__)
+inline constexpr bool fused = true;
+#else
+inline constexpr bool fused = false;
+#endif
+
+/// a * b + c, rounded once where the processor can, else twice.
+template <class V>
+WAVKIT_LANES V mul_add(V a, V b, V c) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        if constexpr (is_double<V>) return (V)_mm512_fmadd_pd((__m512d)a, (__m512d)b, (__m512d)c);
+        return (V)_mm512_fmadd_ps((__m512)a, (__m512)b, (__m512)c);
+    }
+#endif
+#if defined(__FMA__)
+    if constexpr (sizeof(V) == 32) {
+        if constexpr (is_double<V>) return (V)_mm256_fmadd_pd((__m256d)a, (__m256d)b, (__m256d)c);
+        return (V)_mm256_fmadd_ps((__m256)a, (__m256)b, (__m256)c);
+    }
+    if constexpr (sizeof(V) == 16) {
+        if constexpr (is_double<V>) return (V)_mm_fmadd_pd((__m128d)a, (__m128d)b, (__m128d)c);
+        return (V)_mm_fmadd_ps((__m128)a, (__m128)b, (__m128)c);
+    }
+#endif
+    if constexpr (fused) {
+        V sum;
+        for (int i = 0; i < count<V>; ++i) sum[i] = std::fma(a[i], b[i], c[i]);
+        return sum;
+    }
+    return a * b + c;
+}
+
+template <class V>
+WAVKIT_LANES V mul_add(V a, Lane<V> b, V c) {
+    return mul_add(a, all<V>(b), c);
+}
+
+template <class V>
+WAVKIT_LANES V mul_add(V a, Lane<V> b, Lane<V> c) {
+    return mul_add(a, all<V>(b), all<V>(c));
+}
+
+template <class V>
+WAVKIT_LANES V mul_add(V a, V b, Lane<V> c) {
+    return mul_add(a, b, all<V>(c));
+}
+
+/// a * b - p for p near a * b, exactly rounded: with p = a * b what rounding has taken from the
+/// product. Without a fused product by splitting the factors (T. J. Dekker, 1971), for factors that
+/// do not overflow when multiplied by 2^27.
+template <class V>
+WAVKIT_LANES V product_minus(V a, V b, V p) {
+    if constexpr (fused) return mul_add(a, b, -p);
+    constexpr auto low_half = Lane<Bits<V>>(is_double<V> ? (1LL << 27) - 1 : (1LL << 12) - 1);
+    const V a1 = from_bits<V>(bits(a) & ~low_half), b1 = from_bits<V>(bits(b) & ~low_half);
+    const V a2 = a - a1, b2 = b - b1;
+    return (((a1 * b1 - p) + a1 * b2) + a2 * b1) + a2 * b2;
+}
+
+/// c[0] + c[1] x + c[2] x^2 + ..., odd and even powers apart: two short chains instead of a long.
+template <class V, std::size_t N>
+WAVKIT_LANES V polynomial(V x, const Lane<V> (&c)[N]) {
+    if constexpr (N == 1) {
+        return all<V>(c[0]);
+    } else if constexpr (N == 2) {
+        return mul_add(x, c[1], c[0]);
+    } else if constexpr (N == 3) {
+        return mul_add(x, mul_add(x, c[2], c[1]), c[0]);
+    } else {
+        const V square = x * x;
+        V last = all<V>(c[N - 1]), other = all<V>(c[N - 2]);
+        for (int i = int(N) - 3; i >= 0; --i) {
+            const V next = mul_add(last, square, c[i]);
+            last = other;
+            other = next;
+        }
+        return mul_add(last, x, other);  // last: odd powers
+    }
+}
+
+/// The whole number nearest to v, and the same as an integer in the lowest bits of `bits`. For
+/// |v| < 2^51, of floats 2^22.
+template <class V>
+struct Rounded {
+    V number;
+    Bits<V> low_bits;
+};
+
+/// 1.5 * 2^52 (2^23): a number added to it loses its fraction.
+template <class V>
+inline constexpr Lane<V> to_whole = is_double<V> ? Lane<V>(0x1.8p52) : Lane<V>(0x1.8p23);
+
+/// v * factor rounded to whole numbers.
+template <class V>
+WAVKIT_LANES Rounded<V> round_product(V v, Lane<V> factor) {
+    const V shifted = mul_add(v, factor, to_whole<V>);
+    return {shifted - to_whole<V>, bits(shifted)};
+}
+
+/// 2^k for whole numbers k in the range of normal numbers.
+template <class V>
+WAVKIT_LANES V power_of_two(V k) {
+    constexpr int mantissa = is_double<V> ? 52 : 23, bias = is_double<V> ? 1023 : 127;
+    return from_bits<V>(bits(k + (to_whole<V> + Lane<V>(bias))) << mantissa);
+}
+
+/// v * 2^k, rounded once where the result is subnormal; |k| up to twice the largest exponent.
+template <class V>
+WAVKIT_LANES V scale(V v, V k) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        if constexpr (is_double<V>) return (V)_mm512_maskz_scalef_pd(0xff, (__m512d)v, (__m512d)k);
+        return (V)_mm512_maskz_scalef_ps(0xffff, (__m512)v, (__m512)k);
+    }
+#endif
+    const V half = mul_add(k, Lane<V>(0.5), to_whole<V>) - to_whole<V>;
+    return v * power_of_two(half) * power_of_two(k - half);
+}
+
+/// x = number * 2^exponent with 0.75 <= number < 1.5, for every x > 0, subnormal ones too. Of zero,
+/// negative and infinite x without meaning.
+template <class V>
+struct Parts {
+    V number, exponent;
+};
+
+template <class V>
+WAVKIT_LANES Parts<V> parts(V x) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        V number, exponent;
+        constexpr auto interval = _MM_MANT_NORM_p75_1p5;
+        if constexpr (is_double<V>) {
+            number = (V)_mm512_maskz_getmant_pd(0xff, (__m512d)x, interval, _MM_MANT_SIGN_src);
+            exponent = (V)_mm512_maskz_getexp_pd(0xff, (__m512d)x);
+        } else {
+            number = (V)_mm512_maskz_getmant_ps(0xffff, (__m512)x, interval, _MM_MANT_SIGN_src);
+            exponent = (V)_mm512_maskz_getexp_ps(0xffff, (__m512)x);
+        }
+        return {number, number < Lane<V>(1) ? exponent + Lane<V>(1) : exponent};
+    }
+#endif
+    using T = Lane<V>;
+    using I = Lane<Bits<V>>;
+    constexpr int mantissa = is_double<V> ? 52 : 23;
+    constexpr T lift = is_double<V> ? T(0x1p54) : T(0x1p25);
+    constexpr T lifted = is_double<V> ? T(54) : T(25);
+    const auto subnormal = x < std::numeric_limits<T>::min();
+    const auto b = bits(subnormal ? x * lift : x);
+    // From 1.5 on the next power of two is the nearer one.
+    constexpr I half = I(1) << (mantissa - 1), one = I(std::bit_cast<I>(T(1)));
+    const auto up = b + half;
+    const auto exponent = (up >> mantissa) & I(is_double<V> ? 0x7ff : 0xff);
+    const V number = from_bits<V>(b - (up & ~((I(1) << mantissa) - 1)) + one);
+    // An integer below 2^52 (2^23) behind the bits of that number is a number of its own.
+    constexpr T base = is_double<V> ? T(0x1p52) : T(0x1p23);
+    const V shifted = from_bits<V>(exponent | std::bit_cast<I>(base));
+    const T bias = base + T(is_double<V> ? 1023 : 127);
+    return {number, shifted - (subnormal ? all<V>(bias + lifted) : all<V>(bias))};
+}
+
+}  // namespace
+}  // namespace wavkit::kernel

@@ -1,0 +1,74 @@
+// Natural and decimal logarithm of vectors, to one unit in the last place.
+//
+// x = 2^k (1 + f) with 0.75 <= 1 + f < 1.5, log(1 + f) = 2 artanh(s) with s = f / (2 + f), written
+// as f - f^2/2 + s (f^2/2 + R(s^2)) so that the leading terms are exact (as in W. J. Cody and
+// W. Waite, Software Manual for the Elementary Functions, 1980).
+#pragma once
+
+#include "kernel/exponential.hpp"
+
+namespace wavkit::kernel {
+namespace {
+
+/// `result`, where x is a positive number: -infinity of a zero, NaN of a negative number or NaN,
+/// infinity of infinity.
+template <class V>
+WAVKIT_LANES V mend_logarithm(V x, V result) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        // What becomes of each class of x: the result stays (0) or is a constant (3 NaN, ...).
+        const auto actions = _mm512_set1_epi32(0x03530422);
+        if constexpr (is_double<V>) {
+            return (V)_mm512_fixupimm_pd((__m512d)result, (__m512d)x, actions, 0);
+        } else {
+            return (V)_mm512_fixupimm_ps((__m512)result, (__m512)x, actions, 0);
+        }
+    }
+#endif
+    using Limits = std::numeric_limits<Lane<V>>;
+    result = x > Limits::max() ? all<V>(Limits::infinity()) : result;
+    result = x >= Lane<V>(0) ? result : all<V>(Limits::quiet_NaN());
+    return x == Lane<V>(0) ? all<V>(-Limits::infinity()) : result;
+}
+
+/// log(1 + f) - f for -0.25 <= f < 0.5.
+template <class V>
+WAVKIT_LANES V log1p_tail(V f) {
+    const V s = f / (f + Lane<V>(2)), z = s * s, h = f * f * Lane<V>(0.5);
+    V rest;
+    if constexpr (is_double<V>) {
+        rest = polynomial(z, {0.66666666666672725, 0.39999999996152480, 0.28571429397181320,
+                              0.22222138330390173, 0.18186363661672786, 0.15250026659824575,
+                              0.15369517918594230});
+    } else {
+        rest = polynomial(z, {0.66666948795f, 0.39957708120f, 0.30362823606f});
+    }
+    return mul_add(s, mul_add(z, rest, h), -h);
+}
+
+template <class V>
+WAVKIT_LANES V log(V x) {
+    const auto [number, k] = parts(x);
+    const V f = number - Lane<V>(1);
+    const V whole = k * ln2_high<V>;  // exact
+    const V sum = whole + f, lost = (whole - sum) + f;
+    return mend_logarithm(x, sum + (lost + mul_add(k, ln2_low<V>, log1p_tail(f))));
+}
+
+/// Exact where x is a power of ten.
+template <class V>
+WAVKIT_LANES V log10(V x) {
+    using T = Lane<V>;
+    constexpr T log10_e = T(0.4342944819032518276511L);
+    constexpr T log10_e_low = T(0.4342944819032518276511L - (long double)log10_e);
+    const auto [number, k] = parts(x);
+    const V f = number - T(1), part = f * log10_e;
+    const V part_lost = mul_add(log1p_tail(f), log10_e,
+                                mul_add(f, log10_e_low, product_minus(f, all<V>(log10_e), part)));
+    const V whole = k * log10_2_high<V>;  // exact
+    const V sum = whole + part, lost = (whole - sum) + part;
+    return mend_logarithm(x, sum + (lost + mul_add(k, log10_2_low<V>, part_lost)));
+}
+
+}  // namespace
+}  // namespace wavkit::kernel
