@@ -30,7 +30,8 @@ typename SharedTables<Table>::Slot* take_shared(SharedTables<Table>& shared, int
     return nullptr;
 }
 
-/// A slot that nobody uses, empty now, for the caller who holds the lock; null where all are in use.
+/// A slot that nobody uses, empty now, for the caller who holds the lock; null where all are in
+/// use.
 template <class Table>
 typename SharedTables<Table>::Slot* claim(SharedTables<Table>& shared) {
     for (std::size_t i = 0; i < shared.others.size(); ++i) {
@@ -70,8 +71,8 @@ void let_go_of_all(HeldTables<Table>& held, std::uint32_t epoch) {
 
 /// The table of a power of two, built under the lock; null when memory runs out.
 template <class Table, class Build>
-[[gnu::noinline]] const Table* add_power(std::mutex& building,
-                                         std::atomic<const Table*>& published, const Build& build) {
+[[gnu::noinline]] const Table* add_power(std::mutex& building, std::atomic<const Table*>& published,
+                                         const Build& build) {
     const std::lock_guard lock(building);
     const Table* table = published.load(std::memory_order_acquire);
     if (!table) {

@@ -147,8 +147,7 @@ WAVKIT_API int dspfh_avg(dspf *input, dspf *avg, dspf *scratch, int flags, int c
  *
  *  computed through transforms of the smallest power of two that holds b.
  *  @param out      complex if either is; delta = mean of both. May be a or b.
- *  @param scratch  room for the spectrum of b, or null; one that shares its buffer with another
- *                  argument is not used
+ *  @param scratch  kept for hosts that pass one; it is neither read nor written and may be null
  *  @param half     anything but 0 halves the result
  *  @return 0; -1 unless 0 < m <= points of a and of b, when b has more than 2^30 points, or when
  *          memory runs out */

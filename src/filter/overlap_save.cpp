@@ -142,7 +142,7 @@ int filter_by_transform(const FilterCall<R>& call, scalar<R>* out) {
     const int p = 1 << spectrum->exponent;
     const std::size_t fresh = std::size_t(p) - order, scalars = w * std::size_t(p);
     // A real stretch has one bin more than half its samples.
-    scalar<R>* const stretch = reserve_room<R>(int(scalars), scalars + 2);
+    scalar<R>* const stretch = reserve_room<R>(p, w == 2, scalars + 2);
     if (!stretch) return -1;
     for (std::size_t first = 0; first < n; first += fresh) {
         const std::size_t count = std::min(fresh, n - first);

@@ -1,5 +1,5 @@
-// Transforms of a few samples, the butterflies of which longer ones consist: V of them side by side,
-// one in each lane.
+// Transforms of a few samples, the butterflies of which longer ones consist: V of them side by
+// side, one in each lane.
 #pragma once
 
 #include "kernel/vector.hpp"
@@ -29,7 +29,7 @@ struct Circle<7> {
                                       0.43388373911755812048};
 };
 
-constexpr double half_root_two = 0.70710678118654752440;          // cos(pi / 4)
+constexpr double half_root_two = 0.70710678118654752440;  // cos(pi / 4)
 constexpr double cos_pi_8 = 0.92387953251128675613, sin_pi_8 = 0.38268343236508977173;
 
 /// z e^(-i pi / 4) and z e^(-3 i pi / 4)
@@ -100,8 +100,8 @@ inline void butterfly(Complexes<T, V>* z) {
         butterfly_of_four<2>(z);
         butterfly_of_four<2>(z + 1);
         const Complexes<T, V> even[4] = {z[0], z[2], z[4], z[6]};
-        const Complexes<T, V> odd[4] = {z[1], turned_by_eighth(z[3]), {z[5].im, -z[5].re},
-                                        turned_by_three_eighths(z[7])};
+        const Complexes<T, V> odd[4] = {
+            z[1], turned_by_eighth(z[3]), {z[5].im, -z[5].re}, turned_by_three_eighths(z[7])};
         for (int k = 0; k < 4; ++k) {
             z[k] = even[k] + odd[k];
             z[k + 4] = even[k] - odd[k];

@@ -86,9 +86,9 @@ inline void convolve_all(const Taps<T>& taps, const T* in, std::size_t delay, T*
 }
 
 /// out[i] = sum over k of tap k * in[i - k * delay] for i = 0 .. n - 1, samples before in[0] being
-/// there as far as the taps reach. A delay of 1 filters real samples, one of 2 both parts of complex
-/// ones. `out` overlaps neither samples nor taps. Vectors are narrow where the taps are too few for
-/// groups, or the outputs for vectors, of wide ones.
+/// there as far as the taps reach. A delay of 1 filters real samples, one of 2 both parts of
+/// complex ones. `out` overlaps neither samples nor taps. Vectors are narrow where the taps are too
+/// few for groups, or the outputs for vectors, of wide ones.
 template <class T>
 void convolve(const Taps<T>& taps, const T* in, std::size_t delay, T* out, std::size_t n) {
     constexpr int wide = lanes<T>, narrow = std::min(wide, 32 / int(sizeof(T)));

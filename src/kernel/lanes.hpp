@@ -90,8 +90,10 @@ template <class V>
 WAVKIT_LANES V at_least(V v, V low) {
 #if defined(__AVX512F__)
     if constexpr (sizeof(V) == 64) {
-        if constexpr (is_double<V>) return (V)_mm512_maskz_max_pd(0xff, (__m512d)low, (__m512d)v);
-        else return (V)_mm512_maskz_max_ps(0xffff, (__m512)low, (__m512)v);
+        if constexpr (is_double<V>)
+            return (V)_mm512_maskz_max_pd(0xff, (__m512d)low, (__m512d)v);
+        else
+            return (V)_mm512_maskz_max_ps(0xffff, (__m512)low, (__m512)v);
     }
 #endif
     return v < low ? low : v;
@@ -102,8 +104,10 @@ template <class V>
 WAVKIT_LANES V at_most(V v, V high) {
 #if defined(__AVX512F__)
     if constexpr (sizeof(V) == 64) {
-        if constexpr (is_double<V>) return (V)_mm512_maskz_min_pd(0xff, (__m512d)high, (__m512d)v);
-        else return (V)_mm512_maskz_min_ps(0xffff, (__m512)high, (__m512)v);
+        if constexpr (is_double<V>)
+            return (V)_mm512_maskz_min_pd(0xff, (__m512d)high, (__m512d)v);
+        else
+            return (V)_mm512_maskz_min_ps(0xffff, (__m512)high, (__m512)v);
     }
 #endif
     return v > high ? high : v;
@@ -174,8 +178,10 @@ template <class V>
 WAVKIT_LANES V sqrt(V v) {
 #if defined(__AVX512F__)
     if constexpr (sizeof(V) == 64) {
-        if constexpr (is_double<V>) return (V)_mm512_maskz_sqrt_pd(0xff, (__m512d)v);
-        else return (V)_mm512_maskz_sqrt_ps(0xffff, (__m512)v);
+        if constexpr (is_double<V>)
+            return (V)_mm512_maskz_sqrt_pd(0xff, (__m512d)v);
+        else
+            return (V)_mm512_maskz_sqrt_ps(0xffff, (__m512)v);
     }
 #endif
     V root;

@@ -51,8 +51,8 @@ inline Strip<T> start_strip(const Passes<T>& passes, const T* in, std::size_t ro
     for (int i = 1; i + 1 < passes.count; ++i) {
         const int radix = passes.radices[std::size_t(i)];
         with_power(radix, [&](auto r) {
-            twiddles = pass<V, r, Layout::blocks, Layout::blocks>(from, stride, to, n, stride,
-                                                                  twiddles);
+            twiddles =
+                pass<V, r, Layout::blocks, Layout::blocks>(from, stride, to, n, stride, twiddles);
         });
         n /= std::size_t(radix);
         stride *= std::size_t(radix);
@@ -137,8 +137,8 @@ void run_matrix(const Matrix<T>& matrix, T* data, T* work, T scale) {
         rotate_and_turn<T, V>(matrix, strip.samples, b, turned);
     }
     for (std::size_t k = 0; k < matrix.rows; k += width) {
-        const auto strip =
-            start_strip<T, V, Layout::pairs>(matrix.of_columns, turned + 2 * k, matrix.rows, strips);
+        const auto strip = start_strip<T, V, Layout::pairs>(matrix.of_columns, turned + 2 * k,
+                                                            matrix.rows, strips);
         finish_strip<T, V, Outside>(strip, data + 2 * k, matrix.rows, scale);
     }
 }

@@ -1,7 +1,7 @@
 // Transforms as passes over vectors: the autosort form of Stockham (Cochran et al., 1967),
 // decimation in frequency. A pass of radix r at stride s turns blocks of n samples into r blocks of
-// n / r; samples that belong together lie s apart, so that from the stride of a vector on every load
-// and store is contiguous, and no permutation is left to do at the end.
+// n / r; samples that belong together lie s apart, so that from the stride of a vector on every
+// load and store is contiguous, and no permutation is left to do at the end.
 //
 // Between the passes samples lie in whole vectors ("blocks") where all strides but the first are
 // multiples of four, else in pairs; what is left of a run beside its vectors is then done by a
@@ -21,8 +21,8 @@ struct Passes {
     std::size_t points = 1;
     int count = 0;
     std::array<unsigned char, 31> radices{};
-    int vector = 1;       // lanes of the vectors that go through the passes
-    bool blocks = false;  // the samples between passes lie in whole vectors
+    int vector = 1;               // lanes of the vectors that go through the passes
+    bool blocks = false;          // the samples between passes lie in whole vectors
     const T* twiddles = nullptr;  // pass by pass; none for the last
 };
 
@@ -145,8 +145,8 @@ inline void short_column(const T* in, std::size_t distance, T* out, const T* twi
     }
 }
 
-/// A pass at a stride below that of a vector, over all samples, for any number of butterflies from a
-/// vector on.
+/// A pass at a stride below that of a vector, over all samples, for any number of butterflies from
+/// a vector on.
 template <int V, int Radix, int Stride, Layout In, class T>
 inline const T* short_pass(const T* in, T* out, std::size_t points, const T* twiddles) {
     const std::size_t part = points / Radix;
@@ -214,9 +214,8 @@ template <int V, Layout In, class T>
 inline const T* next_pass_into_blocks(int radix, const T* in, T* out, std::size_t n,
                                       std::size_t stride, const T* twiddles) {
     if (stride == 1) {
-        return with_power(radix, [&](auto r) {
-            return short_pass<V, r, 1, In>(in, out, n, twiddles);
-        });
+        return with_power(radix,
+                          [&](auto r) { return short_pass<V, r, 1, In>(in, out, n, twiddles); });
     }
     if constexpr (V > 4) {
         if (stride == 4) {

@@ -3,7 +3,7 @@
 #include <bit>
 #include <cstdint>
 
-#include "record_view.hpp"
+#include "transform/record_transform.hpp"
 #include "window/tolerance.hpp"
 
 namespace wavkit {
@@ -11,8 +11,6 @@ namespace {
 
 constexpr int rotated = DSP_SPECTRUM_SUM | DSP_SPECTRUM_ROTATED;
 constexpr int whole_record = DSP_SPECTRUM_SUM | DSP_SPECTRUM_ROTATED | DSP_SPECTRUM_RAW;
-
-constexpr std::uint64_t longest_transform = 1u << 30;
 
 /// The points of a transform and the share of them that is measured.
 template <Record R>
@@ -30,17 +28,12 @@ Frame<R> frame(int npts, scalar<R> fraction, std::int64_t available, int flags) 
     if (!(fraction > 0 && fraction <= 1)) fraction = 1;
     if (points < 1) points = std::max<std::int64_t>(available, 1);
     const auto length = std::bit_ceil(std::uint64_t(points));
-    return {length > longest_transform ? 0 : int(length), fraction};
+    return {length > std::uint64_t(longest_transform) ? 0 : int(length), fraction};
 }
 
 /// Zeros go amid the points where a window has been rotated to the start, else behind them.
 constexpr int padding(int window, int flags) {
     return DSP_PAD_UNSCALED | (window > 0 || flags & DSP_SPECTRUM_SUM ? DSP_PAD_SPLIT : 0);
-}
-
-template <Record R>
-int scale(R* x, scalar<R> factor) {
-    return factor == 1 ? 0 : dspi_scale(x, factor);
 }
 
 template <Record R>
@@ -52,31 +45,40 @@ int taper(R* x, int window, int flags, scalar<R> width) {
     return window > 0 || flags & rotated ? dspi_swap_halves2(x) : 0;
 }
 
-/// A transform of n points is their mean; with the zeros of the padding among them, the mean over
-/// the measured points takes the factor n / measured. A one-sided spectrum shows what the negative
-/// frequencies hold as well.
+/// What a transform is multiplied by: nothing for a sum, else what makes it the mean over the
+/// measured points. A one-sided spectrum shows what the negative frequencies hold as well.
+template <class T>
+T forward_factor(std::size_t measured, int flags) {
+    if (flags & DSP_SPECTRUM_SUM) return T(1);
+    const double mean = measured > 0 ? 1.0 / double(measured) : 1;
+    return T(flags & DSP_SPECTRUM_TWO_SIDED ? mean : 2 * mean);
+}
+
+/// Whether the spectrum of a signal is all of it, with the zero frequency in the middle.
 template <Record R>
-scalar<R> forward_factor(const R* x, int n, int flags) {
-    if (flags & DSP_SPECTRUM_SUM) return scalar<R>(n);
-    const double mean = x->points > 0 ? double(n) / x->points : 1;
-    return scalar<R>(flags & DSP_SPECTRUM_TWO_SIDED ? mean : 2 * mean);
+bool is_full(const R* x, int flags) {
+    return x->complex || flags & DSP_SPECTRUM_TWO_SIDED;
+}
+
+template <Record R>
+int take_centred(R* x, bool full, scalar<R> factor) {
+    return full ? status(take_spectrum(x, factor) || dspi_swap_halves(x))
+                : take_half_spectrum(x, factor);
 }
 
 template <Record R>
 int to_spectrum(const R* in, R* out, int npts, scalar<R> fraction, int window, int flags) {
     using T = scalar<R>;
-    const bool full = in->complex || flags & DSP_SPECTRUM_TWO_SIDED;
+    const bool full = is_full(in, flags);
     const int available = int(length(in));
     const auto [n, part] = frame<R>(npts, fraction, available, flags);
     if (n == 0) return -1;
     const T measured = std::min(T(n) * part, T(available));
     if (dspu_subvec(in, out, 0, tol_ceil(measured))) return -1;
     if (flags & DSP_SPECTRUM_RAW) return status(dspi_zpad(out, n) || dspi_fft(out, 0));
-    if (taper(out, window, flags, measured) || scale(out, forward_factor(out, n, flags)) ||
-        dspi_zpad2(out, n, padding(window, flags))) {
-        return -1;
-    }
-    return full ? status(dspi_fft(out, 0) || dspi_swap_halves(out)) : dspi_rfft(out);
+    const T factor = forward_factor<T>(length(out), flags);
+    return status(taper(out, window, flags, measured) ||
+                  dspi_zpad2(out, n, padding(window, flags)) || take_centred(out, full, factor));
 }
 
 /// The first n points, with zeros behind them where there are fewer.
@@ -85,30 +87,33 @@ int take(const R* in, R* out, int n) {
     return status(dspu_subvec(in, out, 0, n) || dspi_zpad(out, n));
 }
 
-template <Record R>
-scalar<R> inverse_factor(const R* x, int n, int flags) {
-    if (flags & DSP_SPECTRUM_SUM) return scalar<R>(1.0 / x->points);
-    const double mean = double(x->points) / n;
-    return scalar<R>(flags & DSP_SPECTRUM_TWO_SIDED ? mean : 0.5 * mean);
+/// What the samples, of which `kept` remain of n, are multiplied by.
+template <class T>
+T inverse_factor(int kept, int n, int flags) {
+    if (kept < 1) return T(1);
+    if (flags & DSP_SPECTRUM_SUM) return T(1.0 / kept);
+    const double mean = double(kept) / n;
+    return T(flags & DSP_SPECTRUM_TWO_SIDED ? mean : 0.5 * mean);
 }
 
 template <Record R>
 int to_time(const R* in, R* out, int npts, scalar<R> fraction, int window, int flags) {
+    using T = scalar<R>;
     const bool half = !(flags & (DSP_SPECTRUM_TWO_SIDED | DSP_SPECTRUM_FROM_TWO_SIDED));
     const auto given = std::int64_t(length(in));
     const auto available = half && !(flags & DSP_SPECTRUM_RAW) ? 2 * given - 2 : given;
     const auto [n, part] = frame<R>(npts, fraction, available, flags);
     if (n == 0) return -1;
     if (flags & DSP_SPECTRUM_RAW) return status(take(in, out, n) || dspi_fft(out, 1));
-    if (half ? take(in, out, n / 2 + 1) || dspi_irfft(out)
+    const int kept = std::min(n, tol_ceil(T(n) * part));
+    const T factor = inverse_factor<T>(kept, n, flags);
+    if (half ? take(in, out, n / 2 + 1) || take_samples_of_half(out, false, factor)
              : dsp_copy(out, in) || dspi_swap_halves2(out) || take(out, out, n) ||
-                   dspi_fft(out, 1)) {
+                   take_samples(out, factor)) {
         return -1;
     }
-    const int kept = tol_ceil(scalar<R>(n) * part);
     if (dspi_unzpad(out, kept, padding(window, flags))) return -1;
-    if ((window > 0 || flags & rotated) && dspi_swap_halves(out)) return -1;
-    return scale(out, inverse_factor(out, n, flags));
+    return window > 0 || flags & rotated ? dspi_swap_halves(out) : 0;
 }
 
 template <Record R>
@@ -121,7 +126,7 @@ int measure(const R* in, R* out, int npts, scalar<R> fraction, int window, int f
 /// The same at the length of the record: nothing is padded.
 template <Record R>
 int to_spectrum_of_length(const R* in, R* out, int window, int flags) {
-    const bool full = in->complex || flags & DSP_SPECTRUM_TWO_SIDED;
+    const bool full = is_full(in, flags);
     if (dsp_copy(out, in)) return -1;
     if (flags & DSP_SPECTRUM_RAW) return dspi_dft(out, 0);
     const bool rotates = window != 0 || flags & rotated;
@@ -130,9 +135,7 @@ int to_spectrum_of_length(const R* in, R* out, int window, int flags) {
                                           : rotates && dspi_swap_halves2(out)) {
         return -1;
     }
-    const int n = int(length(out));
-    if (scale(out, forward_factor(out, n, flags))) return -1;
-    return full ? status(dspi_dft(out, 0) || dspi_swap_halves(out)) : dspi_rdft(out);
+    return take_centred(out, full, forward_factor<scalar<R>>(length(out), flags));
 }
 
 template <Record R>
@@ -140,12 +143,16 @@ int to_time_of_length(const R* in, R* out, int window, int flags) {
     if (dsp_copy(out, in)) return -1;
     if (flags & DSP_SPECTRUM_RAW) return dspi_dft(out, 1);
     const bool half = !(flags & (DSP_SPECTRUM_TWO_SIDED | DSP_SPECTRUM_FROM_TWO_SIDED));
-    if (half ? dspi_irdft(out, flags & DSP_SPECTRUM_ODD)
-             : dspi_swap_halves2(out) || dspi_dft(out, 1)) {
+    const bool odd = flags & DSP_SPECTRUM_ODD;
+    const auto given = std::int64_t(length(out)), whole = 2 * given - (odd ? 1 : 2);
+    // Too few bins for half a spectrum are a whole one.
+    const auto n = half && given >= (odd ? 2 : 3) ? std::min(whole, longest_transform) : given;
+    const auto factor = inverse_factor<scalar<R>>(int(n), int(n), flags);
+    if (half ? take_samples_of_half(out, odd, factor)
+             : dspi_swap_halves2(out) || take_samples(out, factor)) {
         return -1;
     }
-    if ((window != 0 || flags & rotated) && dspi_swap_halves(out)) return -1;
-    return out->points > 0 ? scale(out, inverse_factor(out, out->points, flags)) : 0;
+    return window != 0 || flags & rotated ? dspi_swap_halves(out) : 0;
 }
 
 template <Record R>

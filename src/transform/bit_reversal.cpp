@@ -17,8 +17,8 @@ constexpr std::uint32_t next_reversed(std::uint32_t value, std::uint32_t half) {
     return value | half;
 }
 
-/// Calls exchange(a, b) once for every pair of indices of m bits that are each other's reversal, and
-/// keep(a) for every index that is its own.
+/// Calls exchange(a, b) once for every pair of indices of m bits that are each other's reversal,
+/// and keep(a) for every index that is its own.
 ///
 /// An index is three fields: high and low half of h bits, and the middle bit of an odd m. Reversal
 /// exchanges the reversed halves, so i in the high and r(j) in the low half trade places with j and

@@ -29,7 +29,7 @@ struct Setting {
 template <Record R>
 Setting<scalar<R>> prepare(int n) {
     using T = scalar<R>;
-    T* const room = reserve_room<R>(n, std::size_t(n) + 2);
+    T* const room = reserve_room<R>(n, false, std::size_t(n) + 2);
     const Bin<T>* const turns = room ? find_quarter_turns<R>(n) : nullptr;
     return {turns, turns ? room : nullptr, reinterpret_cast<Bin<T>*>(room)};
 }
@@ -81,7 +81,7 @@ int dct(R* x, int flags) {
     }
     const bool normalised = flags & DSP_DCT_NORMALISED;
     const bool failed = flags & DSP_DCT_INVERSE ? inverse<R>(x->data, n, normalised)
-                                             : forward<R>(x->data, n, normalised);
+                                                : forward<R>(x->data, n, normalised);
     if (!failed) x->delta = reciprocal_spacing<R>(n, x->delta) * T(0.5);
     return status(failed);
 }

@@ -130,9 +130,9 @@ Passes<T> passes_of(std::size_t n) {
     return passes;
 }
 
-/// Twiddles of all passes but the last, those of a pass shorter than a vector lane by lane. `stride`
-/// samples side by side belong to transforms of their own; `step` is how far apart the roots of the
-/// passes lie among those of the whole.
+/// Twiddles of all passes but the last, those of a pass shorter than a vector lane by lane.
+/// `stride` samples side by side belong to transforms of their own; `step` is how far apart the
+/// roots of the passes lie among those of the whole.
 template <class T>
 void write_twiddles(Passes<T>& passes, const Roots<T>& roots, std::size_t stride, std::size_t step,
                     Writer<T>& to) {
@@ -194,8 +194,8 @@ Matrix<T> matrix_of(std::size_t n) {
     matrix.rows = n / matrix.columns;
     matrix.fine_bits = exponent / 2;
     for (auto* passes : {&matrix.of_rows, &matrix.of_columns}) {
-        *passes = factorised<T>(passes == &matrix.of_rows ? matrix.rows : matrix.columns,
-                                many_registers);
+        *passes =
+            factorised<T>(passes == &matrix.of_rows ? matrix.rows : matrix.columns, many_registers);
         passes->vector = lanes<T>;
     }
     return matrix;

@@ -11,8 +11,8 @@ namespace wavkit {
 template <class T>
 Transform<T>* plan_transform(int n);
 
-/// Points of the convolution behind n points: at least 2n - 2, as the chirp is symmetric and its two
-/// outermost lags may share a place.
+/// Points of the convolution behind n points: at least 2n - 2, as the chirp is symmetric and its
+/// two outermost lags may share a place.
 std::size_t convolution_points(int n);
 
 }  // namespace wavkit

@@ -9,9 +9,10 @@
 
 namespace wavkit {
 
-/// e^(-2 pi i k / n) for any k, 0 <= k < n <= 2^33, to rounding: products of two roots out of tables
-/// of about sqrt(n) in extended precision. Angles are folded into the first eighth of the circle in
-/// whole numbers, so that neither their size nor the folding costs accuracy, and quarters are exact.
+/// e^(-2 pi i k / n) for any k, 0 <= k < n <= 2^33, to rounding: products of two roots out of
+/// tables of about sqrt(n) in extended precision. Angles are folded into the first eighth of the
+/// circle in whole numbers, so that neither their size nor the folding costs accuracy, and quarters
+/// are exact.
 template <class T>
 class Roots {
   public:

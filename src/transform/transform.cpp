@@ -23,8 +23,8 @@ void run(const Transform<T>& t, T* samples, T* work, bool inverse, T scale) {
     }
 }
 
-/// With nk = (n^2 + k^2 - (k - n)^2) / 2 a transform is a product with the chirp, a convolution with
-/// its conjugate, and another product with the chirp. Both directions read the same chirp: an
+/// With nk = (n^2 + k^2 - (k - n)^2) / 2 a transform is a product with the chirp, a convolution
+/// with its conjugate, and another product with the chirp. Both directions read the same chirp: an
 /// inverse transform is the conjugate of the forward transform of the conjugate.
 template <class T>
 void convolve_with_chirp(const Transform<T>& t, Bin<T>* z, T* work, bool inverse, T scale) {
@@ -173,10 +173,10 @@ int transform_to_real(scalar<R>* x, int n, scalar<R> scale) {
 }
 
 template <Record R>
-scalar<R>* reserve_room(int n, std::size_t scalars) {
+scalar<R>* reserve_room(int n, bool complex, std::size_t scalars) {
     using T = scalar<R>;
-    const bool odd = n % 2 != 0;
-    const int points = odd ? n : n / 2;
+    const bool odd = !complex && n % 2 != 0;
+    const int points = complex || odd ? n : n / 2;
     const auto* t = points < 2 ? nullptr : find_transform<R>(points);
     if (points >= 2 && !t) return nullptr;
     const std::size_t apart = odd ? aligned_count<T>(2 * std::size_t(n)) : 0;
@@ -198,8 +198,8 @@ const Bin<scalar<R>>* find_quarter_turns(int n) {
         }
         return table;
     };
-    return reinterpret_cast<const Bin<T>*>(find_table<R>(
-        shared_state<T>.quarter_turns, thread_state<R>.quarter_turns, n, build));
+    return reinterpret_cast<const Bin<T>*>(
+        find_table<R>(shared_state<T>.quarter_turns, thread_state<R>.quarter_turns, n, build));
 }
 
 template int transform<dsp>(Bin<double>*, int, bool, double);
@@ -208,8 +208,8 @@ template int transform_real<dsp>(double*, int, double);
 template int transform_real<dspf>(float*, int, float);
 template int transform_to_real<dsp>(double*, int, double);
 template int transform_to_real<dspf>(float*, int, float);
-template double* reserve_room<dsp>(int, std::size_t);
-template float* reserve_room<dspf>(int, std::size_t);
+template double* reserve_room<dsp>(int, bool, std::size_t);
+template float* reserve_room<dspf>(int, bool, std::size_t);
 template const Bin<double>* find_quarter_turns<dsp>(int);
 template const Bin<float>* find_quarter_turns<dspf>(int);
 

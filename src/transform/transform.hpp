@@ -9,9 +9,9 @@ namespace wavkit {
 
 /// What a transform of one length reads; immutable, one block with its tables, shared by threads.
 ///
-/// Lengths without a prime factor above 7 go through passes or, where they are longer than the cache
-/// is good for, through a matrix. Others are a convolution with a chirp (Bluestein, 1970), of a
-/// length that does so.
+/// Lengths without a prime factor above 7 go through passes or, where they are longer than the
+/// cache is good for, through a matrix. Others are a convolution with a chirp (Bluestein, 1970), of
+/// a length that does so.
 template <class T>
 struct Transform {
     int points;
@@ -28,8 +28,8 @@ struct Transform {
 /// Whether n has no prime factor above 7.
 bool is_smooth(int n);
 
-/// z[k] = scale * sum z[n] e^(-2 pi i n k / N), or of the conjugate kernel for an inverse, in place;
-/// -1 when memory runs out.
+/// z[k] = scale * sum z[n] e^(-2 pi i n k / N), or of the conjugate kernel for an inverse, in
+/// place; -1 when memory runs out.
 template <Record R>
 int transform(Bin<scalar<R>>* z, int n, bool inverse, scalar<R> scale);
 
@@ -42,10 +42,10 @@ int transform_real(scalar<R>* x, int n, scalar<R> scale);
 template <Record R>
 int transform_to_real(scalar<R>* x, int n, scalar<R> scale);
 
-/// Room for so many scalars in the thread's workspace beside what transforms of n real samples take;
-/// null when memory runs out.
+/// Room for so many scalars in the thread's workspace beside what transforms of n complex or real
+/// samples take; null when memory runs out.
 template <Record R>
-scalar<R>* reserve_room(int n, std::size_t scalars);
+scalar<R>* reserve_room(int n, bool complex, std::size_t scalars);
 
 /// e^(pi i k / (2 n)) for k = 1 .. (n - 1) / 2: the turns of a cosine transform; null when memory
 /// runs out.

@@ -90,15 +90,14 @@ BOTH_PRECISIONS(Average, FailureLeavesTheAverageAsItWas) {
     }
 }
 
-TYPED_TEST(AverageTest, AnAverageThatCannotGrowIsNotRead) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Average, AnAverageThatCannotGrowIsNotRead) {
     for (const int flags : {0, 1, 2, 3, 4, 5, 0x14, 0x15, 0x25}) {
         auto x = complex<R>({{1, 2}, {3, 4}});
         const auto start = real<R>({4, 2});
         EXPECT_GE(fail_each_growth<R>([&] {
                       Borrowed<R> avg(start);
                       Signal<R> scratch;
-                      return average<R>(x, avg, scratch, flags, 2, 0, -1, 3);
+                      return dsph_avg(x, avg, scratch, flags, 2, 0, -1, 3);
                   }),
                   1)
             << flags;
@@ -167,7 +166,7 @@ BOTH_PRECISIONS(Average, CorrelationLimits) {
                   Signal<R> result;
                   return dsph_corr(a, b, result, null<R>, 1, 0);
               }),
-              2);
+              1);
 }
 
 }  // namespace

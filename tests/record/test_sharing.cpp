@@ -40,87 +40,67 @@ std::vector<Call<R>> calls() {
     binary("sub", dspb_sub);
     binary("mul", dspb_mul);
     binary("conj_mul", dspb_conj_mul);
-    binary("div", pick<R>(dspb_div, dspfb_div));
+    binary("div", dspb_div);
     binary("min", dspb_min);
     binary("max", dspb_max);
-    binary("ritoc", pick<R>(dspb_ritoc, dspfb_ritoc));
-    binary("pmul", pick<R>(dspb_pmul, dspfb_pmul));
-    binary("dot", pick<R>(dspbs_dot, dspfbs_dot));
-    binary("inter", pick<R>(dspb_inter, dspfb_inter));
+    binary("ritoc", dspb_ritoc);
+    binary("pmul", dspb_pmul);
+    binary("dot", dspbs_dot);
+    binary("inter", dspb_inter);
     unary("copy", [](const R* x, R* out) { return dsp_copy(out, x); });
     unary("append", [](const R* x, R* out) { return dsp_append(out, x); });
-    unary("mag", pick<R>(dspu_mag, dspfu_mag));
+    unary("mag", dspu_mag);
     unary("magsq", dspu_magsq);
-    unary("sqrt", pick<R>(dspu_sqrt, dspfu_sqrt));
+    unary("sqrt", dspu_sqrt);
     unary("sum", dsps_sum);
     unary("mean", dsps_mean);
-    unary("min of", pick<R>(dsps_min, dspfs_min));
-    unary("max of", pick<R>(dsps_max, dspfs_max));
-    unary("median", pick<R>(dsps_median, dspfs_median));
+    unary("min of", dsps_min);
+    unary("max of", dsps_max);
+    unary("median", dsps_median);
     unary("magsq_sum", dsps_magsq_sum);
     unary("rms", dsps_rms);
-    unary("samp_stddev", pick<R>(dsps_samp_stddev, dspfs_samp_stddev));
-    unary("skew", pick<R>(dsps_skew, dspfs_skew));
-    unary("excess", pick<R>(dsps_excess, dspfs_excess));
-    unary("gmean", pick<R>(dsps_gmean, dspfs_gmean));
-    unary("hmean", pick<R>(dsps_hmean, dspfs_hmean));
-    unary("lin_regres", pick<R>(dsps_lin_regres, dspfs_lin_regres));
-    unary("lin_regres2", pick<R>(dsps_lin_regres2, dspfs_lin_regres2));
-    unary("roots", pick<R>(dsps_proots, dspfs_proots));
+    unary("samp_stddev", dsps_samp_stddev);
+    unary("skew", dsps_skew);
+    unary("excess", dsps_excess);
+    unary("gmean", dsps_gmean);
+    unary("hmean", dsps_hmean);
+    unary("lin_regres", dsps_lin_regres);
+    unary("lin_regres2", dsps_lin_regres2);
+    unary("roots", dsps_proots);
     other("avg_add",
           [](Operands<R>& x, R* out) { return dspb_avg_add(&x[0], &x[1], out, T(0.25)); });
     other("subvec", [](Operands<R>& x, R* out) { return dspu_subvec(&x[0], out, 1, 4); });
     other("copy_at_most", [](Operands<R>& x, R* out) { return dsp_copy_at_most(out, &x[0], 5); });
-    other("few bins", [](Operands<R>& x, R* out) {
-        return pick<R>(dsps_hist, dspfs_hist)(&x[0], out, 1, 1, 5);
-    });
-    other("many bins", [](Operands<R>& x, R* out) {
-        return pick<R>(dsps_hist, dspfs_hist)(&x[0], out, 1, 1, 40);
-    });
-    other("peak", [](Operands<R>& x, R* out) {
-        return pick<R>(dsps_peak, dspfs_peak)(&x[0], out, 0x2000, 0);
-    });
+    other("few bins", [](Operands<R>& x, R* out) { return dsps_hist(&x[0], out, 1, 1, 5); });
+    other("many bins", [](Operands<R>& x, R* out) { return dsps_hist(&x[0], out, 1, 1, 40); });
+    other("peak", [](Operands<R>& x, R* out) { return dsps_peak(&x[0], out, 0x2000, 0); });
     other("psolve", [](Operands<R>& x, R* out) { return dsps_psolve(&x[0], out, 1); });
     other("pcsolve", [](Operands<R>& x, R* out) { return dsps_pcsolve(&x[0], out, 1, 1); });
-    other("peval", [](Operands<R>& x, R* out) {
-        return pick<R>(dsps_peval, dspfs_peval)(&x[0], out, T(0.5));
-    });
+    other("peval", [](Operands<R>& x, R* out) { return dsps_peval(&x[0], out, T(0.5)); });
     other("lines", [](Operands<R>& x, R* out) {
-        return pick<R>(dsp_interp, dspf_interp)(&x[0], &x[1], nullptr, &x[2], out,
-                                                DSP_INTERP_LINEAR);
+        return dsp_interp(&x[0], &x[1], nullptr, &x[2], out, DSP_INTERP_LINEAR);
     });
-    other("spline", [](Operands<R>& x, R* out) {
-        return pick<R>(dsp_cspline, dspf_cspline)(&x[0], &x[1], &x[3], &x[2], out);
-    });
+    other("spline",
+          [](Operands<R>& x, R* out) { return dsp_cspline(&x[0], &x[1], &x[3], &x[2], out); });
     other("cspline_2d", [](Operands<R>& x, R* out) {
         return dspb_cspline_2d(&x[0], &x[1], out, 1, 1, DSP_SPLINE_SLOPE, DSP_SPLINE_NOT_A_KNOT);
     });
-    other("measured", [](Operands<R>& x, R* out) {
-        return pick<R>(dsph_fft, dspfh_fft)(&x[0], out, 16, 1, 2, 0);
-    });
+    other("measured", [](Operands<R>& x, R* out) { return dsph_fft(&x[0], out, 16, 1, 2, 0); });
     other("measured back", [](Operands<R>& x, R* out) {
-        return pick<R>(dsph_fft, dspfh_fft)(&x[0], out, 16, 1, 2, DSP_SPECTRUM_INVERSE);
+        return dsph_fft(&x[0], out, 16, 1, 2, DSP_SPECTRUM_INVERSE);
     });
     other("measured at its length",
-          [](Operands<R>& x, R* out) { return pick<R>(dsph_dft, dspfh_dft)(&x[0], out, 2, 0); });
-    other("linear mean", [](Operands<R>& x, R* out) {
-        return pick<R>(dsph_avg, dspfh_avg)(&x[0], out, &x[1], 1, 2, 0, T(0.25), 0);
-    });
-    other("harmonic mean", [](Operands<R>& x, R* out) {
-        return pick<R>(dsph_avg, dspfh_avg)(&x[0], out, &x[1], 4, 2, 0, T(0.25), 0);
-    });
+          [](Operands<R>& x, R* out) { return dsph_dft(&x[0], out, 2, 0); });
+    other("linear mean",
+          [](Operands<R>& x, R* out) { return dsph_avg(&x[0], out, &x[1], 1, 2, 0, T(0.25), 0); });
+    other("harmonic mean",
+          [](Operands<R>& x, R* out) { return dsph_avg(&x[0], out, &x[1], 4, 2, 0, T(0.25), 0); });
     other("mean power", [](Operands<R>& x, R* out) {
-        return pick<R>(dsph_avg, dspfh_avg)(&x[0], out, &x[1], 0x25, 2, 0, T(0.25), 0);
+        return dsph_avg(&x[0], out, &x[1], 0x25, 2, 0, T(0.25), 0);
     });
-    other("corr", [](Operands<R>& x, R* out) {
-        return pick<R>(dspb_corr, dspfb_corr)(&x[0], &x[1], out, &x[2], 3);
-    });
-    other("fir", [](Operands<R>& x, R* out) {
-        return pick<R>(dspd_fir, dspfd_fir)(&x[0], out, &x[1], &x[2]);
-    });
-    other("sfir", [](Operands<R>& x, R* out) {
-        return pick<R>(dspd_sfir, dspfd_sfir)(&x[0], out, &x[1], 1, 0, &x[2]);
-    });
+    other("corr", [](Operands<R>& x, R* out) { return dspb_corr(&x[0], &x[1], out, &x[2], 3); });
+    other("fir", [](Operands<R>& x, R* out) { return dspd_fir(&x[0], out, &x[1], &x[2]); });
+    other("sfir", [](Operands<R>& x, R* out) { return dspd_sfir(&x[0], out, &x[1], 1, 0, &x[2]); });
     return all;
 }
 
@@ -197,12 +177,7 @@ template <class R>
     return same;
 }
 
-template <class R>
-class SharingTest : public ::testing::Test {};
-TYPED_TEST_SUITE(SharingTest, Precisions);
-
-TYPED_TEST(SharingTest, OperandsMayLieAnywhereInTheBlockOfTheOutput) {
-    using R = TypeParam;
+BOTH_PRECISIONS(Sharing, OperandsMayLieAnywhereInTheBlockOfTheOutput) {
     for (const auto& call : calls<R>()) {
         auto same = ::testing::AssertionSuccess();
         for (unsigned i = 0; same && layout<R>(i); ++i) {
