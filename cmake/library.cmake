@@ -49,10 +49,16 @@ endif()
 set_property(TARGET wavkit APPEND PROPERTY LINK_DEPENDS ${PROJECT_SOURCE_DIR}/cmake/exports.map)
 set(WAVKIT_TARGETS wavkit)
 
+# What a C compiler does not link by itself: the C++ runtime and what that needs.
+set(WAVKIT_RUNTIME ${CMAKE_CXX_IMPLICIT_LINK_LIBRARIES})
+list(REMOVE_ITEM WAVKIT_RUNTIME ${CMAKE_C_IMPLICIT_LINK_LIBRARIES})
+list(TRANSFORM WAVKIT_RUNTIME PREPEND "-l" OUTPUT_VARIABLE WAVKIT_PC_RUNTIME)
+list(JOIN WAVKIT_PC_RUNTIME " " WAVKIT_PC_RUNTIME)
 if(WAVKIT_STATIC)
   add_library(wavkit_static STATIC ${WAVKIT_OBJECTS})
   set_target_properties(wavkit_static PROPERTIES OUTPUT_NAME wavkit EXPORT_NAME wavkit_static)
   target_compile_definitions(wavkit_static INTERFACE WAVKIT_STATIC)
+  target_link_libraries(wavkit_static INTERFACE ${WAVKIT_RUNTIME})
   list(APPEND WAVKIT_TARGETS wavkit_static)
 endif()
 
