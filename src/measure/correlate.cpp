@@ -6,9 +6,6 @@
 namespace wavkit {
 namespace {
 
-/// Correlations over longer signals are refused.
-constexpr unsigned longest = 1u << 30;
-
 template <Record R>
 int forward(R* x, bool complex) {
     return complex ? dspi_fft(x, 0) : dspi_rfft(x);
@@ -30,7 +27,7 @@ int correlate(const R* a, const R* b, R* out, R* scratch, int m, int half) {
         scratch = local;
     }
     const int n = b->points;
-    if (m <= 0 || m > a->points || m > n || unsigned(n) > longest) return -1;
+    if (m <= 0 || m > a->points || m > n || n > longest_transform) return -1;
     const int padded = int(std::bit_ceil(unsigned(n)));
     const T delta = (a->delta + b->delta) * T(0.5);
     const bool complex = a->complex || b->complex;

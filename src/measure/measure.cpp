@@ -14,8 +14,6 @@ constexpr int whole_record = DSP_SPECTRUM_SUM | DSP_SPECTRUM_ROTATED | DSP_SPECT
 
 constexpr int pad_unscaled = 2, pad_split = 0x300;
 
-constexpr std::uint64_t longest_transform = 1u << 30;
-
 /// The points of a transform and the share of them that is measured.
 template <Record R>
 struct Frame {
@@ -31,7 +29,7 @@ Frame<R> frame(int npts, scalar<R> fraction, std::int64_t available, int flags) 
     if (flags & whole_record) points = 0, fraction = 1;
     if (!(fraction > 0 && fraction <= 1)) fraction = 1;
     if (points < 1) points = std::max<std::int64_t>(available, 1);
-    const auto length = std::bit_ceil(std::uint64_t(points));
+    const auto length = std::int64_t(std::bit_ceil(std::uint64_t(points)));
     return {length > longest_transform ? 0 : int(length), fraction};
 }
 
