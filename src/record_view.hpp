@@ -50,6 +50,19 @@ std::span<const Bin<scalar<R>>> bins(const R* x) {
     return {reinterpret_cast<const Bin<scalar<R>>*>(x->data), length(x)};
 }
 
+/// Points of the longest transform. Whatever would need a longer one is refused.
+inline constexpr std::int64_t longest_transform = std::int64_t(1) << 30;
+
+/// Makes a real record complex: a sample for each value. Backwards, since point i takes the place
+/// of the values 2i and 2i + 1.
+template <Record R, class Sample>
+int make_complex(R* x, Sample sample) {
+    x->complex = 1;
+    if (dsp_realloc(x, x->points, 0)) return -1;
+    for (std::size_t i = length(x); i-- > 0;) bins(x)[i] = sample(x->data[i]);
+    return 0;
+}
+
 /// Scalars that a record may touch: all of a block that it owns, of a borrowed one those in use.
 template <Record R>
 std::size_t extent(const R* x) {

@@ -20,15 +20,12 @@ void append_mirrored(Sample* samples, int n, int last) {
     for (int i = last; i >= 1; --i) samples[n + last - i] = mirrored<R>(samples[i]);
 }
 
-/// Sequences longer than any transform are refused.
-constexpr int longest = 1 << 30;
-
 template <Record R>
 int reconstruct(R* x, int odd) {
     const int n = x->points;
     if (n < (odd ? 2 : 3)) return 0;
     const int last = odd ? n - 1 : n - 2;  // the sample that the first new one mirrors
-    if (last > longest - n) return -1;
+    if (last > longest_transform - n) return -1;
     x->points = n + last;
     if (dsp_realloc(x, n, x->complex)) return -1;
     if (x->complex) {

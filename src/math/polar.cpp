@@ -4,26 +4,17 @@
 namespace wavkit {
 namespace {
 
-/// Makes a real record complex: one sample for each value.
-template <Record R, class Sample>
-int spread(R* x, Sample sample) {
-    x->complex = 1;
-    if (dsp_realloc(x, x->points, 0)) return -1;
-    for (std::size_t i = length(x); i-- > 0;) bins(x)[i] = sample(x->data[i]);
-    return 0;
-}
-
 template <Record R>
 int multiply_by_i(R* x) {
     using T = scalar<R>;
-    if (!x->complex) return spread(x, [](T v) { return Bin<T>{T(0), v}; });
+    if (!x->complex) return make_complex(x, [](T v) { return Bin<T>{T(0), v}; });
     for (auto& z : bins(x)) z = {-z.im, z.re};
     return 0;
 }
 
 template <Record R>
 int scale_complex(R* x, Bin<scalar<R>> factor) {
-    if (!x->complex) return spread(x, [factor](scalar<R> v) { return factor * v; });
+    if (!x->complex) return make_complex(x, [factor](scalar<R> v) { return factor * v; });
     for (auto& z : bins(x)) z = z * factor;
     return 0;
 }
@@ -32,7 +23,7 @@ template <Record R>
 int to_polar(R* x) {
     using T = scalar<R>;
     if (!x->complex) {
-        return spread(x, [](T v) { return v < T(0) ? Bin<T>{-v, pi<T>} : Bin<T>{v, T(0)}; });
+        return make_complex(x, [](T v) { return v < T(0) ? Bin<T>{-v, pi<T>} : Bin<T>{v, T(0)}; });
     }
     for (auto& z : bins(x)) {
         const bool zero = z.re == 0 && z.im == 0;  // without it a -0 would turn the angle

@@ -201,11 +201,8 @@ int append(R* destination, const R* source) {
 
 template <Record R>
 int promote(R* x) {
-    if (x->complex) return 0;
-    x->complex = 1;
-    if (dsp_realloc(x, x->points, 0)) return -1;
-    for (std::size_t i = length(x); i-- > 0;) bins(x)[i] = {x->data[i], 0};
-    return 0;
+    using T = scalar<R>;
+    return x->complex ? 0 : make_complex(x, [](T v) { return Bin<T>{v, 0}; });
 }
 
 /// 1, -1 or 0: whether a difference lies above, below or within the tolerance (a NaN lies within).

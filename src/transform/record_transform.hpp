@@ -6,9 +6,6 @@
 
 namespace wavkit {
 
-/// Transforms, and the convolutions behind them, of more points are refused.
-inline constexpr std::int64_t longest_transform = std::int64_t(1) << 30;
-
 /// All bins of a signal of any length; a real one becomes complex, one point keeps its kind.
 template <Record R>
 int take_spectrum(R* x, scalar<R> factor);
