@@ -129,20 +129,13 @@ std::string other_order(const Signal<dsp>& x) {
 TEST_F(SegmentsTest, EverySourceGivesTheSame) {
     const auto x = noise(40000, 1.0 / 8000), other = sine(40000, 7, 0.5, 1.0 / 8000);
     write("x.dsp", Signals{x, other});
-    write("y.dsp", Signals{other, x});
     write("swapped.dsp", other_order(x));
-    printed("convert x.dsp single.dsp --type float");
-    printed("convert y.dsp y.wav");
-    printed("convert y.dsp y.txt");
-    printed("convert y.dsp y.csv");
-    printed("convert x.dsp x.txt --signal 1");
+    printed("convert x.dsp x.wav");
     printed("convert x.dsp x.csv --with-time --signal 1");
     const std::string options = " --average 3000 --overlap 30 --slope --detrend";
     const auto want = spectrum("x.dsp" + options);
     for (const std::string source :
-         {"y.dsp --signal 2", "swapped.dsp", "single.dsp", "y.wav --channel 2", "y.wav --signal 2",
-          "x.txt", "x.csv", "- <x.dsp", "x.csv --rate 8000", "y.txt --signal 2",
-          "y.csv --signal 2"}) {
+         {"swapped.dsp", "x.wav --channel 1", "x.wav --signal 1", "x.csv", "- <x.dsp"}) {
         const auto got = spectrum(source + options);
         ASSERT_EQ(got.size(), want.size()) << source;
         for (std::size_t i = 0; i < want.size(); ++i) {
@@ -150,9 +143,9 @@ TEST_F(SegmentsTest, EverySourceGivesTheSame) {
             EXPECT_NEAR(got[i][1], want[i][1], 1e-5 * want[10][1]) << source;
         }
     }
-    EXPECT_EQ(shell("wavkit spectrum --average 64 x.txt").err, "");
+    EXPECT_EQ(shell("wavkit spectrum --average 64 x.csv").err, "");
     EXPECT_NE(shell("wavkit spectrum x.dsp --average 64").err.find("--signal"), std::string::npos);
-    EXPECT_NE(shell("wavkit spectrum y.wav --average 64").err.find("--channel"), std::string::npos);
+    EXPECT_NE(shell("wavkit spectrum x.wav --average 64").err.find("--channel"), std::string::npos);
 
     write("z.dsp", Signals{complex<dsp>({{0, 3}, {3, 0}, {0, -3}, {-3, 0}, {0, 3}, {3, 0}})});
     EXPECT_EQ(
