@@ -1,5 +1,5 @@
 // Correlations, envelopes and windows from the command line.
-#include <algorithm>
+#include <array>
 #include <map>
 
 #include "tools/program.hpp"
@@ -81,29 +81,24 @@ TEST_F(CommandsTest, TheEnvelopeOfAModulatedToneIsItsModulation) {
 }
 
 TEST_F(CommandsTest, WindowsHaveTheirFigures) {
-    const struct {
-        const char* name;
-        double gain, bandwidth, sidelobe, loss, loss_tolerance;  // loss: F. J. Harris, 1978
-    } table[] = {
-        {"Uniform", 1, 1, -13, 3.92, 0.01},
-        {"Hann", 0.5, 1.5, -31, 1.42, 0.01},
-        {"Flattop", 0.213283, 3.8221, -95, 0, 0.01},
-        {"Kaiser70", 0.4015, 1.7995, -70, 1.02, 0.01},
-    };
-    for (const auto& [name, gain, bandwidth, sidelobe, loss, tolerance] : table) {
-        const auto got = figures(printed(std::string("window ") + name));
-        EXPECT_NEAR(got.at("coherent gain"), gain, 6e-5) << name;
-        EXPECT_NEAR(got.at("noise bandwidth"), bandwidth, 1.01e-4) << name;
-        EXPECT_NEAR(got.at("highest sidelobe"), sidelobe, 0.6) << name;
-        EXPECT_NEAR(got.at("scalloping loss"), loss, tolerance) << name;
+    // Coherent gain, noise bandwidth, highest sidelobe, scalloping loss (F. J. Harris, 1978).
+    const std::pair<std::string, std::array<double, 4>> table[] = {
+        {"Uniform", {1, 1, -13, 3.92}},
+        {"Hann", {0.5, 1.5, -31, 1.42}},
+        {"Flattop", {0.213283, 3.8221, -95, 0}},
+        {"Kaiser70", {0.4015, 1.7995, -70, 1.02}}};
+    for (const auto& [name, want] : table) {
+        const auto got = figures(printed("window " + name));
+        EXPECT_NEAR(got.at("coherent gain"), want[0], 6e-5) << name;
+        EXPECT_NEAR(got.at("noise bandwidth"), want[1], 1.01e-4) << name;
+        EXPECT_NEAR(got.at("highest sidelobe"), want[2], 0.6) << name;
+        EXPECT_NEAR(got.at("scalloping loss"), want[3], 0.01) << name;
     }
     EXPECT_NE(printed("window hann --points 1").find("highest sidelobe  none"), std::string::npos);
 
     EXPECT_EQ(printed("window hann --points 6 -o w.dsp"), "");
     EXPECT_TRUE(
         matches<dsp>(read("w.dsp").at(0), real<dsp>({0, 0.25L, 0.75L, 1, 0.75L, 0.25L}), 2));
-    printed("window hann --plot w.png");
-    EXPECT_TRUE(contents("w.png").starts_with("\x89PNG\r\n"));
     EXPECT_NE(printed("window p601 --plot - --points 8").find("P601, 8 points"), std::string::npos);
 }
 
