@@ -17,6 +17,8 @@
 
 namespace wavkit::test {
 
+using Signals = std::vector<Signal<dsp>>;
+
 struct Outcome {
     int status;
     std::string out, err;
@@ -58,15 +60,15 @@ class ProgramTest : public ::testing::Test {
         std::ofstream(home / name, std::ios::binary) << text;
     }
 
-    void write(const std::string& name, const std::vector<Signal<dsp>>& signals) const {
+    void write(const std::string& name, const Signals& signals) const {
         std::FILE* const file = dspf_fopen((home / name).c_str(), "wb");
         for (const auto& x : signals) ASSERT_EQ(dspf_fwrite(x, file), 0);
         ASSERT_EQ(dspf_fclose(file), 0);
     }
 
     /// The signals of a signal file.
-    std::vector<Signal<dsp>> read(const std::string& name) const {
-        std::vector<Signal<dsp>> signals;
+    Signals read(const std::string& name) const {
+        Signals signals;
         std::FILE* const file = dspf_fopen((home / name).c_str(), "rb");
         EXPECT_NE(file, nullptr) << name;
         if (!file) return signals;
@@ -76,8 +78,7 @@ class ProgramTest : public ::testing::Test {
     }
 
     /// What the program makes of a file: read, written as a binary signal file, read here.
-    std::vector<Signal<dsp>> through(const std::string& name,
-                                     const std::string& options = "") const {
+    Signals through(const std::string& name, const std::string& options = "") const {
         printed("convert " + name + " read.dsp " + options);
         return read("read.dsp");
     }
@@ -95,22 +96,6 @@ class ProgramTest : public ::testing::Test {
             for (double value; fields >> value;) result.back().push_back(value);
         }
         return result;
-    }
-
-    /// A command line that must fail with one line on standard error, and leave nothing.
-    struct Failure {
-        int status;
-        std::string line, complaint;
-    };
-    void expect_failures(const std::vector<Failure>& failures) const {
-        const auto before = files();
-        for (const auto& [status, line, complaint] : failures) {
-            const auto done = shell("wavkit " + line);
-            EXPECT_EQ(done.status, status) << line;
-            EXPECT_NE(done.err.find(complaint), std::string::npos) << line << "\n" << done.err;
-            EXPECT_EQ(std::count(done.err.begin(), done.err.end(), '\n'), 1) << done.err;
-            EXPECT_EQ(files(), before) << line;
-        }
     }
 
     /// The names of the files there, but for what shell() keeps.

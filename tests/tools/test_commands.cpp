@@ -1,7 +1,6 @@
 // Correlations, envelopes and windows from the command line.
-#include <algorithm>
+#include <array>
 #include <map>
-#include <random>
 
 #include "tools/program.hpp"
 
@@ -9,14 +8,6 @@ namespace wavkit::test {
 namespace {
 
 using CommandsTest = ProgramTest;
-using Signals = std::vector<Signal<dsp>>;
-
-std::vector<long double> random_samples(int n) {
-    std::mt19937 random(11);
-    std::vector<long double> samples;
-    for (int i = 0; i < n; ++i) samples.push_back(2.0L * random() / 4294967296.0L - 1);
-    return samples;
-}
 
 /// The numbers behind the words of a summary.
 std::map<std::string, double> figures(const std::string& text) {
@@ -30,30 +21,7 @@ std::map<std::string, double> figures(const std::string& text) {
     return result;
 }
 
-TEST_F(CommandsTest, CorrelateFindsADelayEitherWay) {
-    const auto a = random_samples(500);
-    for (const int delay : {0, 37, 700, -120}) {
-        std::vector<long double> b(1000);
-        for (int i = 0; i < 500; ++i) {
-            if (i + delay >= 0 && i + delay < 1000)
-                b[std::size_t(i + delay)] = -2 * a[std::size_t(i)];
-        }
-        write("a.dsp", Signals{real<dsp>(a, 0.01)});
-        write("b.dsp", Signals{real<dsp>(b, 0.01)});
-        write("both.dsp", Signals{real<dsp>(a, 0.01), real<dsp>(b, 0.01)});
-        for (const std::string files : {"a.dsp b.dsp", "both.dsp", "- b.dsp <a.dsp"}) {
-            const auto found = figures(printed("correlate " + files));
-            EXPECT_EQ(found.at("samples"), delay);
-            EXPECT_NEAR(found.at("lag"), delay * 0.01, 1e-12);
-            EXPECT_LT(found.at("correlation"), 0);
-            if (delay >= 0 && delay <= 500) {
-                EXPECT_NEAR(found.at("coefficient"), -1, 1e-6);
-            }
-        }
-    }
-}
-
-TEST_F(CommandsTest, CorrelateWritesEveryLag) {
+TEST_F(CommandsTest, CorrelateFindsOneInTheOther) {
     write("a.txt", "1\n2\n");
     write("b.txt", "0\n0\n0\n1\n2\n");
     const std::vector<std::vector<double>> want{{-1, 0}, {0, 0}, {1, 0}, {2, 1}, {3, 2.5}, {4, 1}};
@@ -72,6 +40,18 @@ TEST_F(CommandsTest, CorrelateWritesEveryLag) {
     EXPECT_EQ(figures(printed("correlate a.txt b.txt --lags -1 2")).at("samples"), 2);
     printed("correlate a.txt b.txt -o c.dsp");
     EXPECT_TRUE(matches<dsp>(read("c.dsp").at(0), real<dsp>({0, 0, 0, 1, 2.5L, 1}), 4));
+    // Upside down, and the other way round.
+    write("b.txt", "#DSP delta = 0.5\n0\n0\n0\n-2\n-4\n");
+    write("both.csv", "# delta = 0.5\nv\n1\n2\n\n# delta = 0.5\nv\n0\n0\n0\n-2\n-4\n");
+    for (const std::string files :
+         {"a.txt b.txt --delta 0.5", "both.csv", "- b.txt --delta 0.5 <a.txt"}) {
+        auto found = figures(shell("wavkit correlate " + files).out);
+        EXPECT_EQ(found["samples"], 3) << files;
+        EXPECT_EQ(found["lag"], 1.5);
+        EXPECT_EQ(found["correlation"], -5);
+        EXPECT_EQ(found["coefficient"], -1);
+    }
+    EXPECT_EQ(figures(printed("correlate b.txt a.txt --delta 1")).at("samples"), -3);
 }
 
 TEST_F(CommandsTest, TheEnvelopeOfAModulatedToneIsItsModulation) {
@@ -100,78 +80,26 @@ TEST_F(CommandsTest, TheEnvelopeOfAModulatedToneIsItsModulation) {
     EXPECT_NEAR(summary[2], 3, 1e-3);
 }
 
-TEST_F(CommandsTest, WindowsAreAsTheTableSays) {
-    const struct {
-        const char* name;
-        double gain, bandwidth, sidelobe, loss, loss_tolerance;  // loss: F. J. Harris, 1978
-    } table[] = {
-        {"Uniform", 1, 1, -13, 3.92, 0.01},
-        {"Bartlett", 0.5, 1.3333, -27, 1.82, 0.01},
-        {"Hann", 0.5, 1.5, -31, 1.42, 0.01},
-        {"Hamming", 0.54, 1.3628, -43, 1.78, 0.04},
-        {"Blackman", 0.42, 1.7268, -58, 1.10, 0.01},
-        {"Blackman_Harris3", 0.424383, 1.7037, -71, 1.13, 0.01},
-        {"Lowleak", 0.355768, 2.0212, -93, 0.83, 0.03},
-        {"Gausstop", 0.323215, 2.2153, -125, 0.68, 0.01},
-        {"Flat4", 0.239524, 3.4279, -70, 0, 0.01},
-        {"Flattop", 0.213283, 3.8221, -95, 0, 0.01},
-        {"Flat6", 0.191848, 4.2316, -117, 0, 0.01},
-        {"Flat7", 0.177866, 4.5500, -144, 0, 0.01},
-        {"P501", 0.194194, 4.1794, -121, 0, 0.01},
-        {"P601", 0.179324, 4.5124, -148, 0, 0.01},
-        {"Kaiser70", 0.4015, 1.7995, -70, 1.02, 0.01},
-        {"Kaiser120", 0.3133, 2.2851, -120, 0.64, 0.01},
-        {"Gauss60", 0.3963, 1.7869, -60, 1.06, 0.01},
-        {"Gauss80", 0.3329, 2.1248, -80, 0.75, 0.01},
-        {"Riemann", 0.589490, 1.2990, -26, 1.89, 0.01},
-    };
-    for (const auto& [name, gain, bandwidth, sidelobe, loss, tolerance] : table) {
-        const auto got = figures(printed(std::string("window ") + name));
-        EXPECT_NEAR(got.at("coherent gain"), gain, 6e-5) << name;
-        EXPECT_NEAR(got.at("noise bandwidth"), bandwidth, 1.01e-4) << name;
-        EXPECT_NEAR(got.at("highest sidelobe"), sidelobe, 0.6) << name;
-        EXPECT_NEAR(got.at("scalloping loss"), loss, tolerance) << name;
+TEST_F(CommandsTest, WindowsHaveTheirFigures) {
+    // Coherent gain, noise bandwidth, highest sidelobe, scalloping loss (F. J. Harris, 1978).
+    const std::pair<std::string, std::array<double, 4>> table[] = {
+        {"Uniform", {1, 1, -13, 3.92}},
+        {"Hann", {0.5, 1.5, -31, 1.42}},
+        {"Flattop", {0.213283, 3.8221, -95, 0}},
+        {"Kaiser70", {0.4015, 1.7995, -70, 1.02}}};
+    for (const auto& [name, want] : table) {
+        const auto got = figures(printed("window " + name));
+        EXPECT_NEAR(got.at("coherent gain"), want[0], 6e-5) << name;
+        EXPECT_NEAR(got.at("noise bandwidth"), want[1], 1.01e-4) << name;
+        EXPECT_NEAR(got.at("highest sidelobe"), want[2], 0.6) << name;
+        EXPECT_NEAR(got.at("scalloping loss"), want[3], 0.01) << name;
     }
     EXPECT_NE(printed("window hann --points 1").find("highest sidelobe  none"), std::string::npos);
 
     EXPECT_EQ(printed("window hann --points 6 -o w.dsp"), "");
     EXPECT_TRUE(
         matches<dsp>(read("w.dsp").at(0), real<dsp>({0, 0.25L, 0.75L, 1, 0.75L, 0.25L}), 2));
-    printed("window hann --plot w.png");
-    EXPECT_TRUE(contents("w.png").starts_with("\x89PNG\r\n"));
     EXPECT_NE(printed("window p601 --plot - --points 8").find("P601, 8 points"), std::string::npos);
-}
-
-TEST_F(CommandsTest, FailuresAreToldAndLeaveNothing) {
-    write("x.txt", "1\n2\n3\n");
-    write("fine.txt", "#DSP delta = 0.5\n1\n2\n");
-    write("nan.txt", "1\nnan\n");
-    write("none.txt", "#DSP points = 0\n");
-    expect_failures({
-        {1, "correlate x.txt", "name a second file"},
-        {1, "correlate x.txt fine.txt -o c.csv", "spacings differ, 1 and 0.5"},
-        {1, "correlate x.txt nan.txt -o c.csv", "sample 1 is not a finite number"},
-        {1, "correlate none.txt x.txt -o c.csv", "no samples"},
-        {1, "correlate x.txt x.txt --lags 0.2 0.3", "no lag in that range"},
-        {1, "correlate x.txt missing.txt", "missing.txt"},
-        {2, "correlate x.txt x.txt -o c.wav", "sound file"},
-        {2, "correlate x.txt x.txt -o c.dsp --lags 0 1", "--lags goes with CSV"},
-        {2, "correlate x.txt x.txt --to csv", "-o"},
-        {2, "correlate", "A"},
-        {1, "envelope nan.txt -o e.csv", "sample 1 is not a finite number"},
-        {1, "envelope x.txt -o nowhere/e.csv", "nowhere"},
-        {2, "envelope x.txt --to csv", "-o"},
-        {2, "envelope x.txt -o e.dsp --with-time", "--with-time is for CSV"},
-        {2, "window", "NAME"},
-        {2, "window hanning", "Uniform, Bartlett, Hann"},
-        {2, "window hann --points 0", "--points"},
-        {2, "window hann --plot w.gif", ".png"},
-        {2, "window hann --to csv", "-o"},
-        {2, "window hann -o - --plot -", "standard output"},
-    });
-    for (const std::string command : {"correlate", "envelope", "window"}) {
-        EXPECT_NE(printed(command + " --help").find("Example"), std::string::npos);
-    }
 }
 
 }  // namespace

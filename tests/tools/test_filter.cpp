@@ -1,5 +1,6 @@
 // Filters and test signals from the command line.
 #include <algorithm>
+#include <tuple>
 
 #include "support/oracles.hpp"
 #include "tools/program.hpp"
@@ -8,7 +9,6 @@ namespace wavkit::test {
 namespace {
 
 using FilterTest = ProgramTest;
-using Signals = std::vector<Signal<dsp>>;
 using Complex = std::complex<long double>;
 
 /// The gain of taps at a frequency in cycles a sample, seen from their middle.
@@ -190,8 +190,6 @@ TEST_F(FilterTest, FiguresOfADesignAreThoseOfItsTaps) {
         }
     }
     EXPECT_EQ(bands, 3);
-    printed("design hilbert 0.4 --plot h.png");
-    EXPECT_TRUE(contents("h.png").starts_with("\x89PNG\r\n"));
     EXPECT_NE(printed("design hilbert 0.4 --plot -").find("phase"), std::string::npos);
 }
 
@@ -212,25 +210,22 @@ TEST_F(FilterTest, GeneratedSignalsAreTheirSums) {
     EXPECT_EQ(printed("generate line 1 --complex --points 2 --to csv"), "re,im\n0,0\n1,0\n");
     EXPECT_EQ(printed("generate line 1 --points 0 --to csv"), "value\n");
 
-    const struct {
-        const char* term;
-        double mean, deviation, low, high;
-    } noises[] = {{"0.5", 0, 0.5, -4, 4},
-                  {"3 type=uniform", 0, 3 / std::sqrt(3.0), -3, 3},
-                  {"2 type=exponential", 2, 2, 0, 60},
-                  {"-1 type=laplace", 0, std::sqrt(2.0), -30, 30}};
-    for (const auto& [term, mean, deviation, low, high] : noises) {
-        printed("generate noise " + std::string(term) + " --points 100000 --seed 7 -o n.dsp");
+    const std::tuple<std::string, double, double, double> noises[] = {
+        {"0.5", 0, 0.5, -4},
+        {"3 type=uniform", 0, 3 / std::sqrt(3.0), -3},
+        {"2 type=exponential", 2, 2, 0},
+        {"-1 type=laplace", 0, std::sqrt(2.0), -30}};
+    for (const auto& [term, mean, deviation, low] : noises) {
+        printed("generate noise " + term + " --points 100000 --seed 7 -o n.dsp");
         const auto noise = read("n.dsp").at(0);
         double sum = 0, squares = 0;
         for (const double v : scalars<dsp>(noise)) {
-            EXPECT_TRUE(v >= low && v <= high) << v;
+            EXPECT_GE(v, low) << term;
             sum += v;
             squares += v * v;
         }
         EXPECT_NEAR(sum / 1e5, mean, 0.02 * deviation) << term;
-        EXPECT_NEAR(squares / 1e5 - mean * mean, deviation * deviation,
-                    0.05 * deviation * deviation);
+        EXPECT_NEAR(std::sqrt(squares / 1e5 - mean * mean), deviation, 0.03 * deviation) << term;
     }
     const auto drawn = [&](const std::string& seed) {
         return printed("generate noise + noise 0.1 --points 9 --to csv" + seed);
@@ -255,69 +250,8 @@ TEST_F(FilterTest, CommandsPipe) {
     EXPECT_EQ(same.out, printed("filter x.txt --taps h.txt --to csv"));
     const auto half = shell("wavkit filter x.txt --lowpass 0.1 --length 2 --to csv");
     EXPECT_NE(half.err.find("half a sample"), std::string::npos);
-    printed("filter x.txt --lowpass 0.1 --plot x.svg --span 0 1");
-    EXPECT_NE(contents("x.svg").find("<svg"), std::string::npos);
-}
-
-TEST_F(FilterTest, FailuresAreToldAndLeaveNothing) {
-    write("x.txt", "1\n2\n3\n");
-    write("nan.txt", "1\nnan\n");
-    write("none.txt", "#DSP points = 0\n");
-    write("z.csv", "re,im\n1,2\n3,4\n");
-    write("cut.dsp", "\xBE\x30\x03\xEB\x08\x04");
-    expect_failures({
-        {1, "filter x.txt --lowpass 0.6 -o y.csv", "half the sampling rate"},
-        {1, "filter x.txt --bandpass 0.3 0.2 -o y.csv", "lower to a higher"},
-        {1, "filter x.txt --bandstop 0.3 0.3 -o y.csv", "lower to a higher"},
-        {1, "filter x.txt --lowpass nan -o y.csv", "half the sampling rate"},
-        {1, "filter nan.txt --lowpass 0.1 -o y.csv", "sample 1 is not a finite number"},
-        {1, "filter cut.dsp --lowpass 0.1 -o y.csv", "cut.dsp"},
-        {1, "filter x.txt --taps missing.txt -o y.csv", "missing.txt"},
-        {1, "filter x.txt --taps none.txt -o y.csv", "no taps"},
-        {1, "filter x.txt --taps nan.txt -o y.csv", "not a finite number"},
-        {1, "filter x.txt --lowpass 0.1 -o nowhere/y.csv", "nowhere"},
-        {1, "filter z.csv --lowpass 0.1 --plot y.png", "real signals"},
-        {1, "filter x.txt --taps z.csv --plot y.png", "real signals"},
-        {1, "filter x.txt --lowpass 0.1 -o y.csv --plot y.png --span 7 9", "too few points"},
-        {2, "filter x.txt -o y.csv", "what to filter by"},
-        {2, "filter x.txt --lowpass 0.1 --taps x.txt -o y.csv", "what to filter by"},
-        {2, "filter x.txt --bandpass 0.1 -o y.csv", "--bandpass"},
-        {2, "filter x.txt --highpass 0.1 --length 10 -o y.csv", "odd number"},
-        {2, "filter x.txt --lowpass 0.1 --window hann -o y.csv", "Kaiser70"},
-        {2, "filter x.txt --lowpass 0.1 --transition 1e-9 -o y.csv", "--length"},
-        {2, "filter x.txt --lowpass 0.1 --length 9 --transition 0.1 --attenuation 50", "no choice"},
-        {2, "filter x.txt --taps x.txt --length 9 -o y.csv", "not for --taps"},
-        {2, "filter - --taps - -o y.csv", "standard input"},
-        {2, "filter x.txt --lowpass 0.1 -o y.csv --span 0 1", "--span is for --plot"},
-        {2, "filter x.txt --lowpass 0.1 -o y.dsp --with-time", "--with-time is for CSV"},
-        {2, "filter x.txt --lowpass 0.1 -o - --plot -", "standard output"},
-        {2, "design", "DESIGN"},
-        {2, "design notch 0.1", "bandstop"},
-        {2, "design lowpass", "one frequency"},
-        {2, "design lowpass 0.7 -o h.dsp", "half the sampling rate"},
-        {2, "design bandstop 0.1 0.2 --length 10 -o h.dsp", "odd number"},
-        {2, "design gauss 0.1 --transition 0.1", "stop band"},
-        {2, "design gauss 1e-9", "--length"},
-        {2, "design fixed12 --length 5", "its own length"},
-        {2, "design lowpass 0.1 --plot h.gif", ".png"},
-        {2, "design lowpass 0.1 --to csv", "-o"},
-        {2, "generate", "SIGNAL"},
-        {2, "generate sine 50 -o x.dsp", "none of cos, cexp, line, noise"},
-        {2, "generate cos -o x.dsp", "a frequency"},
-        {2, "generate cos 50 60 -o x.dsp", "stands alone"},
-        {2, "generate cos 50 amp=x -o x.dsp", "is not a number"},
-        {2, "generate cos 50 type=normal -o x.dsp", "has no type="},
-        {2, "generate cos 50 + -o x.dsp", "behind a +"},
-        {2, "generate + cos 50 -o x.dsp", "before a +"},
-        {2, "generate noise type=pink -o x.dsp", "uniform, normal"},
-        {2, "generate noise type=laplace --complex -o x.dsp", "real"},
-        {2, "generate cos 1 --rate 2 --delta 1 -o x.dsp", "--delta"},
-        {2, "generate cos 1 --duration 1e99 -o x.dsp", "1073741824"},
-        {2, "generate cos 1 -o x", "--to"},
-    });
-    for (const std::string command : {"filter", "design", "generate"}) {
-        EXPECT_NE(printed(command + " --help").find("Example"), std::string::npos);
-    }
+    EXPECT_NE(printed("filter x.txt --lowpass 0.1 --plot - --span 0 1").find("filtered"),
+              std::string::npos);
 }
 
 }  // namespace

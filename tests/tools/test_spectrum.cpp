@@ -7,7 +7,6 @@ namespace wavkit::test {
 namespace {
 
 using SpectrumTest = ProgramTest;
-using Signals = std::vector<Signal<dsp>>;
 
 /// How far a peak between bins may be off, in bins and in relative amplitude; the guide states the
 /// same figures.
@@ -94,40 +93,22 @@ TEST_F(SpectrumTest, SidesConstantsAndDecibels) {
     ASSERT_EQ(band.size(), 3u);
     EXPECT_EQ(band[0][0], 0.1875);
 
-    // A signal file holds what the library gives.
-    printed("spectrum x.dsp --window hamming -o x.sig");
-    Signal<dsp> want;
-    ASSERT_EQ(dsph_fft(real<dsp>(samples, 0.25), want, 0, 1.0, DSP_WINDOW_HAMMING, 0), 0);
-    EXPECT_TRUE(matches<dsp>(read("x.sig").at(0), want));
-    EXPECT_EQ(read("x.sig")[0]->delta, want->delta);
-    printed("spectrum x.dsp --window hamming --db -o x.sig");
-    EXPECT_EQ(read("x.sig").at(0)->complex, 0);
-
     // Seven samples through a window that fills its record: half a bin short of half the rate.
     write("odd.dsp", Signals{real<dsp>({1, 1, 1, 1, 1, 1, 1})});
     const auto odd = rows(printed("spectrum odd.dsp --window kaiser70 -o - --to csv"));
     ASSERT_EQ(odd.size(), 4u);
     EXPECT_NEAR(odd[0][1], 1, 1e-12);
     EXPECT_DOUBLE_EQ(odd[3][0], 3.0 / 7);
-    ASSERT_EQ(dsph_dft(real<dsp>({1, 1, 1, 1, 1, 1, 1}), want, DSP_WINDOW_KAISER70, 0), 0);
-    EXPECT_NEAR(odd[3][1], std::hypot(want[6], want[7]), 1e-15);
+    // Complex bins are as the transform leaves them, the edges doubled; decibels are real.
+    printed("spectrum x.dsp --window none -o x.sig");
+    EXPECT_NEAR(read("x.sig").at(0)[0], 11, 1e-12);
+    EXPECT_EQ(read("x.sig")[0]->delta, one[1][0]);
+    printed("spectrum x.dsp --window hamming --db -o x.sig");
+    EXPECT_EQ(read("x.sig").at(0)->complex, 0);
 
     write("z.dsp", Signals{complex<dsp>({{0, 3}, {3, 0}, {0, -3}, {-3, 0}})});  // 3 at -1/4
     EXPECT_EQ(rows(printed("spectrum z.dsp --window none --peaks 1")).at(0),
               (std::vector<double>{-0.25, 4, 3}));
-}
-
-TEST_F(SpectrumTest, UnusableSignalsAreRefused) {
-    write("nan.txt", "1\n2\nnan\n");
-    write("flat.txt", "#DSP delta = 0\n1\n2\n");
-    write("empty.txt", "#DSP points = 0\n");
-    EXPECT_NE(shell("wavkit spectrum nan.txt").err.find("sample 2 is not a finite number"),
-              std::string::npos);
-    EXPECT_NE(shell("wavkit spectrum flat.txt").err.find("gives no frequencies"),
-              std::string::npos);
-    EXPECT_EQ(shell("wavkit spectrum empty.txt").status, 1);
-    write("one.txt", "7\n");
-    EXPECT_EQ(printed("spectrum one.txt --peaks 2"), "no peaks\n");
 }
 
 TEST_F(SpectrumTest, Pictures) {
@@ -136,10 +117,7 @@ TEST_F(SpectrumTest, Pictures) {
     EXPECT_TRUE(contents("x.png").starts_with("\x89PNG\r\n"));
     EXPECT_EQ(printed("spectrum x.dsp --db --plot x.svg"), "");
     EXPECT_NE(contents("x.svg").find("</svg>"), std::string::npos);
-    const auto drawing = printed("spectrum x.dsp --plot -");
-    EXPECT_NE(drawing.find("x.dsp"), std::string::npos);
-    EXPECT_GT(std::count(drawing.begin(), drawing.end(), '\n'), 20);
-
+    EXPECT_NE(printed("spectrum x.dsp --plot -").find("x.dsp"), std::string::npos);
     const auto before = files();
     const auto done = shell("PATH=/nowhere; wavkit spectrum x.dsp --plot y.png");
     EXPECT_EQ(done.status, 1);
@@ -147,47 +125,16 @@ TEST_F(SpectrumTest, Pictures) {
     EXPECT_EQ(files(), before);
 }
 
-TEST_F(SpectrumTest, SunspotsHaveACycleOfElevenYears) {
-    const std::string data = WAVKIT_DATA "/sunspots-yearly.txt";
-    for (const std::string window : {"Hann", "Gausstop", "Kaiser80", "Flattop"}) {
-        const auto peak =
-            rows(printed("spectrum " + data + " --detrend --peaks 1 --window " + window)).at(0);
-        EXPECT_GT(peak[1], 10) << window;
-        EXPECT_LT(peak[1], 12) << window;
+TEST_F(SpectrumTest, TheSlopeOfASineBeatsTwiceAPeriod) {
+    write("x.dsp", Signals{sine(1 << 14, 256, 3, 0.01)});
+    const std::string options = "spectrum x.dsp --slope --detrend --any-length --peaks 1";
+    const double hertz = 2 * 256 / (0.01 * (1 << 14));
+    for (const std::string more : {"", " --average 8192"}) {
+        const auto peak = rows(printed(options + more)).at(0);
+        EXPECT_NEAR(peak[0], hertz, 1e-3 * hertz) << more;
+        // |cos| is 2/pi + 4/(3 pi) cos of twice the angle - ...
+        EXPECT_NEAR(peak[2], 3 * pi<double> * hertz * 4 / (3 * pi<double>), 0.02 * peak[2]) << more;
     }
-}
-
-/// Beats of an electrocardiogram, counted where its slope is steep.
-std::vector<double> beats(const Signal<dsp>& x, double rate) {
-    std::vector<double> energy;
-    double sum = 0;
-    const auto slope2 = [&](int i) { return std::pow(x[i + 2] - x[i - 2], 2); };
-    for (int i = 50; i < x->points - 2; ++i) {
-        sum += slope2(i) - (i >= 95 ? slope2(i - 45) : 0);
-        energy.push_back(sum);
-    }
-    auto sorted = energy;
-    std::ranges::sort(sorted);
-    const double threshold = 0.18 * sorted[sorted.size() * 98 / 100];
-    std::vector<double> times;
-    for (std::size_t i = 0; i < energy.size(); ++i) {
-        const double t = double(i) / rate;
-        if (energy[i] > threshold && (times.empty() || t - times.back() > 0.25)) times.push_back(t);
-    }
-    return times;
-}
-
-TEST_F(SpectrumTest, TheHeartRateIsThatOfTheCountedBeats) {
-    const std::string data = WAVKIT_DATA "/ecg-360hz.txt";
-    const auto peak = rows(printed("spectrum " + data +
-                                   " --rate 360 --slope --detrend --peaks 1 "
-                                   "--band 0.5 4"))
-                          .at(0);
-    const auto times = beats(through(data).at(0), 360);
-    std::vector<double> intervals;
-    for (std::size_t i = 1; i < times.size(); ++i) intervals.push_back(times[i] - times[i - 1]);
-    std::ranges::sort(intervals);
-    EXPECT_NEAR(peak[1], intervals[intervals.size() / 2], 0.05 * peak[1]);
 }
 
 }  // namespace

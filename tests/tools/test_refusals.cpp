@@ -1,0 +1,99 @@
+// What cannot be done: told in one line, by an exit status, and nothing is left behind.
+#include "tools/program.hpp"
+
+namespace wavkit::test {
+namespace {
+
+using RefusalsTest = ProgramTest;
+
+TEST_F(RefusalsTest, OneOfAKind) {
+    write("x.txt", "1\n2\n3\n");
+    write("slow.txt", "#DSP delta = 0.5\n1\n2\n");
+    write("still.txt", "#DSP delta = 0\n1\n2\n");
+    write("nan.txt", "1\n2\nnan\n1\n1\n");
+    write("none.txt", "#DSP points = 0\n");
+    write("back.csv", "x,y\n0,1\n2,1\n2,1\n");
+    write("times.csv", "time,x\n0,1\n1,1\n3,1\n");
+    write("z.csv", "re,im\n1,2\n3,4\n");
+    write("cut.dsp", "\xBE\x30\x03\xEB\x08\x04");
+    write("word.txt", "1 2 3 four");
+    write("many.txt", "#DSP points = 9223372036854775807\n#DSP complex = 1\n1 2 3 4");
+    const struct {
+        int status;
+        std::string line, complaint;
+    } refusals[] = {
+        // Sources
+        {1, "stats missing.txt --json", "missing.txt"},
+        {1, "filter cut.dsp --lowpass 0.1 -o y.csv", "signal 1 is damaged"},
+        {1, "spectrum word.txt --average 2", "signal 1 is damaged"},
+        {1, "info many.txt", "fewer values than it says"},
+        {1, "spectrum times.csv --average 2", "the time column is not equally spaced"},
+        {1, "convert x.txt o.csv --signal 2", "x.txt holds 1 signal, no signal 2"},
+        {1, "filter x.txt --lowpass 0.1 -o nowhere/y.csv", "nowhere"},
+        // Samples
+        {1, "spectrum nan.txt -o y.csv", "sample 2 is not a finite number"},
+        {1, "spectrum nan.txt --average 2 -o y.csv", "sample 2 is not a finite number"},
+        {1, "filter nan.txt --lowpass 0.1 -o y.csv", "sample 2 is not a finite number"},
+        {1, "spectrum none.txt", "no samples"},
+        {1, "filter x.txt --taps none.txt", "no taps"},
+        {1, "correlate x.txt slow.txt -o c.csv", "spacings differ, 1 and 0.5"},
+        {1, "spectrum still.txt", "gives no frequencies"},
+        {1, "spectrum x.txt --average 4 -o y.csv", "fewer than one segment of 4"},
+        {1, "filter z.csv --lowpass 0.1 --plot y.png", "real signals"},
+        {1, "interp back.csv --table --rate 1", "sample 2 does not lie behind"},
+        {1, "interp x.txt --rate 2 --method spline", "5 points"},
+        {1, "roots 0 0", "0 everywhere"},
+        // Places and sizes
+        {1, "filter x.txt --lowpass nan -o y.csv", "half the sampling rate"},
+        {1, "filter x.txt --bandpass 0.3 0.2 -o y.csv", "lower to a higher"},
+        {1, "interp x.txt --at x.txt --edges refuse", "3 lies outside"},
+        {2, "generate cos 1 --duration 1e99 -o x.dsp", "1073741824"},
+        {2, "filter x.txt --lowpass 0.1 --transition 1e-9", "--length"},
+        {2, "filter x.txt --highpass 0.1 --length 10", "odd number"},
+        // Words
+        {2, "", "subcommand"},
+        {2, "convert x.txt out", "--to"},
+        {2, "window hanning", "Uniform, Bartlett, Hann"},
+        {2, "filter x.txt --lowpass 0.1 --window hann", "Kaiser70"},
+        {2, "generate sine 50 -o x.dsp", "none of cos, cexp, line, noise"},
+        {2, "generate cos 50 amp=x -o x.dsp", "is not a number"},
+        {2, "generate noise type=laplace --complex -o x.dsp", "real"},
+        // Numbers out of range
+        {2, "convert x.txt out.csv --delta nan", "positive number"},
+        {2, "spectrum x.txt --fraction nan", "between"},
+        // Options that do not go together, or not with the output
+        {2, "convert x.txt o.csv --rate 1 --delta 1", "--delta"},
+        {2, "convert x.txt o.csv --column 1,2,3", "one column or two"},
+        {2, "convert x.txt o.txt --with-time", "--with-time is for CSV"},
+        {2, "convert x.txt o.flac --bits float", "FLAC"},
+        {2, "correlate x.txt x.txt -o c.dsp --lags 0 1", "--lags goes with CSV"},
+        {2, "spectrum x.txt --overlap 50", "go with --average"},
+        {2, "spectrum x.txt --waterfall x.svg", ".png"},
+        {2, "filter x.txt -o y.csv", "what to filter by"},
+        {2, "filter x.txt --taps x.txt --length 9", "not for --taps"},
+        {2, "filter x.txt --lowpass 0.1 --length 9 --transition 0.1 --attenuation 50", "no choice"},
+        {2, "interp x.txt", "--at and --rate"},
+        {2, "interp - --at -", "standard input"},
+        {2, "spectrum x.txt -o - --peaks 1", "standard output"},
+    };
+    const auto before = files();
+    for (const auto& [status, line, complaint] : refusals) {
+        const auto done = shell("wavkit " + line);
+        EXPECT_EQ(done.status, status) << line;
+        EXPECT_NE(done.err.find(complaint), std::string::npos) << line << "\n" << done.err;
+        EXPECT_EQ(std::count(done.err.begin(), done.err.end(), '\n'), 1) << done.err;
+        EXPECT_EQ(done.out, "") << line;
+        EXPECT_EQ(files(), before) << line;
+    }
+}
+
+TEST_F(RefusalsTest, EveryCommandExplainsItself) {
+    for (const std::string command :
+         {"info", "convert", "spectrum", "correlate", "envelope", "window", "filter", "design",
+          "generate", "stats", "hist", "fit", "roots", "interp"}) {
+        EXPECT_NE(printed(command + " --help").find("Example"), std::string::npos) << command;
+    }
+}
+
+}  // namespace
+}  // namespace wavkit::test
