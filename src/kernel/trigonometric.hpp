@@ -64,7 +64,7 @@ WAVKIT_LANES V sine_tail(V r, V lost, V square) {
                                 2.7557313583111128e-06, -2.5050742467399597e-08,
                                 1.5895952752398005e-10});
     } else {
-        p = polynomial(square, {-0.16666655242f, 0.0083321891725f, -0.00019518285990f});
+        p = polynomial(square, {-0.166666672f, 0.00833337195f, -0.000198499110f, 2.80054496e-06f});
     }
     return mul_add(r * square, p, lost);
 }
@@ -129,7 +129,7 @@ WAVKIT_LANES V sin(V x) {
     const auto [s, c] = sine_cosine_of(angle);
     const V result = flip_by_sign_of(select_odd(angle.quadrant, c, s),
                                      quadrant_sign<V>(angle.quadrant) ^ bits(x));
-    return mend_large_angles(result, x, [](Lane<V> v) { return std::sin(v); });
+    return mend_large_angles(result, x, [](Lane<V> v) { return Lane<V>(std::sin(double(v))); });
 }
 
 template <class V>
@@ -138,7 +138,7 @@ WAVKIT_LANES V cos(V x) {
     const auto [s, c] = sine_cosine_of(angle);
     const V result = flip_by_sign_of(select_odd(angle.quadrant, s, c),
                                      quadrant_sign<V>(angle.quadrant + 1));
-    return mend_large_angles(result, x, [](Lane<V> v) { return std::cos(v); });
+    return mend_large_angles(result, x, [](Lane<V> v) { return Lane<V>(std::cos(double(v))); });
 }
 
 /// Both for little more than the price of one.
@@ -150,8 +150,30 @@ WAVKIT_LANES SineCosine<V> sincos(V x) {
                                    quadrant_sign<V>(angle.quadrant) ^ bits(x));
     const V cosine = flip_by_sign_of(select_odd(angle.quadrant, s, c),
                                      quadrant_sign<V>(angle.quadrant + 1));
-    return {mend_large_angles(sine, x, [](Lane<V> v) { return std::sin(v); }),
-            mend_large_angles(cosine, x, [](Lane<V> v) { return std::cos(v); })};
+    return {mend_large_angles(sine, x, [](Lane<V> v) { return Lane<V>(std::sin(double(v))); }),
+            mend_large_angles(cosine, x, [](Lane<V> v) { return Lane<V>(std::cos(double(v))); })};
+}
+
+/// The sine by the cosine, each to twice the precision; in odd quadrants the negative reciprocal.
+template <class V>
+WAVKIT_LANES V tan(V x) {
+    using T = Lane<V>;
+    const auto [r, r_low, quadrant] = reduce(abs(x));
+    const V square = r * r;
+    const V one = mul_add(square, T(-0.5), T(1)), lost = mul_add(square, T(-0.5), T(1) - one);
+    const V sine = sine_tail(r, r_low * one, square);
+    const V cosine = cosine_tail(mul_add(-r, r_low, lost), square);
+    const V result = quotient(
+        Sum<V>{select_odd(quadrant, one, r), select_odd(quadrant, cosine, sine)},
+        Sum<V>{select_odd(quadrant, r, one), select_odd(quadrant, sine, cosine)});
+    const V tangent = flip_by_sign_of(result, quadrant_sign<V>(quadrant << 1) ^ bits(x));
+    return mend_large_angles(tangent, x, [](T v) { return T(std::tan(double(v))); });
+}
+
+/// sin(x) / x, 1 at 0.
+template <class V>
+WAVKIT_LANES V sinc(V x) {
+    return x == Lane<V>(0) ? all<V>(Lane<V>(1)) : sin(x) / x;
 }
 
 }  // namespace
