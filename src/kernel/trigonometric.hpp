@@ -162,7 +162,9 @@ WAVKIT_LANES V tan(V x) {
     const V square = r * r;
     const V one = mul_add(square, T(-0.5), T(1)), lost = mul_add(square, T(-0.5), T(1) - one);
     const V sine = sine_tail(r, r_low * one, square);
-    const V cosine = cosine_tail(mul_add(-r, r_low, lost), square);
+    // What rounding takes from the square would show as well.
+    const V rest = mul_add(product_minus(r, r, square), T(-0.5), lost);
+    const V cosine = cosine_tail(mul_add(-r, r_low, rest), square);
     const V result = quotient(
         Sum<V>{select_odd(quadrant, one, r), select_odd(quadrant, cosine, sine)},
         Sum<V>{select_odd(quadrant, r, one), select_odd(quadrant, sine, cosine)});
