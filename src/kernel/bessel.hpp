@@ -219,7 +219,7 @@ struct ModifiedTables<double> {
 
 template <>
 struct ModifiedTables<float> {
-    static constexpr float near[] = {1f,
+    static constexpr float near[] = {1.0f,
                                      0.25000003f,
                                      0.0277777184f,
                                      0.00173615792f,
@@ -240,8 +240,12 @@ WAVKIT_LANES V bessel_i0(V signed_x) {
     using T = Lane<V>;
     using Table = ModifiedTables<T>;
     const V x = abs(signed_x), near = at_most(x, all<V>(T(8))), far = at_least(x, all<V>(T(8)));
-    const V y = near * near * T(0.25);
-    const V inner = mul_add(y, polynomial(y, Table::near), T(1));
+    const V square = near * near, y = square * T(0.25);
+    const V rounded = mul_add(y, polynomial(y, Table::near), T(1));
+    // What rounding took from the square shows as I0' / I0, near 2 / x - 1 / x^2 from 1 on.
+    const V slope = rough_reciprocal(at_least(near, all<V>(T(1))));
+    const V square_low = product_minus(near, near, square) * T(0.25);
+    const V inner = mul_add(rounded * square_low, slope * (T(2) - slope), rounded);
     const V t = T(16) / far - T(1);
     const V outer = exp(far) * (polynomial(t, Table::far) / sqrt(far));
     return x < T(8) ? inner : x > std::numeric_limits<T>::max() ? x : outer;
