@@ -82,5 +82,77 @@ WAVKIT_LANES V exp10(V x) {
     return scale(sum + mul_add(r * r, exp10_tail(r), lost), k);
 }
 
+/// The hyperbolic functions of x = k ln 2 + r >= 0 are those of r mixed: with w = 4^-k,
+/// 2^(1-k) sinh(x) = (1 - w) cosh(r) + (1 + w) sinh(r), and cosh with the signs of w changed.
+template <class V>
+struct Hyperbolic {
+    V k, w, r;
+    V sine_tail;    // sinh - r, with what rounding took from r
+    V cosine_tail;  // cosh - 1
+
+    /// 2^(1-k) sinh(x)
+    WAVKIT_LANES Sum<V> sine() const { return mix<false>(-w); }
+    /// 2^(1-k) cosh(x)
+    WAVKIT_LANES Sum<V> cosine() const { return mix<false>(w); }
+    /// The same for their quotient, which would show what rounding takes from 1 + w.
+    WAVKIT_LANES Sum<V> exact_sine() const { return mix<true>(-w); }
+
+  private:
+    template <bool exact>
+    WAVKIT_LANES Sum<V> mix(V signed_w) const {
+        using T = Lane<V>;
+        const V one = T(1) + signed_w, other = T(1) - signed_w;
+        V lost = (T(1) - one) + signed_w;
+        if (exact) lost = mul_add((T(1) - other) - signed_w, r, lost);
+        const auto [high, low] = product_sum(other, r, one);
+        return {high, (low + lost) + mul_add(other, sine_tail, one * cosine_tail)};
+    }
+};
+
+template <class V>
+WAVKIT_LANES Hyperbolic<V> hyperbolic(V x) {
+    using T = Lane<V>;
+    const V k = round_product(x, T(1.44269504088896340736L)).number;
+    const V high = mul_add(k, -ln2_high<V>, x), low = k * ln2_low<V>;
+    const V r = high - low, r_lost = (high - r) - low, square = r * r;
+    V s, c;
+    if constexpr (is_double<V>) {
+        s = polynomial(square, {0.16666666666666677, 0.008333333333321463, 0.00019841269886483053, 2.7557243898356963e-06, 2.5109132832527064e-08});
+        c = polynomial(square, {0.5, 0.041666666666603645, 0.0013888888926929504, 2.4801508510738206e-05, 2.7625255942704444e-07});
+    } else {
+        s = polynomial(square, {0.166666672f, 0.00833319221f, 0.000199584814f});
+        c = polynomial(square, {0.5f, 0.0416664593f, 0.00139354193f});
+    }
+    // Once 4^-k is nothing beside 1 its exact size does not matter.
+    const V few = at_most(k, all<V>(T(is_double<V> ? 64 : 32)));
+    return {k, power_of_two(few * T(-2)), r, mul_add(r * square, s, r_lost), square * c};
+}
+
+/// Arguments from which sinh and cosh are infinite, and from which tanh is 1.
+template <class V>
+inline constexpr Lane<V> hyperbolic_limit = is_double<V> ? Lane<V>(711) : Lane<V>(90);
+template <class V>
+inline constexpr Lane<V> tanh_limit = is_double<V> ? Lane<V>(20) : Lane<V>(10);
+
+template <class V>
+WAVKIT_LANES V sinh(V x) {
+    const auto parts = hyperbolic(at_most(abs(x), all<V>(hyperbolic_limit<V>)));
+    const auto [high, low] = parts.sine();
+    return flip_by_sign_of(scale(high + low, parts.k - Lane<V>(1)), bits(x));
+}
+
+template <class V>
+WAVKIT_LANES V cosh(V x) {
+    const auto parts = hyperbolic(at_most(abs(x), all<V>(hyperbolic_limit<V>)));
+    const auto [high, low] = parts.cosine();
+    return scale(high + low, parts.k - Lane<V>(1));
+}
+
+template <class V>
+WAVKIT_LANES V tanh(V x) {
+    const auto parts = hyperbolic(at_most(abs(x), all<V>(tanh_limit<V>)));
+    return flip_by_sign_of(quotient(parts.exact_sine(), parts.cosine()), bits(x));
+}
+
 }  // namespace
 }  // namespace wavkit::kernel

@@ -19,19 +19,6 @@ inline constexpr T pi_low = T(3.141592653589793238462643L - (long double)pi_high
 template <>
 inline constexpr double pi_low<double> = 1.2246467991473532e-16;
 
-/// 1 / v within an eighth, from the bits: for what only corrects the last place. Large for 0.
-template <class V>
-WAVKIT_LANES V rough_reciprocal(V v) {
-    constexpr auto sum = Lane<Bits<V>>(is_double<V> ? 0x7fde623822fc16e6LL : 0x7ef311c7);
-    return from_bits<V>(sum - bits(v));
-}
-
-/// high + low
-template <class V>
-struct Sum {
-    V high, low;
-};
-
 /// atan(t) - t for |t| <= 1/2
 template <class V>
 WAVKIT_LANES V arc_tangent_tail(V t) {

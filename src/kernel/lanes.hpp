@@ -270,6 +270,56 @@ WAVKIT_LANES V polynomial(V x, const Lane<V> (&c)[N]) {
     }
 }
 
+/// 1 / v within an eighth, from the bits: for what only corrects the last place. Large for 0.
+template <class V>
+WAVKIT_LANES V rough_reciprocal(V v) {
+    constexpr auto sum = Lane<Bits<V>>(is_double<V> ? 0x7fde623822fc16e6LL : 0x7ef311c7);
+    return from_bits<V>(sum - bits(v));
+}
+
+/// high + low, a number of more than the precision.
+template <class V>
+struct Sum {
+    V high, low;
+};
+
+/// a / b to one unit in the last place, for sizes far from the limits of the precision. The rest
+/// that a first quotient leaves, which is known exactly enough, is divided once more and added; for
+/// that a good reciprocal will do.
+template <class V>
+WAVKIT_LANES V quotient(Sum<V> a, Sum<V> b) {
+    const V whole_a = a.high + a.low, whole_b = b.high + b.low;
+    const auto rest_of = [&](V q) {
+        return mul_add(-q, b.low, a.low) - product_minus(q, b.high, a.high);
+    };
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        V reciprocal;
+        if constexpr (is_double<V>) {
+            reciprocal = (V)_mm512_maskz_rcp14_pd(0xff, (__m512d)whole_b);
+            reciprocal = mul_add(mul_add(-whole_b, reciprocal, Lane<V>(1)), reciprocal, reciprocal);
+        } else {
+            reciprocal = (V)_mm512_maskz_rcp14_ps(0xffff, (__m512)whole_b);
+        }
+        const V q = whole_a * reciprocal;
+        return mul_add(rest_of(q), reciprocal, q);
+    }
+#endif
+    const V q = whole_a / whole_b;
+    return q + rest_of(q) / whole_b;
+}
+
+/// a * b + c to more than the precision, |c| >= |a * b| or c = 0.
+template <class V>
+WAVKIT_LANES Sum<V> product_sum(V a, V b, V c) {
+    if constexpr (fused) {
+        const V sum = mul_add(a, b, c);
+        return {sum, mul_add(a, b, c - sum)};
+    }
+    const V product = a * b, sum = product + c;
+    return {sum, ((c - sum) + product) + product_minus(a, b, product)};
+}
+
 /// The whole number nearest to v, and the same as an integer in the lowest bits of `bits`. For
 /// |v| < 2^51, of floats 2^22.
 template <class V>
