@@ -1,5 +1,4 @@
 // Cosines, complex exponentials and lines, by their closed forms.
-#include "support/failing_allocator.hpp"
 #include "support/signals.hpp"
 
 namespace wavkit::test {
@@ -78,12 +77,6 @@ BOTH_PRECISIONS(Waveform, LineAddsItsStepSampleBySample) {
     EXPECT_EQ(host.host, (std::vector<T>{7, 8, 9}));
     EXPECT_TRUE(is_complex<R>(z, {4, -2, -8}));
     for (int i = 1; i < 999; ++i) ASSERT_EQ(y[i], y[i - 1] + step);
-    const auto failing = [](auto f) {
-        return fail_each_growth<R>([&] { return f(blank<R>(5, true, 1)); });
-    };
-    EXPECT_EQ(failing([](R* x) { return dspc_line(x, 1, 2); }), 1);
-    EXPECT_EQ(failing([](R* x) { return dspc_cos(x, 1, 2); }), 1);
-    EXPECT_EQ(failing([](R* x) { return dspc_cexp(x, 1, 2); }), 1);
 }
 
 }  // namespace

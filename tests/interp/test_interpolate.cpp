@@ -1,7 +1,6 @@
 // Tables read at new abscissae, and interleaved signals.
 #include <climits>
 
-#include "support/failing_allocator.hpp"
 #include "support/signals.hpp"
 
 namespace wavkit::test {
@@ -102,11 +101,6 @@ BOTH_PRECISIONS(Interpolate, Refusals) {
     }
     EXPECT_EQ(dsp_interp(step, four, nullptr, early, out, 3), -1);
     EXPECT_EQ(dsp_interp(real<R>({1, 1}), real<R>({1, 1}), nullptr, early, out, 17), 0);
-    EXPECT_EQ(fail_each_growth<R>([&] {
-                  Borrowed<R> y(x);
-                  return dsp_interp(x, y, nullptr, x, y, 5);
-              }),
-              3);
 }
 
 BOTH_PRECISIONS(Interpolate, InterleavesAllKinds) {

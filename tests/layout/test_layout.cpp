@@ -1,7 +1,6 @@
 // Layout: rotation, padding, trimming, interleaved zeros.
 #include <climits>
 
-#include "support/failing_allocator.hpp"
 #include "support/signals.hpp"
 
 namespace wavkit::test {
@@ -69,11 +68,6 @@ BOTH_PRECISIONS(Layout, GrowthLeavesTheHostsArrayAndReportsFailure) {
     x->points = -3;
     ASSERT_EQ(dspi_zinter(x) || dspi_swap_halves(x) || dspi_zpad(x, 2), 0);
     EXPECT_TRUE(is_complex<R>(x, {0, 0}));
-    EXPECT_EQ(fail_each_growth<R>([] {
-                  Signal<R> y;
-                  return status(dspi_zpad(y, 2) || dspi_zpad2(y, 4, 0) || dspi_zinter(y));
-              }),
-              3);
     Borrowed<R> endless(real<R>({1}));
     endless->points = INT_MAX / 2 + 1;
     EXPECT_TRUE(dspi_zinter(endless) == -1 && !endless->data);

@@ -1,7 +1,6 @@
 // Records: buffers owned and borrowed, copies, ranges, comparison, hooks.
 #include <climits>
 
-#include "support/failing_allocator.hpp"
 #include "support/signals.hpp"
 
 namespace wavkit::test {
@@ -215,21 +214,6 @@ BOTH_PRECISIONS(Record, ComparisonFollowsDeltaThenSamples) {
     EXPECT_EQ(compared(real<R>({1}), complex<R>({{1, 0.5L}}), 0), -1);
     EXPECT_EQ(compared(real<R>({1}), complex<R>({{1, -0.5L}}), 0), 1);
     EXPECT_EQ(compared(complex<R>({{1, 2}}), complex<R>({{1, 3}}), 0), -1);
-}
-
-BOTH_PRECISIONS(Record, EveryFailingGrowthIsReported) {
-    const auto source = complex<R>({{1, 2}, {3, 4}});
-    const auto one = real<R>({1});
-    EXPECT_EQ(fail_each_growth<R>([&] {
-                  Signal<R> y;
-                  return dsp_copy(y, source);
-              }),
-              1);
-    EXPECT_EQ(fail_each_growth<R>([&] {
-                  Borrowed<R> y(one);
-                  return dsp_append(y, source);
-              }),
-              2);
 }
 
 // The hooks see the old capacity and block, and the borrowed case arrives with a null block.

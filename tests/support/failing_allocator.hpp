@@ -14,44 +14,47 @@ class FailingAllocator {
   public:
     explicit FailingAllocator(int fail_at = -1) {
         countdown_ = fail_at;
-        growths_ = 0;
+        growths_ = blocks_ = 0;
         dsp_lib_alloc(&allocate, &alloc_);
         dsp_lib_realloc(&reallocate, &realloc_);
+        dsp_lib_free(&release, &free_);
     }
     ~FailingAllocator() {
         dsp_lib_alloc(alloc_, nullptr);
         dsp_lib_realloc(realloc_, nullptr);
+        dsp_lib_free(free_, nullptr);
     }
     FailingAllocator(const FailingAllocator&) = delete;
     FailingAllocator& operator=(const FailingAllocator&) = delete;
 
     /// Growths asked for so far.
     static int growths() { return growths_; }
+    /// Blocks that it gave and that have not come back.
+    static int blocks() { return blocks_; }
 
   private:
     using Block = decltype(R::data);
 
-    static bool fails() {
+    /// A block for what the record holds, in place of its own one; none when it is to fail.
+    static void grow(R* x, Block old) {
+        const bool fails = countdown_-- == 0;
         ++growths_;
-        return countdown_-- == 0;
+        blocks_ += !fails - (old != nullptr);
+        if (fails) std::free(old);  // the library drops it; a test must not leak
+        x->data =
+            fails ? nullptr : static_cast<Block>(std::realloc(old, used(x) * sizeof(scalar<R>)));
     }
-    static std::size_t bytes(const R* x) { return used(x) * sizeof(scalar<R>); }
-    static void allocate(R* x) {
-        if (x->alloc > 0) std::free(x->data);
-        x->data = fails() ? nullptr : static_cast<Block>(std::malloc(bytes(x)));
-    }
-    static void reallocate(R* x, int, int) {
-        if (fails()) {
-            std::free(x->data);  // the library drops it; a test must not leak
-            x->data = nullptr;
-        } else {
-            x->data = static_cast<Block>(std::realloc(x->data, bytes(x)));
-        }
+    static void allocate(R* x) { grow(x, x->alloc > 0 ? x->data : nullptr); }
+    static void reallocate(R* x, int, int) { grow(x, x->data); }
+    static void release(R* x) {
+        --blocks_;
+        std::free(x->data);
     }
 
-    static inline int countdown_, growths_;
+    static inline int countdown_, growths_, blocks_;
     void (*alloc_)(R*) = nullptr;
     void (*realloc_)(R*, int, int) = nullptr;
+    void (*free_)(R*) = nullptr;
 };
 
 /// Runs `call` again and again, failing its first growth, then its second, and so on until it has

@@ -7,6 +7,8 @@ foreach(header IN LISTS WAVKIT_HEADERS)
   list(APPEND twins ${singles})
 endforeach()
 list(TRANSFORM twins REPLACE "(.+)" "TWINS(dsp\\1, dspf\\1)" OUTPUT_VARIABLE definitions)
+# In the list of them, those that begin and end what records and the library hold are left out.
+list(FILTER twins EXCLUDE REGEX "_(init|alloc|realloc|destroy|lib_.*)$")
 list(TRANSFORM twins PREPEND "dsp" OUTPUT_VARIABLE names)
 list(JOIN definitions "\n" definitions)
 list(JOIN names ", " names)

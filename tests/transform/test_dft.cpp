@@ -1,7 +1,6 @@
 // Transforms of any length, cosine transforms, analytic signals: direct sums and closed forms.
 #include <cmath>
 
-#include "support/failing_allocator.hpp"
 #include "support/oracles.hpp"
 
 namespace wavkit::test {
@@ -193,26 +192,6 @@ BOTH_PRECISIONS(Dft, AnalyticSignalsOfCosines) {
     ASSERT_EQ(dspi_analytic(constant), 0);
     EXPECT_TRUE(is_complex<R>(constant, {2, 2, 2, 2, 2}, 8));
     EXPECT_NEAR(double(constant->delta) * double(limits<R>::big) * 5, 1, 1e-5);
-}
-
-BOTH_PRECISIONS(Dft, FailingGrowthIsReportedAndLeavesNoHalfBuiltTable) {
-    const auto x = Noise().real<R>(11);
-    const auto growths = [&](auto transform) {
-        return fail_each_growth<R>([&] {
-            free_internal<R>();
-            Borrowed<R> y(x);
-            return transform(y);
-        });
-    };
-    EXPECT_EQ(growths([](R* y) { return dspi_dft(y, 0); }), 3);  // chirp, filter, signal
-    EXPECT_EQ(growths([](R* y) { return dspi_dct(y, 0); }), 4);  // and the scratch record
-
-    FailingAllocator<R> memory(1);  // the filter
-    Borrowed<R> y(x), z(x);
-    free_internal<R>();
-    EXPECT_EQ(dspi_dft(y, 0), -1);
-    EXPECT_EQ(dspi_dft(z, 0), 0);
-    EXPECT_LT(relative_error<R>(z, forward_transform(samples_of<R>(x.operator->()))), bound<R>(11));
 }
 
 }  // namespace

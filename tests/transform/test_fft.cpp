@@ -1,7 +1,6 @@
 // Power-of-two transforms against direct sums and closed forms.
 #include <cmath>
 
-#include "support/failing_allocator.hpp"
 #include "support/oracles.hpp"
 
 namespace wavkit::test {
@@ -111,18 +110,6 @@ BOTH_PRECISIONS(Fft, BorrowedBuffers) {
     ASSERT_EQ(dspi_fft(pairs, 0), 0);
     EXPECT_EQ(pairs->data, pairs.host.data());
     EXPECT_EQ(pairs->alloc, 0);
-}
-
-BOTH_PRECISIONS(Fft, FailingGrowthIsReported) {
-    const auto source = Noise().real<R>(8);
-    const auto transformed = [&](auto transform) {
-        return fail_each_growth<R>([&] {
-            Borrowed<R> x(source);
-            return transform(x);
-        });
-    };
-    EXPECT_EQ(transformed([](R* x) { return dspi_fft(x, 0); }), 1);
-    EXPECT_EQ(transformed([](R* x) { return dspi_rfft(x); }), 1);
 }
 
 BOTH_PRECISIONS(Fft, BitReversedOrder) {

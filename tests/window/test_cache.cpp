@@ -107,22 +107,6 @@ BOTH_PRECISIONS(Windowing, KeepsSixteenByLengthIdentifierFlagsAndWidth) {
     }
 }
 
-BOTH_PRECISIONS(Windowing, EveryFailingGrowthIsReported) {
-    free_internal<R>();
-    const auto ramp = real<R>({1, 2, 3, 4, 5});
-    Borrowed<R> host(ramp);
-    for (int which : {0, 1, 2, 3}) {
-        const auto call = [&] {
-            Signal<R> x;
-            *x.get() = host.record;
-            free_internal<R>();
-            return which < 3 ? free_form<R>(x, which, 1) : dspi_window2(x, 4, wide, 4);
-        };
-        EXPECT_EQ(fail_each_growth<R>(call), 3);  // the window, its rms or mean, the signal's copy
-    }
-    EXPECT_EQ(host.host, scalars<R>(ramp));
-}
-
 BOTH_PRECISIONS(Windowing, AFailedWindowIsNeverHalfServed) {
     free_internal<R>();
     Signal<R> x;
