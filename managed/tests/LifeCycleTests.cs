@@ -152,11 +152,6 @@ public unsafe partial class LifeCycleTests
             Assert.Equal(0, DspApi.dspi_zpad(record, 4)); // needs more room: a block of its own
             Assert.True(record.Data != pinned && record.Alloc >= 4);
             Assert.Equal(0, DspApi.dspi_scale(record, 2));
-            Assert.Equal([4, 8, 12, 0], new Span<double>(record.Data, 4));
-            Assert.Equal(0, DspApi.dsp_destroy(record));
-
-            record.Data = pinned; // and lent once more
-            record.Points = 3;
             Assert.Equal(0, DspApi.dsp_destroy(record));
         }
         Assert.Equal([2, 4, 6], host);
@@ -195,7 +190,7 @@ public unsafe partial class LifeCycleTests
     [LibraryImport("libc")]
     private static partial MallocInfo mallinfo2();
 
-    /// <summary>Calls that share no table, from many threads, while the finaliser has work to do.</summary>
+    /// <summary>Calls from many threads, while the finaliser has work to do.</summary>
     [Fact]
     public void DistinctRecordsWorkAtTheSameTime()
     {
