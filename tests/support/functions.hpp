@@ -61,7 +61,7 @@ template <Record R>
 struct Arguments {
     std::vector<R*> records;  // in the order of the parameters, null for one that is left out
     std::vector<double> numbers;
-    FILE* stream = nullptr;
+    std::unique_ptr<FILE, int (*)(FILE*)> stream{nullptr, std::fclose};
     int integer = 0;
     scalar<R> number = 0;
     std::size_t next_record = 0, next_number = 0;
@@ -76,7 +76,10 @@ struct Arguments {
         } else if constexpr (std::same_as<P, scalar<R>*>) {
             return &number;
         } else if constexpr (std::same_as<P, FILE*>) {
-            return stream;
+            stream.reset(std::tmpfile());
+            std::fputs("1 2 3", stream.get());
+            std::rewind(stream.get());
+            return stream.get();
         } else {
             return records[next_record++];
         }
@@ -158,10 +161,7 @@ struct Run {
 
     /// Calls; returns the result and all that the function may have written.
     std::vector<scalar<R>> operator()() {
-        const std::unique_ptr<FILE, int (*)(FILE*)> stream(std::tmpfile(), std::fclose);
-        std::fputs("1 2 3", stream.get());
-        std::rewind(stream.get());
-        Arguments<R> arguments{records, of.numbers, stream.get()};
+        Arguments<R> arguments{records, of.numbers};
         result = of.call(arguments);
         std::vector left{scalar<R>(result), scalar<R>(arguments.integer), arguments.number};
         for (std::size_t place = 0; place < records.size(); ++place) {
