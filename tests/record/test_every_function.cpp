@@ -24,12 +24,13 @@ void each_call(Check check) {
 /// share a buffer with. States and scratch records are not among them: they are written in place.
 template <Record R, class Share>
 void each_sharing(const Case<R>& c, Share share) {
-    const auto optional = optional_records.find(c.name);
-    for (std::size_t pair = 0; pair < c.is_const.size() * c.is_const.size(); ++pair) {
-        const auto to = pair / c.is_const.size(), from = pair % c.is_const.size();
-        if (c.is_const[to] || !c.is_const[from] || from == c.left_out) continue;
-        if (c.name == "dsp_append") continue;  // shares in ways of its own
-        if (optional == optional_records.end() || to != optional->second) share(to, from);
+    if (c.name == "dsp_append") return;  // shares in ways of its own
+    for (std::size_t to = 0; to < c.is_const.size(); ++to) {
+        for (std::size_t from = 0; from < c.is_const.size(); ++from) {
+            const bool left_out = from == c.optional && c.leaves_out;
+            if (!c.is_const[to] && to != c.optional && c.is_const[from] && !left_out)
+                share(to, from);
+        }
     }
 }
 
