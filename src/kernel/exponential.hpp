@@ -14,15 +14,16 @@ namespace {
 template <class V>
 inline constexpr Lane<V> ln2_high = is_double<V> ? 0x1.62e42fefap-1 : Lane<V>(0.693145751953125);
 template <class V>
-inline constexpr Lane<V> ln2_low =
-    is_double<V> ? Lane<V>(0.693147180559945309417232L - 0x1.62e42fefap-1L)
-                 : Lane<V>(0.693147180559945309417232L - 0.693145751953125L);
+inline constexpr Lane<V> ln2_low = is_double<V>
+                                       ? Lane<V>(0.693147180559945309417232L - 0x1.62e42fefap-1L)
+                                       : Lane<V>(0.693147180559945309417232L - 0.693145751953125L);
 template <class V>
 inline constexpr Lane<V> log10_2_high = is_double<V> ? 0x1.34413509f8p-2 : Lane<V>(0.301025390625);
 template <class V>
-inline constexpr Lane<V> log10_2_low =
-    is_double<V> ? Lane<V>(0.301029995663981195213739L - 0x1.34413509f8p-2L)
-                 : Lane<V>(0.301029995663981195213739L - 0.301025390625L);
+inline constexpr Lane<V> log10_2_low = is_double<V>
+                                           ? Lane<V>(0.301029995663981195213739L -
+                                                     0x1.34413509f8p-2L)
+                                           : Lane<V>(0.301029995663981195213739L - 0.301025390625L);
 
 /// (e^r - 1 - r) / r^2
 template <class V>
@@ -55,13 +56,13 @@ WAVKIT_LANES V exp(V x) {
 template <class V>
 WAVKIT_LANES V exp10_tail(V r) {
     if constexpr (is_double<V>) {
-        return polynomial(r, {2.6509490552392045, 2.0346785922934445, 1.1712551489084631,
-                              0.53938292920623187, 0.20699584950882552, 0.068089363900984888,
-                              0.019597620375717432, 0.0050139786014763137, 0.0011575519590943484,
-                              0.00024114540202336936});
+        return polynomial(
+            r, {2.6509490552392045, 2.0346785922934445, 1.1712551489084631, 0.53938292920623187,
+                0.20699584950882552, 0.068089363900984888, 0.019597620375717432,
+                0.0050139786014763137, 0.0011575519590943484, 0.00024114540202336936});
     } else {
-        return polynomial(r, {2.6509487629f, 2.0346608162f, 1.1712968349f, 0.54167062044f,
-                              0.20608115196f});
+        return polynomial(
+            r, {2.6509487629f, 2.0346608162f, 1.1712968349f, 0.54167062044f, 0.20608115196f});
     }
 }
 
@@ -116,8 +117,10 @@ WAVKIT_LANES Hyperbolic<V> hyperbolic(V x) {
     const V r = high - low, r_lost = (high - r) - low, square = r * r;
     V s, c;
     if constexpr (is_double<V>) {
-        s = polynomial(square, {0.16666666666666677, 0.008333333333321463, 0.00019841269886483053, 2.7557243898356963e-06, 2.5109132832527064e-08});
-        c = polynomial(square, {0.5, 0.041666666666603645, 0.0013888888926929504, 2.4801508510738206e-05, 2.7625255942704444e-07});
+        s = polynomial(square, {0.16666666666666677, 0.008333333333321463, 0.00019841269886483053,
+                                2.7557243898356963e-06, 2.5109132832527064e-08});
+        c = polynomial(square, {0.5, 0.041666666666603645, 0.0013888888926929504,
+                                2.4801508510738206e-05, 2.7625255942704444e-07});
     } else {
         s = polynomial(square, {0.166666672f, 0.00833319221f, 0.000199584814f});
         c = polynomial(square, {0.5f, 0.0416664593f, 0.00139354193f});

@@ -25,9 +25,13 @@ WAVKIT_LANES V arc_tangent_tail(V t) {
     const V square = t * t;
     V p;
     if constexpr (is_double<V>) {
-        p = polynomial(square, {-0.3333333333333298, 0.19999999999903112, -0.14285714276385975, 0.11111110659630949, -0.0909089624434714, 0.07692073902777725, -0.06663810483982287, 0.058582978208545605, -0.05122000167430027, 0.04186486680271098, -0.027434640235569054, 0.010116614781319583});
+        p = polynomial(square, {-0.3333333333333298, 0.19999999999903112, -0.14285714276385975,
+                                0.11111110659630949, -0.0909089624434714, 0.07692073902777725,
+                                -0.06663810483982287, 0.058582978208545605, -0.05122000167430027,
+                                0.04186486680271098, -0.027434640235569054, 0.010116614781319583});
     } else {
-        p = polynomial(square, {-0.333333284f, 0.199995548f, -0.142731071f, 0.109484099f, -0.0800906867f, 0.0390419699f});
+        p = polynomial(square, {-0.333333284f, 0.199995548f, -0.142731071f, 0.109484099f,
+                                -0.0800906867f, 0.0390419699f});
     }
     return t * square * p;
 }
@@ -48,8 +52,10 @@ WAVKIT_LANES Turned<V> turn(V y, V x) {
     const V q = upright ? y : diagonal ? sum : x, q_low = upright ? V{} : diagonal ? sum_low : V{};
     const V t = p / q;
     const V rest = -mul_add(t, q_low, product_minus(t, q, p));
-    return {upright ? all<V>(T(2)) : diagonal ? all<V>(T(1)) : V{}, t,
-            mul_add(rest, rough_reciprocal(q), arc_tangent_tail(t))};
+    return {upright    ? all<V>(T(2))
+            : diagonal ? all<V>(T(1))
+                       : V{},
+            t, mul_add(rest, rough_reciprocal(q), arc_tangent_tail(t))};
 }
 
 template <class V>
@@ -85,7 +91,8 @@ WAVKIT_LANES V atan2(V y, V x) {
     angle = flip_by_sign_of(angle, left);
     low = flip_by_sign_of(low, left);
     const V whole = eighths * quarter;
-    const V whole_low = mul_add(eighths, quarter_low, product_minus(eighths, all<V>(quarter), whole));
+    const V whole_low =
+        mul_add(eighths, quarter_low, product_minus(eighths, all<V>(quarter), whole));
     const V sum = whole + angle, lost = (whole - sum) + angle;
     const V result = flip_by_sign_of(sum + (lost + (whole_low + low)), bits(y));
     // Bring the size of zeros within the range, and ask whether all sizes are.
@@ -117,9 +124,13 @@ WAVKIT_LANES ArcSine<V> arc_sine(V x) {
     const V rest = product_minus(s, s, square) * T(-0.5) * rough_reciprocal(s);
     V p;
     if constexpr (is_double<V>) {
-        p = polynomial(square, {0.16666666666665408, 0.07500000000337152, 0.04464285682820365, 0.030381959142454704, 0.022371757912027418, 0.01735970693806651, 0.013885213232474203, 0.012169362039915619, 0.0065273072151494456, 0.019530138720204742, -0.016227260352506483, 0.03191437574307198});
+        p = polynomial(square, {0.16666666666665408, 0.07500000000337152, 0.04464285682820365,
+                                0.030381959142454704, 0.022371757912027418, 0.01735970693806651,
+                                0.013885213232474203, 0.012169362039915619, 0.0065273072151494456,
+                                0.019530138720204742, -0.016227260352506483, 0.03191437574307198});
     } else {
-        p = polynomial(square, {0.166667521f, 0.0749530941f, 0.0454691611f, 0.0241846591f, 0.0421586148f});
+        p = polynomial(square,
+                       {0.166667521f, 0.0749530941f, 0.0454691611f, 0.0241846591f, 0.0421586148f});
     }
     return {s, mul_add(s * square, p, half ? rest : V{}), half};
 }

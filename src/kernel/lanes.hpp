@@ -90,8 +90,10 @@ template <class V>
 WAVKIT_LANES V at_least(V v, V low) {
 #if defined(__AVX512F__)
     if constexpr (sizeof(V) == 64) {
-        if constexpr (is_double<V>) return (V)_mm512_maskz_max_pd(0xff, (__m512d)low, (__m512d)v);
-        else return (V)_mm512_maskz_max_ps(0xffff, (__m512)low, (__m512)v);
+        if constexpr (is_double<V>)
+            return (V)_mm512_maskz_max_pd(0xff, (__m512d)low, (__m512d)v);
+        else
+            return (V)_mm512_maskz_max_ps(0xffff, (__m512)low, (__m512)v);
     }
 #endif
     return v < low ? low : v;
@@ -102,8 +104,10 @@ template <class V>
 WAVKIT_LANES V at_most(V v, V high) {
 #if defined(__AVX512F__)
     if constexpr (sizeof(V) == 64) {
-        if constexpr (is_double<V>) return (V)_mm512_maskz_min_pd(0xff, (__m512d)high, (__m512d)v);
-        else return (V)_mm512_maskz_min_ps(0xffff, (__m512)high, (__m512)v);
+        if constexpr (is_double<V>)
+            return (V)_mm512_maskz_min_pd(0xff, (__m512d)high, (__m512d)v);
+        else
+            return (V)_mm512_maskz_min_ps(0xffff, (__m512)high, (__m512)v);
     }
 #endif
     return v > high ? high : v;
@@ -174,11 +178,29 @@ template <class V>
 WAVKIT_LANES V sqrt(V v) {
 #if defined(__AVX512F__)
     if constexpr (sizeof(V) == 64) {
-        if constexpr (is_double<V>) return (V)_mm512_maskz_sqrt_pd(0xff, (__m512d)v);
-        else return (V)_mm512_maskz_sqrt_ps(0xffff, (__m512)v);
+        if constexpr (is_double<V>)
+            return (V)_mm512_maskz_sqrt_pd(0xff, (__m512d)v);
+        else
+            return (V)_mm512_maskz_sqrt_ps(0xffff, (__m512)v);
     }
 #endif
-    V root;
+#if defined(__AVX2__)
+    if constexpr (sizeof(V) == 32) {
+        if constexpr (is_double<V>)
+            return (V)_mm256_sqrt_pd((__m256d)v);
+        else
+            return (V)_mm256_sqrt_ps((__m256)v);
+    }
+#endif
+#if defined(__x86_64__)
+    if constexpr (sizeof(V) == 16) {
+        if constexpr (is_double<V>)
+            return (V)_mm_sqrt_pd((__m128d)v);
+        else
+            return (V)_mm_sqrt_ps((__m128)v);
+    }
+#endif
+    V root{};
     for (int i = 0; i < count<V>; ++i) root[i] = std::sqrt(v[i]);
     return root;
 }
@@ -209,7 +231,7 @@ WAVKIT_LANES V mul_add(V a, V b, V c) {
     }
 #endif
     if constexpr (fused) {
-        V sum;
+        V sum{};
         for (int i = 0; i < count<V>; ++i) sum[i] = std::fma(a[i], b[i], c[i]);
         return sum;
     }
