@@ -299,6 +299,22 @@ struct Sum {
     V high, low;
 };
 
+/// 1 / v of floats, rounded or nearly so.
+template <class V>
+WAVKIT_LANES V near_reciprocal(Sum<V> v) {
+    V near;
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        near = (V)_mm512_maskz_rcp14_ps(0xffff, (__m512)v.high);
+    } else
+#endif
+    {
+        near = Lane<V>(1) / v.high;
+    }
+    const V rest = product_minus(v.high, near, all<V>(Lane<V>(1)));
+    return mul_add(-mul_add(v.low, near, rest), near, near);
+}
+
 /// a / b to one unit in the last place, for sizes far from the limits of the precision. The rest
 /// that a first quotient leaves, which is known exactly enough, is divided once more and added; for
 /// that a good reciprocal will do.
