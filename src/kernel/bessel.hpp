@@ -183,7 +183,8 @@ WAVKIT_LANES V bessel_y1(V x) {
     return in_double(x, [](auto v) { return bessel_y<1>(v, [](double t) { return ::y1(t); }); });
 }
 
-/// (I0 - 1) / y over y = x^2 / 4 up to 16; and sqrt(x) e^-x I0 over 16 / x - 1.
+/// (I0 - 1) / y over y = x^2 / 4 up to 16; and
+/// x (sqrt(2 pi x) e^-x I0 - 1) over 16 / x - 1.
 template <class T>
 struct ModifiedTables;
 
@@ -206,15 +207,15 @@ struct ModifiedTables<double> {
                                       5.062353740472859e-25,
                                       3.548836657975519e-27};
     static constexpr double far[] = {
-        0.4021765094450081,      0.003360551983667854,   0.00013621607439232746,
-        1.1143033791556743e-05,  1.4838475473607391e-06, 2.973598432479169e-07,
-        8.87225351128584e-08,    3.932602459703109e-08,  2.1545177650836005e-08,
-        7.553516470355896e-09,   -6.729724111923548e-09, -1.3404241991980871e-08,
-        -5.4685974495866e-09,    7.540601378890834e-09,  7.580221339152718e-09,
-        -3.4857887470034955e-09, -6.188265090497361e-09, 1.497880830187091e-09,
-        3.881151253996067e-09,   -5.562201990080394e-10, -1.7789375042917173e-09,
-        1.4672236659214398e-10,  5.181936971288284e-10,  -1.9216763724933513e-11,
-        -7.06893851181878e-11};
+        0.12971215947614195,     0.005066314453925904,    0.00039677456256937,
+        5.012853434310733e-05,   9.38273304505673e-06,    2.5432011806561627e-06,
+        1.0151146503129167e-06,  5.620308738271559e-07,   3.019711848516458e-07,
+        1.4853444521783873e-09,  -2.7059816306901927e-07, -2.694816874727124e-07,
+        4.603960701958129e-08,   2.642668172980614e-07,   5.349766509611047e-08,
+        -2.1012104910174586e-07, -6.858799581479939e-08,  1.5302358930754792e-07,
+        4.820436647726228e-08,   -9.412094186650315e-08,  -2.2481302801142765e-08,
+        4.302447367618444e-08,   6.428913234518591e-09,   -1.2471336683220517e-08,
+        -8.500535391424227e-10,  1.6850950727434155e-09};
 };
 
 template <>
@@ -229,9 +230,9 @@ struct ModifiedTables<float> {
                                      6.67034983e-10f,
                                      4.96406518e-12f,
                                      1.46044391e-13f};
-    static constexpr float far[] = {0.402176499f,    0.00336055574f,  0.00013621684f,
-                                    1.11115251e-05f, 1.47679214e-06f, 3.6317104e-07f,
-                                    1.08298984e-07f};
+    static constexpr float far[] = {0.129712164f,    0.00506634917f,  0.000396770803f,
+                                    4.98329682e-05f, 9.39533402e-06f, 3.24134135e-06f,
+                                    1.10210328e-06f};
 };
 
 /// I0; infinite where e^|x| is.
@@ -246,8 +247,13 @@ WAVKIT_LANES V bessel_i0(V signed_x) {
     const V slope = rough_reciprocal(at_least(near, all<V>(T(1))));
     const V square_low = product_minus(near, near, square) * T(0.25);
     const V inner = mul_add(rounded * square_low, slope * (T(2) - slope), rounded);
-    const V t = T(16) / far - T(1);
-    const V outer = exp(far) * (polynomial(t, Table::far) / sqrt(far));
+    // e^x / sqrt(2 pi x) (1 + Q(1 / x) / x); what rounding took from 2 pi x and from the root.
+    constexpr T two_pi = T(6.283185307179586476925L);
+    const V inverse = T(1) / far, scaled = far * two_pi, root = sqrt(scaled);
+    const V rest = product_minus(root, root, scaled) - product_minus(far, all<V>(two_pi), scaled);
+    const V tail = polynomial(mul_add(inverse, T(16), T(-1)), Table::far) * inverse;
+    const V change = mul_add(rest * T(0.5), inverse * T(1 / two_pi), tail);
+    const V leading = exp(far) / root, outer = mul_add(leading, change, leading);
     return x < T(8) ? inner : x > std::numeric_limits<T>::max() ? x : outer;
 }
 

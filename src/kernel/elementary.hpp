@@ -5,5 +5,6 @@
 #include "kernel/exponential.hpp"
 #include "kernel/inverse_trigonometric.hpp"
 #include "kernel/logarithm.hpp"
+#include "kernel/magnitude.hpp"
 #include "kernel/map.hpp"
 #include "kernel/trigonometric.hpp"

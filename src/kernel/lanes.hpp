@@ -184,7 +184,23 @@ WAVKIT_LANES V sqrt(V v) {
             return (V)_mm512_maskz_sqrt_ps(0xffff, (__m512)v);
     }
 #endif
-    V root;
+#if defined(__AVX2__)
+    if constexpr (sizeof(V) == 32) {
+        if constexpr (is_double<V>)
+            return (V)_mm256_sqrt_pd((__m256d)v);
+        else
+            return (V)_mm256_sqrt_ps((__m256)v);
+    }
+#endif
+#if defined(__x86_64__)
+    if constexpr (sizeof(V) == 16) {
+        if constexpr (is_double<V>)
+            return (V)_mm_sqrt_pd((__m128d)v);
+        else
+            return (V)_mm_sqrt_ps((__m128)v);
+    }
+#endif
+    V root{};
     for (int i = 0; i < count<V>; ++i) root[i] = std::sqrt(v[i]);
     return root;
 }
@@ -215,7 +231,7 @@ WAVKIT_LANES V mul_add(V a, V b, V c) {
     }
 #endif
     if constexpr (fused) {
-        V sum;
+        V sum{};
         for (int i = 0; i < count<V>; ++i) sum[i] = std::fma(a[i], b[i], c[i]);
         return sum;
     }
@@ -282,6 +298,22 @@ template <class V>
 struct Sum {
     V high, low;
 };
+
+/// 1 / v of floats, rounded or nearly so.
+template <class V>
+WAVKIT_LANES V near_reciprocal(Sum<V> v) {
+    V near;
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {
+        near = (V)_mm512_maskz_rcp14_ps(0xffff, (__m512)v.high);
+    } else
+#endif
+    {
+        near = Lane<V>(1) / v.high;
+    }
+    const V rest = product_minus(v.high, near, all<V>(Lane<V>(1)));
+    return mul_add(-mul_add(v.low, near, rest), near, near);
+}
 
 /// a / b to one unit in the last place, for sizes far from the limits of the precision. The rest
 /// that a first quotient leaves, which is known exactly enough, is divided once more and added; for

@@ -19,7 +19,7 @@ struct HalfPi<double> {
     static constexpr double high = 0x1.921fb54442d18p+0, middle = 6.123233995384610e-17,
                             low = 3.521559865183200e-27;
     static constexpr double high_first = 0x1.921fb544p+0;  // 33 bits
-    static constexpr double last = 0x1p20;                  // |k| up to which the products are exact
+    static constexpr double last = 0x1p20;                 // |k| up to which the products are exact
 };
 
 template <>
@@ -37,7 +37,7 @@ struct Remainder {
 };
 
 template <class V>
-inline constexpr Lane<V> last_reduced = HalfPi<Lane<V>>::last * Lane<V>(1.5);
+inline constexpr Lane<V> last_reduced = HalfPi<Lane<V>>::last* Lane<V>(1.5);
 
 template <class V>
 WAVKIT_LANES Remainder<V> reduce(V x) {
@@ -60,9 +60,9 @@ template <class V>
 WAVKIT_LANES V sine_tail(V r, V lost, V square) {
     V p;
     if constexpr (is_double<V>) {
-        p = polynomial(square, {-0.16666666666666630, 0.0083333333333219205, -0.00019841269829460562,
-                                2.7557313583111128e-06, -2.5050742467399597e-08,
-                                1.5895952752398005e-10});
+        p = polynomial(square,
+                       {-0.16666666666666630, 0.0083333333333219205, -0.00019841269829460562,
+                        2.7557313583111128e-06, -2.5050742467399597e-08, 1.5895952752398005e-10});
     } else {
         p = polynomial(square, {-0.166666672f, 0.00833337195f, -0.000198499110f, 2.80054496e-06f});
     }
@@ -74,9 +74,9 @@ template <class V>
 WAVKIT_LANES V cosine_tail(V lost, V square) {
     V p;
     if constexpr (is_double<V>) {
-        p = polynomial(square, {0.041666666666666595, -0.0013888888888873346, 2.4801587289005626e-05,
-                                -2.7557314218073983e-07, 2.0875705523765137e-09,
-                                -1.1358754840328495e-11});
+        p = polynomial(square,
+                       {0.041666666666666595, -0.0013888888888873346, 2.4801587289005626e-05,
+                        -2.7557314218073983e-07, 2.0875705523765137e-09, -1.1358754840328495e-11});
     } else {
         p = polynomial(square, {0.041666645557f, -0.0013887310633f, 2.4432563805e-05f});
     }
@@ -136,8 +136,8 @@ template <class V>
 WAVKIT_LANES V cos(V x) {
     const auto angle = reduce(abs(x));
     const auto [s, c] = sine_cosine_of(angle);
-    const V result = flip_by_sign_of(select_odd(angle.quadrant, s, c),
-                                     quadrant_sign<V>(angle.quadrant + 1));
+    const V result =
+        flip_by_sign_of(select_odd(angle.quadrant, s, c), quadrant_sign<V>(angle.quadrant + 1));
     return mend_large_angles(result, x, [](Lane<V> v) { return Lane<V>(std::cos(double(v))); });
 }
 
@@ -148,8 +148,8 @@ WAVKIT_LANES SineCosine<V> sincos(V x) {
     const auto [s, c] = sine_cosine_of(angle);
     const V sine = flip_by_sign_of(select_odd(angle.quadrant, c, s),
                                    quadrant_sign<V>(angle.quadrant) ^ bits(x));
-    const V cosine = flip_by_sign_of(select_odd(angle.quadrant, s, c),
-                                     quadrant_sign<V>(angle.quadrant + 1));
+    const V cosine =
+        flip_by_sign_of(select_odd(angle.quadrant, s, c), quadrant_sign<V>(angle.quadrant + 1));
     return {mend_large_angles(sine, x, [](Lane<V> v) { return Lane<V>(std::sin(double(v))); }),
             mend_large_angles(cosine, x, [](Lane<V> v) { return Lane<V>(std::cos(double(v))); })};
 }
@@ -165,9 +165,9 @@ WAVKIT_LANES V tan(V x) {
     // What rounding takes from the square would show as well.
     const V rest = mul_add(product_minus(r, r, square), T(-0.5), lost);
     const V cosine = cosine_tail(mul_add(-r, r_low, rest), square);
-    const V result = quotient(
-        Sum<V>{select_odd(quadrant, one, r), select_odd(quadrant, cosine, sine)},
-        Sum<V>{select_odd(quadrant, r, one), select_odd(quadrant, sine, cosine)});
+    const V result =
+        quotient(Sum<V>{select_odd(quadrant, one, r), select_odd(quadrant, cosine, sine)},
+                 Sum<V>{select_odd(quadrant, r, one), select_odd(quadrant, sine, cosine)});
     const V tangent = flip_by_sign_of(result, quadrant_sign<V>(quadrant << 1) ^ bits(x));
     return mend_large_angles(tangent, x, [](T v) { return T(std::tan(double(v))); });
 }
