@@ -121,8 +121,19 @@ struct ThreadState {
     void* conversion = nullptr;  // a load of stored scalars on their way to this precision
 };
 
+/// What hosts have installed in place of the standard allocator.
+template <Record R>
+struct Hooks {
+    void (*alloc)(R*) = nullptr;
+    void (*realloc)(R*, int, int) = nullptr;
+    void (*free)(R*) = nullptr;
+};
+
 template <class T>
 inline constinit SharedState<T> shared_state{};
+
+template <Record R>
+inline constinit Hooks<R> hooks_of{};
 
 template <Record R>
 inline constinit thread_local ThreadState<R> thread_state{};

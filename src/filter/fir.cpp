@@ -8,17 +8,11 @@ namespace {
 /// From how many real taps on transforms are worth their while.
 constexpr std::size_t long_for_real = 46, long_for_complex = 36, long_for_symmetric = 61;
 
-/// Whether the samples of a record lie in the block that another one owns.
+/// Whether an output lies over what a call still reads.
 template <Record R>
-bool overlaps(const R* owner, const R& x) {
-    const auto at = [](const scalar<R>* p) { return reinterpret_cast<std::uintptr_t>(p); };
-    return owner->alloc > 0 && used(&x) > 0 && at(x.data) < at(owner->data + owner->alloc) &&
-           at(owner->data) < at(x.data + used(&x));
-}
-
-template <Record R>
-bool overlaps(const R* owner, const FilterCall<R>& call) {
-    return overlaps(owner, call.in) || overlaps(owner, call.taps) || overlaps(owner, call.state);
+bool overlaps(const R* out, const FilterCall<R>& call) {
+    return shares_memory(out, &call.in) || shares_memory(out, &call.taps) ||
+           shares_memory(out, &call.state);
 }
 
 /// Puts the last `order` samples before the next block at the start of `work`.
@@ -72,7 +66,8 @@ int filter(const R* in, R* out, const R* taps, R* state, std::size_t many_taps) 
 
     // An output that is the state keeps no history. One that owns the state's buffer leaves it.
     if (state && state != out) {
-        if (state->alloc < 1 && overlaps(out, call.state) && dsp_copy(state, state)) return -1;
+        if (state->alloc < 1 && shares_memory(out, &call.state) && dsp_copy(state, state))
+            return -1;
         if (keep_history(call, &scratch.work, state)) return -1;
     }
     return result == out ? 0 : dsp_copy(out, result);

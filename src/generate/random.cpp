@@ -28,6 +28,12 @@ void start_from(std::uint64_t seed) {
     draws.has_spare = false;
 }
 
+template <Record R>
+int seed(std::uint64_t value) {
+    start_from<R>(value);
+    return 0;
+}
+
 /// The time tells runs and threads that follow one another apart; the address, which systems choose
 /// at random, processes and threads of the same time, and the two precisions.
 template <Record R>
@@ -177,6 +183,9 @@ int shuffle(R* x) {
 
 int dspc_rand(dsp* x, int type) { return wavkit::random_samples(x, type); }
 int dspfc_rand(dspf* x, int type) { return wavkit::random_samples(x, type); }
+
+int dspc_seed(std::uint64_t seed) { return wavkit::seed<dsp>(seed); }
+int dspfc_seed(std::uint64_t seed) { return wavkit::seed<dspf>(seed); }
 
 int dspi_shuffle(dsp* x) { return wavkit::shuffle(x); }
 int dspfi_shuffle(dspf* x) { return wavkit::shuffle(x); }

@@ -4,19 +4,10 @@
 #include <cstring>
 
 #include "record_view.hpp"
+#include "state.hpp"
 
 namespace wavkit {
 namespace {
-
-template <Record R>
-struct Hooks {
-    void (*alloc)(R*) = nullptr;
-    void (*realloc)(R*, int, int) = nullptr;
-    void (*free)(R*) = nullptr;
-};
-
-template <Record R>
-Hooks<R> hooks;
 
 /// Scalars that a count of type int can express and an address can reach.
 template <Record R>
@@ -95,8 +86,8 @@ int init(R* x) {
 template <Record R>
 void release(R* x) {
     if (x->alloc <= 0) return;
-    if (hooks<R>.free) {
-        hooks<R>.free(x);
+    if (hooks_of<R>.free) {
+        hooks_of<R>.free(x);
     } else {
         std::free(x->data);
     }
@@ -110,8 +101,8 @@ int allocate(R* x) {
         release(x);
         return without_memory(x);
     }
-    if (hooks<R>.alloc) {
-        hooks<R>.alloc(x);
+    if (hooks_of<R>.alloc) {
+        hooks_of<R>.alloc(x);
     } else {
         if (x->alloc > 0) std::free(x->data);
         x->data = static_cast<scalar<R>*>(obtain(need * sizeof(scalar<R>)));
@@ -131,8 +122,8 @@ int reallocate(R* x, int old_points, int old_complex) {
         borrowed = x->data;
         x->data = nullptr;
     }
-    if (hooks<R>.realloc) {
-        hooks<R>.realloc(x, old_points, old_complex);
+    if (hooks_of<R>.realloc) {
+        hooks_of<R>.realloc(x, old_points, old_complex);
     } else {
         const std::size_t had = std::size_t(std::max(x->alloc, 0)) * sizeof(scalar<R>);
         x->data = static_cast<scalar<R>*>(x->data ? enlarge(x->data, had, bytes) : obtain(bytes));
@@ -300,20 +291,20 @@ int dspi_rtoc(dsp* record) { return wavkit::promote(record); }
 int dspfi_rtoc(dspf* record) { return wavkit::promote(record); }
 
 int dsp_lib_alloc(dsp_alloc_hook hook, dsp_alloc_hook* previous) {
-    return wavkit::install(wavkit::hooks<dsp>.alloc, hook, previous);
+    return wavkit::install(wavkit::hooks_of<dsp>.alloc, hook, previous);
 }
 int dspf_lib_alloc(dspf_alloc_hook hook, dspf_alloc_hook* previous) {
-    return wavkit::install(wavkit::hooks<dspf>.alloc, hook, previous);
+    return wavkit::install(wavkit::hooks_of<dspf>.alloc, hook, previous);
 }
 int dsp_lib_realloc(dsp_realloc_hook hook, dsp_realloc_hook* previous) {
-    return wavkit::install(wavkit::hooks<dsp>.realloc, hook, previous);
+    return wavkit::install(wavkit::hooks_of<dsp>.realloc, hook, previous);
 }
 int dspf_lib_realloc(dspf_realloc_hook hook, dspf_realloc_hook* previous) {
-    return wavkit::install(wavkit::hooks<dspf>.realloc, hook, previous);
+    return wavkit::install(wavkit::hooks_of<dspf>.realloc, hook, previous);
 }
 int dsp_lib_free(dsp_free_hook hook, dsp_free_hook* previous) {
-    return wavkit::install(wavkit::hooks<dsp>.free, hook, previous);
+    return wavkit::install(wavkit::hooks_of<dsp>.free, hook, previous);
 }
 int dspf_lib_free(dspf_free_hook hook, dspf_free_hook* previous) {
-    return wavkit::install(wavkit::hooks<dspf>.free, hook, previous);
+    return wavkit::install(wavkit::hooks_of<dspf>.free, hook, previous);
 }

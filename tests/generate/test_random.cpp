@@ -1,47 +1,31 @@
-// Random samples: bounds, moments and distribution; random order.
-//
-// The runtime's rand() and srand() are this file's: what the library draws is then known on every
-// system, extremes that a lifetime of drawing would not meet can be dealt out, and seeding shows.
+// Random samples: distributions and bounds, seeds, random order.
 #include <algorithm>
 #include <functional>
-#include <random>
+#include <map>
+#include <thread>
 
 #include "support/signals.hpp"
 
-namespace {
-std::mt19937 noise;
-std::vector<int> dealt;  // while there are any, they come again and again in place of noise
-std::size_t next_dealt;
-std::vector<unsigned> seeds;
-}  // namespace
-
-extern "C" int rand() noexcept {
-    return dealt.empty() ? int(noise() >> 1) : dealt[next_dealt++ % dealt.size()];
-}
-extern "C" void srand(unsigned seed) noexcept { seeds.push_back(seed); }
+// The host's generator, which the library leaves alone.
+static int host_calls = 0;
+extern "C" int rand() noexcept { return ++host_calls; }
+extern "C" void srand(unsigned) noexcept { ++host_calls; }
 
 namespace wavkit::test {
 namespace {
 
 template <Record R>
-Signal<R> drawn(int type, bool is_complex, int points, const std::vector<int>& deal = {}) {
-    dealt = deal;
-    next_dealt = 0;
+Signal<R> drawn(int type, bool is_complex, int points) {
     Signal<R> x;
     x->points = points;
     x->complex = is_complex;
     EXPECT_EQ(dspc_rand(x, type), 0);
-    dealt.clear();
     return x;
 }
 
 template <Record R>
-Signal<R> shuffled(Signal<R> x, const std::vector<int>& deal) {
-    dealt = deal;
-    next_dealt = 0;
-    EXPECT_EQ(dspi_shuffle(x), 0);
-    dealt.clear();
-    return x;
+int seed(std::uint64_t value) {
+    return std::same_as<R, dsp> ? ::dspc_seed(value) : ::dspfc_seed(value);
 }
 
 struct Law {
@@ -67,7 +51,7 @@ void expect_law(std::vector<double> x, const Law& law) {
 }
 
 BOTH_PRECISIONS(Random, SamplesFollowTheirDistribution) {
-    noise.seed(7);
+    ASSERT_EQ(seed<R>(7), 0);
     const Law uniform{0, 1.0 / 3, 1.8, [](double x) { return (x + 1) / 2; }};
     const Law normal{0, 1, 3, [](double x) { return std::erfc(-x / std::sqrt(2.0)) / 2; }};
     const Law exponential{1, 1, 9, [](double x) { return 1 - std::exp(-x); }};
@@ -91,60 +75,64 @@ BOTH_PRECISIONS(Random, SamplesFollowTheirDistribution) {
     }
 }
 
-BOTH_PRECISIONS(Random, DrawsKeepFromTheirOpenBounds) {
-    const std::vector<int> most{0x7fffffff};  // bits beyond the fifteenth do not count
-    EXPECT_EQ(drawn<R>(0, false, 1, most)[0], 1 - epsilon<R>);
-    EXPECT_EQ(drawn<R>(2, false, 1, most)[0], -std::log(1 - epsilon<R> / 2));
-    EXPECT_EQ(drawn<R>(0, false, 1, {0})[0], -1);
-    EXPECT_EQ(drawn<R>(2, false, 1, {0})[0], -std::log(limits<R>::floor));
-    EXPECT_EQ(drawn<R>(1, true, 1, {0})[0], std::sqrt(-2 * std::log(limits<R>::floor)));
-    // The centre of the disc; points on its rim and next to it, which are drawn again.
-    EXPECT_TRUE(is_real<R>(drawn<R>(1, false, 2, {0, 0, 0, 16384}), {0, 0}));
-    std::vector<int> rim{0, 0, 0, 0, 0, 0, 0, 16384, 0, 0, 0, 8192, 0, 0, 0, 24576};
-    EXPECT_TRUE(is_complex<R>(drawn<R>(0, true, 1, rim), {{-0.5L, 0.5L}}));
-    std::fill_n(rim.begin(), 4, 32767);
-    rim[6] = std::same_as<R, dsp> ? 11 : 30147;
-    rim[7] = std::same_as<R, dsp> ? 16384 : 16391;
-    EXPECT_TRUE(is_complex<R>(drawn<R>(0, true, 1, rim), {{-0.5L, 0.5L}}));
+BOTH_PRECISIONS(Random, SamplesStayWithinTheirBounds) {
+    ASSERT_EQ(seed<R>(1), 0);
+    T least = 0, most = 0;
+    for (const T v : scalars<R>(drawn<R>(DSP_RANDOM_UNIFORM, false, 1 << 20))) {
+        least = std::min(least, v);
+        most = std::max(most, v);
+    }
+    EXPECT_GE(least, -1);
+    EXPECT_LT(most, 1);
+    const auto z = drawn<R>(DSP_RANDOM_UNIFORM, true, 1 << 18);
+    for (int i = 0; i < z->points; ++i) ASSERT_LT(std::hypot(z[2 * i], z[2 * i + 1]), 1) << i;
+    for (const T v : scalars<R>(drawn<R>(DSP_RANDOM_EXPONENTIAL, false, 1 << 18))) ASSERT_GE(v, 0);
 }
 
-BOTH_PRECISIONS(Random, DrawsAreMadeInOrder) {
-    const long double u = 4 * 0x1p-15L + 3 * 0x1p-30L + 2 * 0x1p-45L + 0x1p-60L;
-    EXPECT_TRUE(is_real<R>(drawn<R>(0, false, 1, {1, 2, 3, 4}), {2 * u - 1}, 1));
-    // Polar pairs: the second value first, the other one for the next record.
-    const std::vector<int> point{0, 0, 0, 24576, 0, 0, 0, 12288};
-    const long double factor = std::sqrt(-2 * std::log(0.3125L) / 0.3125L);
-    EXPECT_TRUE(is_real<R>(drawn<R>(1, false, 1, point), {-0.25L * factor}, 4));
-    EXPECT_TRUE(is_complex<R>(drawn<R>(0, true, 1, point), {{0.5L, -0.25L}}));
-    EXPECT_TRUE(is_real<R>(drawn<R>(1, false, 1), {0.5L * factor}, 4));
-    // Laplace: the magnitude, then the sign in the last bit of an integer.
-    EXPECT_TRUE(is_real<R>(
-        drawn<R>(3, false, 2, {0, 0, 0, 8192, 32767, 32767, 32766, 0, 0, 0, 16384, 0, 0, 1}),
-        {std::log(4.0L), -std::log(2.0L)}, 4));
-    // The three parts of integers: 6 is point 2 of 4, 3 is point 0 of 3, which leaves over the last
-    // integer of 31 bits, to be drawn again.
-    const auto four = complex<R>({{1, -1}, {2, -2}, {3, -3}, {4, -4}});
-    EXPECT_TRUE(is_complex<R>(shuffled<R>(four, {0, 0, 6, 0, 0, 3, 0, 2, 0}),
-                              {{2, -2}, {4, -4}, {1, -1}, {3, -3}}));
-    const auto three = real<R>({1, 2, 3});
-    EXPECT_TRUE(is_real<R>(shuffled<R>(three, {32767, 1, 32766, 0, 0, 1, 0, 0, 0}), {3, 1, 2}));
+BOTH_PRECISIONS(Random, ASeedRepeatsWhatFollowsIt) {
+    const auto draw = [](std::uint64_t value) {
+        EXPECT_EQ(seed<R>(value), 0);
+        auto all = drawn<R>(DSP_RANDOM_NORMAL, false, 7);  // the other one of a pair waits
+        const auto order = drawn<R>(DSP_RANDOM_LAPLACE, false, 100);
+        EXPECT_EQ(dspi_shuffle(all) || dsp_append(all, order), 0);
+        return scalars<R>(all);
+    };
+    const auto first = draw(5);
+    EXPECT_EQ(draw(5), first);
+    EXPECT_NE(draw(6), first);
+    const auto unseeded = [] {
+        std::vector<T> samples;
+        std::thread([&] { samples = scalars<R>(drawn<R>(0, false, 100)); }).join();
+        return samples;
+    };
+    EXPECT_NE(unseeded(), unseeded());
+    EXPECT_EQ(host_calls, 0);
+}
+
+/// Every order of four points as often as any other: Pearson's statistic of 23 degrees of freedom
+/// stays below what one sample in a thousand exceeds.
+BOTH_PRECISIONS(Random, EveryOrderIsAsLikely) {
+    ASSERT_EQ(seed<R>(3), 0);
+    constexpr int rounds = 24000;
+    std::map<std::vector<T>, int> counts;
+    for (int i = 0; i < rounds; ++i) {
+        auto x = real<R>({1, 2, 3, 4});
+        ASSERT_EQ(dspi_shuffle(x), 0);
+        ++counts[scalars<R>(x)];
+    }
+    double statistic = 0;
+    for (const auto& [order, count] : counts) statistic += std::pow(count - rounds / 24, 2);
+    EXPECT_EQ(counts.size(), 24u);
+    EXPECT_LT(statistic / (rounds / 24), 49.73);
+    auto z = complex<R>({{1, -1}, {2, -2}, {3, -3}});
+    ASSERT_EQ(dspi_shuffle(z), 0);
+    for (int i = 0; i < 3; ++i) EXPECT_EQ(z[2 * i], -z[2 * i + 1]);
 }
 
 BOTH_PRECISIONS(Random, RefusesWhatThereIsNot) {
     for (const int type : {-1, 4}) EXPECT_EQ(dspc_rand(real<R>({1}), type), -1);
     for (const int type : {2, 3}) EXPECT_EQ(dspc_rand(complex<R>({1}), type), -1);
     for (int type = 0; type < 4; ++type) EXPECT_EQ(drawn<R>(type, false, 0)->data, nullptr);
-}
-
-TEST(RandomSeed, EachPrecisionSeedsOnceAndDifferently) {
-    for (int round = 0; round < 2; ++round) {
-        auto x = real<dsp>({1, 2});
-        auto y = real<dspf>({0});
-        EXPECT_EQ(dspi_shuffle(x) || dspc_rand(x, 0) || dspfc_rand(y, 0), 0);
-        EXPECT_EQ(dsp_free_internal() || dspf_free_internal(), 0);
-    }
-    ASSERT_EQ(seeds.size(), 2u);
-    EXPECT_NE(seeds[0], seeds[1]);
 }
 
 }  // namespace

@@ -2,6 +2,7 @@
 #include <wavkit/dsp.h>
 
 #include <cmath>
+#include <cstdint>
 #include <cstdlib>
 #include <map>
 #include <memory>
@@ -22,7 +23,7 @@ struct GenerateOptions {
     std::string out = "-";
     std::optional<int> points;
     std::optional<double> duration, delta, rate;
-    std::optional<unsigned> seed;
+    std::optional<std::uint64_t> seed;
     bool complex = false;
     WriteOptions writing;
 };
@@ -143,14 +144,6 @@ void add_term(Signal& x, const Term& term) {
     }
 }
 
-/// The library seeds before its first draw; what comes after that draw counts.
-void seed_draws(unsigned seed) {
-    Signal first;
-    first->points = 1;
-    check(dspc_rand(first, 0), "drawing");
-    std::srand(seed);
-}
-
 int points_of(const GenerateOptions& options, double delta) {
     if (!options.duration) return options.points.value_or(1024);
     const double points = std::round(*options.duration / delta);
@@ -169,7 +162,7 @@ void run(const GenerateOptions& options) {
         Progress progress("generating");
         check(dsp_alloc(x), "making room for the signal");
         std::ranges::fill(x.values(), 0.0);
-        if (options.seed) seed_draws(*options.seed);
+        if (options.seed) check(dspc_seed(*options.seed), "seeding");
         for (const auto& term : terms) add_term(x, term);
     }
     write_recording(options.out, {&x, 1}, options.writing);
