@@ -27,8 +27,8 @@ set(entries ${PROJECT_SOURCE_DIR}/src/kernel/entries.cpp)
 list(REMOVE_ITEM WAVKIT_SOURCES ${entries})
 wavkit_add_objects(wavkit_entries ${entries})
 set(WAVKIT_OBJECTS $<TARGET_OBJECTS:wavkit_entries>)
-# Transforms and convolution are only the better for fused products and sums.
-file(GLOB fused ${PROJECT_SOURCE_DIR}/src/transform/*.cpp ${PROJECT_SOURCE_DIR}/src/filter/direct.cpp)
+# Transforms are only the better for fused products and sums.
+file(GLOB fused ${PROJECT_SOURCE_DIR}/src/transform/*.cpp)
 set_source_files_properties(${fused} PROPERTIES COMPILE_OPTIONS -ffp-contract=fast)
 foreach(set IN LISTS WAVKIT_SETS)
   wavkit_add_objects(wavkit_${set} ${WAVKIT_SOURCES})

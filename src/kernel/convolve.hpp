@@ -7,7 +7,7 @@
 
 #include <algorithm>
 
-#include "kernel/vector.hpp"
+#include "kernel/lanes.hpp"
 
 namespace wavkit::kernel {
 
@@ -35,7 +35,7 @@ inline void add_products(Vec<T, V> (&sums)[Vectors], const T* tap, std::size_t d
         const auto x = load<T, V>(oldest + j * V);
         unrolled<Sharing>([&](auto t) {
             constexpr int u = int(j) - (Sharing - 1) + int(t);
-            if constexpr (u >= 0 && u < Vectors) sums[u] += h[t] * x;
+            if constexpr (u >= 0 && u < Vectors) sums[u] = mul_add(h[t], x, sums[u]);
         });
     });
 }
