@@ -2,6 +2,7 @@
 #include "transform/transform.hpp"
 
 #include "kernel/half_spectrum.hpp"
+#include "kernel/straight.hpp"
 #include "shared_table.hpp"
 #include "transform/plan.hpp"
 #include "transform/roots.hpp"
@@ -114,6 +115,10 @@ template <Record R>
 int transform(Bin<scalar<R>>* z, int n, bool inverse, scalar<R> scale) {
     if (n < 2) {
         if (n == 1) z[0] = z[0] * scale;
+        return 0;
+    }
+    if (inverse ? kernel::run_straight<Layout::swapped_pairs>(n, &z->re, scale)
+                : kernel::run_straight<Layout::pairs>(n, &z->re, scale)) {
         return 0;
     }
     const auto* t = find_transform<R>(n);
