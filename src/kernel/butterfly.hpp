@@ -34,26 +34,26 @@ constexpr double cos_pi_8 = 0.92387953251128675613, sin_pi_8 = 0.382683432365089
 
 /// z e^(-i pi / 4) and z e^(-3 i pi / 4)
 template <class T, int V>
-inline Complexes<T, V> turned_by_eighth(Complexes<T, V> z) {
+[[gnu::always_inline]] inline Complexes<T, V> turned_by_eighth(Complexes<T, V> z) {
     const T c = T(half_root_two);
     return {(z.re + z.im) * c, (z.im - z.re) * c};
 }
 
 template <class T, int V>
-inline Complexes<T, V> turned_by_three_eighths(Complexes<T, V> z) {
+[[gnu::always_inline]] inline Complexes<T, V> turned_by_three_eighths(Complexes<T, V> z) {
     const T c = T(half_root_two);
     return {(z.im - z.re) * c, (z.re + z.im) * -c};
 }
 
 /// z (c - i s)
 template <class T, int V>
-inline Complexes<T, V> turned(Complexes<T, V> z, double c, double s) {
+[[gnu::always_inline]] inline Complexes<T, V> turned(Complexes<T, V> z, double c, double s) {
     return {z.re * T(c) + z.im * T(s), z.im * T(c) - z.re * T(s)};
 }
 
 /// A transform of the four samples z[0], z[Step], z[2 Step], z[3 Step] in place.
 template <int Step, class T, int V>
-inline void butterfly_of_four(Complexes<T, V>* z) {
+[[gnu::always_inline]] inline void butterfly_of_four(Complexes<T, V>* z) {
     const auto even_sum = z[0] + z[2 * Step], even_difference = z[0] - z[2 * Step];
     const auto odd_sum = z[Step] + z[3 * Step], odd_difference = times_i(z[Step] - z[3 * Step]);
     z[0] = even_sum + odd_sum;
@@ -64,7 +64,7 @@ inline void butterfly_of_four(Complexes<T, V>* z) {
 
 /// Sums and differences of the samples k and Radix - k are what the bins j and Radix - j share.
 template <int Radix, class T, int V>
-inline void butterfly_of_odd(Complexes<T, V>* z) {
+[[gnu::always_inline]] inline void butterfly_of_odd(Complexes<T, V>* z) {
     constexpr int half = Radix / 2;
     Complexes<T, V> sum[half], difference[half];
     const auto first = z[0];
@@ -89,7 +89,7 @@ inline void butterfly_of_odd(Complexes<T, V>* z) {
 
 /// The transform of `Radix` samples in place.
 template <int Radix, class T, int V>
-inline void butterfly(Complexes<T, V>* z) {
+[[gnu::always_inline]] inline void butterfly(Complexes<T, V>* z) {
     if constexpr (Radix == 2) {
         const auto a = z[0];
         z[0] = a + z[1];

@@ -8,7 +8,8 @@ namespace wavkit::kernel {
 /// Bins k and half - k of a real signal's spectrum from those of its half-length transform, or the
 /// other way round.
 template <bool Split, class T, int V>
-inline void combine(Complexes<T, V>& a, Complexes<T, V>& b, Vec<T, V> cosine, Vec<T, V> sine) {
+[[gnu::always_inline]] inline void combine(Complexes<T, V>& a, Complexes<T, V>& b, Vec<T, V> cosine,
+                                           Vec<T, V> sine) {
     const auto mirrored = conj(b);
     const auto sum = a + mirrored;
     const Complexes<T, V> factor{-sine, Split ? -cosine : cosine};
@@ -18,7 +19,7 @@ inline void combine(Complexes<T, V>& a, Complexes<T, V>& b, Vec<T, V> cosine, Ve
 }
 
 template <bool Split, class T, int V>
-inline void combine_pair(T* low, T* high, const T* cosines, const T* sines) {
+[[gnu::always_inline]] inline void combine_pair(T* low, T* high, const T* cosines, const T* sines) {
     auto a = load_complex<T, V, Layout::pairs>(low);
     auto b = load_complex<T, V, Layout::pairs>(high);
     b = {reversed<T, V>(b.re), reversed<T, V>(b.im)};

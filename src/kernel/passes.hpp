@@ -45,7 +45,7 @@ template <class T, int V, int Radix>
 struct Rotation {
     const T* twiddles;
 
-    void turn(Complexes<T, V>* z) const {
+    [[gnu::always_inline]] void turn(Complexes<T, V>* z) const {
         for (int k = 1; k < Radix; ++k) {
             z[k] = z[k] * Complexes<T, V>{broadcast<T, V>(twiddles[2 * k - 2]),
                                           broadcast<T, V>(twiddles[2 * k - 1])};
@@ -64,15 +64,15 @@ template <class T, int Radix>
 struct Scaling {
     T scale;
     template <class Z>
-    void turn(Z* z) const {
+    [[gnu::always_inline]] void turn(Z* z) const {
         for (int k = 0; k < Radix; ++k) z[k] = z[k] * scale;
     }
 };
 
 /// One vector of butterflies.
 template <int V, int Radix, Layout In, Layout Out, class T, class Turn>
-inline void column(const T* in, std::size_t in_distance, T* out, std::size_t out_distance,
-                   const Turn& turn) {
+[[gnu::always_inline]] inline void column(const T* in, std::size_t in_distance, T* out,
+                                          std::size_t out_distance, const Turn& turn) {
     Complexes<T, V> z[Radix];
     for (std::size_t k = 0; k < Radix; ++k) z[k] = load_complex<T, V, In>(in + k * in_distance);
     butterfly<Radix>(z);
@@ -82,8 +82,9 @@ inline void column(const T* in, std::size_t in_distance, T* out, std::size_t out
 
 /// The butterflies of one rotation over a run of samples. `one` is the turn for single samples.
 template <int V, int Radix, Layout In, Layout Out, class T, class Turn, class TurnOne>
-inline void columns(const T* in, std::size_t in_distance, T* out, std::size_t out_distance,
-                    std::size_t run, const Turn& turn, const TurnOne& one) {
+[[gnu::always_inline]] inline void columns(const T* in, std::size_t in_distance, T* out,
+                                           std::size_t out_distance, std::size_t run,
+                                           const Turn& turn, const TurnOne& one) {
     const std::size_t whole = run - run % V;
     const auto several = [&](std::size_t q) {
         column<V, Radix, In, Out>(in + 2 * q, in_distance, out + 2 * q, out_distance, turn);
@@ -115,7 +116,7 @@ inline const T* pass(const T* in, std::size_t row, T* out, std::size_t n, std::s
 /// One part of the bins of V butterflies, brought side by side: bin after bin of a butterfly, then
 /// the next one, `Stride` lanes at a time. Each step interleaves the halves of the whole sequence.
 template <class T, int V, int Radix, int Stride>
-inline void interleave(Vec<T, V>* bins) {
+[[gnu::always_inline]] inline void interleave(Vec<T, V>* bins) {
     Vec<T, V> turned[Radix];
     for (int span = Radix; span > 1; span /= 2) {
         for (int i = 0; i < Radix / 2; ++i) {
@@ -129,7 +130,8 @@ inline void interleave(Vec<T, V>* bins) {
 /// A vector of butterflies at a stride below that of a vector, with twiddles lane by lane; the bins
 /// come out side by side.
 template <int V, int Radix, int Stride, Layout In, class T>
-inline void short_column(const T* in, std::size_t distance, T* out, const T* twiddles) {
+[[gnu::always_inline]] inline void short_column(const T* in, std::size_t distance, T* out,
+                                                const T* twiddles) {
     Complexes<T, V> z[Radix];
     for (std::size_t k = 0; k < Radix; ++k) z[k] = load_complex<T, V, In>(in + k * distance);
     butterfly<Radix>(z);

@@ -63,9 +63,8 @@ void run_straight(T* data, T scale) {
     Complexes<T, V> y[N / V];
     unrolled<R2 / V>([&](auto i) {
         Complexes<T, V> z[R1];
-        unrolled<R1>([&](auto k) {
-            z[k] = load_complex<T, V, Outside>(data + 2 * (i * V + k * R2));
-        });
+        unrolled<R1>(
+            [&](auto k) { z[k] = load_complex<T, V, Outside>(data + 2 * (i * V + k * R2)); });
         butterfly<R1>(z);
         Vec<T, V> re[R1], im[R1];
         re[0] = z[0].re, im[0] = z[0].im;

@@ -22,7 +22,7 @@ inline constexpr int lanes = register_bytes / int(sizeof(T));
 
 /// Calls f(0), f(1), ... f(N - 1) with constants.
 template <int N, class F>
-inline void unrolled(F f) {
+[[gnu::always_inline]] inline void unrolled(F f) {
     [&]<int... I>(std::integer_sequence<int, I...>) { (f(std::integral_constant<int, I>{}), ...); }
     (std::make_integer_sequence<int, N>{});
 }
@@ -36,19 +36,19 @@ template <class T, int V>
 using Vec = typename VectorType<T, V>::type;
 
 template <class T, int V>
-inline Vec<T, V> load(const T* p) {
+[[gnu::always_inline]] inline Vec<T, V> load(const T* p) {
     Vec<T, V> v;
     __builtin_memcpy(&v, p, sizeof v);
     return v;
 }
 
 template <class T, int V>
-inline void store(T* p, Vec<T, V> v) {
+[[gnu::always_inline]] inline void store(T* p, Vec<T, V> v) {
     __builtin_memcpy(p, &v, sizeof v);
 }
 
 template <class T, int V>
-inline Vec<T, V> broadcast(T value) {
+[[gnu::always_inline]] inline Vec<T, V> broadcast(T value) {
     return value - Vec<T, V>{};
 }
 
@@ -57,39 +57,39 @@ template <class T, int V>
 struct Complexes {
     Vec<T, V> re, im;
 
-    friend inline Complexes operator+(Complexes a, Complexes b) {
+    [[gnu::always_inline]] friend inline Complexes operator+(Complexes a, Complexes b) {
         return {a.re + b.re, a.im + b.im};
     }
-    friend inline Complexes operator-(Complexes a, Complexes b) {
+    [[gnu::always_inline]] friend inline Complexes operator-(Complexes a, Complexes b) {
         return {a.re - b.re, a.im - b.im};
     }
-    friend inline Complexes operator*(Complexes a, Complexes b) {
+    [[gnu::always_inline]] friend inline Complexes operator*(Complexes a, Complexes b) {
         return {a.re * b.re - a.im * b.im, a.re * b.im + a.im * b.re};
     }
-    friend inline Complexes operator*(Complexes a, T factor) {
+    [[gnu::always_inline]] friend inline Complexes operator*(Complexes a, T factor) {
         return {a.re * factor, a.im * factor};
     }
 };
 
 /// i * z
 template <class T, int V>
-inline Complexes<T, V> times_i(Complexes<T, V> z) {
+[[gnu::always_inline]] inline Complexes<T, V> times_i(Complexes<T, V> z) {
     return {-z.im, z.re};
 }
 
 template <class T, int V>
-inline Complexes<T, V> conj(Complexes<T, V> z) {
+[[gnu::always_inline]] inline Complexes<T, V> conj(Complexes<T, V> z) {
     return {z.re, -z.im};
 }
 
 /// Lane i of the result is lane Pick::lane(i) of the 2V lanes of a and b together.
 template <class Pick, class Vector, std::size_t... I>
-inline Vector shuffle(Vector a, Vector b, std::index_sequence<I...>) {
+[[gnu::always_inline]] inline Vector shuffle(Vector a, Vector b, std::index_sequence<I...>) {
     return __builtin_shufflevector(a, b, Pick::lane(int(I))...);
 }
 
 template <int V, class Pick, class Vector>
-inline Vector shuffle(Vector a, Vector b) {
+[[gnu::always_inline]] inline Vector shuffle(Vector a, Vector b) {
     return shuffle<Pick>(a, b, std::make_index_sequence<std::size_t(V)>{});
 }
 
@@ -114,17 +114,17 @@ struct Backwards {
 };
 
 template <int V, int Block, class Vector>
-inline Vector first_in_turn(Vector a, Vector b) {
+[[gnu::always_inline]] inline Vector first_in_turn(Vector a, Vector b) {
     return shuffle<V, InTurn<V, Block, false>>(a, b);
 }
 
 template <int V, int Block, class Vector>
-inline Vector second_in_turn(Vector a, Vector b) {
+[[gnu::always_inline]] inline Vector second_in_turn(Vector a, Vector b) {
     return shuffle<V, InTurn<V, Block, true>>(a, b);
 }
 
 template <class T, int V>
-inline Vec<T, V> reversed(Vec<T, V> v) {
+[[gnu::always_inline]] inline Vec<T, V> reversed(Vec<T, V> v) {
     return shuffle<V, Backwards<V>>(v, v);
 }
 
@@ -134,7 +134,7 @@ inline Vec<T, V> reversed(Vec<T, V> v) {
 enum class Layout { pairs, swapped_pairs, blocks };
 
 template <class T, int V, Layout L>
-inline Complexes<T, V> load_complex(const T* p) {
+[[gnu::always_inline]] inline Complexes<T, V> load_complex(const T* p) {
     const auto a = load<T, V>(p), b = load<T, V>(p + V);
     if constexpr (L == Layout::blocks) {
         return {a, b};
@@ -147,7 +147,7 @@ inline Complexes<T, V> load_complex(const T* p) {
 }
 
 template <class T, int V, Layout L>
-inline void store_complex(T* p, Complexes<T, V> z) {
+[[gnu::always_inline]] inline void store_complex(T* p, Complexes<T, V> z) {
     if constexpr (L == Layout::blocks) {
         store<T, V>(p, z.re);
         store<T, V>(p + V, z.im);
@@ -160,7 +160,7 @@ inline void store_complex(T* p, Complexes<T, V> z) {
 
 /// Transposes V vectors of V lanes in place.
 template <class T, int V>
-inline void transpose(Vec<T, V>* rows) {
+[[gnu::always_inline]] inline void transpose(Vec<T, V>* rows) {
     Vec<T, V> turned[V];
     for (int span = V; span > 1; span /= 2) {
         for (int i = 0; i < V / 2; ++i) {
