@@ -200,6 +200,10 @@ inline auto with_radix(int radix, F f) {
             return f(std::integral_constant<int, 5>());
         case 7:
             return f(std::integral_constant<int, 7>());
+        case 11:
+            return f(std::integral_constant<int, 11>());
+        case 13:
+            return f(std::integral_constant<int, 13>());
         default:
             return f(std::integral_constant<int, 8>());
     }

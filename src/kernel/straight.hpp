@@ -6,47 +6,21 @@
 
 namespace wavkit::kernel {
 
-/// cos and sin of 2 pi k / n, 0 <= 8 k <= n, by their series.
-constexpr long double series_cosine(long k, long n) {
-    const long double x = 6.283185307179586476925286766559005768L * static_cast<long double>(k) /
-                          static_cast<long double>(n);
-    long double term = 1, sum = 1;
-    for (int i = 1; i <= 12; ++i) sum += term *= -x * x / ((2 * i - 1) * (2 * i));
-    return sum;
-}
-
-constexpr long double series_sine(long k, long n) {
-    const long double x = 6.283185307179586476925286766559005768L * static_cast<long double>(k) /
-                          static_cast<long double>(n);
-    long double term = x, sum = x;
-    for (int i = 1; i <= 12; ++i) sum += term *= -x * x / ((2 * i) * (2 * i + 1));
-    return sum;
-}
-
-/// cos(2 pi k / n) for any 0 <= k < n: folded into the first eighth of the circle. The sine is the
-/// cosine of a quarter less.
-constexpr long double exact_cosine(long k, long n) {
-    if (2 * k > n) k = n - k;
-    if (4 * k > n) return -exact_cosine(n - 2 * k, 2 * n);
-    return 8 * k > n ? series_sine(n - 4 * k, 4 * n) : series_cosine(k, n);
-}
-
-constexpr long double exact_sine(long k, long n) {
-    return exact_cosine((4 * k + 3 * n) % (4 * n), 4 * n);
-}
-
-/// The rotations between the two passes, a vector of each for a vector of first butterflies.
+/// The rotations between the two passes, for the lanes of pairs: cosines twice, sines with signs
+/// that take the exchanged parts of a sample.
 template <class T, int N, int R1, int V>
 struct StraightTwiddles {
-    alignas(64) T values[N / R1 / V][R1 - 1][2][V];
+    alignas(64) T cosines[N / R1 / V][R1][2 * V], sines[N / R1 / V][R1][2 * V];
 
-    constexpr StraightTwiddles() : values() {
+    constexpr StraightTwiddles() : cosines(), sines() {
         for (int i = 0; i < N / R1 / V; ++i) {
             for (int k = 1; k < R1; ++k) {
                 for (int lane = 0; lane < V; ++lane) {
                     const long index = long(i * V + lane) * k;
-                    values[i][k - 1][0][lane] = T(exact_cosine(index, N));
-                    values[i][k - 1][1][lane] = T(-exact_sine(index, N));
+                    const T c = T(exact_cosine(index, N)), s = T(exact_sine(index, N));
+                    cosines[i][k][2 * lane] = cosines[i][k][2 * lane + 1] = c;
+                    sines[i][k][2 * lane] = s;
+                    sines[i][k][2 * lane + 1] = -s;
                 }
             }
         }
@@ -56,36 +30,46 @@ struct StraightTwiddles {
 template <class T, int N, int R1, int V>
 inline constexpr StraightTwiddles<T, N, R1, V> straight_twiddles{};
 
-/// A transform of N = R1 * R2 samples in vectors of V lanes, which R1 and R2 are multiples of.
+template <class T, int V, Layout L>
+[[gnu::always_inline]] inline Pairs<T, V> load_pairs(const T* p) {
+    const Pairs<T, V> z{load<T, 2 * V>(p)};
+    if constexpr (L == Layout::swapped_pairs) return {swapped(z)};
+    return z;
+}
+
+template <class T, int V, Layout L>
+[[gnu::always_inline]] inline void store_pairs(T* p, Pairs<T, V> z) {
+    if constexpr (L == Layout::swapped_pairs) z = {swapped(z)};
+    store<T, 2 * V>(p, z.parts);
+}
+
+/// A transform of N = R1 * R2 samples, V of them in a vector; R1 and R2 are multiples of V.
 template <int N, int R1, int V, Layout Outside, class T>
 void run_straight(T* data, T scale) {
     constexpr int R2 = N / R1;
-    Complexes<T, V> y[N / V];
+    Vec<T, 2 * V> y[N / V];
     unrolled<R2 / V>([&](auto i) {
-        Complexes<T, V> z[R1];
+        Pairs<T, V> z[R1];
         unrolled<R1>(
-            [&](auto k) { z[k] = load_complex<T, V, Outside>(data + 2 * (i * V + k * R2)); });
+            [&](auto k) { z[k] = load_pairs<T, V, Outside>(data + 2 * (i * V + k * R2)); });
         butterfly<R1>(z);
-        Vec<T, V> re[R1], im[R1];
-        re[0] = z[0].re, im[0] = z[0].im;
-        unrolled<R1 - 1>([&](auto k) {
-            const T* w = straight_twiddles<T, N, R1, V>.values[i][k][0];
-            z[k + 1] = z[k + 1] * load_complex<T, V, Layout::blocks>(w);
-            re[k + 1] = z[k + 1].re, im[k + 1] = z[k + 1].im;
+        Vec<T, 2 * V> turned[R1];
+        turned[0] = z[0].parts;
+        unrolled<R1 - 1>([&](auto j) {
+            constexpr int k = j + 1;
+            const auto& w = straight_twiddles<T, N, R1, V>;
+            turned[k] = z[k].parts * load<T, 2 * V>(w.cosines[i][k]) +
+                        swapped(z[k]) * load<T, 2 * V>(w.sines[i][k]);
         });
-        if constexpr (V > 1) {
-            interleave<T, V, R1, 1>(re);
-            interleave<T, V, R1, 1>(im);
-        }
-        unrolled<R1>([&](auto k) { y[i * R1 + k] = {re[k], im[k]}; });
+        if constexpr (V > 1) interleave<T, 2 * V, R1, 2>(turned);
+        unrolled<R1>([&](auto k) { y[i * R1 + k] = turned[k]; });
     });
     unrolled<R1 / V>([&](auto b) {
-        Complexes<T, V> z[R2];
-        unrolled<R2>([&](auto k) { z[k] = y[k * (R1 / V) + b]; });
+        Pairs<T, V> z[R2];
+        unrolled<R2>([&](auto k) { z[k] = {y[k * (R1 / V) + b]}; });
         butterfly<R2>(z);
-        unrolled<R2>([&](auto k) {
-            store_complex<T, V, Outside>(data + 2 * (b * V + k * R1), z[k] * scale);
-        });
+        unrolled<R2>(
+            [&](auto k) { store_pairs<T, V, Outside>(data + 2 * (b * V + k * R1), z[k] * scale); });
     });
 }
 
@@ -101,8 +85,9 @@ inline void run_tiny(T* data, T scale) {
 /// Transforms n samples in place, where there is a straight line for them; else false.
 template <Layout Outside, class T>
 inline bool run_straight(int n, T* data, T scale) {
-    constexpr int V = narrow_lanes<T>;
-    constexpr bool wide = lanes<T> >= 8;
+    constexpr int V = std::max(1, std::min(4, lanes<T> / 2));  // complex samples of a vector
+    constexpr int W = std::max(1, std::min(8, lanes<T> / 2));
+    constexpr bool wide = register_bytes == 64;
     switch (n) {
         case 2:
             return run_tiny<2, Outside>(data, scale), true;
@@ -122,8 +107,12 @@ inline bool run_straight(int n, T* data, T scale) {
             return run_straight<9, 3, 1, Outside>(data, scale), true;
         case 10:
             return run_straight<10, 2, 1, Outside>(data, scale), true;
+        case 11:
+            return run_tiny<11, Outside>(data, scale), true;
         case 12:
             return run_straight<12, 4, 1, Outside>(data, scale), true;
+        case 13:
+            return run_tiny<13, Outside>(data, scale), true;
         case 15:
             return run_straight<15, 3, 1, Outside>(data, scale), true;
         case 16:
@@ -131,10 +120,10 @@ inline bool run_straight(int n, T* data, T scale) {
         case 32:
             return run_straight<32, 8, V, Outside>(data, scale), true;
         case 64:
-            if constexpr (wide) return run_straight<64, 8, 8, Outside>(data, scale), true;
+            if constexpr (wide) return run_straight<64, 8, W, Outside>(data, scale), true;
             return false;
         case 128:
-            if constexpr (wide) return run_straight<128, 8, 8, Outside>(data, scale), true;
+            if constexpr (wide) return run_straight<128, 8, W, Outside>(data, scale), true;
             return false;
         default:
             return false;

@@ -82,6 +82,22 @@ template <class T, int V>
     return {z.re, -z.im};
 }
 
+/// V complex samples in one vector, real and imaginary parts in turn as they lie in memory.
+template <class T, int V>
+struct Pairs {
+    Vec<T, 2 * V> parts;
+
+    [[gnu::always_inline]] friend inline Pairs operator+(Pairs a, Pairs b) {
+        return {a.parts + b.parts};
+    }
+    [[gnu::always_inline]] friend inline Pairs operator-(Pairs a, Pairs b) {
+        return {a.parts - b.parts};
+    }
+    [[gnu::always_inline]] friend inline Pairs operator*(Pairs a, T factor) {
+        return {a.parts * factor};
+    }
+};
+
 /// Lane i of the result is lane Pick::lane(i) of the 2V lanes of a and b together.
 template <class Pick, class Vector, std::size_t... I>
 [[gnu::always_inline]] inline Vector shuffle(Vector a, Vector b, std::index_sequence<I...>) {
@@ -108,6 +124,11 @@ struct EveryOther {
     static constexpr int lane(int i) { return 2 * i + (Odd ? 1 : 0); }
 };
 
+/// Neighbours exchanged.
+struct Swapped {
+    static constexpr int lane(int i) { return i ^ 1; }
+};
+
 template <int V>
 struct Backwards {
     static constexpr int lane(int i) { return V - 1 - i; }
@@ -126,6 +147,26 @@ template <int V, int Block, class Vector>
 template <class T, int V>
 [[gnu::always_inline]] inline Vec<T, V> reversed(Vec<T, V> v) {
     return shuffle<V, Backwards<V>>(v, v);
+}
+
+/// im, re, im, re, ...
+template <class T, int V>
+[[gnu::always_inline]] inline Vec<T, 2 * V> swapped(Pairs<T, V> z) {
+    return shuffle<2 * V, Swapped>(z.parts, z.parts);
+}
+
+/// 1, -1, 1, -1, ... or the other way round.
+template <class T, int V>
+[[gnu::always_inline]] inline Vec<T, 2 * V> alternating(T first) {
+    Vec<T, 2 * V> signs;
+    for (int i = 0; i < 2 * V; ++i) signs[i] = i % 2 ? -first : first;
+    return signs;
+}
+
+/// i * z
+template <class T, int V>
+[[gnu::always_inline]] inline Pairs<T, V> times_i(Pairs<T, V> z) {
+    return {swapped(z) * alternating<T, V>(-1)};
 }
 
 /// How complex samples lie in memory: in pairs (re, im), in pairs read or written as (im, re), or

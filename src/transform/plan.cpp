@@ -4,6 +4,10 @@
 #include <bit>
 #include <new>
 
+#if __has_include(<unistd.h>)
+#include <unistd.h>
+#endif
+
 #include "transform/roots.hpp"
 
 namespace wavkit {
@@ -16,10 +20,22 @@ using kernel::narrow_lanes;
 using kernel::Passes;
 using kernel::strip_width;
 
-/// The longest powers of two that go through passes: data and workspace then fit the second-level
+/// Bytes of the last cache, or what most processors have at least.
+std::size_t last_cache() {
+#if defined(_SC_LEVEL3_CACHE_SIZE)
+    const long bytes = sysconf(_SC_LEVEL3_CACHE_SIZE);
+    if (bytes > 0) return std::size_t(bytes);
+#endif
+    return std::size_t(2) << 20;
+}
+
+/// The longest powers of two that go through passes: data and workspace take a quarter of the last
 /// cache.
 template <class T>
-constexpr std::size_t longest_direct = std::size_t(1) << (sizeof(T) == 8 ? 14 : 15);
+std::size_t longest_direct() {
+    static const std::size_t longest = std::bit_floor(last_cache() / (16 * sizeof(T)));
+    return longest;
+}
 
 /// Whether butterflies of eight samples and their twiddles have room in the registers.
 constexpr bool many_registers = kernel::register_bytes == 64;
@@ -87,7 +103,7 @@ Passes<T> factorised(std::size_t n, bool eights) {
     } else {
         add_fours(passes, exponent, odd == 1);
     }
-    for (const std::size_t radix : {3, 5, 7}) {
+    for (const std::size_t radix : {3, 5, 7, 11, 13}) {
         for (; odd % radix == 0; odd /= radix) {
             passes.radices[std::size_t(passes.count++)] = static_cast<unsigned char>(radix);
         }
@@ -242,7 +258,7 @@ Transform<T> shape_of(int n) {
     t.points = n;
     t.convolution_points = is_smooth(n) ? 0 : convolution_points(n);
     const std::size_t inner = t.convolution_points ? t.convolution_points : std::size_t(n);
-    if (std::has_single_bit(inner) && inner > longest_direct<T>) {
+    if (std::has_single_bit(inner) && inner > longest_direct<T>()) {
         t.matrix = matrix_of<T>(inner);
         t.work_scalars = kernel::work_scalars(t.matrix);
     } else {
@@ -257,7 +273,7 @@ Transform<T> shape_of(int n) {
 
 bool is_smooth(int n) {
     if (n < 1) return false;
-    for (const int radix : {2, 3, 5, 7}) {
+    for (const int radix : {2, 3, 5, 7, 11, 13}) {
         while (n % radix == 0) n /= radix;
     }
     return n == 1;
