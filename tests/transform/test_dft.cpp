@@ -70,36 +70,22 @@ BOTH_PRECISIONS(Dft, DirectionsAndLengthsMayAlternate) {
 }
 
 BOTH_PRECISIONS(Dft, SpacingAndCapacity) {
-    auto x = Noise().real<R>(6);
+    auto x = Noise().real<R>(6), one = real<R>({5}, 4);
     x->delta = T(0.25);
-    ASSERT_EQ(dspi_dft(x, 0), 0);
+    ASSERT_EQ(dspi_dft(x, 0) || dspi_dft(one, 0), 0);
     EXPECT_EQ(x->delta, T(1 / 1.5));
     EXPECT_EQ(x->alloc, 2 * 16);  // the convolution's room stays
+    EXPECT_TRUE(is_real<R>(one, {5}) && one->delta == T(0.25));
     x->delta = 0;
     ASSERT_EQ(dspi_dft(x, 0), 0);
     EXPECT_EQ(x->delta, limits<R>::big);
 
-    auto one = real<R>({5}, 4);
-    ASSERT_EQ(dspi_dft(one, 0), 0);
-    EXPECT_TRUE(is_real<R>(one, {5}));
-    EXPECT_EQ(one->delta, T(0.25));
-    Signal<R> none;
+    Signal<R> none, huge;
     none->delta = 0;
     ASSERT_EQ(dspi_dft(none, 1) || dspi_rdft(none), 0);
     EXPECT_EQ(none->delta, 1 / limits<R>::big);
-
-    auto eight = Noise().complex<R>(8), same = eight;
-    ASSERT_EQ(dspi_dft(eight, 0) || dspi_fft(same, 0), 0);
-    EXPECT_TRUE(matches<R>(eight, same));
-
-    Signal<R> huge;
     huge->points = (1 << 29) + 3;
     EXPECT_EQ(dspi_dft(huge, 0), -1);
-
-    Borrowed<R> host(complex<R>({1, 2, 3}));
-    const auto before = host.host;
-    ASSERT_EQ(dspi_dft(host, 0), 0);
-    EXPECT_EQ(host.host, before);
 }
 
 BOTH_PRECISIONS(Dft, HalfSpectraOfRealSignals) {
@@ -145,15 +131,10 @@ BOTH_PRECISIONS(Dft, CosineTransformByItsDefinition) {
             EXPECT_NEAR(y->delta, 0.125, epsilon<R>);
         }
     }
-    Signal<R> none;
-    none->delta = 4;
-    ASSERT_EQ(dspi_dct(none, 1), 0);
+    auto none = real<R>({}, 4), empty = real<R>({}, 0), still = real<R>({1, 2, 3}, 0);
+    ASSERT_EQ(dspi_dct(none, 1) || dspi_dct(empty, 0) || dspi_dct(still, 0), 0);
     EXPECT_EQ(none->delta, T(0.125));
-    none->delta = 0;
-    ASSERT_EQ(dspi_dct(none, 0), 0);
-    EXPECT_EQ(none->delta, limits<R>::big);
-    auto still = real<R>({1, 2, 3}, 0);
-    ASSERT_EQ(dspi_dct(still, 0), 0);
+    EXPECT_EQ(empty->delta, limits<R>::big);
     EXPECT_EQ(still->delta, limits<R>::big / 2);
 }
 
@@ -182,12 +163,10 @@ BOTH_PRECISIONS(Dft, AnalyticSignalsOfCosines) {
             EXPECT_TRUE(is_complex<R>(z, turning, 24));
         }
     }
-    auto one = real<R>({3}), hilbert_of_one = one;
-    ASSERT_EQ(dspi_analytic(one) || dspi_hilbert(hilbert_of_one), 0);
-    EXPECT_TRUE(is_real<R>(one, {3}));
-    EXPECT_TRUE(is_real<R>(hilbert_of_one, {0}));
-    Signal<R> none;
-    EXPECT_EQ(dspi_analytic(none) || dspi_hilbert(none), 0);
+    EXPECT_TRUE(turns(dspi_analytic, real<R>({3}), real<R>({3})));
+    EXPECT_TRUE(turns(dspi_hilbert, real<R>({3}), real<R>({0})));
+    EXPECT_TRUE(turns(dspi_analytic, real<R>({}), real<R>({})));
+    EXPECT_TRUE(turns(dspi_hilbert, real<R>({}), real<R>({})));
     auto constant = real<R>({2, 2, 2, 2, 2}, 0);
     ASSERT_EQ(dspi_analytic(constant), 0);
     EXPECT_TRUE(is_complex<R>(constant, {2, 2, 2, 2, 2}, 8));
