@@ -98,38 +98,21 @@ BOTH_PRECISIONS(Fir, HalvesAreMirrored) {
     }
 }
 
-BOTH_PRECISIONS(Fir, RecordsMayShareTheirBuffers) {
-    enum Role { input, output, tap, state };
-    const std::pair<Role, Role> pairs[] = {{output, input}, {output, tap}, {output, state},
-                                           {state, input},  {state, tap},  {tap, input}};
-    for (int variant = 0; variant < 48; ++variant) {
+BOTH_PRECISIONS(Fir, TheOutputMayBeTheState) {
+    for (int variant = 0; variant < 24; ++variant) {
         const bool is_complex = variant & 1, borrowed = variant & 2;
-        const int points = variant & 4 ? 90 : 2, count = variant & 8 ? 70 : 4;
-        const int view = variant / 16;  // none: one record; of the one's buffer; of the other's
-        for (const auto& [one, other] : pairs) {
-            Signal<R> r[] = {noise<R>(points, is_complex, 1), Signal<R>(),
-                             noise<R>(count, false, 2), noise<R>(count + 5, is_complex, 3)};
-            r[one] = r[other];
-            Signal<R> apart[] = {r[0], r[1], r[2], r[3]};
-            ASSERT_EQ(dspd_fir(apart[0], apart[1], apart[2], apart[3]), 0);
-
-            Borrowed<R> host(r[other]);
-            const auto before = host.host;
-            R* owner = borrowed ? static_cast<R*>(host) : r[other].get();
-            R shared = *owner;
-            shared.alloc = 0;
-            R* records[] = {r[0], r[1], r[2], r[3]};
-            records[other] = view == 2 ? &shared : owner;
-            records[one] = view == 1 ? &shared : owner;
-            SCOPED_TRACE(testing::Message() << one << ' ' << other << ' ' << variant);
-            ASSERT_EQ(dspd_fir(records[0], records[1], records[2], records[3]), 0);
-            EXPECT_TRUE(matches<R>(records[output], apart[output]));
-            if (records[state] != records[output]) {
-                EXPECT_TRUE(matches<R>(records[state], apart[state]));
-            }
-            EXPECT_TRUE(one == state || other == state || host.host == before);
-            dsp_destroy(&shared);
-        }
+        const auto x = noise<R>(variant & 4 ? 90 : 2, is_complex, 1), h = noise<R>(70, false, 2);
+        auto state = noise<R>(75, is_complex, 3), apart = state;
+        Signal<R> want;
+        ASSERT_EQ(dspd_fir(x, want, h, apart), 0);
+        Borrowed<R> host(state);
+        R* const owner = borrowed ? static_cast<R*>(host) : state.get();
+        R view = *owner;
+        view.alloc = 0;
+        R* const out = variant / 8 == 1 ? &view : owner;
+        ASSERT_EQ(dspd_fir(x, out, h, variant / 8 == 2 ? &view : owner), 0);
+        EXPECT_TRUE(matches<R>(out, want)) << variant;
+        dsp_destroy(&view);
     }
 }
 

@@ -45,23 +45,13 @@ BOTH_PRECISIONS(Spline, AllEndsOnUnevenKnots) {
         const auto knots = real<R>(x, 1), ordinates = real<R>(y, 4);
         for (int codes = 0; codes < 16; ++codes) {
             const int start = codes / 4, end = codes % 4;
-            Signal<R> m, in_x = knots, in_y = ordinates;
-            Borrowed<R> host(ordinates);
-            const auto call = [&](const R* p, const R* q, R* out) {
-                return dspb_cspline_2d(p, q, out, 2, -3, start, end);
-            };
-            ASSERT_EQ(call(knots, ordinates, m), 0);
+            Signal<R> m;
+            ASSERT_EQ(dspb_cspline_2d(knots, ordinates, m, 2, -3, start, end), 0);
             long double largest = 0;
             for (const auto v : values(m.get()))
                 largest = std::max<long double>(largest, std::fabs(v));
             EXPECT_LT(misfit<R>(x, y, m, 2, -3, start, end), 40 * epsilon<R> * largest) << codes;
             EXPECT_EQ(m->delta, T(2.5));
-            ASSERT_EQ(call(in_x, ordinates, in_x) || call(knots, in_y, in_y), 0);
-            ASSERT_EQ(call(knots, host, host), 0);
-            for (const R* got : {in_x.get(), in_y.get(), &host.record}) {
-                EXPECT_TRUE(matches<R>(got, m));
-            }
-            EXPECT_EQ(host.host, scalars<R>(ordinates));
         }
         EXPECT_TRUE(is_real<R>(ordinates, y));
     }

@@ -125,31 +125,14 @@ BOTH_PRECISIONS(Average, CorrelationBySlidingSums) {
             b->delta = 2;
             const Samples expected =
                 correlation(samples_of<R>(a), samples_of<R>(b), std::size_t(m));
-            const auto check = [&](R* out, const char* what) {
-                EXPECT_EQ(bool(out->complex), kinds != 0) << what;
-                ASSERT_EQ(out->points, points - m + 1);
-                EXPECT_EQ(out->delta, T(1.5));
-                const Samples got = samples_of<R>(out);
-                for (std::size_t k = 0; k < got.size(); ++k) {
-                    EXPECT_LT(std::abs(got[k] - expected[k]), 16 * epsilon<R>) << what << points;
-                }
-            };
-            Signal<R> out, scratch;
-            ASSERT_EQ(dspb_corr(a, b, out, scratch, m), 0);
-            check(out, "apart");
-            // The output, or the scratch record, may be any of the operands.
-            const Signal<R> first = a, second = b;
-            ASSERT_EQ(dspb_corr(a, b, a, null<R>, m), 0);
-            check(a, "over a");
-            a = first;
-            ASSERT_EQ(dspb_corr(a, b, b, a, m), 0);
-            check(b, "over b");
-            EXPECT_TRUE(matches<R>(a, first));
-            b = second;
-            Borrowed<R> host(b);
-            ASSERT_EQ(dspb_corr(a, host, host, host, m), 0);
-            check(host, "over a host's array");
-            EXPECT_EQ(host.host, scalars<R>(second));
+            Signal<R> out;
+            ASSERT_EQ(dspb_corr(a, b, out, null<R>, m), 0);
+            EXPECT_TRUE(bool(out->complex) == (kinds != 0) && out->delta == T(1.5));
+            const Samples got = samples_of<R>(out);
+            ASSERT_EQ(got.size(), expected.size());
+            for (std::size_t k = 0; k < got.size(); ++k) {
+                EXPECT_LT(std::abs(got[k] - expected[k]), 16 * epsilon<R>) << points;
+            }
         }
     }
 }

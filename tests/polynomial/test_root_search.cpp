@@ -84,7 +84,7 @@ BOTH_PRECISIONS(RootSearch, RandomPolynomialsFromRandomStarts) {
     }
 }
 
-BOTH_PRECISIONS(RootSearch, ValuesRefusalsAndFailingMemory) {
+BOTH_PRECISIONS(RootSearch, ValuesAndRefusals) {
     for (const auto& [c, want] : {std::pair<List, List>{{}, {0}}, {{5}, {5}}, {{1, 2, 3}, {17}}}) {
         in_every_place(real<R>(c, 0.5), [&, &value = want](const R* in, R* out) {
             const auto delta = out->delta;
@@ -94,17 +94,15 @@ BOTH_PRECISIONS(RootSearch, ValuesRefusalsAndFailingMemory) {
         });
     }
     const auto z = complex<R>({{1, 2}, {3, 4}}, 7), c = real<R>({-1, 1});
-    const std::pair<int (*)(const R*, R*), int> calls[] = {
-        {[](const R* in, R* out) { return dsps_peval(in, out, 1); }, 1},
-        {[](const R* in, R* out) { return dsps_psolve(in, out, 1); }, 1},
-        {[](const R* in, R* out) { return dsps_pcsolve(in, out, 1, 1); }, 1}};
-    for (const auto& [call, growths] : calls) {
+    int (*const calls[])(const R*, R*) = {
+        [](const R* in, R* out) { return dsps_peval(in, out, 1); },
+        [](const R* in, R* out) { return dsps_psolve(in, out, 1); },
+        [](const R* in, R* out) { return dsps_pcsolve(in, out, 1, 1); }};
+    for (const auto call : calls) {
         auto in_place = z, out = c;
-        EXPECT_EQ(call(z, out), -1);
-        EXPECT_EQ(call(in_place, in_place), -1);
+        EXPECT_EQ(call(z, out) + call(in_place, in_place), -2);
         EXPECT_TRUE(matches<R>(out, c));
-        EXPECT_TRUE(matches<R>(in_place, z));
-        EXPECT_EQ(in_place->delta, 7);
+        EXPECT_TRUE(matches<R>(in_place, z) && in_place->delta == 7);
     }
 }
 

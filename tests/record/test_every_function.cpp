@@ -21,15 +21,14 @@ void each_call(Check check) {
 }
 
 /// Runs `share(to, from)` for every place of an output with every place of an operand that it may
-/// share a buffer with. States and scratch records are not among them: they are written in place.
+/// share a buffer with.
 template <Record R, class Share>
 void each_sharing(const Case<R>& c, Share share) {
     if (c.name == "dsp_append") return;  // shares in ways of its own
     for (std::size_t to = 0; to < c.is_const.size(); ++to) {
         for (std::size_t from = 0; from < c.is_const.size(); ++from) {
-            const bool left_out = from == c.optional && c.leaves_out;
-            if (!c.is_const[to] && to != c.optional && c.is_const[from] && !left_out)
-                share(to, from);
+            const bool left_out = c.leaves_out && (from == c.optional || to == c.optional);
+            if (!c.is_const[to] && c.is_const[from] && !left_out) share(to, from);
         }
     }
 }

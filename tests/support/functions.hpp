@@ -28,7 +28,7 @@ inline const std::map<std::string, std::vector<std::vector<double>>> numbers = {
     {"dspc_rand", {{0}, {1}, {3}}},
     {"dspd_sfir", {{0, 1}, {1, 0}}},
     {"dspf_fwrite2", {{0}, {1}}},
-    {"dsph_avg", {{1, 1}, {1, 2, 1, -1}, {3, 2}, {4, 2}, {5, 2}, {0x21, 2}}},
+    {"dsph_avg", {{1, 1}, {1, 2, 1, -1}, {3, 2}, {4, 2}, {5, 2}, {0x21, 2}, {0x25, 2}}},
     {"dsph_corr", {{1, 0}, {3, 1}}},
     {"dsph_dft", {{20, 0}, {2, 1}, {0, 4}, {0, 0x80}}},
     {"dsph_fft", {{0, 1, 2, 0}, {0, 1, 0, 1}, {0, 1, 0, 4}, {0, 1, 0, 0x80}, {700, 0.5, 6, 2}}},
@@ -163,14 +163,15 @@ struct Run {
         if (to != from) records[to] = records[from];
     }
 
-    /// Calls; returns the result and all that the function may have written.
+    /// Calls; returns the result and all that the function may have written but for scratch.
     std::vector<scalar<R>> operator()() {
         Arguments<R> arguments{records, of.numbers};
         result = of.call(arguments);
         std::vector left{scalar<R>(result), scalar<R>(arguments.integer), arguments.number};
         for (std::size_t place = 0; place < records.size(); ++place) {
             const R* x = records[place];
-            if (of.is_const[place] || !x || result < 0) continue;
+            const bool is_scratch = place == of.optional && of.name.find("corr") != of.name.npos;
+            if (of.is_const[place] || !x || result < 0 || is_scratch) continue;
             left.insert(left.end(), {x->delta, scalar<R>(x->points), scalar<R>(x->complex)});
             left.insert(left.end(), x->data, x->data + used(x));
         }
@@ -183,7 +184,8 @@ struct Run {
         std::size_t place = 0;
         return std::all_of(hosts.begin(), hosts.end(), [&](const Borrowed<R>& x) {
             const bool stays = x.record.data == x.host.data() || of.name == "dspi_analytic";
-            const bool may_be_written = !of.is_const[place] && (stays || place == of.optional);
+            const bool is_state = of.optional < records.size() && records[of.optional] == &x.record;
+            const bool may_be_written = is_state || (!of.is_const[place] && stays);
             return x.host == before[place++] || may_be_written;
         });
     }

@@ -12,94 +12,37 @@ long double bound(int n) {
     return 10 * static_cast<long double>(epsilon<R>) * std::log2(static_cast<long double>(n));
 }
 
-/// The error over `checked` bins spread over the spectrum, relative to the norm of those bins.
-template <class R>
-long double error_at_some_bins(const R* spectrum, const Samples& x, int checked, Noise& noise) {
-    const auto n = std::int64_t(x.size());
-    Samples roots(x.size());
-    for (std::int64_t k = 0; k < n; ++k) roots[std::size_t(k)] = unit_root(-k, n);
-    long double difference = 0, norm = 0;
-    for (int c = 0; c < checked; ++c) {
-        const auto k = checked == n ? c : std::int64_t((noise() + 1) / 2 * n);
-        std::complex<long double> sum = 0;
-        for (std::int64_t i = 0, at = 0; i < n; ++i, at = at + k < n ? at + k : at + k - n) {
-            const auto& a = x[std::size_t(i)];
-            const auto& w = roots[std::size_t(at)];
-            sum += std::complex<long double>(a.real() * w.real() - a.imag() * w.imag(),
-                                             a.real() * w.imag() + a.imag() * w.real());
-        }
-        sum /= static_cast<long double>(n);
-        const auto bin = bins(spectrum)[std::size_t(k)];
-        difference += std::norm(sum - std::complex<long double>(bin.re, bin.im));
-        norm += std::norm(sum);
-    }
-    return std::sqrt(difference / norm);
-}
-
 BOTH_PRECISIONS(Dft, EveryLengthMeetsTheErrorBound) {
     Noise noise;
     for (int n = 2; n <= 2048; ++n) {
-        auto x = noise.complex<R>(n);
+        auto x = n % 5 ? noise.complex<R>(n) : noise.real<R>(n);
         const Samples samples = samples_of<R>(x);
         ASSERT_EQ(dspi_dft(x, 0), 0);
-        ASSERT_EQ(x->points, n);
-        ASSERT_LT(error_at_some_bins<R>(x, samples, n <= 256 ? n : 24, noise), bound<R>(n)) << n;
+        if (n <= 256 || n % 53 == 0) {
+            ASSERT_LT(relative_error<R>(x, forward_transform(samples)), bound<R>(n)) << n;
+        }
         ASSERT_EQ(dspi_dft(x, 1), 0);
         ASSERT_LT(relative_error<R>(x, samples), bound<R>(n)) << n;
     }
 }
 
-BOTH_PRECISIONS(Dft, DirectionsAndLengthsMayAlternate) {
-    Noise noise;
-    // Direction changes, length changes, both, and a fresh start, over the one cached chirp.
-    const int steps[][2] = {{6, 0},  {6, 1}, {6, 1},  {6, 0},  {7, 0}, {5, 1}, {5, 0},
-                            {12, 1}, {0, 0}, {12, 1}, {12, 0}, {0, 0}, {3, 0}};
-    for (const auto& [n, inverse] : steps) {
-        if (n == 0) {
-            ASSERT_EQ(free_internal<R>(), 0);
-            continue;
-        }
-        for (const auto& x : {noise.real<R>(n), noise.complex<R>(n)}) {
-            Signal<R> y = x;
-            const Samples samples = samples_of<R>(y);
-            ASSERT_EQ(dspi_dft(y, inverse), 0);
-            const Samples expected = inverse ? direct_sum(samples, 1) : forward_transform(samples);
-            EXPECT_LT(relative_error<R>(y, expected), bound<R>(n)) << n << ' ' << inverse;
-        }
-    }
-}
-
 BOTH_PRECISIONS(Dft, SpacingAndCapacity) {
-    auto x = Noise().real<R>(6);
+    auto x = Noise().real<R>(6), one = real<R>({5}, 4);
     x->delta = T(0.25);
-    ASSERT_EQ(dspi_dft(x, 0), 0);
+    ASSERT_EQ(dspi_dft(x, 0) || dspi_dft(one, 0), 0);
     EXPECT_EQ(x->delta, T(1 / 1.5));
     EXPECT_EQ(x->alloc, 2 * 16);  // the convolution's room stays
+    EXPECT_TRUE(is_real<R>(one, {5}) && one->delta == T(0.25));
     x->delta = 0;
     ASSERT_EQ(dspi_dft(x, 0), 0);
     EXPECT_EQ(x->delta, limits<R>::big);
 
-    auto one = real<R>({5}, 4);
-    ASSERT_EQ(dspi_dft(one, 0), 0);
-    EXPECT_TRUE(is_real<R>(one, {5}));
-    EXPECT_EQ(one->delta, T(0.25));
-    Signal<R> none;
+    Signal<R> none, huge;
     none->delta = 0;
     ASSERT_EQ(dspi_dft(none, 1) || dspi_rdft(none), 0);
     EXPECT_EQ(none->delta, 1 / limits<R>::big);
-
-    auto eight = Noise().complex<R>(8), same = eight;
-    ASSERT_EQ(dspi_dft(eight, 0) || dspi_fft(same, 0), 0);
-    EXPECT_TRUE(matches<R>(eight, same));
-
-    Signal<R> huge;
     huge->points = (1 << 29) + 3;
     EXPECT_EQ(dspi_dft(huge, 0), -1);
-
-    Borrowed<R> host(complex<R>({1, 2, 3}));
-    const auto before = host.host;
-    ASSERT_EQ(dspi_dft(host, 0), 0);
-    EXPECT_EQ(host.host, before);
 }
 
 BOTH_PRECISIONS(Dft, HalfSpectraOfRealSignals) {
@@ -145,15 +88,10 @@ BOTH_PRECISIONS(Dft, CosineTransformByItsDefinition) {
             EXPECT_NEAR(y->delta, 0.125, epsilon<R>);
         }
     }
-    Signal<R> none;
-    none->delta = 4;
-    ASSERT_EQ(dspi_dct(none, 1), 0);
+    auto none = real<R>({}, 4), empty = real<R>({}, 0), still = real<R>({1, 2, 3}, 0);
+    ASSERT_EQ(dspi_dct(none, 1) || dspi_dct(empty, 0) || dspi_dct(still, 0), 0);
     EXPECT_EQ(none->delta, T(0.125));
-    none->delta = 0;
-    ASSERT_EQ(dspi_dct(none, 0), 0);
-    EXPECT_EQ(none->delta, limits<R>::big);
-    auto still = real<R>({1, 2, 3}, 0);
-    ASSERT_EQ(dspi_dct(still, 0), 0);
+    EXPECT_EQ(empty->delta, limits<R>::big);
     EXPECT_EQ(still->delta, limits<R>::big / 2);
 }
 
@@ -182,12 +120,10 @@ BOTH_PRECISIONS(Dft, AnalyticSignalsOfCosines) {
             EXPECT_TRUE(is_complex<R>(z, turning, 24));
         }
     }
-    auto one = real<R>({3}), hilbert_of_one = one;
-    ASSERT_EQ(dspi_analytic(one) || dspi_hilbert(hilbert_of_one), 0);
-    EXPECT_TRUE(is_real<R>(one, {3}));
-    EXPECT_TRUE(is_real<R>(hilbert_of_one, {0}));
-    Signal<R> none;
-    EXPECT_EQ(dspi_analytic(none) || dspi_hilbert(none), 0);
+    EXPECT_TRUE(turns(dspi_analytic, real<R>({3}), real<R>({3})));
+    EXPECT_TRUE(turns(dspi_hilbert, real<R>({3}), real<R>({0})));
+    EXPECT_TRUE(turns(dspi_analytic, real<R>({}), real<R>({})));
+    EXPECT_TRUE(turns(dspi_hilbert, real<R>({}), real<R>({})));
     auto constant = real<R>({2, 2, 2, 2, 2}, 0);
     ASSERT_EQ(dspi_analytic(constant), 0);
     EXPECT_TRUE(is_complex<R>(constant, {2, 2, 2, 2, 2}, 8));

@@ -1,0 +1,79 @@
+// Every function from several threads at once, on records of their own.
+#include <thread>
+
+#include "support/functions.hpp"
+
+namespace wavkit::test {
+namespace {
+
+/// A call, and what it leaves in a single thread.
+template <Record R>
+struct Call {
+    const Case<R>* of;
+    int n, kinds;
+    std::vector<scalar<R>> outcome;
+};
+
+/// Calls of every function at more lengths than any cache keeps, and of transforms at long ones.
+template <Record R>
+std::vector<Call<R>> calls_in_one_thread(const std::vector<Case<R>>& cases) {
+    std::vector<Call<R>> calls;
+    std::vector<int> lengths{1 << 14, 10007};
+    for (int n = 2; n < 42; ++n) lengths.push_back(n);
+    for (const int n : lengths) {
+        for (const auto& c : cases) {
+            const bool transforms = c.name.find("ft") != c.name.npos || c.name == "dspi_dct";
+            for (const int kinds : {0, 3}) {
+                if (n > 41 && !transforms) continue;
+                calls.push_back({&c, n, kinds, Run<R>(c, n, kinds)()});
+            }
+        }
+    }
+    return calls;
+}
+
+/// Random values cannot be foretold, but they are finite, and uniform ones lie within 1.
+template <Record R>
+bool is_drawn(const Call<R>& call, const std::vector<scalar<R>>& got) {
+    const auto bound = call.of->name == "dspc_rand" && call.of->numbers[0] == 0 ? 1 : 300;
+    return got.size() == call.outcome.size() &&
+           std::all_of(got.begin() + 6, got.end(), [=](auto v) { return std::fabs(v) <= bound; });
+}
+
+/// Makes all calls of a range, beginning at some and going round.
+template <Record R>
+void repeat(std::span<const Call<R>> calls, std::size_t first) {
+    for (std::size_t i = 0; i < calls.size(); ++i) {
+        const auto& call = calls[(i + first) % calls.size()];
+        const auto got = Run<R>(*call.of, call.n, call.kinds)();
+        ASSERT_TRUE(call.of->random() ? ::testing::AssertionResult(is_drawn(call, got))
+                                      : same(got, call.outcome))
+            << *call.of << ' ' << call.n << " points, kinds " << call.kinds;
+    }
+}
+
+TEST(Threads, GetWhatASingleThreadGets) {
+    const auto doubles = every_case<dsp>();
+    const auto singles = every_case<dspf>();
+    const auto of_double = calls_in_one_thread(doubles);
+    const auto of_single = calls_in_one_thread(singles);
+    const std::size_t parts = 8, part = of_double.size() / parts;
+    ASSERT_EQ(of_double.size(), of_single.size());
+    for (std::size_t k = 0; k < parts; ++k) {
+        // New threads for each part, over tables that do not exist yet.
+        EXPECT_EQ(dsp_free_internal() || dspf_free_internal(), 0);
+        std::vector<std::jthread> threads;
+        for (std::size_t t = 0; t < 2; ++t) {
+            const auto first = k % 2 ? t * part / 3 : 0;  // side by side, or all the same calls
+            threads.emplace_back([&, first] {
+                repeat(std::span(of_double).subspan(k * part, part), first);
+                repeat(std::span(of_single).subspan(k * part, part), first);
+            });
+            threads.emplace_back(
+                [&, first] { repeat(std::span(of_single).subspan(k * part, part), first); });
+        }
+    }
+}
+
+}  // namespace
+}  // namespace wavkit::test
