@@ -16,7 +16,7 @@ extern "C" {
 #endif
 
 /** Cosine: x[n] = cos(2 pi freq delta n + phase).
- *  The phase of every 256th sample is computed afresh, in double and without the rounding error of
+ *  The phase of every 32nd sample is computed afresh, in double and without the rounding error of
  *  freq delta n growing with n: long signals stay in phase in both precisions. A complex record
  *  gets imaginary parts 0.
  *  @param freq   frequency in cycles per unit of `delta`; may be negative
