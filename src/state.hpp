@@ -92,13 +92,11 @@ struct FilterScratch {
     R work{};
 };
 
-/// Random numbers of one thread.
-template <class T>
+/// Random numbers of one thread: generators side by side, the first words of their states first.
 struct Draws {
-    std::array<std::uint64_t, 4> generator{};
+    static constexpr int count = 8;
+    std::array<std::array<std::uint64_t, count>, 4> generators{};
     bool seeded = false;
-    bool has_spare = false;
-    T spare = 0;  // the second normal value of a pair
 };
 
 template <class T>
@@ -117,7 +115,7 @@ struct ThreadState {
     TapCache<R> tap_cache;
     R expanded_taps{};
     FilterScratch<R> filter_scratch;
-    Draws<scalar<R>> draws;
+    Draws draws;
     void* conversion = nullptr;  // a load of stored scalars on their way to this precision
 };
 

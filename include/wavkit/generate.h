@@ -16,7 +16,7 @@ extern "C" {
 #endif
 
 /** Cosine: x[n] = cos(2 pi freq delta n + phase).
- *  The phase of every 256th sample is computed afresh, in double and without the rounding error of
+ *  The phase of every 32nd sample is computed afresh, in double and without the rounding error of
  *  freq delta n growing with n: long signals stay in phase in both precisions. A complex record
  *  gets imaginary parts 0.
  *  @param freq   frequency in cycles per unit of `delta`; may be negative
@@ -56,15 +56,14 @@ enum {
 /** Random samples of one of four distributions. In a complex record, DSP_RANDOM_UNIFORM is uniform
  *  over the unit disc without its rim, and with DSP_RANDOM_NORMAL both parts are standard normal.
  *
- *  Random bits come from a generator of the library's own, one to a thread and precision:
- *  xoshiro256++ (D. Blackman and S. Vigna, "Scrambled linear pseudorandom number generators",
- *  2021). A uniform value has all bits of its precision. Without dspc_seed(), a thread's numbers
- *  start from the time and from what differs between processes and threads. The host's rand() is
- *  neither drawn from nor seeded. Normal samples come in pairs: a real record that takes one of a
- *  pair leaves the other one to the thread's next real record of the precision.
+ *  Random bits come from generators of the library's own, eight side by side to a thread and
+ *  precision: xoshiro256++ (D. Blackman and S. Vigna, "Scrambled linear pseudorandom number
+ *  generators", 2021). A uniform value has all bits of its precision. Without dspc_seed(), a
+ *  thread's numbers start from the time and from what differs between processes and threads. The
+ *  host's rand() is neither drawn from nor seeded.
  *
- *  Normal samples follow G. Marsaglia's polar method (Marsaglia and Bray, 1964) in a real record,
- *  G. E. P. Box and M. E. Muller (1958) in a complex one.
+ *  Normal samples follow G. E. P. Box and M. E. Muller ("A note on the generation of random normal
+ *  deviates", 1958), exponential ones the inverse of their distribution: -log(u).
  *  @param type  DSP_RANDOM_... constant
  *  @return 0; -1 for another type, for the last two with a complex record (its samples are then not
  *          set), or when memory runs out */
@@ -72,9 +71,9 @@ WAVKIT_API int dspc_rand(dsp *x, int type);
 WAVKIT_API int dspfc_rand(dspf *x, int type);
 
 /** Starts the calling thread's random numbers of the precision anew from a seed, so that the same
- *  calls give the same samples: those of dspc_rand() and of dspi_shuffle(). A normal sample that
- *  waits for the next record is dropped. Other threads and the other precision go on as they were.
- *  Processors with other instruction sets give the same samples to rounding.
+ *  calls give the same samples: those of dspc_rand() and of dspi_shuffle(). Other threads and the
+ *  other precision go on as they were. Processors with other instruction sets give the same samples
+ *  to rounding.
  *  @return 0 */
 WAVKIT_API int dspc_seed(uint64_t seed);
 WAVKIT_API int dspfc_seed(uint64_t seed);

@@ -1,10 +1,12 @@
 // Random samples of four distributions, and random order.
 #include <algorithm>
-#include <bit>
+#include <array>
 #include <chrono>
 #include <cstdint>
+#include <cstring>
 #include <utility>
 
+#include "kernel/elementary.hpp"
 #include "record_view.hpp"
 #include "state.hpp"
 
@@ -23,9 +25,10 @@ std::uint64_t next_mixed(std::uint64_t& counter) {
 template <Record R>
 void start_from(std::uint64_t seed) {
     auto& draws = thread_state<R>.draws;
-    for (auto& word : draws.generator) word = next_mixed(seed);
+    for (auto& words : draws.generators) {
+        for (auto& word : words) word = next_mixed(seed);
+    }
     draws.seeded = true;
-    draws.has_spare = false;
 }
 
 template <Record R>
@@ -45,130 +48,213 @@ std::uint64_t fresh_seed() {
     return bits ^ std::uint64_t(std::chrono::steady_clock::now().time_since_epoch().count());
 }
 
-/// 64 bits of xoshiro256++ (Blackman and Vigna, "Scrambled linear pseudorandom number generators",
-/// 2021).
 template <Record R>
-std::uint64_t draw_bits() {
+Draws& seeded_draws() {
     auto& draws = thread_state<R>.draws;
     if (!draws.seeded) start_from<R>(fresh_seed<R>());
-    auto& s = draws.generator;
-    const std::uint64_t result = std::rotl(s[0] + s[3], 23) + s[0], shifted = s[1] << 17;
-    s[2] ^= s[0];
-    s[3] ^= s[1];
-    s[1] ^= s[2];
-    s[0] ^= s[3];
-    s[2] ^= shifted;
-    s[3] = std::rotl(s[3], 45);
-    return result;
+    return draws;
 }
 
-/// An integer from 0 to 2^31 - 1.
-template <Record R>
-std::uint32_t draw_integer() {
-    return std::uint32_t(draw_bits<R>() >> 33);
+constexpr int generators = Draws::count;
+using Words = kernel::Vec<std::uint64_t, generators>;
+
+/// Fills memory, a multiple of eight words, with the bits of eight generators side by side:
+/// xoshiro256++ (Blackman and Vigna, "Scrambled linear pseudorandom number generators", 2021).
+void draw_bits(Draws& draws, void* to, std::size_t bytes) {
+    const auto load = [&](int i) {
+        return kernel::load<std::uint64_t, generators>(draws.generators[std::size_t(i)].data());
+    };
+    Words a = load(0), b = load(1), c = load(2), d = load(3);
+    auto* const start = static_cast<unsigned char*>(to);
+    for (std::size_t i = 0; i < bytes; i += sizeof(Words)) {
+        const Words sum = a + d, result = (sum << 23 | sum >> 41) + a, shifted = b << 17;
+        c ^= a;
+        d ^= b;
+        b ^= c;
+        a ^= d;
+        c ^= shifted;
+        d = d << 45 | d >> 19;
+        std::memcpy(start + i, &result, sizeof result);
+    }
+    const Words words[] = {a, b, c, d};
+    std::memcpy(draws.generators.data(), words, sizeof words);
 }
 
-/// An integer from 0 to count - 1: those left over beyond the last multiple of count are drawn
-/// again.
-template <Record R>
-std::uint32_t draw_below(std::uint32_t count) {
-    constexpr std::uint32_t range = std::uint32_t(1) << 31;
-    for (;;) {
-        const std::uint32_t drawn = draw_integer<R>();
-        if (drawn < range - range % count) return drawn % count;
+/// Scalars that are drawn at a time, and of which their number is a multiple: both the same in
+/// every instruction set, since they decide which bits a sample is made of.
+constexpr std::size_t block = 512, step = 32;
+
+/// At least `wanted` scalars, as far as a block has room.
+constexpr std::size_t block_for(std::size_t wanted) {
+    return std::min(block, (wanted + step - 1) / step * step);
+}
+
+template <class T>
+using Block = std::array<T, block>;
+
+/// Replaces bits in vectors by what `make` makes of them.
+template <class T, class Make>
+void replace(T* samples, std::size_t n, Make make) {
+    constexpr int V = kernel::lanes<T>;
+    using Vector = kernel::Vec<T, V>;
+    for (std::size_t i = 0; i < n; i += V) {
+        const auto bits = (kernel::Bits<Vector>)kernel::load<T, V>(samples + i);
+        kernel::store<T, V>(samples + i, make(bits));
     }
 }
 
-/// From 0 up to, not including, 1, with all bits of the precision.
-template <Record R>
-scalar<R> draw_uniform() {
+/// Samples by the block: `make(samples, n)` replaces n scalars of random bits.
+template <Record R, class Make>
+int fill(std::span<scalar<R>> samples, Make make) {
     using T = scalar<R>;
-    constexpr int digits = std::numeric_limits<T>::digits;
-    return T(draw_bits<R>() >> (64 - digits)) * (std::numeric_limits<T>::epsilon() / 2);
+    Draws& draws = seeded_draws<R>();
+    alignas(64) Block<T> drawn;
+    for (std::size_t done = 0; done < samples.size();) {
+        const std::size_t left = samples.size() - done, n = block_for(left);
+        T* const to = n <= left ? samples.data() + done : drawn.data();
+        draw_bits(draws, to, n * sizeof(T));
+        make(to, n);
+        if (n > left) std::copy_n(to, left, samples.data() + done);
+        done += std::min(n, left);
+    }
+    return 0;
 }
 
-/// From -1 up to, not including, 1.
-template <Record R>
-scalar<R> draw_signed() {
-    return 2 * draw_uniform<R>() - 1;
+template <class Bits>
+using Reals = kernel::Vec<std::conditional_t<sizeof(Bits{}[0]) == 8, double, float>,
+                          int(sizeof(Bits) / sizeof(Bits{}[0]))>;
+
+/// From -1 up to, not including, 1, with all bits of the precision.
+template <class Bits>
+WAVKIT_LANES Reals<Bits> to_signed(Bits bits) {
+    using T = kernel::Lane<Reals<Bits>>;
+    constexpr int unused = 8 * int(sizeof(T)) - std::numeric_limits<T>::digits;
+    return __builtin_convertvector(bits >> unused, Reals<Bits>) * std::numeric_limits<T>::epsilon();
 }
 
-template <Record R>
-scalar<R> draw_positive() {
-    return std::max(draw_uniform<R>(), limits<R>::floor);
+/// Above 0 and up to 1, small values to full precision too; from all bits but the lowest.
+template <class Bits>
+WAVKIT_LANES Reals<Bits> to_positive(Bits bits) {
+    using T = kernel::Lane<Reals<Bits>>;
+    using Unsigned = std::make_unsigned_t<kernel::Lane<Bits>>;
+    constexpr int digits = 8 * int(sizeof(T)) - 1;
+    const auto whole = bits >> 1 & std::numeric_limits<kernel::Lane<Bits>>::max();
+    return (__builtin_convertvector(whole, Reals<Bits>) + T(0.5)) * (1 / T(Unsigned(1) << digits));
 }
 
-/// A point of the unit disc; those whose distance from the centre rounds to 1 lie outside.
+/// Points of the unit disc, out of those of the square; one whose distance from the centre might
+/// round to 1 lies outside.
 template <Record R>
-Bin<scalar<R>> draw_in_disc() {
-    for (;;) {
-        const auto re = draw_signed<R>(), im = draw_signed<R>();
-        if (std::hypot(re, im) < 1) return {re, im};
+int fill_disc(std::span<Bin<scalar<R>>> points) {
+    using T = scalar<R>;
+    constexpr T rim = 1 - 2 * std::numeric_limits<T>::epsilon();
+    Draws& draws = seeded_draws<R>();
+    alignas(64) Block<T> drawn;
+    for (std::size_t done = 0; done < points.size();) {
+        const std::size_t n = block_for(2 * (points.size() - done));
+        draw_bits(draws, drawn.data(), n * sizeof(T));
+        replace(drawn.data(), n, [](auto bits) { return to_signed(bits); });
+        for (std::size_t i = 0; i < n && done < points.size(); i += 2) {
+            points[done] = {drawn[i], drawn[i + 1]};
+            done += magnitude_squared(points[done]) < rim;
+        }
+    }
+    return 0;
+}
+
+/// Box and Muller's method: a length from one half of the bits, a direction from the other. The
+/// direction lies within an eighth of a turn from one of the four axes.
+template <class T>
+void make_normal(T* samples, std::size_t n) {
+    constexpr int V = kernel::lanes<T>;
+    using Vector = kernel::Vec<T, V>;
+    for (std::size_t i = 0; i < n / 2; i += V) {
+        T* const first = samples + i;
+        T* const second = samples + n / 2 + i;
+        const auto bits = (kernel::Bits<Vector>)kernel::load<T, V>(second);
+        const Vector u = to_positive((kernel::Bits<Vector>)kernel::load<T, V>(first));
+        const Vector radius = kernel::sqrt(kernel::log(u) * T(-2));
+        const auto [s, c] = kernel::sine_cosine_of(kernel::Remainder<Vector>{
+            to_signed(bits) * (pi<T> / 4), Vector{}, kernel::Bits<Vector>{}});
+        const Vector signed_radius =
+            kernel::flip_by_sign_of(radius, kernel::quadrant_sign<Vector>(bits));
+        kernel::store<T, V>(first, signed_radius * kernel::select_odd(bits, s, c));
+        kernel::store<T, V>(second, signed_radius * kernel::select_odd(bits, c, s));
     }
 }
 
-/// Marsaglia's polar method: two values at a time, of which one waits.
-template <Record R>
-scalar<R> draw_normal() {
-    auto& kept = thread_state<R>.draws;
-    if (std::exchange(kept.has_spare, false)) return kept.spare;
-    const auto z = draw_in_disc<R>();
-    const auto s = std::max(magnitude_squared(z), limits<R>::floor);
-    const auto factor = std::sqrt(-2 * std::log(s)) / std::sqrt(s);
-    kept.spare = factor * z.re;
-    kept.has_spare = true;
-    return factor * z.im;
+template <class T>
+void make_exponential(T* samples, std::size_t n) {
+    replace(samples, n, [](auto bits) { return -kernel::log(to_positive(bits)); });
 }
 
-/// Box and Muller's method.
-template <Record R>
-Bin<scalar<R>> draw_normal_pair() {
-    const auto r = std::sqrt(-2 * std::log(draw_positive<R>()));
-    const auto angle = two_pi<scalar<R>> * draw_uniform<R>();
-    return {r * std::cos(angle), r * std::sin(angle)};
-}
-
-template <Record R>
-scalar<R> draw_exponential() {
-    return -std::log(draw_positive<R>());
-}
-
-template <Record R>
-scalar<R> draw_laplace() {
-    const auto magnitude = draw_exponential<R>();
-    return draw_integer<R>() & 1 ? -magnitude : magnitude;
-}
-
-template <class Samples, class Draw>
-int fill(Samples samples, Draw draw) {
-    for (auto& sample : samples) sample = draw();
-    return 0;
+/// The lowest bit, of which the magnitude knows nothing, is the sign.
+template <class T>
+void make_laplace(T* samples, std::size_t n) {
+    replace(samples, n, [](auto bits) {
+        const auto magnitude = -kernel::log(to_positive(bits));
+        return kernel::flip_sign(magnitude, bits << (8 * int(sizeof(T)) - 1));
+    });
 }
 
 enum Distribution { uniform, normal, exponential, laplace };
 
 template <Record R>
 int random_samples(R* x, int type) {
+    using T = scalar<R>;
     if (dsp_alloc(x)) return -1;
     switch (type) {
         case uniform:
-            return x->complex ? fill(bins(x), draw_in_disc<R>) : fill(values(x), draw_signed<R>);
+            if (x->complex) return fill_disc<R>(bins(x));
+            return fill<R>(values(x), [](T* samples, std::size_t n) {
+                replace(samples, n, [](auto bits) { return to_signed(bits); });
+            });
         case normal:
-            return x->complex ? fill(bins(x), draw_normal_pair<R>)
-                              : fill(values(x), draw_normal<R>);
+            return fill<R>(values(x), make_normal<T>);
         case exponential:
-            return x->complex ? -1 : fill(values(x), draw_exponential<R>);
+            return x->complex ? -1 : fill<R>(values(x), make_exponential<T>);
         case laplace:
-            return x->complex ? -1 : fill(values(x), draw_laplace<R>);
+            return x->complex ? -1 : fill<R>(values(x), make_laplace<T>);
         default:
             return -1;
     }
 }
 
+/// Random integers one by one.
+class Integers {
+  public:
+    explicit Integers(Draws& draws) : draws_(draws) {}
+
+    /// An integer from 0 to count - 1: those left over beyond the last multiple of count are drawn
+    /// again.
+    std::uint32_t below(std::uint32_t count) {
+        constexpr std::uint32_t range = std::uint32_t(1) << 31;
+        for (;;) {
+            const std::uint32_t drawn = next();
+            if (drawn < range - range % count) return drawn % count;
+        }
+    }
+
+  private:
+    /// From 0 to 2^31 - 1.
+    std::uint32_t next() {
+        if (used_ == words_.size()) {
+            draw_bits(draws_, words_.data(), sizeof words_);
+            used_ = 0;
+        }
+        return std::uint32_t(words_[used_++] >> 33);
+    }
+
+    Draws& draws_;
+    std::array<std::uint64_t, generators> words_;
+    std::size_t used_ = generators;
+};
+
 template <Record R, class Samples>
 int permute(Samples samples) {
+    Integers integers(seeded_draws<R>());
     for (std::size_t left = samples.size(); left > 1; --left) {
-        std::swap(samples[left - 1], samples[draw_below<R>(std::uint32_t(left))]);
+        std::swap(samples[left - 1], samples[integers.below(std::uint32_t(left))]);
     }
     return 0;
 }

@@ -1,80 +1,115 @@
 // Cosines, complex exponentials and straight lines.
 #include <algorithm>
 #include <array>
+#include <bit>
+#include <cstdint>
 
+#include "kernel/elementary.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
 namespace {
 
-/// Samples from one exactly computed phase to the next.
-constexpr std::size_t block = 256;
+using Doubles = kernel::Lanes<double>;
+
+/// Phasors that are computed at a time.
+constexpr std::size_t vector = kernel::lanes<double>;
+
+/// Samples from one exactly computed phase to the next: as many as a vector of phases has room for
+/// turns of, in the fastest instruction set.
+constexpr std::size_t block = 32;
 
 /// The whole turns of an angle are nothing to a cosine.
 double fraction(double turns) { return turns - std::nearbyint(turns); }
+
+/// cos and sin of angles of up to half a turn. Quarters are turned apart, so that they come out
+/// exact.
+kernel::SineCosine<Doubles> phasors(Doubles turns) {
+    const auto [quarters, quadrant] = kernel::round_product(turns, 4.0);
+    const Doubles angle = two_pi<double> * (turns - quarters * 0.25);
+    const auto [s, c] = kernel::sine_cosine_of(kernel::Remainder<Doubles>{angle, {}, {}});
+    return {kernel::flip_by_sign_of(kernel::select_odd(quadrant, c, s),
+                                    kernel::quadrant_sign<Doubles>(quadrant)),
+            kernel::flip_by_sign_of(kernel::select_odd(quadrant, s, c),
+                                    kernel::quadrant_sign<Doubles>(quadrant + 1))};
+}
 
 /// How far a cosine turns from sample to sample. The rounding error of the product is kept: left
 /// out, it would add up over the samples.
 class TurnRate {
   public:
     TurnRate(double freq, double delta)
-        : rate_(freq * delta), error_(std::fma(freq, delta, -rate_)) {}
+        : rate_(fraction(freq * delta)), error_(std::fma(freq, delta, -freq * delta)) {}
 
-    /// The turns made at sample n, from -1/2 to 1/2.
-    double turns_at(std::size_t n) const {
-        const double count = double(n), turns = count * rate_;
-        const double rounding = std::fma(count, rate_, -turns);
-        return fraction(fraction(turns) + (rounding + count * error_));
+    /// cos and sin of what is turned at the samples first, first + stride, ...
+    kernel::SineCosine<Doubles> phasors_at(double first, double stride) const {
+        Doubles counted;
+        for (std::size_t i = 0; i < vector; ++i) counted[i] = double(i);
+        const Doubles n = counted * stride + first, turns = n * rate_;
+        const Doubles rounding = kernel::product_minus(n, kernel::all<Doubles>(rate_), turns);
+        const Doubles part = turns - kernel::round_product(turns, 1.0).number;
+        return phasors(part + (rounding + n * error_));
     }
 
   private:
     double rate_, error_;
 };
 
-/// cos and sin of up to half a turn. Quarters are turned apart, so that they come out exact.
-Bin<double> phasor(double turns) {
-    const double quarters = std::nearbyint(4 * turns);
-    const double angle = two_pi<double> * (turns - quarters / 4);
-    const double c = std::cos(angle), s = std::sin(angle);
-    if (quarters == 1) return {-s, c};
-    if (quarters == -1) return {s, -c};
-    if (quarters == 2 || quarters == -2) return {-c, -s};
-    return {c, s};
-}
-
 /// cos and sin of one frequency. The samples of a block are the phasor of its first sample turned
 /// by a table that is the same for every block, all of them side by side.
 template <class T>
 class Oscillator {
+    using Vector = kernel::Lanes<T>;
+    static constexpr std::size_t V = kernel::lanes<T>;
+
   public:
     Oscillator(double freq, double delta, double phase, std::size_t points)
         : rate_(freq, delta), start_{std::cos(phase), std::sin(phase)}, points_(points) {
-        constexpr std::size_t fine = 16;
-        std::array<Bin<double>, fine> turned;
-        for (std::size_t i = 0; i < fine; ++i) turned[i] = phasor(rate_.turns_at(i));
-        for (std::size_t j = 0; j < std::min(points, block); j += fine) {
-            const Bin<double> coarse = phasor(rate_.turns_at(j));
-            for (std::size_t i = 0; i < fine; ++i) {
-                const Bin<double> z = coarse * turned[i];
-                cos_[j + i] = T(z.re);
-                sin_[j + i] = T(z.im);
+        for (std::size_t j = 0; j < block; j += vector) {
+            const auto [s, c] = rate_.phasors_at(double(j), 1);
+            for (std::size_t i = 0; i < vector; ++i) {
+                cos_[j + i] = T(c[i]);
+                sin_[j + i] = T(s[i]);
             }
         }
     }
 
-    /// Calls use(n, c, s) for every sample n.
-    template <class Use>
-    void run(Use use) const {
-        for (std::size_t first = 0; first < points_; first += block) {
-            const Bin<double> anchor = start_ * phasor(rate_.turns_at(first));
-            const T c = T(anchor.re), s = T(anchor.im);
-            for (std::size_t j = 0; j < std::min(block, points_ - first); ++j) {
-                use(first + j, c * cos_[j] - s * sin_[j], c * sin_[j] + s * cos_[j]);
+    /// Calls use(place, c, s) for every vector of samples, `Width` scalars each.
+    template <std::size_t Width, class Use>
+    void run(T* samples, Use use) const {
+        for (std::size_t first = 0; first < points_; first += vector * block) {
+            const auto [s, c] = rate_.phasors_at(double(first), double(block));
+            const Doubles re = start_.re * c - start_.im * s, im = start_.re * s + start_.im * c;
+            const std::size_t blocks = (points_ - first + block - 1) / block;
+            for (std::size_t i = 0; i < std::min(vector, blocks); ++i) {
+                const std::size_t done = first + i * block;
+                run_block<Width>(samples + Width * done, std::min(block, points_ - done),
+                                 Bin<T>{T(re[i]), T(im[i])}, use);
             }
         }
     }
 
   private:
+    template <std::size_t Width, class Use>
+    WAVKIT_LANES void run_block(T* samples, std::size_t n, Bin<T> anchor, Use use) const {
+        const auto turn = [&](T* place, std::size_t j) {
+            const auto c = kernel::load<T, V>(&cos_[j]), s = kernel::load<T, V>(&sin_[j]);
+            use(place, kernel::mul_add(s, -anchor.im, c * anchor.re),
+                kernel::mul_add(c, anchor.im, s * anchor.re));
+        };
+        if (n == block) [[likely]] {
+            for (std::size_t j = 0; j < block; j += V) turn(samples + Width * j, j);
+            return;
+        }
+        for (std::size_t j = 0; j < n; j += V) {
+            T rest[Width * V]{};
+            const std::size_t count = Width * std::min(V, n - j);
+            std::copy_n(samples + Width * j, count, rest);
+            turn(rest, j);
+            std::copy_n(rest, count, samples + Width * j);
+        }
+    }
+
     TurnRate rate_;
     Bin<double> start_;
     std::size_t points_;
@@ -88,49 +123,103 @@ Oscillator<scalar<R>> oscillator(const R* x, scalar<R> freq, scalar<R> phase) {
 
 template <Record R>
 int cosine(R* x, scalar<R> freq, scalar<R> phase) {
+    using T = scalar<R>;
     if (dsp_alloc(x)) return -1;
     const bool was_complex = x->complex;
     x->complex = 0;
-    auto* samples = x->data;
-    oscillator(x, freq, phase).run([=](std::size_t n, auto c, auto) { samples[n] = c; });
+    oscillator(x, freq, phase).template run<1>(x->data, [](T* place, auto c, auto) {
+        kernel::store<T, kernel::lanes<T>>(place, c);
+    });
     return was_complex ? dspi_rtoc(x) : 0;
 }
 
 template <Record R>
 int complex_exponential(R* x, scalar<R> freq, scalar<R> phase) {
+    using T = scalar<R>;
     if (!x->complex) return cosine(x, freq, phase);
     if (dsp_alloc(x)) return -1;
-    auto* samples = bins(x).data();
-    oscillator(x, freq, phase).run([=](std::size_t n, auto c, auto s) { samples[n] = {c, s}; });
+    oscillator(x, freq, phase).template run<2>(x->data, [](T* place, auto c, auto s) {
+        kernel::store_complex<T, kernel::lanes<T>, kernel::Layout::pairs>(place, {c, s});
+    });
     return 0;
 }
 
 template <Record R>
 int add_cosine(R* x, scalar<R> amplitude, scalar<R> freq, scalar<R> phase) {
-    auto* samples = x->data;
-    const auto add = [=](std::size_t step) {
-        return [=](std::size_t n, auto c, auto) { samples[step * n] += amplitude * c; };
-    };
+    using T = scalar<R>;
     const auto wave = oscillator(x, freq, phase);
     if (x->complex) {
-        wave.run(add(2));
+        wave.template run<2>(x->data, [=](T* place, auto c, auto) {
+            auto z = kernel::load_complex<T, kernel::lanes<T>, kernel::Layout::pairs>(place);
+            z.re += amplitude * c;
+            kernel::store_complex<T, kernel::lanes<T>, kernel::Layout::pairs>(place, z);
+        });
     } else {
-        wave.run(add(1));
+        wave.template run<1>(x->data, [=](T* place, auto c, auto) {
+            kernel::store<T, kernel::lanes<T>>(
+                place, kernel::load<T, kernel::lanes<T>>(place) + amplitude * c);
+        });
     }
     return 0;
+}
+
+/// out[i] = value + i * step
+template <class T>
+void put_multiples(T* out, std::size_t n, T value, T step) {
+    for (std::size_t i = 0; i < n; ++i) out[i] = value + T(std::int32_t(i)) * step;
+}
+
+/// Whether all values between two lie on one grid: they have one sign and one exponent.
+template <class T>
+bool same_grid(T a, T b) {
+    using Word = std::conditional_t<sizeof(T) == 8, std::uint64_t, std::uint32_t>;
+    constexpr int mantissa = std::numeric_limits<T>::digits - 1;
+    return std::bit_cast<Word>(a) >> mantissa == std::bit_cast<Word>(b) >> mantissa;
+}
+
+/// How many more times `step`, a multiple of the grid, can be added to a value without leaving it.
+template <class T>
+std::size_t steps_left(T value, T step, std::size_t most) {
+    const T low = std::ldexp(T(1), std::ilogb(value)), size = std::fabs(value);
+    const T room = (value < 0) == (step < 0) ? 2 * low - size : size - low;
+    const T steps = room / std::fabs(step) - 1;
+    return steps < T(most) ? steps > 1 ? std::size_t(steps) : 0 : most;
+}
+
+/// Repeated addition. As long as sums keep their exponent each addition is rounded alike, so that
+/// two equal differences in a row (a sum half way between two numbers becomes the even one, whose
+/// next difference may be another) mean that as many follow as the exponent lasts; those are exact
+/// multiples.
+template <class T>
+void add_repeatedly(T* out, std::size_t n, T value, T step) {
+    constexpr std::size_t longest = 1 << (std::numeric_limits<T>::digits > 30 ? 30 : 20);
+    for (std::size_t i = 0; i < n;) {
+        const T next = value + step, second = next + step, third = second + step;
+        const T difference = second - next;
+        out[i++] = value;
+        value = next;
+        if (n - i < 16 || !same_grid(next, third) || third - second != difference) continue;
+        if (!std::isnormal(next)) continue;
+        const std::size_t most = std::min(n - i, longest);
+        const std::size_t run = difference == 0 ? most : steps_left(next, difference, most);
+        put_multiples(out + i, run, next, difference);
+        i += run;
+        value = next + T(run) * difference;
+    }
 }
 
 template <Record R>
 int line(R* x, scalar<R> slope, scalar<R> offset) {
     if (dsp_alloc(x)) return -1;
     const auto step = slope * x->delta;
+    if (!x->complex) {
+        add_repeatedly(x->data, length(x), offset, step);
+        return 0;
+    }
     auto value = offset;
-    for (std::size_t n = 0; n < length(x); ++n, value += step) {
-        if (x->complex) {
-            bins(x)[n] = {value, 0};
-        } else {
-            x->data[n] = value;
-        }
+    for (auto& sample : bins(x)) {
+        sample = {value, 0};
+        value += step;
     }
     return 0;
 }

@@ -3,6 +3,7 @@
 #include <numeric>
 
 #include "window/generate.hpp"
+#include "window/outward.hpp"
 #include "window/tolerance.hpp"
 
 namespace wavkit {
@@ -13,19 +14,36 @@ namespace {
 /// window next to the centre and 2 cos(phi) + 2 in the outer one, does not lose digits where the
 /// cosine is flat.
 template <class T>
-T cosine_sum(std::span<const T> a, double position, double period) {
-    const bool inner = 4 * position <= period;
-    const double from_extremum = inner ? position : period / 2 - position;
-    const double half_sine = std::sin(pi<double> * from_extremum / period);
-    const T sign = inner ? 1 : -1;
-    const T step = -sign * T(4 * half_sine * half_sine);
-    T b = 0, d = 0;
-    for (std::size_t k = a.size(); k-- > 1;) {
-        d = a[k] + step * b + sign * d;
-        b = d + sign * b;
+class CosineSum {
+  public:
+    CosineSum(std::span<const T> a, double period)
+        : a_(a), half_period_(period / 2), half_step_(pi<double> / period) {}
+
+    WAVKIT_LANES kernel::Lanes<T> operator()(const Offsets<T>& positions) const {
+        using Vector = kernel::Lanes<T>;
+        const auto sign = rounded(positions, [this](Doubles position) {
+            return is_inner(position) ? Doubles{} + 1.0 : Doubles{} - 1.0;
+        });
+        const Vector step = -sign * rounded(positions, [this](Doubles position) {
+            const Doubles from_extremum = is_inner(position) ? position : half_period_ - position;
+            const Doubles angle = from_extremum * half_step_;
+            const Doubles sine = angle + kernel::sine_tail(angle, Doubles{}, angle * angle);
+            return 4.0 * sine * sine;
+        });
+        Vector b{}, d{};
+        for (std::size_t k = a_.size(); k-- > 1;) {
+            d = kernel::mul_add(step, b, kernel::mul_add(sign, d, kernel::all<Vector>(a_[k])));
+            b = kernel::mul_add(sign, b, d);
+        }
+        return kernel::mul_add(step * T(0.5), b, kernel::mul_add(sign, d, a_[0]));
     }
-    return a[0] + sign * d + step / 2 * b;
-}
+
+  private:
+    WAVKIT_LANES auto is_inner(Doubles position) const { return 2 * position <= half_period_; }
+
+    std::span<const T> a_;
+    double half_period_, half_step_;
+};
 
 }  // namespace
 
@@ -46,14 +64,15 @@ int cosine_sum_fill(R* w, std::span<const scalar<R>> a, int scale_type, scalar<R
     std::fill(w->data, centre - pairs, T(0));
     std::fill(centre + pairs + 1, w->data + n, T(0));
     centre[0] = std::accumulate(a.begin(), a.end(), T(0));
-    for (int j = 1; j <= pairs; ++j) centre[j] = centre[-j] = cosine_sum(a, j, period);
+    const CosineSum<T> value(a, period);
+    mirror(centre + 1, centre - 1, std::size_t(pairs), 1, value);
 
     if (narrow) {
         // An even width is periodic like an even window: its first sample has no partner.
         const int whole = tol_floor(win_length);
         if (whole % 2 == 0 && tol_equal(win_length, T(whole))) centre[pairs] = 0;
     } else if (n % 2 == 0) {
-        w->data[0] = cosine_sum(a, pairs + 1, period);
+        w->data[0] = value_at<T>(pairs + 1, value);
     }
     return 0;
 }

@@ -1,8 +1,10 @@
 // Windows given by a formula: triangle, Kaiser, Gauss, powers of a sinc.
 #include <algorithm>
+#include <array>
 
 #include "math/bessel.hpp"
 #include "window/generate.hpp"
+#include "window/outward.hpp"
 
 namespace wavkit {
 namespace {
@@ -13,15 +15,17 @@ namespace {
 /// `peak` there.
 template <Record R, class Value>
 void fill_outward(R* w, bool symmetric, scalar<R> peak, Value value) {
+    using T = scalar<R>;
     const int n = w->points, half = n / 2;
-    scalar<R>* const centre = w->data + half;
+    T* const centre = w->data + half;
+    const auto samples = [&](const Offsets<T>& t) { return rounded(t, value); };
     if (symmetric && n % 2 == 0) {
-        for (int i = 0; i < half; ++i) centre[i] = centre[-1 - i] = value(i + 0.5);
+        mirror(centre, centre - 1, std::size_t(half), 0.5, samples);
         return;
     }
     centre[0] = peak;
-    for (int j = 1; j <= (n - 1) / 2; ++j) centre[j] = centre[-j] = value(j);
-    if (n % 2 == 0) w->data[0] = value(half);
+    mirror(centre + 1, centre - 1, std::size_t(n - 1) / 2, 1, samples);
+    if (n % 2 == 0) w->data[0] = value_at<T>(half, samples);
 }
 
 /// Normalisation of the shapes whose centre is 1.
@@ -32,16 +36,42 @@ int normalise_unit_peak(R* w, int mode) {
     return normalise(w, mode);
 }
 
-/// (sin(x) / x)^p, continued to where the sinc is not positive for the powers that allow it.
-double sinc_power(double x, double p) {
-    if (x == 0) return 1;
-    const double s = std::sin(x) / x;
-    if (p == 1) return s;
+/// s^p, continued to where s is not positive for the powers that allow it.
+double sinc_power(double s, double p) {
     if (s > 0) return std::pow(s, p);
     if (p == 0) return 1;
-    if (p == 2) return s * s;
     return s <= 0 ? 0 : s;
 }
+
+/// The series of I0 in y = x^2 / 4 (M. Abramowitz and I. A. Stegun, Handbook of Mathematical
+/// Functions, 9.6.12), as far as it counts for y up to `largest`. All of its terms are positive.
+class BesselSeries {
+  public:
+    explicit BesselSeries(double largest, double precision) {
+        double term = 1, sum = 1;
+        while (terms_ < most && term > sum * precision) {
+            const double k = double(terms_);
+            c_[terms_] = c_[terms_ - 1] / (k * k);
+            term *= largest / (k * k);
+            sum += term;
+            ++terms_;
+        }
+    }
+
+    WAVKIT_LANES Doubles operator()(Doubles y) const {
+        Doubles sum = kernel::all<Doubles>(c_[terms_ - 1]);
+        for (std::size_t k = terms_ - 1; k-- > 0;) sum = kernel::mul_add(sum, y, c_[k]);
+        return sum;
+    }
+
+  private:
+    static constexpr std::size_t most = 48;
+    std::array<double, most> c_{1};
+    std::size_t terms_ = 1;
+};
+
+/// Arguments of I0 up to which the series is short.
+constexpr double series_limit = 20;
 
 /// The largest Kaiser parameter whose window (or its square, where it is to be summed) stays in
 /// range.
@@ -77,7 +107,7 @@ int bartlett_fill(R* w, int scale_type) {
     if (w->complex || scale_type & (DSP_SCALE_SYMMETRIC | DSP_SCALE_WIDTH)) return -1;
     if (w->points < 1) return 0;
     const double n = w->points, peak = bartlett_peak(scale_mode(scale_type), w->points);
-    fill_outward(w, false, T(peak), [=](double t) { return T(peak * (n - 2 * t) / n); });
+    fill_outward(w, false, T(peak), [=](Doubles t) { return (n - 2 * t) * (peak / n); });
     return 0;
 }
 
@@ -95,10 +125,17 @@ int kaiser_fill(R* w, scalar<R> beta, int scale_type) {
     const double shape = std::min(std::fabs(beta), beta_limit<R>(mode));
     const double m = symmetric ? w->points - 1.0 : w->points;
     const T peak = T(bessel_i0(shape));
-    fill_outward(w, symmetric, peak, [=](double t) {
-        // Both factors are exact, so the zero at the ends is one.
-        return T(bessel_i0(shape * (std::sqrt((m - 2 * t) * (m + 2 * t)) / m)));
-    });
+    // Both factors of 1 - (2 t / m)^2 are exact, so the zero at the ends is one.
+    if (shape <= series_limit) {
+        const double largest = shape * shape / 4, factor = largest / (m * m);
+        const BesselSeries series(largest, std::numeric_limits<T>::epsilon() / 16);
+        fill_outward(w, symmetric, peak,
+                     [&](Doubles t) { return series((m - 2 * t) * (m + 2 * t) * factor); });
+    } else {
+        fill_outward(w, symmetric, peak, [=](Doubles t) {
+            return kernel::bessel_i0(kernel::sqrt((m - 2 * t) * (m + 2 * t)) * (shape / m));
+        });
+    }
     if (mode == DSP_SCALE_MEAN || mode == DSP_SCALE_RMS) return normalise(w, mode);
     for (T& sample : values(w)) sample /= peak;
     return 0;
@@ -111,12 +148,11 @@ int gauss_fill(R* w, scalar<R> sigma, int scale_type) {
     if (w->points < 1) return 0;
     const bool symmetric = scale_type & DSP_SCALE_SYMMETRIC;
     if (sigma == 0) {
-        fill_outward(w, symmetric, T(1), [](double t) { return T(t < 1); });
+        fill_outward(w, symmetric, T(1),
+                     [](Doubles t) { return t < 1.0 ? kernel::all<Doubles>(1) : Doubles{}; });
     } else {
-        const double deviation = w->points * double(sigma);
-        fill_outward(w, symmetric, T(1), [=](double t) {
-            return T(std::exp(-0.5 * (t / deviation) * (t / deviation)));
-        });
+        const double deviation = w->points * double(sigma), k = -0.5 / (deviation * deviation);
+        fill_outward(w, symmetric, T(1), [=](Doubles t) { return kernel::exp(k * (t * t)); });
     }
     return normalise_unit_peak(w, scale_mode(scale_type));
 }
@@ -127,8 +163,14 @@ int sinc_fill(R* w, scalar<R> x0, scalar<R> p, int scale_type) {
     if (w->complex || scale_type & DSP_SCALE_WIDTH) return -1;
     if (w->points < 1) return 0;
     const double step = 2 * double(x0) / w->points;
-    fill_outward(w, scale_type & DSP_SCALE_SYMMETRIC, T(1),
-                 [=](double t) { return T(sinc_power(step * t, p)); });
+    fill_outward(w, scale_type & DSP_SCALE_SYMMETRIC, T(1), [=](Doubles t) {
+        const double power = p;
+        Doubles s = kernel::sinc(step * t);
+        if (power == 1) return s;
+        if (power == 2) return s * s;
+        for (int i = 0; i < kernel::lanes<double>; ++i) s[i] = sinc_power(s[i], power);
+        return s;
+    });
     return normalise_unit_peak(w, scale_mode(scale_type));
 }
 

@@ -1,4 +1,5 @@
 // Windows given by the caller's own coefficients or parameters, made anew at every call.
+#include "window/apply.hpp"
 #include "window/generate.hpp"
 
 namespace wavkit {
@@ -9,8 +10,7 @@ int apply(R* x, bool rotate, Fill fill) {
     Temporary<R> window;
     window->points = x->points;
     window->delta = x->delta;
-    return status(dsp_alloc(window) || fill(window) || dspb_mul(x, window, x) ||
-                  (rotate && dspi_swap_halves2(x)));
+    return status(dsp_alloc(window) || fill(window) || apply_samples<R>(x, window, rotate));
 }
 
 constexpr bool rotates(int scale_type) { return !(scale_type & DSP_SCALE_NO_ROTATION); }

@@ -5,6 +5,7 @@
 #include <array>
 
 #include "state.hpp"
+#include "window/apply.hpp"
 #include "window/catalogue.hpp"
 #include "window/tolerance.hpp"
 
@@ -80,24 +81,23 @@ bool leaves_samples_alone(const R* x, int window, int scale_type, scalar<R> win_
 }
 
 template <Record R>
-int apply_cached(R* x, int window, int scale_type, scalar<R> win_length) {
+int apply_cached(R* x, int window, int scale_type, scalar<R> win_length, bool rotate) {
     const int options = scale_type & shape_options;
     CachedWindow<R>* known = find<R>(x->points, window, options, win_length);
     R* samples = known ? &known->samples : make<R>(x->points, window, options, win_length);
     if (!samples) return -1;
     samples->delta = x->delta;
-    return dspb_mul(x, samples, x);
+    return apply_samples(x, samples, rotate);
 }
 
 template <Record R>
 int apply_window(R* x, int window, int scale_type, scalar<R> win_length) {
     if (scale_mode(scale_type) == 3) return -1;
-    if (!leaves_samples_alone(x, window, scale_type, win_length) &&
-        apply_cached(x, window, scale_type, win_length)) {
-        return -1;
-    }
     const bool rotate = window == DSP_WINDOW_UNIFORM ? scale_type & DSP_SCALE_ROTATE_UNIFORM
                                                      : !(scale_type & DSP_SCALE_NO_ROTATION);
+    if (!leaves_samples_alone(x, window, scale_type, win_length)) {
+        return apply_cached(x, window, scale_type, win_length, rotate);
+    }
     return rotate ? dspi_swap_halves2(x) : 0;
 }
 

@@ -92,7 +92,7 @@ BOTH_PRECISIONS(Random, SamplesStayWithinTheirBounds) {
 BOTH_PRECISIONS(Random, ASeedRepeatsWhatFollowsIt) {
     const auto draw = [](std::uint64_t value) {
         EXPECT_EQ(seed<R>(value), 0);
-        auto all = drawn<R>(DSP_RANDOM_NORMAL, false, 7);  // the other one of a pair waits
+        auto all = drawn<R>(DSP_RANDOM_NORMAL, false, 7);
         const auto order = drawn<R>(DSP_RANDOM_LAPLACE, false, 100);
         EXPECT_EQ(dspi_shuffle(all) || dsp_append(all, order), 0);
         return scalars<R>(all);
