@@ -59,18 +59,26 @@ int multiply_polynomials(const R* a, const R* b, R* out) {
 template <Record R>
 Bin<scalar<R>> dot(const R* a, const R* b) {
     using T = scalar<R>;
-    const auto sum_of_products = [n = length(a)](auto p, auto q) -> Bin<T> {
-        const auto [re, im] = blockwise_sums(n, [=](std::size_t i) {
-            const Bin<T> product = p[i] * q[i];
-            return std::array{product.re, product.im};
+    const std::size_t n = length(a);
+    if (a->complex && b->complex) {
+        const auto [re, im] =
+            blockwise_sums<T>(n, [p = bins(a).data(), q = bins(b).data()](auto points) {
+                const auto product = points(p) * points(q);
+                return std::array{product.re, product.im};
+            });
+        return {re, im};
+    }
+    if (a->complex) return dot(b, a);
+    if (b->complex) {
+        const auto [re, im] = blockwise_sums<T>(n, [p = a->data, q = bins(b).data()](auto points) {
+            const auto factor = points(p);
+            const auto point = points(q);
+            return std::array{factor * point.re, factor * point.im};
         });
         return {re, im};
-    };
-    if (a->complex && b->complex) return sum_of_products(bins(a), bins(b));
-    if (a->complex) return sum_of_products(bins(a), values(b));
-    if (b->complex) return sum_of_products(values(a), bins(b));
-    const auto [sum] = blockwise_sums(
-        length(a), [p = a->data, q = b->data](std::size_t i) { return std::array{p[i] * q[i]}; });
+    }
+    const auto [sum] = blockwise_sums<T>(
+        n, [p = a->data, q = b->data](auto points) { return std::array{points(p) * points(q)}; });
     return {sum, 0};
 }
 

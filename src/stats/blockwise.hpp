@@ -1,59 +1,215 @@
-// Sums over long signals: blocks bound the rounding error, lanes keep the additions from waiting
-// for one another and let the compiler put them into vector registers.
+// Sums over long signals, in the vectors of the instruction set: blocks bound the rounding error,
+// several accumulators keep the additions from waiting for one another.
 #pragma once
 
 #include <algorithm>
 #include <array>
-#include <tuple>
-#include <type_traits>
+#include <bit>
 
+#include "kernel/lanes.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
+namespace {
 
 /// Points that share a partial sum before it joins the total.
-inline constexpr std::size_t block_points = 2048;
+constexpr std::size_t block_points = 2048;
 
-/// Partial results that grow side by side within a block.
-template <class T>
-inline constexpr std::size_t lanes = 128 / sizeof(T);
+/// As many points as a vector has lanes, of the signals that are read together. Fewer at the end of
+/// a signal: zeros take the place of the others.
+template <class T, bool whole>
+struct Points {
+    static constexpr int V = kernel::lanes<T>;
+    std::size_t first;      // of the signal
+    std::size_t step = 0;   // place in the block of the first of the vectors that go together
+    std::size_t ahead = 0;  // further points to this one
+    std::size_t count = V;
 
-template <class Terms>
-using terms_of = std::remove_cvref_t<std::invoke_result_t<Terms, std::size_t>>;
+    kernel::Lanes<T> operator()(const T* x) const {
+        if constexpr (whole) return kernel::load<T, V>(x + first);
+        T rest[V] = {};
+        std::copy_n(x + first, count, rest);
+        return kernel::load<T, V>(rest);
+    }
+    kernel::Complexes<T, V> operator()(const Bin<T>* z) const {
+        const T* x = reinterpret_cast<const T*>(z + first);
+        if constexpr (whole) return kernel::load_complex<T, V, kernel::Layout::pairs>(x);
+        T rest[2 * V] = {};
+        std::copy_n(x, 2 * count, rest);
+        return kernel::load_complex<T, V, kernel::Layout::pairs>(rest);
+    }
 
-/// Out of line, where the lanes have all registers to themselves.
-template <class Terms>
-[[gnu::noinline]] terms_of<Terms> sums_of_block(std::size_t begin, std::size_t end, Terms terms) {
-    using Sums = terms_of<Terms>;
-    using T = typename Sums::value_type;
-    constexpr std::size_t count = std::tuple_size_v<Sums>;
-    std::array<std::array<T, lanes<T>>, count> partial{};
-    const auto gather = [&](std::size_t i, std::size_t lane) {
-        const Sums term = terms(i);
-        for (std::size_t s = 0; s < count; ++s) partial[s][lane] += term[s];
+    /// The places of the points within their block.
+    kernel::Lanes<T> places() const {
+        kernel::Lanes<T> lane{};
+        for (int k = 0; k < V; ++k) lane[k] = T(k);
+        return (lane + T(int(ahead))) + T(int(step));
+    }
+    /// v, with `otherwise` in the lanes that hold no point.
+    kernel::Lanes<T> only_points(kernel::Lanes<T> v,
+                                 kernel::Lanes<T> otherwise = kernel::Lanes<T>{}) const {
+        if constexpr (whole) return v;
+        kernel::Lanes<T> lane{};
+        for (int k = 0; k < V; ++k) lane[k] = T(k);
+        return lane < T(int(count)) ? v : otherwise;
+    }
+};
+
+template <class T, class Terms>
+using terms_of = std::invoke_result_t<Terms, Points<T, true>>;
+
+/// Accumulators for each of `sums`: as many as hide the latency of an addition and still leave
+/// registers to what is added.
+constexpr int chains(std::size_t sums) {
+    constexpr std::size_t registers = kernel::register_bytes == 64 ? 24 : 12;
+    return int(std::bit_floor(std::clamp<std::size_t>(registers / sums, 1, 8)));
+}
+
+/// The sums over the points [begin, end), a lane each.
+template <class T, class Terms>
+WAVKIT_LANES terms_of<T, Terms> sums_of_block(std::size_t begin, std::size_t end, Terms terms) {
+    using Sums = terms_of<T, Terms>;
+    constexpr std::size_t sums = std::tuple_size_v<Sums>;
+    constexpr int V = kernel::lanes<T>, C = chains(sums);
+    Sums partial[C];
+    for (Sums& chain : partial) chain.fill(kernel::Lanes<T>{});
+    const auto gather = [&](Sums& to, auto points) {
+        const Sums term = terms(points);
+        for (std::size_t s = 0; s < sums; ++s) to[s] += points.only_points(term[s]);
     };
     std::size_t i = begin;
-    for (; end - i >= lanes<T>; i += lanes<T>) {
-        for (std::size_t lane = 0; lane < lanes<T>; ++lane) gather(i + lane, lane);
+    for (; end - i >= std::size_t(C * V); i += C * V) {
+        kernel::unrolled<C>([&](auto c) {
+            gather(partial[c], Points<T, true>{i + c * V, i - begin, c * V});
+        });
     }
-    for (std::size_t lane = 0; i + lane < end; ++lane) gather(i + lane, lane);
-
-    Sums sums{};
-    for (std::size_t s = 0; s < count; ++s) {
-        for (const T lane : partial[s]) sums[s] += lane;
+    kernel::unrolled<C - 1>([&](auto c) {
+        if (end - i < std::size_t(V)) return;
+        gather(partial[c], Points<T, true>{i, i - begin, 0});
+        i += V;
+    });
+    if (i < end) gather(partial[0], Points<T, false>{i, i - begin, 0, end - i});
+    for (int span = C / 2; span > 0; span /= 2) {
+        for (int c = 0; c < span; ++c) {
+            for (std::size_t s = 0; s < sums; ++s) partial[c][s] += partial[c + span][s];
+        }
     }
-    return sums;
+    return partial[0];
 }
 
-/// The sums over the points [0, n) of `terms(i)`, an array of one or more scalars.
-template <class Terms>
-terms_of<Terms> blockwise_sums(std::size_t n, Terms terms) {
-    terms_of<Terms> sums{};
+/// a + b, and in `lost` besides what rounding takes from it (D. E. Knuth's sum of two).
+template <class V>
+WAVKIT_LANES V add(V a, V b, V& lost) {
+    const V sum = a + b, added = sum - a;
+    lost += (a - (sum - added)) + (b - added);
+    return sum;
+}
+
+/// The lanes [First, First + count / 2) of v.
+template <int First, class V, std::size_t... I>
+WAVKIT_LANES auto half(V v, std::index_sequence<I...>) {
+    return __builtin_shufflevector(v, v, int(I) + First...);
+}
+
+template <class V>
+WAVKIT_LANES auto low_half(V v) {
+    return half<0>(v, std::make_index_sequence<kernel::count<V> / 2>{});
+}
+
+template <class V>
+WAVKIT_LANES auto high_half(V v) {
+    return half<kernel::count<V> / 2>(v, std::make_index_sequence<kernel::count<V> / 2>{});
+}
+
+/// The lanes of v joined two and two by `join`.
+template <class V, class Join>
+WAVKIT_LANES kernel::Lane<V> folded(V v, Join join) {
+    if constexpr (kernel::count<V> == 2) {
+        return join(v[0], v[1]);
+    } else {
+        return folded(join(low_half(v), high_half(v)), join);
+    }
+}
+
+/// The sum of the lanes of `total` and of what was lost on the way. Nothing is to be made up for
+/// beside an infinity.
+template <class V>
+WAVKIT_LANES kernel::Lane<V> folded_sum(V total, V lost) {
+    if constexpr (kernel::count<V> == 2) {
+        kernel::Lane<V> rest = lost[0] + lost[1];
+        const auto sum = add(total[0], total[1], rest);
+        return std::isnan(rest) ? sum : sum + rest;
+    } else {
+        auto rest = low_half(lost) + high_half(lost);
+        const auto sum = add(low_half(total), high_half(total), rest);
+        return folded_sum(sum, rest);
+    }
+}
+
+/// The sums over the points [0, n) of `terms(points)`, an array of vectors for as many points; it
+/// reads them from the signals x by points(x).
+template <class T, class Terms>
+auto blockwise_sums(std::size_t n, Terms terms) {
+    using Sums = terms_of<T, Terms>;
+    constexpr std::size_t sums = std::tuple_size_v<Sums>;
+    std::array<T, sums> result{};
+    if (n <= block_points) {
+        const Sums only = sums_of_block<T>(0, n, terms);
+        for (std::size_t s = 0; s < sums; ++s)
+            result[s] = folded(only[s], [](auto a, auto b) { return a + b; });
+        return result;
+    }
+    Sums total, lost;
+    total.fill(kernel::Lanes<T>{});
+    lost.fill(kernel::Lanes<T>{});
     for (std::size_t begin = 0; begin < n; begin += block_points) {
-        const auto partial = sums_of_block(begin, std::min(n, begin + block_points), terms);
-        for (std::size_t s = 0; s < sums.size(); ++s) sums[s] += partial[s];
+        const Sums partial = sums_of_block<T>(begin, std::min(n, begin + block_points), terms);
+        for (std::size_t s = 0; s < sums; ++s) total[s] = add(total[s], partial[s], lost[s]);
     }
-    return sums;
+    for (std::size_t s = 0; s < sums; ++s) result[s] = folded_sum(total[s], lost[s]);
+    return result;
 }
 
+/// Squares whose sum is no larger than this are of values within [-big, big].
+template <Record R>
+constexpr scalar<R> big_squared = limits<R>::big* limits<R>::big;
+
+/// saturated() of a vector.
+template <Record R, class V>
+WAVKIT_LANES V saturated_lanes(V v) {
+    constexpr auto big = limits<R>::big;
+    return kernel::at_most(kernel::at_least(v, kernel::all<V>(-big)), kernel::all<V>(big));
+}
+
+/// The median of the middle, first and last sample: near the others even where one of the three is
+/// an outlier.
+template <class T, class Sample>
+T median_of_three(std::size_t n, Sample sample) {
+    const T a = sample(n / 2), b = sample(0), c = sample(n - 1);
+    return std::max(std::min(a, b), std::min(std::max(a, b), c));
+}
+
+/// Whether a shift lies so far off the mean, by `square` from it, that the mean of the squares
+/// about it loses digits of the variance.
+template <class T>
+bool is_poor_shift(T square, T mean_of_squares) {
+    return square > 4 * (mean_of_squares - square);
+}
+
+/// capped_magnitude_squared() of a vector.
+template <Record R, class Z>
+WAVKIT_LANES auto capped_lanes(Z z) {
+    constexpr auto big = limits<R>::big;
+    using V = decltype(z.re);
+    const V squares = z.re * z.re + z.im * z.im;
+    const V capped = kernel::abs(z.re) > big ? kernel::all<V>(big) : squares;
+    return kernel::abs(z.im) > big ? kernel::all<V>(big) : capped;
+}
+
+template <class V>
+WAVKIT_LANES V square(V v) {
+    return v * v;
+}
+
+}  // namespace
 }  // namespace wavkit

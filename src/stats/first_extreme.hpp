@@ -4,40 +4,93 @@
 #include "stats/blockwise.hpp"
 
 namespace wavkit {
+namespace {
 
-/// The winner among `start` and the keys of the points [begin, end).
-template <class T, class Key, class Beats>
-T winner_of_block(std::size_t begin, std::size_t end, T start, Key key, Beats beats) {
-    std::array<T, lanes<T>> best;
-    best.fill(start);
-    const auto contend = [&](std::size_t i, std::size_t lane) {
-        const T candidate = key(i);
-        best[lane] = beats(candidate, best[lane]) ? candidate : best[lane];
-    };
-    std::size_t i = begin;
-    for (; end - i >= lanes<T>; i += lanes<T>) {
-        for (std::size_t lane = 0; lane < lanes<T>; ++lane) contend(i + lane, lane);
+/// The order of a search: what a key must be to beat another. A key that is NaN beats nothing.
+struct Smallest {
+    template <class T>
+    static constexpr bool beats(T a, T b) {
+        return a < b;
     }
-    for (std::size_t lane = 0; i + lane < end; ++lane) contend(i + lane, lane);
-    return *std::ranges::min_element(best, beats);
+    template <class V>
+    WAVKIT_LANES static V better(V best, V v) {
+        return kernel::at_most(best, v);
+    }
+};
+
+struct Largest {
+    template <class T>
+    static constexpr bool beats(T a, T b) {
+        return a > b;
+    }
+    template <class V>
+    WAVKIT_LANES static V better(V best, V v) {
+        return kernel::at_least(best, v);
+    }
+};
+
+/// The best among `best` and the keys of the points [begin, end), a lane each.
+template <class Order, class T, class Key>
+WAVKIT_LANES kernel::Lanes<T> best_of(std::size_t begin, std::size_t end, kernel::Lanes<T> best,
+                                      Key key) {
+    using V = kernel::Lanes<T>;
+    constexpr std::size_t lanes = kernel::lanes<T>, C = 8;
+    V chain[C];
+    std::ranges::fill(chain, best);
+    std::size_t i = begin;
+    for (; end - i >= C * lanes; i += C * lanes) {
+        kernel::unrolled<C>([&](auto c) {
+            chain[c] = Order::better(chain[c], key(Points<T, true>{i + c * lanes}));
+        });
+    }
+    for (; end - i >= lanes; i += lanes)
+        chain[0] = Order::better(chain[0], key(Points<T, true>{i}));
+    if (i < end) {
+        const Points<T, false> rest{i, 0, 0, end - i};
+        chain[0] = rest.only_points(Order::better(chain[0], key(rest)), chain[0]);
+    }
+    for (std::size_t span = C / 2; span > 0; span /= 2) {
+        for (std::size_t c = 0; c < span; ++c) chain[c] = Order::better(chain[c], chain[c + span]);
+    }
+    return chain[0];
+}
+
+/// The best among `start` and the keys of the points [0, n).
+template <class Order, class T, class Key>
+T best_key(std::size_t n, T start, Key key) {
+    const auto best = best_of<Order, T>(0, n, kernel::all<kernel::Lanes<T>>(start), key);
+    return folded(best, [](auto a, auto b) {
+        if constexpr (std::is_same_v<decltype(a), T>)
+            return Order::beats(b, a) ? b : a;
+        else
+            return Order::better(a, b);
+    });
+}
+
+/// The first of the points [0, n) with the key `wanted`; n when there is none.
+template <class T, class Key>
+std::size_t first_with_key(std::size_t n, T wanted, Key key) {
+    constexpr std::size_t V = kernel::lanes<T>, step = 4 * V;
+    std::size_t i = 0;
+    for (; n - i >= step; i += step) {
+        kernel::Lanes<T> unequal = kernel::all<kernel::Lanes<T>>(T(1));
+        for (std::size_t k = 0; k < step; k += V)
+            unequal = key(Points<T, true>{i + k}) == wanted ? kernel::Lanes<T>{} : unequal;
+        if (kernel::any_below(unequal, T(1))) break;
+    }
+    for (; i < n; ++i) {
+        if (key(Points<T, false>{i, 0, 0, 1})[0] == wanted) break;
+    }
+    return i;
 }
 
 /// The first of the points [0, n) whose key beats `start` and is beaten by no other; n when there
-/// is none. A key that is NaN beats nothing.
-template <class T, class Key, class Beats>
-std::size_t first_extreme(std::size_t n, T start, Key key, Beats beats) {
-    constexpr std::size_t searched_points = 256;  // few: the last block is walked twice
-    T best = start;
-    std::size_t at = n;
-    for (std::size_t begin = 0; begin < n; begin += searched_points) {
-        const std::size_t end = std::min(n, begin + searched_points);
-        const T winner = winner_of_block(begin, end, best, key, beats);
-        if (!beats(winner, best)) continue;
-        best = winner;
-        at = begin;
-    }
-    while (at < n && key(at) != best) ++at;
-    return at;
+/// is none.
+template <class Order, class T, class Key>
+std::size_t first_extreme(std::size_t n, T start, Key key) {
+    const T best = best_key<Order>(n, start, key);
+    return Order::beats(best, start) ? first_with_key(n, best, key) : n;
 }
 
+}  // namespace
 }  // namespace wavkit

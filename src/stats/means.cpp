@@ -34,15 +34,40 @@ int geometric_mean(const R* x, R* out) {
                       : store(out, geometric_mean<R>(values(x)));
 }
 
-/// A zero makes the mean 0; reciprocals that cancel give the large value.
+/// 1 / v; of v that are 0, infinite or nearly so NaN or nothing may come where it is not divided.
+template <class V>
+WAVKIT_LANES V near_reciprocal(V v) {
+    using T = kernel::Lane<V>;
+#if defined(__AVX512F__)
+    V near;
+    if constexpr (kernel::is_double<V>)
+        near = (V)_mm512_maskz_rcp14_pd(0xff, (__m512d)v);
+    else
+        near = (V)_mm512_maskz_rcp14_ps(0xffff, (__m512)v);
+    if constexpr (kernel::is_double<V>)
+        near = kernel::mul_add(kernel::mul_add(-v, near, T(1)), near, near);
+    return kernel::mul_add(kernel::mul_add(-v, near, T(1)), near, near);
+#endif
+    return T(1) / v;
+}
+
+/// A zero makes the mean 0; reciprocals that cancel give the large value. A sum that is finite and
+/// not tiny has met neither a zero nor what the reciprocal does not serve.
 template <Record R>
 scalar<R> harmonic_mean(std::span<const scalar<R>> x) {
     using T = scalar<R>;
-    const auto [sum, zeros] = blockwise_sums(x.size(), [=](std::size_t i) {
-        return std::array{1 / x[i], T(x[i] == 0)};
+    constexpr T tiny = limits<R>::floor / std::numeric_limits<T>::epsilon();
+    const T n = T(x.size());
+    const auto [near] = blockwise_sums<T>(
+        x.size(), [v = x.data()](auto points) { return std::array{near_reciprocal(points(v))}; });
+    if (std::isfinite(near) && std::fabs(near) > n * tiny) return n / near;
+    const auto [sum, zeros] = blockwise_sums<T>(x.size(), [v = x.data()](auto points) {
+        const auto value = points(v);
+        const auto one = kernel::all<kernel::Lanes<T>>(T(1));
+        return std::array{T(1) / value, value == T(0) ? one : one - one};
     });
     if (x.empty() || zeros > 0) return 0;
-    return sum == 0 ? limits<R>::big : T(x.size()) / sum;
+    return sum == 0 ? limits<R>::big : n / sum;
 }
 
 /// conj(z) / |z|^2, with the large value in place of a division by 0.
@@ -54,11 +79,16 @@ Bin<scalar<R>> reciprocal(Bin<scalar<R>> z) {
 
 template <Record R>
 Bin<scalar<R>> harmonic_mean(std::span<const Bin<scalar<R>>> x) {
-    const auto [re, im] = blockwise_sums(x.size(), [=](std::size_t i) {
-        const auto inverse = reciprocal<R>(saturated<R>(x[i]));
-        return std::array{inverse.re, inverse.im};
+    using T = scalar<R>;
+    using V = kernel::Lanes<T>;
+    const auto [re, im] = blockwise_sums<T>(x.size(), [z = x.data()](auto points) {
+        const auto point = points(z);
+        const V a = saturated_lanes<R>(point.re), b = saturated_lanes<R>(point.im);
+        const V squares = a * a + b * b;
+        const V factor = squares <= T(0) ? kernel::all<V>(limits<R>::big) : T(1) / squares;
+        return std::array{a * factor, -b * factor};
     });
-    return reciprocal<R>({re, im}) * scalar<R>(x.size());
+    return reciprocal<R>({re, im}) * T(x.size());
 }
 
 template <Record R>

@@ -1,6 +1,4 @@
 // The largest or smallest point of a signal, refined between the samples.
-#include <functional>
-
 #include "stats/first_extreme.hpp"
 
 namespace wavkit {
@@ -21,21 +19,21 @@ scalar<R> height_at(const R* x, std::size_t i) {
 }
 
 /// The first of the most extreme points; the first point of all when none exceeds `start`.
-template <Record R, class Beats>
-std::size_t search(const R* x, scalar<R> start, Beats beats) {
+template <class Order, Record R>
+std::size_t search(const R* x, scalar<R> start) {
     const std::size_t n = length(x);
-    const auto square = [z = bins(x)](std::size_t i) { return capped_magnitude_squared<R>(z[i]); };
-    const auto value = [v = x->data](std::size_t i) { return v[i]; };
+    const auto square = [z = bins(x).data()](auto points) { return capped_lanes<R>(points(z)); };
+    const auto value = [v = x->data](auto points) { return points(v); };
     const std::size_t at =
-        x->complex ? first_extreme(n, start, square, beats) : first_extreme(n, start, value, beats);
+        x->complex ? first_extreme<Order>(n, start, square) : first_extreme<Order>(n, start, value);
     return at < n ? at : 0;
 }
 
 template <Record R>
 std::size_t select(const R* x, unsigned flags, int index) {
     if (flags & DSP_PEAK_AT_INDEX) return std::size_t(std::clamp(index, 0, x->points - 1));
-    return flags & DSP_PEAK_SMALLEST ? search(x, limits<R>::big, std::less<>())
-                                     : search(x, -limits<R>::big, std::greater<>());
+    return flags & DSP_PEAK_SMALLEST ? search<Smallest>(x, limits<R>::big)
+                                     : search<Largest>(x, -limits<R>::big);
 }
 
 /// Vertex of the parabola through three points.

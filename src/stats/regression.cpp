@@ -7,8 +7,21 @@
 namespace wavkit {
 namespace {
 
-/// The abscissae of a real signal begin anew after so many points.
-constexpr std::size_t ramp_points = 2048;
+template <class T>
+using Table = std::array<T, 20>;
+
+template <class T>
+struct Axis {
+    T mean, variance;
+};
+
+/// Means, variances and covariance of x and y, and the mean squares of what the line of y on x and
+/// that of x on y leave over.
+template <class T>
+struct Fit {
+    Axis<T> x, y;
+    T covariance, r, y_residue, x_residue;
+};
 
 /// Where the sums are taken from: near the means, so that the squares lose few digits.
 template <class T>
@@ -16,69 +29,149 @@ struct Origin {
     T x, y;
 };
 
+/// Means of dx, dy, dx^2, dx dy and dy^2, for deviations from an origin.
 template <class T>
-struct Sums {
+struct Means {
     T x, y, xx, xy, yy;
 };
-
-template <class T>
-struct Axis {
-    T mean, variance;
-};
-
-template <class T>
-using Table = std::array<T, 20>;
-
-template <Record R>
-scalar<R> spacing(const R* data) {
-    return data->delta == scalar<R>(0) ? scalar<R>(1) : data->delta;
-}
-
-template <Record R>
-Origin<scalar<R>> origin(const R* data) {
-    using T = scalar<R>;
-    const std::size_t n = length(data);
-    if (n == 0) return {0, 0};
-    if (data->complex) {
-        const auto z = bins(data);
-        return {(z[n / 2].re + z[0].re + z[n - 1].re) / 3,
-                (z[n / 2].im + z[0].im + z[n - 1].im) / 3};
-    }
-    const auto y = values(data);
-    return {T(n - 1) * spacing(data) * T(0.5), (y[n / 2] + y[0] + y[n - 1]) / 3};
-}
-
-template <Record R>
-Sums<scalar<R>> sums(const R* data, Origin<scalar<R>> from) {
-    using T = scalar<R>;
-    const auto terms = [](T dx, T dy) { return std::array{dx, dy, dx * dx, dx * dy, dy * dy}; };
-    std::array<T, 5> s;
-    if (data->complex) {
-        s = blockwise_sums(length(data), [=, z = bins(data).data()](std::size_t i) {
-            return terms(saturated<R>(z[i].re - from.x), saturated<R>(z[i].im - from.y));
-        });
-    } else {
-        const T delta = spacing(data);
-        s = blockwise_sums(length(data), [=, y = data->data](std::size_t i) {
-            return terms(T(int(i % ramp_points)) * delta - from.x, saturated<R>(y[i] - from.y));
-        });
-    }
-    return {s[0], s[1], s[2], s[3], s[4]};
-}
 
 template <class T>
 T within_one(T value) {
     return std::clamp(value, T(-1), T(1));
 }
 
+/// The fit with deviations (dx, dy) as pairs(points) gives them. Where the line takes most of the
+/// variance, 1 - r^2 says little of the rest, and a second pass sums the residuals themselves.
+template <class T>
+Fit<T> fit_of(std::size_t points, Means<T> m, Origin<T> from, bool residues, auto pairs) {
+    const Axis<T> x{m.x + from.x, std::max(m.xx - m.x * m.x, T(0))};
+    const Axis<T> y{m.y + from.y, std::max(m.yy - m.y * m.y, T(0))};
+    const T covariance = m.xy - m.x * m.y;
+    const bool flat = x.variance == T(0) || y.variance == T(0);
+    const T r =
+        flat ? T(0) : within_one(covariance / (std::sqrt(x.variance) * std::sqrt(y.variance)));
+    const T unexplained = 1 - r * r;
+    Fit<T> fit{x, y, covariance, r, unexplained * y.variance, unexplained * x.variance};
+    if (!residues || !(unexplained < T(0.25))) return fit;
+    const T slope = covariance / x.variance, inverse = covariance / y.variance;
+    const auto [of_y, of_x] = blockwise_sums<T>(points, [=](auto at) {
+        const auto d = pairs(at);
+        const auto dx = d.re - m.x, dy = d.im - m.y;
+        return std::array{square(dy - slope * dx), square(dx - inverse * dy)};
+    });
+    fit.y_residue = of_y / T(points);
+    fit.x_residue = of_x / T(points);
+    return fit;
+}
+
+template <class T>
+Means<T> means_of_pairs(std::size_t n, auto pairs) {
+    const auto s = blockwise_sums<T>(n, [=](auto points) {
+        const auto d = pairs(points);
+        return std::array{d.re, d.im, d.re * d.re, d.re * d.im, d.im * d.im};
+    });
+    return {s[0] / T(n), s[1] / T(n), s[2] / T(n), s[3] / T(n), s[4] / T(n)};
+}
+
+/// While squares add up to a quarter of the large value's square, the signal spans less than the
+/// large value, and no deviation saturates. Otherwise they do, about the mean of three samples.
+template <Record R>
+Fit<scalar<R>> fit_pairs(const R* data, bool residues) {
+    using T = scalar<R>;
+    const std::size_t n = length(data);
+    const auto z = bins(data).data();
+    const auto attempt = [=](Origin<T> from, auto&& use) {
+        const auto pairs = [=](auto points) {
+            auto d = points(z);
+            return d.re -= from.x, d.im -= from.y, d;
+        };
+        return use(from, means_of_pairs<T>(n, pairs), pairs);
+    };
+    const auto finish = [=](Origin<T> from, Means<T> m, auto pairs) {
+        return fit_of(n, m, from, residues, pairs);
+    };
+    const auto re = [=](std::size_t i) { return z[i].re; };
+    const auto im = [=](std::size_t i) { return z[i].im; };
+    const Origin<T> near = {median_of_three<T>(n, re), median_of_three<T>(n, im)};
+    return attempt(near, [=](Origin<T> from, Means<T> m, auto pairs) {
+        if (!(std::max(m.xx, m.yy) * T(n) <= big_squared<R> / 4)) {
+            const Origin<T> k = {(re(n / 2) + re(0) + re(n - 1)) / 3,
+                                 (im(n / 2) + im(0) + im(n - 1)) / 3};
+            const auto held = [=](auto points) {
+                auto d = points(z);
+                return d.re = saturated_lanes<R>(d.re - k.x), d.im = saturated_lanes<R>(d.im - k.y),
+                       d;
+            };
+            return finish(k, means_of_pairs<T>(n, held), held);
+        }
+        if (is_poor_shift(m.x * m.x, m.xx) || is_poor_shift(m.y * m.y, m.yy))
+            return attempt({from.x + m.x, from.y + m.y}, finish);
+        return finish(from, m, pairs);
+    });
+}
+
+template <Record R>
+scalar<R> spacing(const R* data) {
+    return data->delta == scalar<R>(0) ? scalar<R>(1) : data->delta;
+}
+
+/// The abscissae of a real signal: a ramp that begins anew after every block, about its middle.
+struct Ramp {
+    double points, middle, mean, mean_square;
+
+    explicit Ramp(std::size_t n)
+        : points(double(n)), middle(0.5 * (double(std::min(n, block_points)) - 1)) {
+        constexpr double p = double(block_points);
+        const double whole = double(n / block_points), rest = double(n % block_points);
+        const double off = 0.5 * (rest - 1) - middle;
+        mean = rest * off / points;
+        mean_square =
+            (whole * p * (p * p - 1) / 12 + rest * ((rest * rest - 1) / 12 + off * off)) / points;
+    }
+};
+
+template <Record R>
+Fit<scalar<R>> fit_ramp(const R* data, bool residues) {
+    using T = scalar<R>;
+    const std::size_t n = length(data);
+    const Ramp ramp(n);
+    const T delta = spacing(data), middle = T(ramp.middle);
+    const auto y = data->data;
+    const auto sample = [=](std::size_t i) { return y[i]; };
+    const auto about = [=](T shift, auto deviation) {
+        const auto [s, xy, yy] = blockwise_sums<T>(n, [=](auto points) {
+            const auto dy = deviation(points(y), shift);
+            return std::array{dy, (points.places() - middle) * dy, dy * dy};
+        });
+        return Means<T>{T(ramp.mean) * delta, s / T(n), T(ramp.mean_square) * delta * delta,
+                        xy / T(n) * delta, yy / T(n)};
+    };
+    const auto finish = [=](T shift, Means<T> m, auto deviation) {
+        return fit_of<T>(n, m, {middle * delta, shift}, residues, [=](auto points) {
+            return kernel::Complexes<T, kernel::lanes<T>>{(points.places() - middle) * delta,
+                                                          deviation(points(y), shift)};
+        });
+    };
+    using V = kernel::Lanes<T>;
+    const auto plain = [](V v, T shift) { return v - shift; };
+    const auto held = [](V v, T shift) { return saturated_lanes<R>(v - shift); };
+    const T near = median_of_three<T>(n, sample);
+    const auto m = about(near, plain);
+    if (!(m.yy * T(n) <= big_squared<R> / 4)) {
+        const T k = (y[n / 2] + y[0] + y[n - 1]) / 3;
+        return finish(k, about(k, held), held);
+    }
+    if (is_poor_shift(m.y * m.y, m.yy)) return finish(near + m.y, about(near + m.y, plain), plain);
+    return finish(near, m, plain);
+}
+
 /// The line of `v` on `u`: slope, intercept, residual variance, variances of slope and intercept,
 /// their covariance and their correlation.
 template <Record R, class T = scalar<R>>
-std::array<T, 7> line(Axis<T> u, Axis<T> v, T covariance, T r, T n) {
+std::array<T, 7> line(Axis<T> u, Axis<T> v, T covariance, T residue, T n) {
     constexpr T big = limits<R>::big;
     const T freedom = n < T(3) ? T(0) : n / (n - 2);
     const T square = u.mean * u.mean + u.variance;  // mean square of u
-    const T residue = std::max((1 - r * r) * v.variance, T(0));
     const bool upright = u.variance == T(0);
     const T uncertainty = upright ? big : residue / (n * u.variance);
     return {upright ? big : covariance / u.variance,
@@ -90,33 +183,25 @@ std::array<T, 7> line(Axis<T> u, Axis<T> v, T covariance, T r, T n) {
             square == T(0) ? T(0) : within_one(-u.mean / std::sqrt(square))};
 }
 
-/// Both lines, then means, sample variances, sample covariance and correlation of x and y.
+/// Both lines, then means, sample variances, sample covariance and correlation of x and y. Of a
+/// single point no more than where it lies.
 template <Record R, class T = scalar<R>>
-Table<T> fit(const R* data) {
-    const T n = T(length(data));
-    const auto from = origin(data);
-    const auto s = sums(data, from);
+Table<T> fit(const R* data, bool residues) {
+    const std::size_t points = length(data);
     Table<T> table{};
-    if (n <= T(1)) {
-        table[1] = table[15] = s.y + from.y;
-        table[8] = table[14] = s.x + from.x;
+    if (points == 0) return table;
+    const T n = T(points);
+    const Fit<T> f = data->complex ? fit_pairs(data, residues) : fit_ramp(data, residues);
+    if (points == 1) {
+        table[1] = table[15] = f.y.mean;
+        table[8] = table[14] = f.x.mean;
         return table;
     }
-    const auto variance = [n](T sum, T squares) {
-        const T mean = sum / n;
-        return std::max(squares / n - mean * mean, T(0));
-    };
-    const Axis<T> x{s.x / n + from.x, variance(s.x, s.xx)};
-    const Axis<T> y{s.y / n + from.y, variance(s.y, s.yy)};
-    const T covariance = s.xy / n - (s.x / n) * (s.y / n);
-    const bool flat = x.variance == T(0) || y.variance == T(0);
-    const T r =
-        flat ? T(0) : within_one(covariance / (std::sqrt(x.variance) * std::sqrt(y.variance)));
     const T sample = n / (n - 1);
-    std::ranges::copy(line<R>(x, y, covariance, r, n), table.begin());
-    std::ranges::copy(line<R>(y, x, covariance, r, n), table.begin() + 7);
-    std::ranges::copy(std::array{x.mean, y.mean, sample * x.variance, sample * y.variance,
-                                 sample * covariance, r},
+    std::ranges::copy(line<R>(f.x, f.y, f.covariance, f.y_residue, n), table.begin());
+    std::ranges::copy(line<R>(f.y, f.x, f.covariance, f.x_residue, n), table.begin() + 7);
+    std::ranges::copy(std::array{f.x.mean, f.y.mean, sample * f.x.variance, sample * f.y.variance,
+                                 sample * f.covariance, f.r},
                       table.begin() + 14);
     return table;
 }
@@ -132,13 +217,13 @@ int store(std::span<const scalar<R>> entries, R* out) {
 
 template <Record R>
 int regress(const R* data, R* out) {
-    const auto table = fit(data);
+    const auto table = fit(data, false);
     return store<R>(std::span(table).first(2), out);
 }
 
 template <Record R>
 int regress_in_full(const R* data, R* out) {
-    const auto table = fit(data);
+    const auto table = fit(data, true);
     out->delta = 1;
     return store<R>(table, out);
 }

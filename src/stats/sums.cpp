@@ -7,14 +7,16 @@ namespace {
 
 template <Record R>
 int sum(const R* x, R* out) {
+    using T = scalar<R>;
     if (x->complex) {
-        const auto [re, im] = blockwise_sums(length(x), [z = bins(x)](std::size_t i) {
-            return std::array{z[i].re, z[i].im};
+        const auto [re, im] = blockwise_sums<T>(length(x), [z = bins(x).data()](auto points) {
+            const auto point = points(z);
+            return std::array{point.re, point.im};
         });
-        return store(out, Bin<scalar<R>>{re, im});
+        return store(out, Bin<T>{re, im});
     }
     const auto [total] =
-        blockwise_sums(length(x), [v = values(x)](std::size_t i) { return std::array{v[i]}; });
+        blockwise_sums<T>(length(x), [v = x->data](auto points) { return std::array{points(v)}; });
     return store(out, total);
 }
 
@@ -27,18 +29,31 @@ int mean(const R* x, R* out) {
     return 0;
 }
 
+/// Values in range have squares that add up to no more than the square of the large value. Only
+/// beyond that each is looked at.
+template <Record R>
+scalar<R> energy(const R* x) {
+    using T = scalar<R>;
+    const std::size_t scalars = used(x);
+    const auto [plain] = blockwise_sums<T>(
+        scalars, [v = x->data](auto points) { return std::array{square(points(v))}; });
+    if (plain <= big_squared<R>) return plain;
+    constexpr T big = limits<R>::big;
+    if (x->complex) {
+        return blockwise_sums<T>(length(x), [z = bins(x).data()](auto points) {
+            return std::array{capped_lanes<R>(points(z))};
+        })[0];
+    }
+    return blockwise_sums<T>(scalars, [v = x->data](auto points) {
+        const auto value = points(v);
+        return std::array{kernel::abs(value) > big ? kernel::all<kernel::Lanes<T>>(big)
+                                                   : square(value)};
+    })[0];
+}
+
 template <Record R>
 int energy(const R* x, R* out) {
-    if (x->complex) {
-        const auto [total] = blockwise_sums(length(x), [z = bins(x)](std::size_t i) {
-            return std::array{capped_magnitude_squared<R>(z[i])};
-        });
-        return store(out, total);
-    }
-    const auto [total] = blockwise_sums(length(x), [v = values(x)](std::size_t i) {
-        return std::array{out_of_range<R>(v[i]) ? limits<R>::big : v[i] * v[i]};
-    });
-    return store(out, total);
+    return store(out, energy(x));
 }
 
 template <Record R>
