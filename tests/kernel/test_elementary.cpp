@@ -5,6 +5,9 @@
 #include <limits>
 #include <random>
 #include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
 
 #include "kernel/elementary.hpp"
 
