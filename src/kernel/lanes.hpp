@@ -18,18 +18,6 @@
 namespace wavkit::kernel {
 namespace {
 
-#if defined(__AVX512F__) && defined(__AVX512DQ__) && defined(__AVX512VL__)
-inline constexpr int register_bytes = 64;
-#elif defined(__AVX2__)
-inline constexpr int register_bytes = 32;
-#else
-inline constexpr int register_bytes = 16;
-#endif
-
-/// Values that a register of this instruction set holds.
-template <class T>
-inline constexpr int lanes = register_bytes / int(sizeof(T));
-
 template <class T>
 using Lanes = Vec<T, lanes<T>>;
 
