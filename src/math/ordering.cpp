@@ -1,6 +1,7 @@
 // Order of the points: sorting, reversal, dropping the first ones.
 #include <algorithm>
 
+#include "kernel/lanes.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
@@ -45,13 +46,35 @@ int sort(R* x) {
     return 0;
 }
 
+/// Lanes in groups of `Width` from the last group to the first.
+template <int V, int Width>
+struct GroupsBackwards {
+    static constexpr int lane(int i) { return V - Width - i / Width * Width + i % Width; }
+};
+
+/// Vectors from both ends change places until fewer than two are left between them.
+template <int Width, class T>
+void reverse_groups(T* first, std::size_t n) {
+    constexpr int lanes = kernel::lanes<T>;
+    T* last = first + n;
+    const auto backwards = [](auto v) {
+        return kernel::shuffle<lanes, GroupsBackwards<lanes, Width>>(v, v);
+    };
+    for (; last - first >= 2 * lanes; first += lanes) {
+        last -= lanes;
+        const auto a = kernel::load<T, lanes>(first), b = kernel::load<T, lanes>(last);
+        kernel::store<T, lanes>(first, backwards(b));
+        kernel::store<T, lanes>(last, backwards(a));
+    }
+    for (; last - first >= 2 * Width; first += Width) {
+        last -= Width;
+        std::swap_ranges(first, first + Width, last);
+    }
+}
+
 template <Record R>
 int reverse(R* x) {
-    if (x->complex) {
-        std::ranges::reverse(bins(x));
-    } else {
-        std::ranges::reverse(values(x));
-    }
+    x->complex ? reverse_groups<2>(x->data, used(x)) : reverse_groups<1>(x->data, used(x));
     return 0;
 }
 
