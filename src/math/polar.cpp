@@ -20,7 +20,10 @@ int multiply_by_i(R* x) {
 template <Record R>
 int scale_complex(R* x, Bin<scalar<R>> factor) {
     if (!x->complex) return make_complex(x, [factor](scalar<R> v) { return factor * v; });
-    for (auto& z : bins(x)) z = z * factor;
+    using T = scalar<R>;
+    using V = kernel::Lanes<T>;
+    const Samples<T> factors{kernel::all<V>(factor.re), kernel::all<V>(factor.im)};
+    kernel::map_complex(x->data, x->data, length(x), [=](Samples<T> z) { return z * factors; });
     return 0;
 }
 
