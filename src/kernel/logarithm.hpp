@@ -46,28 +46,58 @@ WAVKIT_LANES V log1p_tail(V f) {
     return mul_add(s, mul_add(z, rest, h), -h);
 }
 
+/// k ln 2 + log(1 + f) for -0.25 <= f < 0.5.
+template <class V>
+WAVKIT_LANES V natural_logarithm(V k, V f) {
+    const V whole = k * ln2_high<V>;  // exact
+    const V sum = whole + f, lost = (whole - sum) + f;
+    return sum + (lost + mul_add(k, ln2_low<V>, log1p_tail(f)));
+}
+
+/// k log10 2 + log10(1 + f) for -0.25 <= f < 0.5.
+template <class V>
+WAVKIT_LANES V decimal_logarithm(V k, V f) {
+    using T = Lane<V>;
+    constexpr T log10_e = T(0.4342944819032518276511L);
+    constexpr T log10_e_low = T(0.4342944819032518276511L - (long double)log10_e);
+    const V part = f * log10_e;
+    const V part_lost = mul_add(log1p_tail(f), log10_e,
+                                mul_add(f, log10_e_low, product_minus(f, all<V>(log10_e), part)));
+    const V whole = k * log10_2_high<V>;  // exact
+    const V sum = whole + part, lost = (whole - sum) + part;
+    return sum + (lost + mul_add(k, log10_2_low<V>, part_lost));
+}
+
 template <class V>
 WAVKIT_LANES V log(V x) {
     const auto [number, k] = parts(x);
-    const V f = number - Lane<V>(1);
-    const V whole = k * ln2_high<V>;  // exact
-    const V sum = whole + f, lost = (whole - sum) + f;
-    return mend_logarithm(x, sum + (lost + mul_add(k, ln2_low<V>, log1p_tail(f))));
+    return mend_logarithm(x, natural_logarithm(k, number - Lane<V>(1)));
 }
 
 /// Exact where x is a power of ten.
 template <class V>
 WAVKIT_LANES V log10(V x) {
-    using T = Lane<V>;
-    constexpr T log10_e = T(0.4342944819032518276511L);
-    constexpr T log10_e_low = T(0.4342944819032518276511L - (long double)log10_e);
     const auto [number, k] = parts(x);
-    const V f = number - T(1), part = f * log10_e;
-    const V part_lost = mul_add(log1p_tail(f), log10_e,
-                                mul_add(f, log10_e_low, product_minus(f, all<V>(log10_e), part)));
-    const V whole = k * log10_2_high<V>;  // exact
-    const V sum = whole + part, lost = (whole - sum) + part;
-    return mend_logarithm(x, sum + (lost + mul_add(k, log10_2_low<V>, part_lost)));
+    return mend_logarithm(x, decimal_logarithm(k, number - Lane<V>(1)));
+}
+
+/// square = 2^k (1 + f) for square = x^2 + y^2, a number of the precision. Near the unit circle,
+/// where the logarithm is as small as f, f is x^2 + y^2 - 1 with what rounding takes from each
+/// term.
+template <class V>
+struct SquareParts {
+    V k, f;
+};
+
+template <class V>
+WAVKIT_LANES SquareParts<V> square_parts(V x, V y, V square) {
+    using T = Lane<V>;
+    const auto [number, k] = parts(square);
+    const V a = abs(x), b = abs(y), larger = at_least(a, b), smaller = at_most(a, b);
+    const V p = larger * larger, q = smaller * smaller, above = p - T(1);
+    const V lost = (p - (above + T(1))) + product_minus(larger, larger, p);
+    const V near = (above + q) + (lost + product_minus(smaller, smaller, q));
+    return {k, k == T(0) ? near : number - T(1)};
 }
 
 }  // namespace

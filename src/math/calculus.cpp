@@ -1,29 +1,57 @@
 // Differences, running sums, and the derivative of a polynomial.
+#include "kernel/running.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
 namespace {
 
-/// y[i] = (x[i] - x[i-1]) / delta with nothing before the first point; backwards, while the earlier
-/// point is still the signal's own. The parts of complex points are two signals in turn.
+/// y[i] = (x[i] - x[i-Step]) * rate with nothing before the first ones.
+template <int Step, class T>
+void differences(T* v, std::size_t n, T rate) {
+    constexpr int lanes = kernel::lanes<T>;
+    kernel::Lanes<T> before{};
+    std::size_t i = 0;
+    for (; i + lanes <= n; i += lanes) {
+        const auto now = kernel::load<T, lanes>(v + i);
+        kernel::store<T, lanes>(v + i, (now - kernel::lanes_before<Step>(now, before)) * rate);
+        before = now;
+    }
+    T last[Step];
+    for (int k = 0; k < Step; ++k) last[k] = before[lanes - Step + k];
+    for (; i < n; ++i) {
+        const T now = v[i];
+        v[i] = (now - last[i % Step]) * rate;
+        last[i % Step] = now;
+    }
+}
+
 template <Record R>
 int differentiate(R* x) {
     using T = scalar<R>;
-    const std::size_t w = width(x), n = used(x);
     const T rate = x->delta == T(0) ? limits<R>::big : T(1) / x->delta;
-    T* v = x->data;
-    for (std::size_t i = n; i-- > w;) v[i] = (v[i] - v[i - w]) * rate;
-    for (std::size_t i = 0; i < w && i < n; ++i) v[i] *= rate;
+    x->complex ? differences<2>(x->data, used(x), rate) : differences<1>(x->data, used(x), rate);
     return 0;
+}
+
+/// y[i] = y[i-Step] + delta x[i]
+template <int Step, class T>
+void sums(T* v, std::size_t n, T delta) {
+    constexpr int lanes = kernel::lanes<T>;
+    kernel::Lanes<T> sum{};
+    std::size_t i = 0;
+    for (; i + lanes <= n; i += lanes) {
+        const auto part = kernel::running_sum<Step>(kernel::load<T, lanes>(v + i) * delta);
+        sum = kernel::last_of<Step>(sum) + part;
+        kernel::store<T, lanes>(v + i, sum);
+    }
+    T last[Step];
+    for (int k = 0; k < Step; ++k) last[k] = sum[lanes - Step + k];
+    for (; i < n; ++i) v[i] = last[i % Step] += delta * v[i];
 }
 
 template <Record R>
 int integrate(R* x) {
-    const std::size_t w = width(x), n = used(x);
-    const auto delta = x->delta;
-    auto* v = x->data;
-    for (std::size_t i = 0; i < w && i < n; ++i) v[i] *= delta;
-    for (std::size_t i = w; i < n; ++i) v[i] = v[i - w] + delta * v[i];
+    x->complex ? sums<2>(x->data, used(x), x->delta) : sums<1>(x->data, used(x), x->delta);
     return 0;
 }
 

@@ -1,30 +1,51 @@
 // Logarithms, decibels and exponentials of the samples.
+#include "kernel/elementary.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
 namespace {
+
+using kernel::all, kernel::Lane, kernel::Lanes;
+
+template <class T>
+using Samples = kernel::Complexes<T, kernel::lanes<T>>;
 
 template <class T>
 constexpr T ln_10 = T(2.302585092994045684L);
 template <class T>
 constexpr T log10_e = T(0.434294481903251828L);  // 1 / ln 10
 
+template <Record R, class V>
+V saturated(V v) {
+    return kernel::at_most(kernel::at_least(v, all<V>(-limits<R>::big)), all<V>(limits<R>::big));
+}
+
+/// ln z, or the floor for a sample whose squared magnitude lies below it. Beyond the range
+/// |z|^2 counts as the saturation value.
 template <Record R>
-Bin<scalar<R>> logarithm(Bin<scalar<R>> z) {
+WAVKIT_LANES Samples<scalar<R>> logarithm(Samples<scalar<R>> z) {
     using T = scalar<R>;
-    const auto near = saturated<R>(z);
-    const T square = out_of_range<R>(z) ? limits<R>::big : magnitude_squared(near);
-    if (square < limits<R>::floor) return {std::log(limits<R>::floor), T(0)};
-    return {T(0.5) * std::log(square), std::atan2(near.im, near.re)};
+    using V = Lanes<T>;
+    const V big = all<V>(limits<R>::big), floor = all<V>(limits<R>::floor);
+    const V re = saturated<R>(z.re), im = saturated<R>(z.im);
+    const V both = re * re + im * im;
+    const V square = kernel::abs(z.re) > big ? big : kernel::abs(z.im) > big ? big : both;
+    const auto low = square < floor;
+    const V shown = kernel::at_least(square, floor);
+    const auto [k, f] = kernel::square_parts(re, im, shown);
+    const V log = kernel::mend_logarithm(shown, kernel::natural_logarithm(k, f));
+    return {low ? log : log * T(0.5), low ? V{} : kernel::atan2(im, re)};
 }
 
 template <Record R>
 int take_logarithm(R* x) {
-    constexpr auto floor = limits<R>::floor;
+    using V = Lanes<scalar<R>>;
     if (x->complex) {
-        for (auto& z : bins(x)) z = logarithm<R>(z);
+        kernel::map_complex(x->data, x->data, length(x),
+                            [](Samples<scalar<R>> z) { return logarithm<R>(z); });
     } else {
-        for (auto& value : values(x)) value = std::log(value < floor ? floor : value);
+        kernel::map(x->data, x->data, used(x),
+                    [](V v) { return kernel::log(kernel::at_least(v, all<V>(limits<R>::floor))); });
     }
     return 0;
 }
@@ -33,63 +54,82 @@ int take_logarithm(R* x) {
 template <Record R>
 int to_decibels(R* x, scalar<R> factor) {
     using T = scalar<R>;
-    constexpr T floor = limits<R>::floor;
+    using V = Lanes<T>;
+    const V floor = all<V>(limits<R>::floor);
     if (!x->complex) {
-        for (auto& value : values(x)) value = std::log10(value < floor ? floor : value) * factor;
+        kernel::map(x->data, x->data, used(x),
+                    [=](V v) { return kernel::log10(kernel::at_least(v, floor)) * factor; });
         return 0;
     }
-    for (auto& z : bins(x)) {
-        const auto near = saturated<R>(z);
-        const T square = magnitude_squared(near);
-        if (square < floor) {
-            z = {std::log10(floor) * factor, T(0)};
-        } else {
-            z = {T(0.5) * factor * std::log10(square),
-                 std::atan2(near.im, near.re) * factor * log10_e<T>};
-        }
-    }
+    kernel::map_complex(x->data, x->data, length(x), [=](Samples<T> z) {
+        const V re = saturated<R>(z.re), im = saturated<R>(z.im), square = re * re + im * im;
+        const auto low = square < floor;
+        const V shown = kernel::at_least(square, floor);
+        const auto [k, f] = kernel::square_parts(re, im, shown);
+        const V log = kernel::mend_logarithm(shown, kernel::decimal_logarithm(k, f));
+        const V angle = kernel::atan2(im, re) * factor * log10_e<T>;
+        return Samples<T>{log * (low ? all<V>(factor) : all<V>(T(0.5) * factor)),
+                          low ? V{} : angle};
+    });
     return 0;
 }
 
 template <class T>
-Bin<T> from_polar(T radius, T angle) {
-    return {radius * std::cos(angle), radius * std::sin(angle)};
+Samples<T> from_polar(Lanes<T> radius, Lanes<T> angle) {
+    const auto [sin, cos] = kernel::sincos(angle);
+    return {radius * cos, radius * sin};
 }
 
 template <Record R>
 int take_exponential(R* x) {
     using T = scalar<R>;
-    const auto bounded = [](T v) {
-        return v > limits<R>::exp_limit ? limits<R>::big : std::exp(v);
+    using V = Lanes<T>;
+    const auto bounded = [](V v) {
+        return v > limits<R>::exp_limit ? all<V>(limits<R>::big) : kernel::exp(v);
     };
     if (x->complex) {
-        for (auto& z : bins(x)) z = from_polar(bounded(z.re), z.im);
+        kernel::map_complex(x->data, x->data, length(x),
+                            [=](Samples<T> z) { return from_polar<T>(bounded(z.re), z.im); });
     } else {
-        for (auto& value : values(x)) value = bounded(value);
+        kernel::map(x->data, x->data, used(x), bounded);
     }
     return 0;
+}
+
+/// The first value below -big, which hosts rely on to end the walk and to stay as it is, like all
+/// that follow it.
+template <Record R>
+std::size_t end_of_walk(const R* x) {
+    using T = scalar<R>;
+    using V = Lanes<T>;
+    constexpr std::size_t step = kernel::lanes<T>;
+    const auto all_values = values(x);
+    std::size_t i = 0;
+    for (; i + step <= all_values.size(); i += step) {
+        const V v = kernel::load<T, int(step)>(x->data + i);
+        if (kernel::any_above(kernel::at_most(v, V{}), limits<R>::big)) break;
+    }
+    while (i < all_values.size() && !(all_values[i] < -limits<R>::big)) ++i;
+    return i;
 }
 
 template <Record R>
 int take_power_of_ten(R* x) {
     using T = scalar<R>;
-    constexpr T big = limits<R>::big, highest = limits<R>::exp10_limit;
-    if (x->complex) {
-        for (auto& z : bins(x)) {
-            const T radius = z.re > highest ? big : z.re < -big ? -big : std::exp(z.re * ln_10<T>);
-            z = from_polar(radius, z.im * ln_10<T>);
-        }
+    using V = Lanes<T>;
+    const auto bounded = [](V v) {
+        const V big = all<V>(limits<R>::big);
+        return v > limits<R>::exp10_limit ? big : kernel::exp10(v);
+    };
+    if (!x->complex) {
+        kernel::map(x->data, x->data, end_of_walk(x), bounded);
         return 0;
     }
-    for (auto& value : values(x)) {
-        if (value > highest) {
-            value = big;
-        } else if (value < -big) {
-            break;  // hosts rely on such a value ending the walk and staying as it is
-        } else {
-            value = std::exp(value * ln_10<T>);
-        }
-    }
+    kernel::map_complex(x->data, x->data, length(x), [=](Samples<T> z) {
+        const V lowest = all<V>(-limits<R>::big);
+        const V radius = z.re < lowest ? lowest : bounded(z.re);
+        return from_polar<T>(radius, z.im * ln_10<T>);
+    });
     return 0;
 }
 

@@ -1,52 +1,86 @@
 // Mathematical functions of real signals.
-#include <math.h>  // the Bessel functions of integer order are POSIX's, not the C++ library's
-
+#include "kernel/elementary.hpp"
 #include "math/bessel.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
 namespace {
 
+using kernel::all, kernel::Lane;
+
 template <Record R, class Function>
 int apply(R* x, Function function) {
     if (x->complex) return -1;
-    for (auto& value : values(x)) value = function(value);
+    kernel::map(x->data, x->data, used(x), function);
     return 0;
 }
 
-constexpr auto absolute = [](auto v) { return std::fabs(v); };
-constexpr auto sine = [](auto v) { return std::sin(v); };
-constexpr auto cosine = [](auto v) { return std::cos(v); };
-constexpr auto tangent = [](auto v) { return std::tan(v); };
-constexpr auto arc_tangent = [](auto v) { return std::atan(v); };
-constexpr auto hyperbolic_tangent = [](auto v) { return std::tanh(v); };
+constexpr auto absolute = [](auto v) { return kernel::abs(v); };
+constexpr auto sine = [](auto v) { return kernel::sin(v); };
+constexpr auto cosine = [](auto v) { return kernel::cos(v); };
+constexpr auto tangent = [](auto v) { return kernel::tan(v); };
+constexpr auto arc_tangent = [](auto v) { return kernel::atan(v); };
+constexpr auto hyperbolic_tangent = [](auto v) { return kernel::tanh(v); };
+constexpr auto sinc = [](auto v) { return kernel::sinc(v); };
 
-constexpr auto arc_cosine = []<class T>(T v) { return std::fabs(v) > 1 ? T(0) : std::acos(v); };
-constexpr auto arc_sine = []<class T>(T v) { return std::fabs(v) > 1 ? T(0) : std::asin(v); };
-constexpr auto sinc = []<class T>(T v) { return v == 0 ? T(1) : std::sin(v) / v; };
+/// `result`, or 0 where |v| > 1.
+template <class V>
+V within_one(V v, V result) {
+    return kernel::abs(v) > Lane<V>(1) ? V{} : result;
+}
+constexpr auto arc_cosine = [](auto v) { return within_one(v, kernel::acos(v)); };
+constexpr auto arc_sine = [](auto v) { return within_one(v, kernel::asin(v)); };
 
-constexpr auto bessel_j0 = []<class T>(T v) { return T(::j0(double(v))); };
-constexpr auto bessel_j1 = []<class T>(T v) { return T(::j1(double(v))); };
-constexpr auto bessel_y0 = []<class T>(T v) { return v <= 0 ? T(0) : T(::y0(double(v))); };
-constexpr auto bessel_y1 = []<class T>(T v) { return v <= 0 ? T(0) : T(::y1(double(v))); };
+/// `result`, or 0 where v is no positive number.
+template <class V>
+V of_positive(V v, V result) {
+    return v <= Lane<V>(0) ? V{} : result;
+}
+constexpr auto bessel_j0 = [](auto v) { return kernel::bessel_j0(v); };
+constexpr auto bessel_j1 = [](auto v) { return kernel::bessel_j1(v); };
+constexpr auto bessel_y0 = [](auto v) { return of_positive(v, kernel::bessel_y0(v)); };
+constexpr auto bessel_y1 = [](auto v) { return of_positive(v, kernel::bessel_y1(v)); };
 
 template <Record R>
-scalar<R> hyperbolic_cosine(scalar<R> v) {
-    return std::fabs(v) > limits<R>::exp_limit ? limits<R>::big : std::cosh(v);
+int hyperbolic_cosine(R* x) {
+    return apply(x, []<class V>(V v) {
+        const V big = all<V>(limits<R>::big);
+        return kernel::abs(v) > limits<R>::exp_limit ? big : kernel::cosh(v);
+    });
 }
 
 template <Record R>
-scalar<R> hyperbolic_sine(scalar<R> v) {
-    if (v > limits<R>::exp_limit) return limits<R>::big;
-    return v < -limits<R>::exp_limit ? -limits<R>::big : std::sinh(v);
+int hyperbolic_sine(R* x) {
+    return apply(x, []<class V>(V v) {
+        const V big = kernel::flip_by_sign_of(all<V>(limits<R>::big), kernel::bits(v));
+        return kernel::abs(v) > limits<R>::exp_limit ? big : kernel::sinh(v);
+    });
 }
 
-template <Record R>
-scalar<R> modified_bessel(scalar<R> v) {
+/// I0 for those |v| of a vector where it fits the precision, though e^|v| may not.
+template <Record R, class V>
+[[gnu::noinline, gnu::cold]] void large_bessel_i0(V& result, const V& v) {
+    using T = scalar<R>;
     constexpr double last_argument = 700.0;
-    const double t = std::fabs(v), i0 = bessel_i0(t);
-    const bool fits = !(t > last_argument || i0 > std::numeric_limits<scalar<R>>::max());
-    return fits ? scalar<R>(i0) : limits<R>::big;
+    for (int i = 0; i < kernel::count<V>; ++i) {
+        const double t = std::fabs(double(v[i])), i0 = bessel_i0(t);
+        const bool fits = !(t > last_argument || i0 > std::numeric_limits<T>::max());
+        result[i] = fits ? T(i0) : limits<R>::big;
+    }
+}
+
+template <Record R>
+int modified_bessel(R* x) {
+    return apply(x, []<class V>(V v) {
+        constexpr auto last = kernel::is_double<V> ? 700 : 88;  // e^last fits
+        const V result = kernel::bessel_i0(v);
+        if (!kernel::any_above(v, last)) [[likely]]
+            return result;
+        V mended;
+        const V arguments = v;
+        large_bessel_i0<R>(mended, arguments);
+        return mended;
+    });
 }
 
 /// Names that the interface promises and that have no function behind them.
@@ -82,11 +116,11 @@ int dspfi_acos(dspf* x) { return wavkit::apply(x, wavkit::arc_cosine); }
 int dspi_asin(dsp* x) { return wavkit::apply(x, wavkit::arc_sine); }
 int dspfi_asin(dspf* x) { return wavkit::apply(x, wavkit::arc_sine); }
 
-int dspi_cosh(dsp* x) { return wavkit::apply(x, wavkit::hyperbolic_cosine<dsp>); }
-int dspfi_cosh(dspf* x) { return wavkit::apply(x, wavkit::hyperbolic_cosine<dspf>); }
+int dspi_cosh(dsp* x) { return wavkit::hyperbolic_cosine(x); }
+int dspfi_cosh(dspf* x) { return wavkit::hyperbolic_cosine(x); }
 
-int dspi_sinh(dsp* x) { return wavkit::apply(x, wavkit::hyperbolic_sine<dsp>); }
-int dspfi_sinh(dspf* x) { return wavkit::apply(x, wavkit::hyperbolic_sine<dspf>); }
+int dspi_sinh(dsp* x) { return wavkit::hyperbolic_sine(x); }
+int dspfi_sinh(dspf* x) { return wavkit::hyperbolic_sine(x); }
 
 int dspi_sinc(dsp* x) { return wavkit::apply(x, wavkit::sinc); }
 int dspfi_sinc(dspf* x) { return wavkit::apply(x, wavkit::sinc); }
@@ -103,8 +137,8 @@ int dspfi_besy0(dspf* x) { return wavkit::apply(x, wavkit::bessel_y0); }
 int dspi_besy1(dsp* x) { return wavkit::apply(x, wavkit::bessel_y1); }
 int dspfi_besy1(dspf* x) { return wavkit::apply(x, wavkit::bessel_y1); }
 
-int dspi_besi0(dsp* x) { return wavkit::apply(x, wavkit::modified_bessel<dsp>); }
-int dspfi_besi0(dspf* x) { return wavkit::apply(x, wavkit::modified_bessel<dspf>); }
+int dspi_besi0(dsp* x) { return wavkit::modified_bessel(x); }
+int dspfi_besi0(dspf* x) { return wavkit::modified_bessel(x); }
 
 int dspi_gamma(dsp* x) { return wavkit::unavailable(x); }
 int dspfi_gamma(dspf* x) { return wavkit::unavailable(x); }

@@ -1,104 +1,73 @@
 // Parts, magnitude and phase of the samples, their squares and square roots.
 #include <algorithm>
-#include <array>
 #include <limits>
 
+#include "kernel/elementary.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
 namespace {
 
-/// One real value for each complex sample: `block` computes them for a run of samples. Its results
-/// go through a buffer of their own, since in place they land on samples of the same run; that
-/// keeps the computing loops free of overlap and thus open to vectorisation.
-template <Record R, class Block>
-void fold(const R* from, R* to, Block block) {
-    std::array<scalar<R>, 256> results;
-    auto* out = to->data;
-    for (auto rest = bins(from); !rest.empty();) {
-        const std::size_t count = std::min(rest.size(), results.size());
-        block(rest.first(count), results.data());
-        out = std::copy_n(results.data(), count, out);
-        rest = rest.subspan(count);
-    }
+using kernel::all, kernel::Lanes;
+
+template <class T>
+using Samples = kernel::Complexes<T, kernel::lanes<T>>;
+
+/// One real value for each complex sample.
+template <Record R, class Sample>
+void fold(const R* from, R* to, Sample sample) {
+    kernel::map_complex(from->data, to->data, length(from), sample);
     to->complex = 0;
 }
 
-template <Record R, class Sample>
-void fold_each(const R* from, R* to, Sample sample) {
-    fold(from, to, [sample](auto run, auto* out) {
-        for (std::size_t i = 0; i < run.size(); ++i) out[i] = sample(run[i]);
-    });
-}
-
-/// One value for each value. In place and apart are separate loops: only of each by itself does the
-/// compiler see that nothing overlaps.
+/// One value for each value.
 template <Record R, class Value>
 void map(const R* from, R* to, Value value) {
-    if (from->data == to->data) {
-        for (auto& v : values(to)) v = value(v);
-    } else {
-        for (std::size_t i = 0; i < used(from); ++i) to->data[i] = value(from->data[i]);
-    }
+    kernel::map(from->data, to->data, used(from), value);
 }
 
 template <Record R>
 int keep_real(R* x) {
-    if (x->complex) fold_each(x, x, [](auto z) { return z.re; });
+    if (x->complex) fold(x, x, [](Samples<scalar<R>> z) { return z.re; });
     return 0;
 }
 
 template <Record R>
 int keep_imaginary(R* x) {
     if (x->complex) {
-        fold_each(x, x, [](auto z) { return z.im; });
+        fold(x, x, [](Samples<scalar<R>> z) { return z.im; });
     } else {
         std::ranges::fill(values(x), scalar<R>(0));
     }
     return 0;
 }
 
-/// Magnitudes by the plain square root, and once more with care for overflow, underflow and NaN in
-/// a run where a square left the range in which the plain root is exact to rounding.
-template <class T>
-void magnitudes(std::span<const Bin<T>> run, T* out) {
-    constexpr T smallest = std::numeric_limits<T>::min() /
-                           (std::numeric_limits<T>::epsilon() * std::numeric_limits<T>::epsilon());
-    constexpr T largest = std::numeric_limits<T>::max();
-    T doubtful = 0;
-    for (std::size_t i = 0; i < run.size(); ++i) {
-        const T square = magnitude_squared(run[i]);
-        const bool zero = run[i].re == 0 && run[i].im == 0;
-        doubtful = (square >= smallest && square <= largest) || zero ? doubtful : T(1);
-        out[i] = std::sqrt(square);
-    }
-    if (doubtful == 0) return;
-    for (std::size_t i = 0; i < run.size(); ++i) out[i] = std::hypot(run[i].re, run[i].im);
-}
-
 template <Record R>
 int take_magnitude(const R* from, R* to) {
     using T = scalar<R>;
     if (from->complex) {
-        fold(from, to, magnitudes<T>);
+        fold(from, to, [](Samples<T> z) { return kernel::magnitude(z.re, z.im); });
     } else {
-        map(from, to, [](T v) { return std::fabs(v); });
+        map(from, to, [](Lanes<T> v) { return kernel::abs(v); });
     }
     return 0;
 }
 
-/// v^2, or the saturation value for a value out of range.
-template <Record R>
-scalar<R> square(scalar<R> v) {
-    return out_of_range<R>(v) ? limits<R>::big : v * v;
+/// `result`, or the saturation value where the size of v is out of range.
+template <Record R, class V>
+V capped(V v, V result) {
+    return kernel::abs(v) > limits<R>::big ? all<V>(limits<R>::big) : result;
 }
 
 template <Record R>
 int take_magnitude_squared(const R* from, R* to) {
+    using T = scalar<R>;
     if (from->complex) {
-        fold_each(from, to, [](auto z) { return capped_magnitude_squared<R>(z); });
+        fold(from, to, [](Samples<T> z) {
+            return capped<R>(z.re, capped<R>(z.im, z.re * z.re + z.im * z.im));
+        });
     } else {
-        map(from, to, square<R>);
+        map(from, to, [](Lanes<T> v) { return capped<R>(v, v * v); });
     }
     return 0;
 }
@@ -106,11 +75,14 @@ int take_magnitude_squared(const R* from, R* to) {
 template <Record R>
 int take_phase(R* x) {
     using T = scalar<R>;
+    using V = Lanes<T>;
     if (x->complex) {
-        fold_each(x, x,
-                  [](Bin<T> z) { return z.re == 0 && z.im == 0 ? T(0) : std::atan2(z.im, z.re); });
+        fold(x, x, [](Samples<T> z) {
+            const V some = kernel::abs(z.re) + kernel::abs(z.im);
+            return some == T(0) ? V{} : kernel::atan2(z.im, z.re);
+        });
     } else {
-        for (auto& value : values(x)) value = value < T(0) ? pi<T> : T(0);
+        map(x, x, [](V v) { return v < T(0) ? all<V>(pi<T>) : V{}; });
     }
     return 0;
 }
@@ -118,40 +90,76 @@ int take_phase(R* x) {
 template <Record R>
 int take_square(R* x) {
     using T = scalar<R>;
-    if (x->complex) {
-        for (auto& z : bins(x)) {
-            const auto [re, im] = saturated<R>(z);
-            z = {re * re - im * im, T(2) * re * im};
-        }
-    } else {
-        for (auto& value : values(x)) value = square<R>(value);
-    }
+    using V = Lanes<T>;
+    if (!x->complex) return take_magnitude_squared(x, x);
+    const V big = all<V>(limits<R>::big);
+    kernel::map_complex(x->data, x->data, length(x), [=](Samples<T> z) {
+        const V re = kernel::at_most(kernel::at_least(z.re, -big), big);
+        const V im = kernel::at_most(kernel::at_least(z.im, -big), big);
+        return Samples<T>{re * re - im * im, T(2) * re * im};
+    });
     return 0;
 }
 
-/// The root in the right half-plane, by the half-angle formulas; beyond the range the radius is
-/// that of the saturation value.
+/// The root in the right half-plane, by the half-angle formulas. Beyond the range the radius is
+/// that of the saturation value; small parts are taken to where their squares are normal.
 template <Record R>
-Bin<scalar<R>> square_root(Bin<scalar<R>> z) {
+Bin<scalar<R>> careful_root(Bin<scalar<R>> z) {
     using T = scalar<R>;
     if (out_of_range<R>(z)) {
         const T radius = std::sqrt(limits<R>::big), angle = T(0.5) * std::atan2(z.im, z.re);
         return {radius * std::cos(angle), radius * std::sin(angle)};
     }
-    const T magnitude = std::sqrt(magnitude_squared(z));
+    constexpr T lift = sizeof(T) == 8 ? T(0x1p300) : T(0x1p40);
+    const bool small = std::fmax(std::fabs(z.re), std::fabs(z.im)) < 1 / (lift * lift);
+    const T back = small ? 1 / lift : T(1);
+    if (small) z = z * lift * lift;
+    const T magnitude = std::hypot(z.re, z.im);
     if (magnitude <= T(0)) return {T(0), T(0)};
     const T larger = std::sqrt(T(0.5) * (magnitude + std::fabs(z.re)));
-    if (z.re >= T(0)) return {larger, z.im / (T(2) * larger)};
-    return {std::fabs(z.im) / (T(2) * larger), std::copysign(larger, z.im)};
+    const T smaller = std::fabs(z.im) / (T(2) * larger) * back;
+    if (z.re >= T(0)) return {larger * back, std::copysign(smaller, z.im)};
+    return {smaller, std::copysign(larger * back, z.im)};
+}
+
+template <Record R, class Z>
+[[gnu::noinline, gnu::cold]] void careful_roots(Z& roots, const Z& z) {
+    for (int i = 0; i < kernel::lanes<scalar<R>>; ++i) {
+        const auto root = careful_root<R>({z.re[i], z.im[i]});
+        roots.re[i] = root.re;
+        roots.im[i] = root.im;
+    }
+}
+
+template <Record R>
+WAVKIT_LANES Samples<scalar<R>> square_root(Samples<scalar<R>> z) {
+    using T = scalar<R>;
+    using V = Lanes<T>;
+    const V a = kernel::abs(z.re), b = kernel::abs(z.im);
+    const V size = kernel::at_least(a, b), other = kernel::at_least(b, a);
+    const V shown = size == T(0) ? all<V>(T(1)) : size;
+    if (kernel::any_above(size, limits<R>::big) || kernel::any_above(other, limits<R>::big) ||
+        kernel::any_below(shown, 1 / kernel::safe_size<T>)) [[unlikely]] {
+        Samples<T> roots;
+        const Samples<T> samples = z;
+        careful_roots<R>(roots, samples);
+        return roots;
+    }
+    const V magnitude = kernel::sqrt(kernel::mul_add(a, a, b * b));
+    const V larger = kernel::sqrt(T(0.5) * (magnitude + a)), smaller = b / (larger + larger);
+    const auto right = z.re >= T(0), zero = a + b == T(0);
+    const V re = right ? larger : smaller, im = right ? smaller : larger;
+    return {zero ? V{} : re, zero ? V{} : kernel::flip_by_sign_of(im, kernel::bits(z.im))};
 }
 
 template <Record R>
 int take_square_root(const R* from, R* to) {
-    using T = scalar<R>;
+    using V = Lanes<scalar<R>>;
     if (from->complex) {
-        for (std::size_t i = 0; i < length(from); ++i) bins(to)[i] = square_root<R>(bins(from)[i]);
+        kernel::map_complex(from->data, to->data, length(from),
+                            [](Samples<scalar<R>> z) { return square_root<R>(z); });
     } else {
-        map(from, to, [](T v) { return std::sqrt(v < T(0) ? T(0) : v); });
+        map(from, to, [](V v) { return kernel::sqrt(kernel::at_least(v, V{})); });
     }
     return 0;
 }

@@ -1,10 +1,14 @@
 // Signs, scaling, limits and reciprocals of the samples.
 #include <utility>
 
+#include "kernel/elementary.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
 namespace {
+
+template <class T>
+using Samples = kernel::Complexes<T, kernel::lanes<T>>;
 
 template <Record R>
 int negate(R* x) {
@@ -44,21 +48,24 @@ int scale(R* x, scalar<R> factor) {
 
 template <Record R>
 int limit(R* x, scalar<R> low, scalar<R> high, int* clipped) {
+    using T = scalar<R>;
+    using V = kernel::Lanes<T>;
     if (low > high) std::swap(low, high);
-    scalar<R> changed = 0;  // of the samples' own type, which lets the loop be vectorised
-    for (auto& value : values(x)) {
-        const auto v = value;
-        changed = v < low || v > high ? scalar<R>(1) : changed;
-        value = v < low ? low : v > high ? high : v;
-    }
-    if (clipped) *clipped = changed != 0;
+    const V lowest = kernel::all<V>(low), highest = kernel::all<V>(high);
+    const V one = kernel::all<V>(T(1));
+    V changed{};
+    kernel::map(x->data, x->data, used(x), [&](V v) {
+        changed = v < lowest ? one : v > highest ? one : changed;
+        return kernel::at_most(kernel::at_least(v, lowest), highest);
+    });
+    if (clipped) *clipped = kernel::any_above(changed, T(0));
     return 0;
 }
 
 /// conj(z) / |z|^2, where a zero counts as |z|^2 = 1 / big and a part out of range as
 /// |z|^2 = big: zero therefore stays zero.
 template <Record R>
-Bin<scalar<R>> reciprocal(Bin<scalar<R>> z) {
+Bin<scalar<R>> limited_reciprocal(Bin<scalar<R>> z) {
     using T = scalar<R>;
     constexpr T big = limits<R>::big;
     const T square = magnitude_squared(z);
@@ -66,13 +73,51 @@ Bin<scalar<R>> reciprocal(Bin<scalar<R>> z) {
     return {factor * z.re, -(factor * z.im)};
 }
 
+template <Record R, class Z>
+[[gnu::noinline, gnu::cold]] void limited_reciprocals(Z& results, const Z& z) {
+    for (int i = 0; i < kernel::lanes<scalar<R>>; ++i) {
+        const auto result = limited_reciprocal<R>({z.re[i], z.im[i]});
+        results.re[i] = result.re;
+        results.im[i] = result.im;
+    }
+}
+
+/// The same with |z|^2 to more than the precision, where it is well within the range.
+template <Record R>
+WAVKIT_LANES Samples<scalar<R>> reciprocal(Samples<scalar<R>> z) {
+    using T = scalar<R>;
+    using V = kernel::Lanes<T>;
+    const V a = kernel::abs(z.re), b = kernel::abs(z.im);
+    const V larger = kernel::at_least(a, b), smaller = kernel::at_most(a, b);
+    const V p = larger * larger;
+    const auto [square, lost] = kernel::product_sum(smaller, smaller, p);
+    // From this on not even what rounding takes from the square is subnormal.
+    constexpr T least = std::numeric_limits<T>::min() /
+                        (std::numeric_limits<T>::epsilon() * std::numeric_limits<T>::epsilon());
+    if (kernel::any_above(z.re, limits<R>::big) || kernel::any_above(z.im, limits<R>::big) ||
+        kernel::any_below(square, least)) [[unlikely]] {
+        Samples<T> results;
+        const Samples<T> samples = z;
+        limited_reciprocals<R>(results, samples);
+        return results;
+    }
+    const kernel::Sum<V> exact{square, lost + kernel::product_minus(larger, larger, p)};
+    const V re = kernel::quotient(kernel::Sum<V>{a, V{}}, exact);
+    const V im = kernel::quotient(kernel::Sum<V>{b, V{}}, exact);
+    return {kernel::flip_by_sign_of(re, kernel::bits(z.re)),
+            -kernel::flip_by_sign_of(im, kernel::bits(z.im))};
+}
+
 template <Record R>
 int invert(R* x) {
     using T = scalar<R>;
+    using V = kernel::Lanes<T>;
     if (x->complex) {
-        for (auto& z : bins(x)) z = reciprocal<R>(z);
+        kernel::map_complex(x->data, x->data, length(x),
+                            [](Samples<scalar<R>> z) { return reciprocal<R>(z); });
     } else {
-        for (auto& value : values(x)) value = value == T(0) ? limits<R>::big : T(1) / value;
+        kernel::map(x->data, x->data, used(x),
+                    [](V v) { return v == T(0) ? kernel::all<V>(limits<R>::big) : T(1) / v; });
     }
     return 0;
 }

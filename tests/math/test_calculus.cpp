@@ -13,6 +13,14 @@ BOTH_PRECISIONS(Calculus, DifferenceAndSumUndoEachOther) {
     EXPECT_TRUE(turns(dspi_differ, z, rates) && turns(dspi_integ, rates, z));
     EXPECT_TRUE(turns(dspi_differ, real<R>({2, 5}, 0), real<R>({2 * big, 3 * big}), 1));
     EXPECT_TRUE(turns(dspi_differ, complex<R>({}), complex<R>({})));
+    for (auto ramp : {real<R>(std::vector<long double>(75, 3)),
+                      complex<R>(std::vector<std::complex<long double>>(75, {3, 3}))}) {
+        const int width = ramp->complex ? 2 : 1;
+        ASSERT_EQ(dspi_integ(ramp), 0);
+        for (int i = 0; i < 75 * width; ++i) EXPECT_EQ(ramp[i], 3 * (i / width + 1)) << i;
+        ASSERT_EQ(dspi_differ(ramp), 0);
+        for (int i = 0; i < 75 * width; ++i) EXPECT_EQ(ramp[i], 3) << i;
+    }
 }
 
 BOTH_PRECISIONS(Calculus, PolynomialLosesOneDegree) {

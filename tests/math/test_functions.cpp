@@ -90,6 +90,13 @@ BOTH_PRECISIONS(Functions, ComplexLogarithmsClampTheirOwnWay) {
     EXPECT_TRUE(turns(db, real<R>({10, 0}), real<R>({10, 10 * lowest / ln_10}), 1));
 }
 
+BOTH_PRECISIONS(Functions, ComplexLogarithmsKeepTheirPlacesBesideTheUnitCircle) {
+    const long double x = 1 - 0x1p-11L, y = 0x1p-5L;  // x^2 + y^2 = 1 + 2^-22
+    const Complex exact(std::log1p(0x1p-22L) / 2, std::atan2(x, -y));
+    EXPECT_TRUE(turns(dspi_log, complex<R>({{-y, x}}), complex<R>({exact}), 1));
+    EXPECT_TRUE(turns(dspi_log10, complex<R>({{-y, x}}), complex<R>({exact / ln_10}), 2));
+}
+
 BOTH_PRECISIONS(Functions, ExponentialsSaturateAndPowersOfTenStall) {
     const long double big = limits<R>::big, beyond = limits<R>::exp10_limit + 1;
     EXPECT_TRUE(turns(dspi_exp, complex<R>({{0.75L, -2}, {0, pi_exact}}),
@@ -97,6 +104,17 @@ BOTH_PRECISIONS(Functions, ExponentialsSaturateAndPowersOfTenStall) {
     EXPECT_TRUE(turns(dspi_exp, complex<R>({{231, 3}}), complex<R>({std::polar(big, 3.0L)}), 1));
     EXPECT_TRUE(turns(dspi_exp10, real<R>({1, -2, 0.5L, nan}),
                       real<R>({10, 0.01L, std::sqrt(10.0L), nan}), 4));
+    std::vector<long double> exponents, powers;
+    for (int k = 0; k <= 10; ++k) {
+        exponents.push_back(k);
+        powers.push_back(std::strtold(("1e" + std::to_string(k)).c_str(), nullptr));
+    }
+    EXPECT_TRUE(turns(dspi_exp10, real<R>(exponents), real<R>(powers)));
+    std::vector<long double> stalled(40, 1);  // the walk ends within a later vector
+    stalled[21] = -2 * big;
+    auto walked = stalled;
+    std::fill_n(walked.begin(), 21, 10);
+    EXPECT_TRUE(turns(dspi_exp10, real<R>(stalled), real<R>(walked)));
     EXPECT_TRUE(turns(dspi_exp10, real<R>({beyond, -big, -2 * big, 2, beyond}),
                       real<R>({big, 0, -2 * big, 2, beyond})));
     EXPECT_TRUE(turns(dspi_exp10, complex<R>({{1, 0.25L}, {-1, 0}}),

@@ -54,6 +54,11 @@ BOTH_PRECISIONS(Magnitude, RootsLieInTheRightHalfPlane) {
     EXPECT_TRUE(turns(
         dspi_sqrt, complex<R>({{-2 * big, 2 * big}, {0, -inf}}),
         complex<R>({std::polar(radius, pi_exact * 3 / 8), std::polar(radius, -pi_exact / 4)}), 2));
+    for (const long double tiny :
+         {std::sqrt((long double)limits<R>::floor) / 1024, 4 * (long double)limits<R>::floor}) {
+        EXPECT_TRUE(turns(dspi_sqrt, complex<R>({{-3 * tiny, 4 * tiny}, 0}),
+                          complex<R>({std::sqrt(tiny) * Samples::value_type(1, 2), 0}), 2));
+    }
     for (int seed = 1; seed < 50; ++seed) {
         const auto z = Noise(std::uint64_t(seed)).complex<R>(1);
         const auto expected = std::sqrt(std::complex<long double>(z[0], z[1]));
@@ -92,6 +97,13 @@ BOTH_PRECISIONS(Magnitude, UnwrappingFollowsThePhase) {
         wrapped.push_back(std::remainder(line.back(), 2 * pi_exact));
     }
     EXPECT_TRUE(turns(dspi_unwrap, real<R>(wrapped), real<R>(line), 4));
+    auto far = real<R>(wrapped);  // so many turns that the step is taken the slow way
+    far[40] += T(4096 * 512);
+    const T sample = far[40];
+    ASSERT_EQ(dspi_unwrap(far), 0);
+    EXPECT_NEAR(far[39], line[39], 1e-3);
+    EXPECT_LE(std::fabs(far[40] - far[39]), 3.15);
+    EXPECT_NEAR(std::remainder(sample - far[40], two_pi<T>), 0, 0.3);
     EXPECT_TRUE(turns(dspi_unwrap, real<R>({0, 6, 20, nan, 1}),
                       real<R>({0, 6 - 2 * pi_exact, 20 - 6 * pi_exact, nan, nan}), 16));
     auto z = complex<R>({{0, 6}});

@@ -71,12 +71,24 @@ BOTH_PRECISIONS(Scaling, SortKeepsEveryValue) {
     auto expected = noise;
     std::sort(expected->data, expected->data + expected->points);
     EXPECT_TRUE(turns(dspi_sort, noise, expected));
+    std::vector<std::complex<long double>> corners, in_order;  // magnitudes equal in pairs
+    for (int i = 1; i <= 300; ++i) {
+        corners.insert(corners.begin(), {{(long double)i, 0}, {-(long double)i, 0}});
+        in_order.insert(in_order.end(), {{-(long double)i, 0}, {(long double)i, 0}});
+    }
+    EXPECT_TRUE(turns(dspi_sort, complex<R>(corners), complex<R>(in_order)));
 }
 
 BOTH_PRECISIONS(Scaling, ReversalAndShiftKeepPointsWhole) {
     auto z = complex<R>({{1, 2}, {3, 4}, {5, 6}});
     ASSERT_EQ(dspi_rev(z) || dspi_shift(z, 1) || dspi_shift(z, INT_MIN), 0);
     EXPECT_TRUE(is_complex<R>(z, {{3, 4}, {1, 2}}));
+    for (const auto& noise : {Noise().real<R>(101), Noise().complex<R>(45)}) {
+        auto turned = noise;
+        const int width = noise->complex ? 2 : 1, n = noise->points * width;
+        ASSERT_EQ(dspi_rev(turned), 0);
+        for (int i = 0; i < n; ++i) EXPECT_EQ(turned[n - width - i + 2 * (i % width)], noise[i]);
+    }
     Borrowed<R> x(real<R>({1, 2, 3, 4}));
     ASSERT_EQ(dspi_rev(x) || dspi_shift(x, 1), 0);
     EXPECT_TRUE(is_real<R>(x, {3, 2, 1}));
