@@ -55,6 +55,18 @@ struct Quotient {
     Bin<T> operator()(T a, Bin<T> b) const { return divide(a * conj(b), a == 0, b); }
     Bin<T> operator()(Bin<T> a, Bin<T> b) const { return divide(a * conj(b), is_zero(a), b); }
 
+    using Z = kernel::Complexes<T, kernel::lanes<T>>;
+    WAVKIT_LANES Z operator()(Z a, Z b) const {
+        using V = kernel::Lanes<T>;
+        const V zero{}, big = kernel::all<V>(limits<R>::big);
+        const V square = b.re * b.re + b.im * b.im, factor = T(1) / square;
+        const auto all_zero = (a.re == zero) & (a.im == zero) & (b.re == zero) & (b.im == zero);
+        const V limit = all_zero != 0 ? zero : big;
+        const Z quotient = a * conj(b);
+        return {square <= T(0) ? limit : quotient.re * factor,
+                square <= T(0) ? limit : quotient.im * factor};
+    }
+
   private:
     static bool is_zero(Bin<T> z) { return z.re == 0 && z.im == 0; }
     static T saturation(bool zero_by_zero) { return zero_by_zero ? T(0) : limits<R>::big; }

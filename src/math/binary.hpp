@@ -3,8 +3,10 @@
 #pragma once
 
 #include <algorithm>
+#include <concepts>
 #include <cstdint>
 
+#include "kernel/lanes.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
@@ -49,6 +51,28 @@ int prepare_output(R& a, R& b, R* out) {
 template <class A, class B, class Out, class Operation>
 void combine(const A* a, const B* b, Out* out, std::size_t n, Operation operation) {
     for (std::size_t i = 0; i < n; ++i) out[i] = operation(a[i], b[i]);
+}
+
+/// Complex points that an operation takes in vectors, too: one that selects or divides, and would
+/// branch or divide one by one. Few are left over.
+template <class T, class Operation>
+requires std::same_as<typename Operation::Z, kernel::Complexes<T, kernel::lanes<T>>>
+[[gnu::flatten]] void combine(const Bin<T>* a, const Bin<T>* b, Bin<T>* out, std::size_t n,
+                              Operation operation) {
+    constexpr int V = kernel::lanes<T>;
+    constexpr auto pairs = kernel::Layout::pairs;
+    const auto scalars = [](auto* z) {
+        using Scalar =
+            std::conditional_t<std::is_const_v<std::remove_pointer_t<decltype(z)>>, const T, T>;
+        return reinterpret_cast<Scalar*>(z);
+    };
+    std::size_t i = 0;
+    for (; n - i >= std::size_t(V); i += V) {
+        const auto p = kernel::load_complex<T, V, pairs>(scalars(a + i));
+        const auto q = kernel::load_complex<T, V, pairs>(scalars(b + i));
+        kernel::store_complex<T, V, pairs>(scalars(out + i), operation(p, q));
+    }
+    for (; i < n; ++i) out[i] = operation(a[i], b[i]);
 }
 
 /// Calls `combine_block(first, count, samples)` until all n real samples have gone into complex

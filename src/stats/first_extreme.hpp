@@ -76,10 +76,15 @@ template <class T, class Key>
             unequal = key(Points<T, true>{i + k}) == wanted ? kernel::Lanes<T>{} : unequal;
         if (kernel::any_below(unequal, T(1))) break;
     }
-    for (; i < n; ++i) {
-        if (key(Points<T, false>{i, 0, 0, 1})[0] == wanted) break;
+    for (; i < n; i += V) {
+        const std::size_t count = std::min(V, n - i);
+        T keys[V];
+        kernel::store<T, int(V)>(
+            keys, count == V ? key(Points<T, true>{i}) : key(Points<T, false>{i, 0, 0, count}));
+        const T* found = std::find(keys, keys + count, wanted);
+        if (found != keys + count) return i + std::size_t(found - keys);
     }
-    return i;
+    return n;
 }
 
 /// The first of the points [0, n) whose key beats `start` and is beaten by no other; n when there
