@@ -27,8 +27,15 @@ int subtract(const R* a, const R* b, R* out) {
 }
 
 template <Record R>
+struct Product {
+    using Z = kernel::Complexes<scalar<R>, kernel::lanes<scalar<R>>>;
+
+    WAVKIT_LANES auto operator()(auto a, auto b) const { return a * b; }
+};
+
+template <Record R>
 int multiply(const R* a, const R* b, R* out) {
-    return pointwise(a, b, out, [](auto p, auto q) { return p * q; });
+    return pointwise(a, b, out, Product<R>{});
 }
 
 template <Record R>
@@ -39,6 +46,9 @@ struct ConjugateProduct {
     Bin<T> operator()(Bin<T> a, T b) const { return a * b; }
     Bin<T> operator()(T a, Bin<T> b) const { return a * conj(b); }
     Bin<T> operator()(Bin<T> a, Bin<T> b) const { return a * conj(b); }
+
+    using Z = kernel::Complexes<T, kernel::lanes<T>>;
+    WAVKIT_LANES Z operator()(Z a, Z b) const { return a * conj(b); }
 };
 
 /// Division that saturates: a zero divisor gives 0 for 0 / 0 and the large value, without a sign,
@@ -54,6 +64,18 @@ struct Quotient {
     }
     Bin<T> operator()(T a, Bin<T> b) const { return divide(a * conj(b), a == 0, b); }
     Bin<T> operator()(Bin<T> a, Bin<T> b) const { return divide(a * conj(b), is_zero(a), b); }
+
+    using Z = kernel::Complexes<T, kernel::lanes<T>>;
+    WAVKIT_LANES Z operator()(Z a, Z b) const {
+        using V = kernel::Lanes<T>;
+        const V zero{}, big = kernel::all<V>(limits<R>::big);
+        const V square = b.re * b.re + b.im * b.im, factor = T(1) / square;
+        const auto all_zero = (a.re == zero) & (a.im == zero) & (b.re == zero) & (b.im == zero);
+        const V limit = all_zero != 0 ? zero : big;
+        const Z quotient = a * conj(b);
+        return {square <= T(0) ? limit : quotient.re * factor,
+                square <= T(0) ? limit : quotient.im * factor};
+    }
 
   private:
     static bool is_zero(Bin<T> z) { return z.re == 0 && z.im == 0; }

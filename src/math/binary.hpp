@@ -3,8 +3,10 @@
 #pragma once
 
 #include <algorithm>
+#include <concepts>
 #include <cstdint>
 
+#include "kernel/lanes.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
@@ -49,6 +51,29 @@ int prepare_output(R& a, R& b, R* out) {
 template <class A, class B, class Out, class Operation>
 void combine(const A* a, const B* b, Out* out, std::size_t n, Operation operation) {
     for (std::size_t i = 0; i < n; ++i) out[i] = operation(a[i], b[i]);
+}
+
+/// Complex points that an operation takes in vectors, to the last: a loop that the compiler makes
+/// vectors of may round a product otherwise than the points that it leaves over.
+template <class T, class Operation>
+requires std::same_as<typename Operation::Z, kernel::Complexes<T, kernel::lanes<T>>>
+[[gnu::flatten]] void combine(const Bin<T>* a, const Bin<T>* b, Bin<T>* out, std::size_t n,
+                              Operation operation) {
+    constexpr std::size_t V = kernel::lanes<T>;
+    constexpr auto pairs = kernel::Layout::pairs;
+    const auto apply = [=](const Bin<T>* p, const Bin<T>* q, Bin<T>* to) {
+        const auto z = operation(kernel::load_complex<T, V, pairs>(reinterpret_cast<const T*>(p)),
+                                 kernel::load_complex<T, V, pairs>(reinterpret_cast<const T*>(q)));
+        kernel::store_complex<T, V, pairs>(reinterpret_cast<T*>(to), z);
+    };
+    std::size_t i = 0;
+    for (; n - i >= V; i += V) apply(a + i, b + i, out + i);
+    if (i == n) return;
+    Bin<T> p[V] = {}, q[V] = {};
+    std::copy(a + i, a + n, p);
+    std::copy(b + i, b + n, q);
+    apply(p, q, p);
+    std::copy_n(p, n - i, out + i);
 }
 
 /// Calls `combine_block(first, count, samples)` until all n real samples have gone into complex

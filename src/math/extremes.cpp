@@ -2,6 +2,7 @@
 #include <functional>
 
 #include "math/binary.hpp"
+#include "stats/blockwise.hpp"
 
 namespace wavkit {
 namespace {
@@ -15,6 +16,11 @@ struct Choice {
     T operator()(T a, T b) const { return Beats{}(a, b) ? a : b; }
     Bin<T> operator()(Bin<T> a, Bin<T> b) const {
         return Beats{}(capped_magnitude_squared<R>(a), capped_magnitude_squared<R>(b)) ? a : b;
+    }
+    using Z = kernel::Complexes<T, kernel::lanes<T>>;
+    WAVKIT_LANES Z operator()(Z a, Z b) const {
+        const auto a_is_better = Beats{}(capped_lanes<R>(a), capped_lanes<R>(b));
+        return {a_is_better ? a.re : b.re, a_is_better ? a.im : b.im};
     }
     Bin<T> operator()(Bin<T> a, T b) const { return (*this)(a, Bin<T>{b, 0}); }
     Bin<T> operator()(T a, Bin<T> b) const { return (*this)(Bin<T>{a, 0}, b); }

@@ -26,13 +26,13 @@ struct Points {
     std::size_t count = V;
 
     kernel::Lanes<T> operator()(const T* x) const {
-        if constexpr (whole) return kernel::load<T, V>(x + first);
+        if constexpr (whole) return kernel::load<T, V>(x + first + ahead);
         T rest[V] = {};
-        std::copy_n(x + first, count, rest);
+        std::copy_n(x + first + ahead, count, rest);
         return kernel::load<T, V>(rest);
     }
     kernel::Complexes<T, V> operator()(const Bin<T>* z) const {
-        const T* x = reinterpret_cast<const T*>(z + first);
+        const T* x = reinterpret_cast<const T*>(z + first + ahead);
         if constexpr (whole) return kernel::load_complex<T, V, kernel::Layout::pairs>(x);
         T rest[2 * V] = {};
         std::copy_n(x, 2 * count, rest);
@@ -65,36 +65,39 @@ constexpr int chains(std::size_t sums) {
     return int(std::bit_floor(std::clamp<std::size_t>(registers / sums, 1, 8)));
 }
 
+/// The sum of C vectors, two and two.
+template <int C, class V>
+WAVKIT_LANES V joined_chains(const V* chain) {
+    if constexpr (C == 1) {
+        return chain[0];
+    } else {
+        return joined_chains<C / 2>(chain) + joined_chains<C / 2>(chain + C / 2);
+    }
+}
+
 /// The sums over the points [begin, end), a lane each.
 template <class T, class Terms>
 WAVKIT_LANES terms_of<T, Terms> sums_of_block(std::size_t begin, std::size_t end, Terms terms) {
     using Sums = terms_of<T, Terms>;
     constexpr std::size_t sums = std::tuple_size_v<Sums>;
     constexpr int V = kernel::lanes<T>, C = chains(sums);
-    Sums partial[C];
-    for (Sums& chain : partial) chain.fill(kernel::Lanes<T>{});
-    const auto gather = [&](Sums& to, auto points) {
+    kernel::Lanes<T> partial[sums][C];
+    kernel::unrolled<sums>(
+        [&](auto s) { kernel::unrolled<C>([&](auto c) { partial[s][c] = kernel::Lanes<T>{}; }); });
+    const auto gather = [&](auto chain, auto points) {
         const Sums term = terms(points);
-        for (std::size_t s = 0; s < sums; ++s) to[s] += points.only_points(term[s]);
+        kernel::unrolled<sums>([&](auto s) { partial[s][chain] += points.only_points(term[s]); });
     };
+    constexpr std::integral_constant<int, 0> first;
     std::size_t i = begin;
     for (; end - i >= std::size_t(C * V); i += C * V) {
-        kernel::unrolled<C>([&](auto c) {
-            gather(partial[c], Points<T, true>{i + c * V, i - begin, c * V});
-        });
+        kernel::unrolled<C>([&](auto c) { gather(c, Points<T, true>{i, i - begin, c * V}); });
     }
-    kernel::unrolled<C - 1>([&](auto c) {
-        if (end - i < std::size_t(V)) return;
-        gather(partial[c], Points<T, true>{i, i - begin, 0});
-        i += V;
-    });
-    if (i < end) gather(partial[0], Points<T, false>{i, i - begin, 0, end - i});
-    for (int span = C / 2; span > 0; span /= 2) {
-        for (int c = 0; c < span; ++c) {
-            for (std::size_t s = 0; s < sums; ++s) partial[c][s] += partial[c + span][s];
-        }
-    }
-    return partial[0];
+    for (; end - i >= std::size_t(V); i += V) gather(first, Points<T, true>{i, i - begin});
+    if (i < end) gather(first, Points<T, false>{i, i - begin, 0, end - i});
+    Sums joined;
+    kernel::unrolled<sums>([&](auto s) { joined[s] = joined_chains<C>(partial[s]); });
+    return joined;
 }
 
 /// a + b, and in `lost` besides what rounding takes from it (D. E. Knuth's sum of two).
@@ -149,24 +152,24 @@ WAVKIT_LANES kernel::Lane<V> folded_sum(V total, V lost) {
 /// The sums over the points [0, n) of `terms(points)`, an array of vectors for as many points; it
 /// reads them from the signals x by points(x).
 template <class T, class Terms>
-auto blockwise_sums(std::size_t n, Terms terms) {
+[[gnu::flatten]] auto blockwise_sums(std::size_t n, Terms terms) {
     using Sums = terms_of<T, Terms>;
     constexpr std::size_t sums = std::tuple_size_v<Sums>;
     std::array<T, sums> result{};
-    if (n <= block_points) {
-        const Sums only = sums_of_block<T>(0, n, terms);
-        for (std::size_t s = 0; s < sums; ++s)
-            result[s] = folded(only[s], [](auto a, auto b) { return a + b; });
-        return result;
-    }
     Sums total, lost;
     total.fill(kernel::Lanes<T>{});
     lost.fill(kernel::Lanes<T>{});
     for (std::size_t begin = 0; begin < n; begin += block_points) {
         const Sums partial = sums_of_block<T>(begin, std::min(n, begin + block_points), terms);
-        for (std::size_t s = 0; s < sums; ++s) total[s] = add(total[s], partial[s], lost[s]);
+        if (n <= block_points) {
+            kernel::unrolled<sums>([&](auto s) {
+                result[s] = folded(partial[s], [](auto a, auto b) { return a + b; });
+            });
+            return result;
+        }
+        kernel::unrolled<sums>([&](auto s) { total[s] = add(total[s], partial[s], lost[s]); });
     }
-    for (std::size_t s = 0; s < sums; ++s) result[s] = folded_sum(total[s], lost[s]);
+    kernel::unrolled<sums>([&](auto s) { result[s] = folded_sum(total[s], lost[s]); });
     return result;
 }
 

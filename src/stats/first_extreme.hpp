@@ -36,7 +36,7 @@ WAVKIT_LANES kernel::Lanes<T> best_of(std::size_t begin, std::size_t end, kernel
     using V = kernel::Lanes<T>;
     constexpr std::size_t lanes = kernel::lanes<T>, C = 8;
     V chain[C];
-    std::ranges::fill(chain, best);
+    kernel::unrolled<C>([&](auto c) { chain[c] = best; });
     std::size_t i = begin;
     for (; end - i >= C * lanes; i += C * lanes) {
         kernel::unrolled<C>([&](auto c) {
@@ -49,15 +49,13 @@ WAVKIT_LANES kernel::Lanes<T> best_of(std::size_t begin, std::size_t end, kernel
         const Points<T, false> rest{i, 0, 0, end - i};
         chain[0] = rest.only_points(Order::better(chain[0], key(rest)), chain[0]);
     }
-    for (std::size_t span = C / 2; span > 0; span /= 2) {
-        for (std::size_t c = 0; c < span; ++c) chain[c] = Order::better(chain[c], chain[c + span]);
-    }
-    return chain[0];
+    kernel::unrolled<C - 1>([&](auto c) { chain[c + 1] = Order::better(chain[c], chain[c + 1]); });
+    return chain[C - 1];
 }
 
 /// The best among `start` and the keys of the points [0, n).
 template <class Order, class T, class Key>
-T best_key(std::size_t n, T start, Key key) {
+[[gnu::flatten]] T best_key(std::size_t n, T start, Key key) {
     const auto best = best_of<Order, T>(0, n, kernel::all<kernel::Lanes<T>>(start), key);
     return folded(best, [](auto a, auto b) {
         if constexpr (std::is_same_v<decltype(a), T>)
@@ -69,7 +67,7 @@ T best_key(std::size_t n, T start, Key key) {
 
 /// The first of the points [0, n) with the key `wanted`; n when there is none.
 template <class T, class Key>
-std::size_t first_with_key(std::size_t n, T wanted, Key key) {
+[[gnu::flatten]] std::size_t first_with_key(std::size_t n, T wanted, Key key) {
     constexpr std::size_t V = kernel::lanes<T>, step = 4 * V;
     std::size_t i = 0;
     for (; n - i >= step; i += step) {
@@ -78,10 +76,15 @@ std::size_t first_with_key(std::size_t n, T wanted, Key key) {
             unequal = key(Points<T, true>{i + k}) == wanted ? kernel::Lanes<T>{} : unequal;
         if (kernel::any_below(unequal, T(1))) break;
     }
-    for (; i < n; ++i) {
-        if (key(Points<T, false>{i, 0, 0, 1})[0] == wanted) break;
+    for (; i < n; i += V) {
+        const std::size_t count = std::min(V, n - i);
+        T keys[V];
+        kernel::store<T, int(V)>(
+            keys, count == V ? key(Points<T, true>{i}) : key(Points<T, false>{i, 0, 0, count}));
+        const T* found = std::find(keys, keys + count, wanted);
+        if (found != keys + count) return i + std::size_t(found - keys);
     }
-    return i;
+    return n;
 }
 
 /// The first of the points [0, n) whose key beats `start` and is beaten by no other; n when there
