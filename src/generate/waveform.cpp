@@ -166,21 +166,22 @@ int add_cosine(R* x, scalar<R> amplitude, scalar<R> freq, scalar<R> phase) {
 /// out[i] = value + i * step
 template <class T>
 void put_multiples(T* out, std::size_t n, T value, T step) {
-    for (std::size_t i = 0; i < n; ++i) out[i] = value + T(std::int32_t(i)) * step;
+    const int count = int(n);
+    for (int i = 0; i < count; ++i) out[i] = value + T(i) * step;
 }
 
-/// Whether all values between two lie on one grid: they have one sign and one exponent.
+/// The power of two, with the sign, whose multiples up to the double have the exponent of a value.
 template <class T>
-bool same_grid(T a, T b) {
+T binade(T value) {
     using Word = std::conditional_t<sizeof(T) == 8, std::uint64_t, std::uint32_t>;
-    constexpr int mantissa = std::numeric_limits<T>::digits - 1;
-    return std::bit_cast<Word>(a) >> mantissa == std::bit_cast<Word>(b) >> mantissa;
+    constexpr Word mantissa = (Word(1) << (std::numeric_limits<T>::digits - 1)) - 1;
+    return std::bit_cast<T>(std::bit_cast<Word>(value) & ~mantissa);
 }
 
 /// How many more times `step`, a multiple of the grid, can be added to a value without leaving it.
 template <class T>
 std::size_t steps_left(T value, T step, std::size_t most) {
-    const T low = std::ldexp(T(1), std::ilogb(value)), size = std::fabs(value);
+    const T low = std::fabs(binade(value)), size = std::fabs(value);
     const T room = (value < 0) == (step < 0) ? 2 * low - size : size - low;
     const T steps = room / std::fabs(step) - 1;
     return steps < T(most) ? steps > 1 ? std::size_t(steps) : 0 : most;
@@ -198,7 +199,7 @@ void add_repeatedly(T* out, std::size_t n, T value, T step) {
         const T difference = second - next;
         out[i++] = value;
         value = next;
-        if (n - i < 16 || !same_grid(next, third) || third - second != difference) continue;
+        if (n - i < 16 || binade(next) != binade(third) || third - second != difference) continue;
         if (!std::isnormal(next)) continue;
         const std::size_t most = std::min(n - i, longest);
         const std::size_t run = difference == 0 ? most : steps_left(next, difference, most);

@@ -21,15 +21,16 @@ class CosineSum {
 
     WAVKIT_LANES kernel::Lanes<T> operator()(const Offsets<T>& positions) const {
         using Vector = kernel::Lanes<T>;
-        const auto sign = rounded(positions, [this](Doubles position) {
-            return is_inner(position) ? Doubles{} + 1.0 : Doubles{} - 1.0;
-        });
-        const Vector step = -sign * rounded(positions, [this](Doubles position) {
-            const Doubles from_extremum = is_inner(position) ? position : half_period_ - position;
-            const Doubles angle = from_extremum * half_step_;
+        // 2 - 2 |cos(phi)|, with the sign of the half.
+        const Vector signed_step = rounded(positions, [this](Doubles position) {
+            const auto inner = 2 * position <= half_period_;
+            const Doubles angle = (inner ? position : half_period_ - position) * half_step_;
             const Doubles sine = angle + kernel::sine_tail(angle, Doubles{}, angle * angle);
-            return 4.0 * sine * sine;
+            return (inner ? Doubles{} + 4.0 : Doubles{} - 4.0) * (sine * sine);
         });
+        const Vector step = -signed_step;
+        const Vector sign =
+            kernel::flip_by_sign_of(kernel::all<Vector>(1), kernel::bits(signed_step));
         Vector b{}, d{};
         for (std::size_t k = a_.size(); k-- > 1;) {
             d = kernel::mul_add(step, b, kernel::mul_add(sign, d, kernel::all<Vector>(a_[k])));
@@ -39,8 +40,6 @@ class CosineSum {
     }
 
   private:
-    WAVKIT_LANES auto is_inner(Doubles position) const { return 2 * position <= half_period_; }
-
     std::span<const T> a_;
     double half_period_, half_step_;
 };

@@ -4,6 +4,7 @@
 #pragma once
 
 #include <algorithm>
+#include <utility>
 
 #include "kernel/elementary.hpp"
 
@@ -29,17 +30,21 @@ WAVKIT_LANES Offsets<T> offsets_from(double first) {
     return t;
 }
 
+template <class Half, int... I>
+WAVKIT_LANES auto joined(Half a, Half b, std::integer_sequence<int, I...>) {
+    return __builtin_shufflevector(a, b, I...);
+}
+
 /// f of every distance, rounded to the precision.
 template <class T, class Function>
 WAVKIT_LANES kernel::Lanes<T> rounded(const Offsets<T>& t, Function f) {
     if constexpr (Offsets<T>::parts == 1) {
         return f(t.part[0]);
     } else {
-        constexpr int V = kernel::lanes<double>;
-        using Half = kernel::Vec<T, V>;
-        const Half halves[] = {__builtin_convertvector(f(t.part[0]), Half),
-                               __builtin_convertvector(f(t.part[1]), Half)};
-        return kernel::load<T, 2 * V>(reinterpret_cast<const T*>(halves));
+        using Half = kernel::Vec<T, kernel::lanes<double>>;
+        return joined(__builtin_convertvector(f(t.part[0]), Half),
+                      __builtin_convertvector(f(t.part[1]), Half),
+                      std::make_integer_sequence<int, kernel::lanes<T>>{});
     }
 }
 
