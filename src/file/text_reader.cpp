@@ -1,11 +1,19 @@
 // Reading text signals: "#" lines and plain numbers, the same in every locale.
 #include <algorithm>
+#include <bit>
 #include <charconv>
 #include <cstdint>
+#include <cstdlib>
+#include <cstring>
 #include <optional>
 #include <string_view>
 
 #include "file/format.hpp"
+#include "file/powers_of_ten.hpp"
+
+#if defined(__unix__) || defined(__APPLE__)
+#include <sys/stat.h>
+#endif
 
 namespace wavkit {
 namespace {
@@ -20,19 +28,80 @@ int next_character(std::FILE* stream) {
 #endif
 }
 
+/// Whether any number of characters can go back into a stream.
+bool can_go_back([[maybe_unused]] std::FILE* stream) {
+#if defined(__unix__) || defined(__APPLE__)
+    struct stat about;
+    return fstat(fileno(stream), &about) == 0 && S_ISREG(about.st_mode);
+#else
+    return false;
+#endif
+}
+
 /// Characters of a stream, the first one visible before it is taken. What is visible at the end
 /// goes back: the next signal may begin with it.
 class Characters {
   public:
-    explicit Characters(std::FILE* stream) : stream_(stream), next_(next_character(stream)) {}
+    explicit Characters(std::FILE* stream) : stream_(stream) { fetch_one(); }
 
-    int peek() const { return next_; }
-    void skip() { next_ = next_character(stream_); }
-    bool give_back() { return next_ == EOF || std::ungetc(next_, stream_) != EOF; }
+    int peek() const { return next_ == end_ ? EOF : static_cast<unsigned char>(*next_); }
+    void skip() {
+        if (++next_ == end_) fetch_one();
+    }
+
+    /// What is in view. Where that is little, it becomes more if `values` numbers still have to
+    /// come: they take that many characters at least, with a separator between each two. So a
+    /// signal as declared never brings a character of the next one into view, apart from the one
+    /// behind its last value.
+    std::string_view look_ahead(std::int64_t values) {
+        const std::size_t rest = std::size_t(end_ - next_);
+        if (rest < enough && !at_end_) {
+            const auto least = std::min<std::int64_t>(values, capacity) * 2 - 1;
+            const std::size_t total = std::min(std::size_t(least), capacity);
+            if (total >= enough && is_bulk()) fetch(rest, total - rest);
+        }
+        return {next_, std::size_t(end_ - next_)};
+    }
+    void skip(std::size_t n) {
+        next_ += n - 1;
+        skip();
+    }
+
+    bool give_back() {
+        const auto rest = end_ - next_;
+        if (rest == 0) return true;
+        if (rest == 1) return std::ungetc(peek(), stream_) != EOF;
+        return std::fseek(stream_, -long(rest), SEEK_CUR) == 0;
+    }
 
   private:
+    static constexpr std::size_t capacity = 1 << 14;
+    static constexpr std::size_t enough = 64;
+
+    void fetch_one() {
+        const int c = next_character(stream_);
+        next_ = end_ = text_;
+        at_end_ = c == EOF;
+        if (!at_end_) *end_++ = char(c);
+    }
+    void fetch(std::size_t rest, std::size_t more) {
+        std::memmove(text_, next_, rest);
+        const std::size_t came = std::fread(text_ + rest, 1, more, stream_);
+        at_end_ = came < more;
+        next_ = text_;
+        end_ = text_ + rest + came;
+    }
+    bool is_bulk() {
+        if (!bulk_) bulk_ = can_go_back(stream_);
+        return *bulk_;
+    }
+
     std::FILE* stream_;
-    int next_;
+    char* next_;
+    char* end_;
+    bool at_end_;
+    std::optional<bool> bulk_;
+    char text_[capacity];
 };
 
 /// The same for the characters of a line.
@@ -197,6 +266,120 @@ bool read_number(Source& in, T& value) {
     return read;
 }
 
+/// The number of eight digits, the first one in the lowest byte: neighbours become pairs, pairs
+/// fours, fours one number. Zero bytes in front count as digits 0.
+constexpr std::uint64_t joined(std::uint64_t eight) {
+    eight &= 0x0F0F0F0F0F0F0F0F;
+    eight = (eight * 10 + (eight >> 8)) & 0x00FF00FF00FF00FF;
+    eight = (eight * 100 + (eight >> 16)) & 0x0000FFFF0000FFFF;
+    return (eight * 10000 + (eight >> 32)) & 0xFFFFFFFF;
+}
+
+/// Has bits in those bytes up to the first other one, counted from the lowest, that are no digits.
+constexpr std::uint64_t other_than_digits(std::uint64_t eight) {
+    constexpr std::uint64_t each = 0x0101010101010101;  // '0' is 0x30, and '9' + 6 is 0x3F
+    return (eight & (eight + each * 6) & each * 0xF0) ^ each * '0';
+}
+
+/// A plain decimal number while it is being read: digits * 10^exponent. Of more than 19 digits, the
+/// number of those that are sure to fit, only the count is right.
+struct PlainDecimal {
+    std::uint64_t digits = 0;
+    int count = 0;
+    int exponent = 0;
+
+    void take_digit(char c) { digits = digits * 10 + std::uint64_t(c - '0'); }
+
+    /// Takes the digits before the point: few, mostly.
+    const char* take_whole(const char* at, const char* end) {
+        const char* const begin = at;
+        for (; at != end && is_digit(*at); ++at) take_digit(*at);
+        count += int(at - begin);
+        return at;
+    }
+
+    /// Takes those behind it, eight at a time where the machine has the first byte lowest.
+    const char* take_fraction(const char* at, const char* end) {
+        constexpr std::uint64_t scale[] = {1, 10, 100, 1000, 10000, 100000, 1000000, 10000000};
+        const char* const begin = at;
+        if constexpr (std::endian::native == std::endian::little) {
+            for (std::uint64_t eight; end - at >= 8; at += 8) {
+                std::memcpy(&eight, at, 8);
+                if (const std::uint64_t others = other_than_digits(eight)) {
+                    const int run = std::countr_zero(others) / 8;
+                    // Half of the shift at a time: of no digits nothing stays.
+                    digits =
+                        digits * scale[run] + joined(eight << (32 - 4 * run) << (32 - 4 * run));
+                    at += run;
+                    break;
+                }
+                digits = digits * 100000000 + joined(eight);
+            }
+        }
+        for (; at != end && is_digit(*at); ++at) take_digit(*at);
+        count += int(at - begin);
+        exponent -= int(at - begin);
+        return at;
+    }
+
+    /// The nearest value, by one product with a power of ten; false where the 64 bits of the power
+    /// do not tell it.
+    template <class T>
+    bool round([[maybe_unused]] T& value) const {
+#if defined(__SIZEOF_INT128__)
+        using Limits = std::numeric_limits<T>;
+        if (count > 19 || exponent < lowest_power || exponent > highest_power) return false;
+        if (digits == 0) {
+            value = 0;
+            return true;
+        }
+        const int zeros = std::countl_zero(digits);
+        const Scaled scaled(digits << zeros, exponent);
+        const int shift = 127 + int(scaled.product >> 127) - Limits::digits;
+        const int binary = scaled.exponent - zeros + shift;
+        if (binary < Limits::min_exponent || binary > Limits::max_exponent - 2 - Limits::digits)
+            return false;
+        std::uint64_t rounded;
+        if (!scaled.round(shift, rounded)) return false;
+        value = T(rounded) * T(std::bit_cast<double>(std::uint64_t(binary + 1023) << 52));
+        return true;
+#else
+        return false;
+#endif
+    }
+};
+
+/// Reads a number as nearly all are: decimal, of moderate length, white space behind it. Returns
+/// how many characters it takes, 0 for anything else.
+template <class T>
+std::size_t read_plain(std::string_view text, T& value) {
+    const char *at = text.data(), *const end = at + text.size();
+    if (at == end) return 0;
+    const bool negative = *at == '-';
+    at += negative;
+    const char* const unsigned_part = at;
+
+    PlainDecimal number;
+    at = number.take_whole(at, end);
+    if (at != end && *at == '.') at = number.take_fraction(at + 1, end);
+    if (number.count == 0) return 0;
+    if (at != end && lower(*at) == 'e') {
+        if (++at != end && *at == '+') ++at;
+        if (at == end || (at[-1] == '+' && !is_digit(*at))) return 0;
+        int exponent;
+        const auto read = std::from_chars(at, end, exponent);
+        if (read.ec != std::errc{} || std::abs(exponent) > 9999) return 0;
+        number.exponent += exponent;
+        at = read.ptr;
+    }
+    if (at == end || !is_space(*at)) return 0;
+
+    if (!number.round(value) && std::from_chars(unsigned_part, at, value).ec != std::errc{})
+        return 0;
+    if (negative) value = -value;
+    return std::size_t(at - text.data());
+}
+
 /// The digits of a hexadecimal integer of 32 bits, higher ones lost; it is taken as signed.
 template <class T>
 bool read_hexadecimal(Characters& in, bool negative, T& value) {
@@ -210,9 +393,14 @@ bool read_hexadecimal(Characters& in, bool negative, T& value) {
     return true;
 }
 
-/// A number, or a hexadecimal integer: one that begins like a 0 and goes on with "x".
+/// A number, or a hexadecimal integer: one that begins like a 0 and goes on with "x". At least
+/// `wanted` of them have to come, this one included.
 template <class T>
-bool read_value(Characters& in, T& value) {
+bool read_value(Characters& in, std::int64_t wanted, T& value) {
+    if (const std::size_t length = read_plain(in.look_ahead(wanted), value)) {
+        in.skip(length);
+        return true;
+    }
     const bool negative = in.peek() == '-';
     if (!read_number(in, value)) return false;
     if (value != 0 || in.peek() != 'x') return true;
@@ -227,9 +415,10 @@ struct Header {
 
     bool is_complex() const { return complex.value_or(0) != 0; }
     bool is_whole() const { return points && complex && has_delta; }
-    /// Whether that many values are all that was declared.
-    bool is_reached(std::int64_t values) const {
-        return points && values >= *points * (is_complex() ? 2 : 1);
+    /// How many values have to come after so many; any number where none was declared.
+    std::int64_t wanted_after(std::int64_t values) const {
+        if (!points) return std::numeric_limits<int>::max();
+        return *points * (is_complex() ? 2 : 1) - values;
     }
 };
 
@@ -304,12 +493,13 @@ bool read_values(R* x, Characters& in, Header& header, std::int64_t& values) {
         if (c == EOF) return true;
         // A '#' after the last declared value begins the next signal. A signal without values has
         // no last one: there the header must be whole first.
-        if (header.is_reached(values) && (c != '#' || values > 0 || header.is_whole())) return true;
+        const std::int64_t wanted = header.wanted_after(values);
+        if (wanted <= 0 && (c != '#' || values > 0 || header.is_whole())) return true;
         if (c == '#') {
             take_header_line(Line(in), header, x);
             continue;
         }
-        if (!read_value(in, x->data[values])) return false;
+        if (!read_value(in, wanted, x->data[values])) return false;
         if (++values % growth == 0 && !make_room(x, values, growth)) return false;
     }
 }

@@ -2,12 +2,13 @@
 #include <algorithm>
 #include <charconv>
 
+#include "file/decimal.hpp"
 #include "file/format.hpp"
 
 namespace wavkit {
 namespace {
 
-/// Text on its way to a stream, gathered in loads of a few kilobytes. The stream's own errors stay
+/// Text on its way to a stream, gathered in loads of some kilobytes. The stream's own errors stay
 /// with the stream.
 class TextOutput {
   public:
@@ -27,6 +28,16 @@ class TextOutput {
         make_room();
         end_ = std::to_chars(end_, std::end(text_), number).ptr;
     }
+    /// As printf's %.{digits}g has it in the C locale.
+    template <int digits, class T>
+    void put_general(T number) {
+        make_room();
+        if (char* const end = print_general<digits>(number, end_)) {
+            end_ = end;
+        } else {
+            put(number, std::chars_format::general, digits);
+        }
+    }
     /// As printf's %.{precision}g or %.{precision}f has it in the C locale.
     template <class T>
     void put(T number, std::chars_format format, int precision) {
@@ -35,7 +46,7 @@ class TextOutput {
     }
 
   private:
-    static constexpr std::ptrdiff_t longest_number = 32;
+    static constexpr std::ptrdiff_t longest_number = 48;  // and what is copied along with it
 
     void make_room() {
         if (std::end(text_) - end_ < longest_number) flush();
@@ -46,7 +57,7 @@ class TextOutput {
     }
 
     std::FILE* stream_;
-    char text_[4096];
+    char text_[1 << 14];
     char* end_ = text_;
 };
 
@@ -67,7 +78,7 @@ void put_header(const R* x, TextOutput& out) {
     out.put(int(sizeof(scalar<R>)));
     out.put('\n');
     out.put(delta_label);
-    out.put(x->delta, std::chars_format::general, digits<R>);
+    out.put_general<digits<R>>(x->delta);
     out.put('\n');
 }
 
@@ -76,7 +87,7 @@ template <Record R>
 void put_data(const R* x, TextOutput& out) {
     const std::size_t numbers_a_line = std::size_t(width(x));
     for (std::size_t i = 0; i < used(x); ++i) {
-        out.put(x->data[i], std::chars_format::general, digits<R>);
+        out.put_general<digits<R>>(x->data[i]);
         out.put((i + 1) % numbers_a_line ? ' ' : '\n');
     }
 }

@@ -1,6 +1,7 @@
 // Two signals joined otherwise than point by point: as the parts of a complex one, as polynomials,
 // as a dot product.
 #include "math/binary.hpp"
+#include "math/long_product.hpp"
 #include "stats/blockwise.hpp"
 
 namespace wavkit {
@@ -37,6 +38,8 @@ int multiply_apart(const R* a, const R* b, R* out) {
     R p = *a, q = *b;
     out->delta = (p.delta + q.delta) * scalar<R>(0.5);
     if (size_output(p, q, out, n && m ? n + m - 1 : 0, p.complex || q.complex)) return -1;
+    if (!a->complex && !b->complex && multiply_by_spectra<R>(values(a), values(b), values(out)))
+        return 0;
     std::ranges::fill(values(out), scalar<R>(0));
     if (a->complex && b->complex) {
         convolve(bins(a), bins(b), bins(out));

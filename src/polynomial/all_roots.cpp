@@ -83,24 +83,33 @@ int deflate(R* polynomial, std::span<Bin<scalar<R>>> roots) {
     return 0;
 }
 
-/// Works on a copy: the coefficients stay where no root is found.
+/// Works on a copy: the coefficients stay where no root is found. Roots of single precision are
+/// found in double too: division after division, their own precision would be lost.
 template <Record R>
 int replace_by_roots(R* x) {
-    using T = scalar<R>;
     if (x->complex) return -1;
-    const int n = int(without_leading_zeros(values(x)).size());
+    const auto c = without_leading_zeros(values(x));
+    const int n = int(c.size());
     if (n < 2) {
         x->points = 0;
         return 0;
     }
-    Temporary<R> polynomial, roots;
+    Temporary<dsp> polynomial, divided, found;
+    polynomial->points = n;
+    found->points = n - 1;
+    found->complex = 1;
+    if (dsp_alloc(polynomial) || dsp_alloc(found)) return -1;
+    std::ranges::copy(c, polynomial->data);
+    if (dsp_copy(divided, polynomial) || dspi_scale(divided, 1 / polynomial->data[n - 1]) ||
+        deflate(divided.get(), bins(found.get())))
+        return -1;
+    correct<double>(values(polynomial.get()), bins(found.get()));
+
+    Temporary<R> roots;
     roots->points = n - 1;
     roots->complex = 1;
-    if (dsp_copy_at_most(polynomial, x, n) ||
-        dspi_scale(polynomial, T(1) / polynomial->data[n - 1]) || dsp_alloc(roots) ||
-        deflate(polynomial.get(), bins(roots.get())))
-        return -1;
-    correct<T>(values(x).first(n), bins(roots.get()));
+    if (dsp_alloc(roots)) return -1;
+    std::ranges::transform(values(found.get()), roots->data, [](double v) { return scalar<R>(v); });
     return status(dspi_sort(roots) || dsp_copy(x, roots));
 }
 

@@ -160,5 +160,24 @@ BOTH_PRECISIONS(Binary, LengthsAndWrongOperands) {
     EXPECT_EQ(out->data, nullptr);
 }
 
+BOTH_PRECISIONS(Binary, LongPolynomialsKeepEveryCoefficient) {
+    Noise noise;
+    for (const bool level : {true, false}) {
+        Signal<R> a = noise.real<R>(700), b = noise.real<R>(1100), out;
+        for (int i = 0; !level && i < 700; ++i) a->data[i] = std::ldexp(a->data[i], -i / 8);
+        ASSERT_EQ(dspb_pmul(a, b, out), 0);
+        ASSERT_EQ(out->points, 1799);
+        for (int k = 0; k < 1799; ++k) {
+            long double sum = 0, magnitude = 0;
+            for (int i = std::max(0, k - 1099); i <= std::min(k, 699); ++i) {
+                const long double product = (long double)a->data[i] * b->data[k - i];
+                sum += product;
+                magnitude += std::fabs(product);
+            }
+            ASSERT_NEAR(out->data[k], sum, double(40 * epsilon<R> * magnitude)) << k;
+        }
+    }
+}
+
 }  // namespace
 }  // namespace wavkit::test
