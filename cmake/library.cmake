@@ -30,6 +30,12 @@ set(WAVKIT_OBJECTS $<TARGET_OBJECTS:wavkit_entries>)
 # Transforms are only the better for fused products and sums.
 file(GLOB fused ${PROJECT_SOURCE_DIR}/src/transform/*.cpp)
 set_source_files_properties(${fused} PROPERTIES COMPILE_OPTIONS -ffp-contract=fast)
+# GCC's vectoriser fuses complex products all the same, and what is left beside its vectors not:
+# where the last bit must not depend on where samples lie, loops over them are not for it.
+foreach(topic filter/direct polynomial/all_roots math/combine)
+  set_source_files_properties(${PROJECT_SOURCE_DIR}/src/${topic}.cpp PROPERTIES COMPILE_OPTIONS
+    -fno-tree-vectorize)
+endforeach()
 foreach(set IN LISTS WAVKIT_SETS)
   wavkit_add_objects(wavkit_${set} ${WAVKIT_SOURCES})
   target_compile_definitions(wavkit_${set} PRIVATE WAVKIT_SET=${set})

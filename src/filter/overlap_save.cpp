@@ -6,6 +6,7 @@
 #include <bit>
 
 #include "filter/convolution.hpp"
+#include "kernel/half_spectrum.hpp"
 #include "state.hpp"
 #include "transform/transform.hpp"
 
@@ -103,18 +104,13 @@ const TapSpectrum<R>* find_spectrum(const FilterCall<R>& call) {
     return spectrum;
 }
 
-template <class T>
-void multiply(Bin<T>* x, std::span<const Bin<T>> y) {
-    for (std::size_t k = 0; k < y.size(); ++k) x[k] = x[k] * y[k];
-}
-
 /// A stretch of p samples, filtered circularly.
 template <Record R>
 int filter_stretch(scalar<R>* x, int p, bool is_complex, const R* spectrum) {
     using T = scalar<R>;
     auto* const z = reinterpret_cast<Bin<T>*>(x);
     if (is_complex ? transform<R>(z, p, false, T(1)) : transform_real<R>(x, p, T(1))) return -1;
-    multiply<T>(z, bins(spectrum));
+    kernel::multiply<false>(x, spectrum->data, length(spectrum));
     return is_complex ? transform<R>(z, p, true, T(1)) : transform_to_real<R>(x, p, T(1));
 }
 

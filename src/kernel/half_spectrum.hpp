@@ -65,4 +65,21 @@ void join(T* data, std::size_t half, const T* roots) {
     combine_halves<false>(data, half, roots);
 }
 
+/// x[k] *= y[k], or its conjugate, for `count` samples in pairs: spectra of a convolution, or of a
+/// correlation.
+template <bool Conjugate, class T, int V = lanes<T>>
+inline void multiply(T* x, const T* y, std::size_t count) {
+    std::size_t k = 0;
+    for (; k + V <= count; k += V) {
+        const auto a = load_complex<T, V, Layout::pairs>(x + 2 * k);
+        const auto b = load_complex<T, V, Layout::pairs>(y + 2 * k);
+        if constexpr (Conjugate) {
+            store_complex<T, V, Layout::pairs>(x + 2 * k, a * conj(b));
+        } else {
+            store_complex<T, V, Layout::pairs>(x + 2 * k, a * b);
+        }
+    }
+    if constexpr (V > 1) multiply<Conjugate, T, 1>(x + 2 * k, y + 2 * k, count - k);
+}
+
 }  // namespace wavkit::kernel

@@ -1,5 +1,6 @@
 // Two signals joined otherwise than point by point: as the parts of a complex one, as polynomials,
 // as a dot product.
+#include "kernel/vector.hpp"
 #include "math/binary.hpp"
 #include "math/long_product.hpp"
 #include "stats/blockwise.hpp"
@@ -23,12 +24,29 @@ int join_parts(const R* a, const R* b, R* out) {
     return write_beside(a, b, out, [=](R* result) { return join_from_start(a, b, result); });
 }
 
+/// out[j] += factor * b[j] in whole vectors; returns how many products they held.
+template <class T>
+std::size_t add_products(T factor, std::span<const T> b, T* out) {
+    constexpr std::size_t V = kernel::lanes<T>;
+    std::size_t j = 0;
+    for (; j + V <= b.size(); j += V) {
+        kernel::store<T, V>(out + j,
+                            kernel::load<T, V>(out + j) +
+                                kernel::broadcast<T, V>(factor) * kernel::load<T, V>(b.data() + j));
+    }
+    return j;
+}
+
 /// out[i + j] += a[i] * b[j], the longer operand in the inner loop.
 template <class A, class B, class Out>
 void convolve(std::span<const A> a, std::span<const B> b, std::span<Out> out) {
     if (a.size() > b.size()) return convolve(b, a, out);
     for (std::size_t i = 0; i < a.size(); ++i) {
-        for (std::size_t j = 0; j < b.size(); ++j) out[i + j] += a[i] * b[j];
+        std::size_t j = 0;
+        if constexpr (std::floating_point<B>) {
+            if constexpr (std::same_as<A, B>) j = add_products<B>(a[i], b, &out[i]);
+        }
+        for (; j < b.size(); ++j) out[i + j] += a[i] * b[j];
     }
 }
 

@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <bit>
 
+#include "kernel/half_spectrum.hpp"
 #include "transform/record_transform.hpp"
 #include "transform/transform.hpp"
 
@@ -58,9 +59,8 @@ int correlate(const R* a, const R* b, R* out, int m, int half) {
     if (forward<R>(first, padded, complex, factor) || forward<R>(second, padded, complex, T(1))) {
         return -1;
     }
-    auto* const p = reinterpret_cast<Bin<T>*>(first);
-    auto* const q = reinterpret_cast<Bin<T>*>(second);
-    for (int k = 0; k < (complex ? padded : padded / 2 + 1); ++k) q[k] = q[k] * conj(p[k]);
+    const int count = complex ? padded : padded / 2 + 1;
+    kernel::multiply<true>(second, first, std::size_t(count));
     if (backward<R>(second, padded, complex)) return -1;
 
     out->delta = delta;

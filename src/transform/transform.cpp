@@ -31,13 +31,12 @@ template <class T>
 void convolve_with_chirp(const Transform<T>& t, Bin<T>* z, T* work, bool inverse, T scale) {
     const auto n = std::size_t(t.points), length = t.convolution_points;
     const auto* const chirp = reinterpret_cast<const Bin<T>*>(t.chirp);
-    const auto* const filter = reinterpret_cast<const Bin<T>*>(t.filter);
     auto* const y = reinterpret_cast<Bin<T>*>(work);
     T* const rest = work + 2 * length;
     for (std::size_t i = 0; i < n; ++i) y[i] = (inverse ? conj(z[i]) : z[i]) * chirp[i];
     std::fill(y + n, y + length, Bin<T>{0, 0});
     run(t, work, rest, false, T(1));
-    for (std::size_t i = 0; i < length; ++i) y[i] = y[i] * filter[i];
+    kernel::multiply<false>(work, t.filter, length);
     run(t, work, rest, true, T(scale / T(length)));
     for (std::size_t i = 0; i < n; ++i) {
         const auto turned = y[i] * chirp[i];
