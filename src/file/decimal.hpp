@@ -1,6 +1,7 @@
 // Decimal digits of a floating-point number, as many as asked for, correctly rounded.
 #pragma once
 
+#include <algorithm>
 #include <cstring>
 
 #include "file/powers_of_ten.hpp"
@@ -118,7 +119,7 @@ char* print_general([[maybe_unused]] T number, [[maybe_unused]] char* to) {
     const int exponent = rounded.exponent;
     if (exponent < -4 || exponent >= n) return print_scientific(digits, count, exponent, to);
     if (exponent < 0) {
-        std::memcpy(to, "0.0000", 6);
+        std::copy_n("0.0000", 6, to);
         to += 1 - exponent;
         std::memcpy(to, digits, 16);
         return to + count;

@@ -450,7 +450,7 @@ void take_header_line(std::string_view line, Header& header, R* x) {
     take_integer(line, complex_label, header.complex);
     if (header.points) header.points = std::max<std::int64_t>(*header.points, 0);
     LineCharacters in(line);
-    scalar<R> delta;
+    scalar<R> delta = 0;
     if (take_label(in, delta_label) && read_number(in, delta)) {
         x->delta = delta;
         header.has_delta = true;

@@ -77,7 +77,7 @@ inline void map_complex(const T* from, T* to, std::size_t n, Function f) {
     constexpr int V = lanes<T>;
     constexpr std::size_t step = V;
     using Result = decltype(f(Complexes<T, V>{}));
-    constexpr std::size_t width = sizeof(Result) / sizeof(Vec<T, V>);
+    constexpr std::size_t width = std::is_same_v<Result, Vec<T, V>> ? 1 : 2;
     T padding[2 * V];
     const T* source = from;
     T* target = to;

@@ -119,15 +119,14 @@ inline bool run_straight(int n, T* data, T scale) {
             return run_straight<16, 4, V, Outside>(data, scale), true;
         case 32:
             return run_straight<32, 8, V, Outside>(data, scale), true;
-        case 64:
-            if constexpr (wide) return run_straight<64, 8, W, Outside>(data, scale), true;
-            return false;
-        case 128:
-            if constexpr (wide) return run_straight<128, 8, W, Outside>(data, scale), true;
-            return false;
         default:
-            return false;
+            break;
     }
+    if constexpr (wide) {
+        if (n == 64) return run_straight<64, 8, W, Outside>(data, scale), true;
+        if (n == 128) return run_straight<128, 8, W, Outside>(data, scale), true;
+    }
+    return false;
 }
 
 }  // namespace wavkit::kernel

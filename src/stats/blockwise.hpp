@@ -90,7 +90,7 @@ WAVKIT_LANES terms_of<T, Terms> sums_of_block(std::size_t begin, std::size_t end
     };
     constexpr std::integral_constant<int, 0> first;
     std::size_t i = begin;
-    for (; end - i >= std::size_t(C * V); i += C * V) {
+    for (; end - i >= std::size_t(C) * V; i += std::size_t(C) * V) {
         kernel::unrolled<C>([&](auto c) { gather(c, Points<T, true>{i, i - begin, c * V}); });
     }
     for (; end - i >= std::size_t(V); i += V) gather(first, Points<T, true>{i, i - begin});

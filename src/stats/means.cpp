@@ -64,7 +64,7 @@ scalar<R> harmonic_mean(std::span<const scalar<R>> x) {
     const auto [sum, zeros] = blockwise_sums<T>(x.size(), [v = x.data()](auto points) {
         const auto value = points(v);
         const auto one = kernel::all<kernel::Lanes<T>>(T(1));
-        return std::array{T(1) / value, value == T(0) ? one : one - one};
+        return std::array{T(1) / value, value == T(0) ? one : kernel::Lanes<T>{}};
     });
     if (x.empty() || zeros > 0) return 0;
     return sum == 0 ? limits<R>::big : n / sum;

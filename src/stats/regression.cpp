@@ -122,7 +122,8 @@ struct Ramp {
     explicit Ramp(std::size_t n)
         : points(double(n)), middle(0.5 * (double(std::min(n, block_points)) - 1)) {
         constexpr double p = double(block_points);
-        const double whole = double(n / block_points), rest = double(n % block_points);
+        const std::size_t blocks = n / block_points;
+        const double whole = double(blocks), rest = double(n % block_points);
         const double off = 0.5 * (rest - 1) - middle;
         mean = rest * off / points;
         mean_square =

@@ -38,13 +38,13 @@ scalar<R> energy(const R* x) {
     const auto [plain] = blockwise_sums<T>(
         scalars, [v = x->data](auto points) { return std::array{square(points(v))}; });
     if (plain <= big_squared<R>) return plain;
-    constexpr T big = limits<R>::big;
     if (x->complex) {
         return blockwise_sums<T>(length(x), [z = bins(x).data()](auto points) {
             return std::array{capped_lanes<R>(points(z))};
         })[0];
     }
     return blockwise_sums<T>(scalars, [v = x->data](auto points) {
+        constexpr T big = limits<R>::big;
         const auto value = points(v);
         return std::array{kernel::abs(value) > big ? kernel::all<kernel::Lanes<T>>(big)
                                                    : square(value)};

@@ -16,7 +16,7 @@ using Doubles = kernel::Lanes<double>;
 /// Distances of as many samples as a vector of T holds.
 template <class T>
 struct Offsets {
-    static constexpr int parts = int(sizeof(double) / sizeof(T));
+    static constexpr int parts = std::same_as<T, double> ? 1 : 2;
     Doubles part[parts];
 };
 
