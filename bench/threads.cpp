@@ -1,5 +1,5 @@
-// What a second thread brings: transforms a second of two threads over those of one, each on records
-// of its own, in the same run.
+// What a second thread brings: transforms a second of two threads over those of one, each on
+// records of its own, in the same run.
 #include <wavkit/dsp.h>
 
 #include <algorithm>
@@ -49,7 +49,8 @@ double transforms_a_second(int threads, int points) {
 }  // namespace
 
 int main() {
-    std::printf("%-24s %14s %14s  %s\n", "complex double", "1 thread, /s", "2 threads, /s", "ratio");
+    std::printf("%-24s %14s %14s  %s\n", "complex double", "1 thread, /s", "2 threads, /s",
+                "ratio");
     for (const int points : {16, 60, 256, 1000, 1009, 4096, 65536, 100000}) {
         double one = 0, two = 0;
         for (int round = 0; round < 5; ++round) {
