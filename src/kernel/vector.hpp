@@ -199,17 +199,4 @@ template <class T, int V, Layout L>
     }
 }
 
-/// Transposes V vectors of V lanes in place.
-template <class T, int V>
-[[gnu::always_inline]] inline void transpose(Vec<T, V>* rows) {
-    Vec<T, V> turned[V];
-    for (int span = V; span > 1; span /= 2) {
-        for (int i = 0; i < V / 2; ++i) {
-            turned[2 * i] = first_in_turn<V, 1>(rows[i], rows[i + V / 2]);
-            turned[2 * i + 1] = second_in_turn<V, 1>(rows[i], rows[i + V / 2]);
-        }
-        for (int i = 0; i < V; ++i) rows[i] = turned[i];
-    }
-}
-
 }  // namespace wavkit::kernel

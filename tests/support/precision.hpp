@@ -57,8 +57,6 @@ Twins(const char*, typename AsDouble<Single>::type*, Single*)
 // build time.
 #include "support/twins.hpp"
 
-using Precisions = ::testing::Types<dsp, dspf>;
-
 /// Distance from 1 to the next number of the precision.
 template <Record R>
 inline constexpr scalar<R> epsilon = std::numeric_limits<scalar<R>>::epsilon();
