@@ -45,18 +45,17 @@ int read(R* x, std::FILE* stream) {
     return begins_binary(first) ? read_binary(x, stream) : read_text(x, stream);
 }
 
-enum Format { binary = 0, text = 1, summary = 2, format_mask = 0xFF };
-enum Omission { no_header = 0x100, no_data = 0x200 };
+constexpr int format_mask = 0xFF;
 
 template <Record R>
 int write(const R* x, std::FILE* stream, int flags) {
-    const Parts parts{!(flags & no_header), !(flags & no_data)};
+    const Parts parts{!(flags & DSP_FILE_NO_HEADER), !(flags & DSP_FILE_NO_DATA)};
     switch (flags & format_mask) {
-        case binary:
+        case DSP_FILE_BINARY:
             return write_binary(x, stream, parts);
-        case text:
+        case DSP_FILE_TEXT:
             return write_text(x, stream, parts);
-        case summary:
+        case DSP_FILE_LINE:
             return write_summary(x, stream, parts);
         default:
             return -1;
@@ -76,10 +75,10 @@ int dspf_fread(dsp* record, std::FILE* stream) { return wavkit::read(record, str
 int dspff_fread(dspf* record, std::FILE* stream) { return wavkit::read(record, stream); }
 
 int dspf_fwrite(const dsp* record, std::FILE* stream) {
-    return wavkit::write(record, stream, wavkit::binary);
+    return wavkit::write(record, stream, DSP_FILE_BINARY);
 }
 int dspff_fwrite(const dspf* record, std::FILE* stream) {
-    return wavkit::write(record, stream, wavkit::binary);
+    return wavkit::write(record, stream, DSP_FILE_BINARY);
 }
 
 int dspf_fwrite2(const dsp* record, std::FILE* stream, int flags) {
@@ -90,8 +89,8 @@ int dspff_fwrite2(const dspf* record, std::FILE* stream, int flags) {
 }
 
 int dspf_fwrite_ascii(const dsp* record, std::FILE* stream) {
-    return wavkit::write(record, stream, wavkit::text);
+    return wavkit::write(record, stream, DSP_FILE_TEXT);
 }
 int dspff_fwrite_ascii(const dspf* record, std::FILE* stream) {
-    return wavkit::write(record, stream, wavkit::text);
+    return wavkit::write(record, stream, DSP_FILE_TEXT);
 }

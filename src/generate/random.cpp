@@ -197,23 +197,21 @@ void make_laplace(T* samples, std::size_t n) {
     });
 }
 
-enum Distribution { uniform, normal, exponential, laplace };
-
 template <Record R>
 int random_samples(R* x, int type) {
     using T = scalar<R>;
     if (dsp_alloc(x)) return -1;
     switch (type) {
-        case uniform:
+        case DSP_RANDOM_UNIFORM:
             if (x->complex) return fill_disc<R>(bins(x));
             return fill<R>(values(x), [](T* samples, std::size_t n) {
                 replace(samples, n, [](auto bits) { return to_signed(bits); });
             });
-        case normal:
+        case DSP_RANDOM_NORMAL:
             return fill<R>(values(x), make_normal<T>);
-        case exponential:
+        case DSP_RANDOM_EXPONENTIAL:
             return x->complex ? -1 : fill<R>(values(x), make_exponential<T>);
-        case laplace:
+        case DSP_RANDOM_LAPLACE:
             return x->complex ? -1 : fill<R>(values(x), make_laplace<T>);
         default:
             return -1;

@@ -14,18 +14,6 @@ constexpr bool is_power_of_two(std::int64_t n) {
     return n > 0 && std::has_single_bit(std::uint64_t(n));
 }
 
-/// Grows a record to so many points of complex samples, its own ones and their number kept.
-template <Record R>
-int make_room(R* x, std::int64_t points) {
-    const int had = x->points, was_complex = x->complex;
-    x->points = int(points);
-    x->complex = 1;
-    const int failed = dsp_realloc(x, had, was_complex);
-    x->points = failed ? 0 : had;
-    x->complex = failed ? x->complex : was_complex;
-    return failed;
-}
-
 /// Room for the convolution behind a transform of n >= 2 points that is no power of two, 2^m >= 2n
 /// - 2 complex ones, which stays with the record whatever way the transform takes.
 template <Record R>
@@ -54,6 +42,17 @@ int take(R* x, bool inverse, scalar<R> factor) {
 }
 
 }  // namespace
+
+template <Record R>
+int make_room(R* x, std::int64_t points) {
+    const int had = x->points, was_complex = x->complex;
+    x->points = int(points);
+    x->complex = 1;
+    const int failed = dsp_realloc(x, had, was_complex);
+    x->points = failed ? 0 : had;
+    x->complex = failed ? x->complex : was_complex;
+    return failed;
+}
 
 template <Record R>
 int take_spectrum(R* x, scalar<R> factor) {
@@ -97,6 +96,8 @@ int take_samples_of_half(R* x, bool odd, scalar<R> factor) {
     return 0;
 }
 
+template int make_room(dsp*, std::int64_t);
+template int make_room(dspf*, std::int64_t);
 template int take_spectrum(dsp*, double);
 template int take_spectrum(dspf*, float);
 template int take_samples(dsp*, double);

@@ -2,9 +2,15 @@
 // with a factor of the caller's in place of 1/N or 1.
 #pragma once
 
+#include <cstdint>
+
 #include "record_view.hpp"
 
 namespace wavkit {
+
+/// Grows a record to so many points of complex samples, its own ones and their number kept.
+template <Record R>
+int make_room(R* x, std::int64_t points);
 
 /// All bins of a signal of any length; a real one becomes complex, one point keeps its kind.
 template <Record R>

@@ -179,11 +179,11 @@ struct Run {
     }
 
     /// Whether the hosts' arrays are as they were, but for states, scratch records and outputs that
-    /// still lie there. The analytic signal begins in the array and may end outside of it.
+    /// still lie there.
     bool kept() const {
         std::size_t place = 0;
         return std::all_of(hosts.begin(), hosts.end(), [&](const Borrowed<R>& x) {
-            const bool stays = x.record.data == x.host.data() || of.name == "dspi_analytic";
+            const bool stays = x.record.data == x.host.data();
             const bool is_state = of.optional < records.size() && records[of.optional] == &x.record;
             const bool may_be_written = is_state || (!of.is_const[place] && stays);
             return x.host == before[place++] || may_be_written;

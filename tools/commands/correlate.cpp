@@ -74,13 +74,12 @@ Correlation correlated(const Signal& a, Signal b) {
     }
     const double energies = energy(a) * energy(b);
     const int shift = a->points - 1;
-    constexpr int at_end = 0x202;
     constexpr long longest = 1L << 30;
     if (b->points + 2L * shift > longest) throw Error("the signals are too long to correlate");
     b->delta = a->delta;
     Correlation result{{}, shift, energies > 0 ? a->points / std::sqrt(energies) : 0};
-    check(dspi_zpad2(b, b->points + shift, at_end) || dspi_zpad(b, b->points + shift) ||
-              dspb_corr(a, b, result.values, nullptr, a->points),
+    check(dspi_zpad2(b, b->points + shift, DSP_PAD_UNSCALED | DSP_PAD_AT_END) ||
+              dspi_zpad(b, b->points + shift) || dspb_corr(a, b, result.values, nullptr, a->points),
           "correlating");
     return result;
 }

@@ -58,9 +58,9 @@ std::vector<double> parts_of(const Statistic& wanted, const Signal& x) {
 
 /// The sample at which the signal (or the magnitude of a complex one) is extreme.
 double place(const Signal& x, bool smallest) {
-    constexpr unsigned least = 0x2000, greatest = 0;
     Signal peak;
-    check(dsps_peak(x, peak, smallest ? least : greatest, 0), "finding an extreme");
+    check(dsps_peak(x, peak, smallest ? DSP_PEAK_SMALLEST : DSP_PEAK_SAMPLE, 0),
+          "finding an extreme");
     return peak->data[1];
 }
 

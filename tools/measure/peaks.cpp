@@ -66,12 +66,10 @@ struct Refined {
     double height, bin;
 };
 
-constexpr unsigned at_index = 0x1000, by_parabola = 0x100, by_corrected_pair = 0x300;
-
 Refined refine(const dsp* y, unsigned rule, int index) {
     Signal peak;
     // -1 with a result tells of an offset that was limited; the result is still the best there is.
-    if (dsps_peak(y, peak, at_index | rule, index) != 0 && peak->data == nullptr) {
+    if (dsps_peak(y, peak, DSP_PEAK_AT_INDEX | rule, index) != 0 && peak->data == nullptr) {
         check(-1, "finding peaks");
     }
     return {peak->data[0], peak->data[1]};
@@ -82,14 +80,14 @@ Refined refine_log(const Signal& magnitudes, int index) {
     Signal three;
     check(dspu_subvec(magnitudes, three, index - 1, 3), "finding peaks");
     check(dspi_log(three), "finding peaks");
-    const auto peak = refine(three, by_parabola, 1);
+    const auto peak = refine(three, DSP_PEAK_PARABOLIC, 1);
     return {std::exp(peak.height), peak.bin + index - 1};
 }
 
 /// The pair rule takes its logarithm from powers but its height factor is that of amplitudes:
 /// sqrt(power of the lower bin) * factor is the amplitude.
 Refined refine_pair(const Spectrum& spectrum, const Signal& magnitudes, int index) {
-    const auto peak = refine(spectrum.bins, by_corrected_pair, index);
+    const auto peak = refine(spectrum.bins, DSP_PEAK_GAUSSIAN_CORRECTED, index);
     const auto m = magnitudes.values();
     const auto i = std::size_t(index);
     const double lower = m[i - 1] > m[i + 1] ? m[i - 1] : m[i];
@@ -102,7 +100,7 @@ Refined refine(const Spectrum& spectrum, const Signal& magnitudes, int index) {
     Refined peak = plain;
     switch (rule_for(spectrum)) {
         case Rule::parabola:
-            peak = refine(magnitudes, by_parabola, index);
+            peak = refine(magnitudes, DSP_PEAK_PARABOLIC, index);
             break;
         case Rule::log_parabola:
             peak = refine_log(magnitudes, index);

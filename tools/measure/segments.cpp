@@ -88,8 +88,8 @@ void measure_segments(SampleStream& source, const Segmentation& segmentation,
 
 void SpectrumAverage::add(Spectrum& spectrum) {
     const long count = average_.bins->points > 0 ? average_.averaged + 1 : 1;
-    constexpr int powers = 0x20, forgetting = 0x10;
-    const int flags = int(averaging_.type) | powers | (averaging_.forget > 0 ? forgetting : 0);
+    const int flags =
+        int(averaging_.type) | DSP_AVG_POWER | (averaging_.forget > 0 ? DSP_AVG_LIMITED : 0);
     Signal& average = average_.bins;
     check(dsph_avg(spectrum.bins, average, scratch_, flags,
                    int(std::min<long>(count, std::numeric_limits<int>::max())), averaging_.every,

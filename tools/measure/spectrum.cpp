@@ -38,10 +38,9 @@ int transform_length(const Signal& x, const SpectrumSettings& settings) {
 /// dsph_fft() for the other windows: the same samples, scale and layout.
 int padded_fft(const Signal& x, Signal& bins, const SpectrumSettings& settings, int length,
                int samples) {
-    constexpr int scaled_split = 0x300;
     if (dsp_copy_at_most(bins, x, samples) || dspi_window(bins, settings.window, 0)) return -1;
     if (!settings.two_sided && dspi_scale(bins, 2.0)) return -1;
-    if (dspi_zpad2(bins, length, scaled_split)) return -1;
+    if (dspi_zpad2(bins, length, DSP_PAD_KEEP_AMPLITUDE | DSP_PAD_SPLIT)) return -1;
     if (!settings.two_sided) return dspi_rfft(bins);
     return dspi_fft(bins, 0) || dspi_swap_halves(bins) ? -1 : 0;
 }
