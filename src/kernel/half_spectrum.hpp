@@ -28,18 +28,26 @@ template <bool Split, class T, int V>
     store_complex<T, V, Layout::pairs>(low, a);
 }
 
-template <bool Split, class T>
-inline void combine_halves(T* data, std::size_t half, const T* cosines) {
-    constexpr int V = lanes<T>;
+/// The bins k and half - k from some k up to the middle, V pairs at a time. Where the last vectors
+/// meet in the middle bin, both have it.
+template <bool Split, class T, int V = lanes<T>>
+inline void combine_halves(T* data, std::size_t half, const T* cosines, std::size_t k = 1) {
     const T* sines = cosines + half / 2 + 1;
-    std::size_t k = 1;
-    for (; 2 * (k + V) < half + 2; k += V) {
+    for (; 2 * (k + V) <= half + 2; k += V) {
         combine_pair<Split, T, V>(data + 2 * k, data + 2 * (half - k - V + 1), cosines + k,
                                   sines + k);
     }
-    for (; 2 * k <= half; ++k) {
-        combine_pair<Split, T, 1>(data + 2 * k, data + 2 * (half - k), cosines + k, sines + k);
-    }
+    if constexpr (V > 1) combine_halves<Split, T, V / 2>(data, half, cosines, k);
+}
+
+/// The bins 0 and `half`, which are real, from the first one of the half-length transform.
+template <class T>
+[[gnu::always_inline]] inline void split_ends(T* data, std::size_t half, T re, T im) {
+    const T even = re + re, odd = im + im;
+    data[0] = even + odd;
+    data[1] = 0;
+    data[2 * half] = even - odd;
+    data[2 * half + 1] = 0;
 }
 
 /// Turns the transform Z of a real signal's even and odd samples, `half` points, into its spectrum,
@@ -48,11 +56,7 @@ inline void combine_halves(T* data, std::size_t half, const T* cosines) {
 /// many sines.
 template <class T>
 void split(T* data, std::size_t half, const T* roots) {
-    const T even = data[0] + data[0], odd = data[1] + data[1];
-    data[0] = even + odd;
-    data[1] = 0;
-    data[2 * half] = even - odd;
-    data[2 * half + 1] = 0;
+    split_ends(data, half, data[0], data[1]);
     combine_halves<true>(data, half, roots);
 }
 

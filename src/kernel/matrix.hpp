@@ -115,8 +115,8 @@ void rotate_and_turn(const Matrix<T>& matrix, const T* samples, std::size_t firs
                 re[j] = z.re;
                 im[j] = z.im;
             }
-            interleave<T, V, V, 1>(re);
-            interleave<T, V, V, 1>(im);
+            bring_side_by_side<T, V, V, 1>(re);
+            bring_side_by_side<T, V, V, 1>(im);
             for (std::size_t j = 0; j < V; ++j) {
                 store_complex<T, V, Layout::pairs>(out + 2 * ((first + b + j) * matrix.rows + k),
                                                    {re[j], im[j]});

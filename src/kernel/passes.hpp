@@ -114,14 +114,25 @@ inline const T* pass(const T* in, std::size_t row, T* out, std::size_t n, std::s
 }
 
 /// One part of the bins of V butterflies, brought side by side: bin after bin of a butterfly, then
-/// the next one, `Stride` lanes at a time. Each step interleaves the halves of the whole sequence.
+/// the next one, `Stride` lanes at a time. Each step interleaves the halves of a group of as many
+/// bins as a vector takes, or of all.
 template <class T, int V, int Radix, int Stride>
-[[gnu::always_inline]] inline void interleave(Vec<T, V>* bins) {
+[[gnu::always_inline]] inline void bring_side_by_side(Vec<T, V>* bins) {
+    constexpr int group = std::min(Radix, V / Stride), groups = Radix / group;
     Vec<T, V> turned[Radix];
-    for (int span = Radix; span > 1; span /= 2) {
-        for (int i = 0; i < Radix / 2; ++i) {
-            turned[2 * i] = first_in_turn<V, Stride>(bins[i], bins[i + Radix / 2]);
-            turned[2 * i + 1] = second_in_turn<V, Stride>(bins[i], bins[i + Radix / 2]);
+    for (int span = group; span > 1; span /= 2) {
+        for (int g = 0; g < groups; ++g) {
+            for (int i = 0; i < group / 2; ++i) {
+                const auto a = bins[g * group + i], b = bins[g * group + i + group / 2];
+                turned[g * group + 2 * i] = first_in_turn<V, Stride>(a, b);
+                turned[g * group + 2 * i + 1] = second_in_turn<V, Stride>(a, b);
+            }
+        }
+        for (int i = 0; i < Radix; ++i) bins[i] = turned[i];
+    }
+    if constexpr (groups > 1) {
+        for (int g = 0; g < groups; ++g) {
+            for (int i = 0; i < group; ++i) turned[i * groups + g] = bins[g * group + i];
         }
         for (int i = 0; i < Radix; ++i) bins[i] = turned[i];
     }
@@ -140,8 +151,8 @@ template <int V, int Radix, int Stride, Layout In, class T>
     }
     Vec<T, V> re[Radix], im[Radix];
     for (int k = 0; k < Radix; ++k) re[k] = z[k].re, im[k] = z[k].im;
-    interleave<T, V, Radix, Stride>(re);
-    interleave<T, V, Radix, Stride>(im);
+    bring_side_by_side<T, V, Radix, Stride>(re);
+    bring_side_by_side<T, V, Radix, Stride>(im);
     for (int k = 0; k < Radix; ++k) {
         store_complex<T, V, Layout::blocks>(out + k * 2 * V, {re[k], im[k]});
     }

@@ -2,6 +2,7 @@
 // nothing between them.
 #pragma once
 
+#include "kernel/half_spectrum.hpp"
 #include "kernel/passes.hpp"
 
 namespace wavkit::kernel {
@@ -43,12 +44,24 @@ template <class T, int V, Layout L>
     store<T, 2 * V>(p, z.parts);
 }
 
+/// Calls f(0), f(1), ... f(N - 1), with constants where that is no more code than registers are
+/// good for.
+template <int N, bool Unrolled, class F>
+[[gnu::always_inline]] inline void repeated(F f) {
+    if constexpr (Unrolled) {
+        unrolled<N>(f);
+    } else {
+        for (int i = 0; i < N; ++i) f(i);
+    }
+}
+
 /// A transform of N = R1 * R2 samples, V of them in a vector; R1 and R2 are multiples of V.
 template <int N, int R1, int V, Layout Outside, class T>
-void run_straight(T* data, T scale) {
+[[gnu::noinline]] void run_straight(T* data, T scale) {
     constexpr int R2 = N / R1;
+    constexpr bool in_registers = N / V <= 32;
     Vec<T, 2 * V> y[N / V];
-    unrolled<R2 / V>([&](auto i) {
+    repeated<R2 / V, in_registers>([&](auto i) __attribute__((always_inline)) {
         Pairs<T, V> z[R1];
         unrolled<R1>(
             [&](auto k) { z[k] = load_pairs<T, V, Outside>(data + 2 * (i * V + k * R2)); });
@@ -61,10 +74,10 @@ void run_straight(T* data, T scale) {
             turned[k] = z[k].parts * load<T, 2 * V>(w.cosines[i][k]) +
                         swapped(z[k]) * load<T, 2 * V>(w.sines[i][k]);
         });
-        if constexpr (V > 1) interleave<T, 2 * V, R1, 2>(turned);
+        if constexpr (V > 1) bring_side_by_side<T, 2 * V, R1, 2>(turned);
         unrolled<R1>([&](auto k) { y[i * R1 + k] = turned[k]; });
     });
-    unrolled<R1 / V>([&](auto b) {
+    repeated<R1 / V, in_registers>([&](auto b) __attribute__((always_inline)) {
         Pairs<T, V> z[R2];
         unrolled<R2>([&](auto k) { z[k] = {y[k * (R1 / V) + b]}; });
         butterfly<R2>(z);
@@ -80,6 +93,69 @@ inline void run_tiny(T* data, T scale) {
     unrolled<N>([&](auto k) { z[k] = load_complex<T, 1, Outside>(data + 2 * k) * scale; });
     butterfly<N>(z);
     unrolled<N>([&](auto k) { store_complex<T, 1, Outside>(data + 2 * k, z[k]); });
+}
+
+/// The bins 0 .. N/2 of so few real samples, or the way back, through half the length; the scale is
+/// half that of the whole forward.
+template <int N, class T>
+inline void run_tiny_real(T* data, T scale) {
+    constexpr int half = N / 2;
+    Complexes<T, 1> z[half];
+    unrolled<half>([&](auto k) { z[k] = load_complex<T, 1, Layout::pairs>(data + 2 * k) * scale; });
+    butterfly<half>(z);
+    split_ends(data, half, z[0].re[0], z[0].im[0]);
+    unrolled<half / 2>([&](auto i) {
+        constexpr int k = i + 1;
+        auto a = z[k], b = z[half - k];
+        combine<true, T, 1>(a, b, broadcast<T, 1>(T(exact_cosine(k, N))),
+                            broadcast<T, 1>(T(exact_sine(k, N))));
+        store_complex<T, 1, Layout::pairs>(data + 2 * (half - k), b);
+        store_complex<T, 1, Layout::pairs>(data + 2 * k, a);
+    });
+}
+
+template <int N, class T>
+inline void run_tiny_to_real(T* data, T scale) {
+    constexpr int half = N / 2;
+    Complexes<T, 1> z[half];
+    z[0] = {broadcast<T, 1>((data[0] + data[2 * half]) * scale),
+            broadcast<T, 1>((data[0] - data[2 * half]) * scale)};
+    unrolled<half / 2>([&](auto i) {
+        constexpr int k = i + 1;
+        auto a = load_complex<T, 1, Layout::pairs>(data + 2 * k) * scale;
+        auto b = load_complex<T, 1, Layout::pairs>(data + 2 * (half - k)) * scale;
+        combine<false, T, 1>(a, b, broadcast<T, 1>(T(exact_cosine(k, N))),
+                             broadcast<T, 1>(T(exact_sine(k, N))));
+        z[half - k] = {b.im, b.re};
+        z[k] = {a.im, a.re};
+    });
+    z[0] = {z[0].im, z[0].re};
+    butterfly<half>(z);
+    unrolled<half>([&](auto k) { store_complex<T, 1, Layout::swapped_pairs>(data + 2 * k, z[k]); });
+}
+
+/// Transforms n real samples in place, or bins into them, where there is a straight line for them
+/// and their tables would cost as much as they; else false.
+template <bool Back, class T>
+inline bool run_straight_real(int n, T* data, T scale) {
+    const auto run = [&](auto points) {
+        if constexpr (Back) {
+            run_tiny_to_real<points>(data, scale);
+        } else {
+            run_tiny_real<points>(data, scale);
+        }
+        return true;
+    };
+    switch (n) {
+        case 4:
+            return run(std::integral_constant<int, 4>());
+        case 8:
+            return run(std::integral_constant<int, 8>());
+        case 16:
+            return run(std::integral_constant<int, 16>());
+        default:
+            return false;
+    }
 }
 
 /// Transforms n samples in place, where there is a straight line for them; else false.
@@ -125,6 +201,7 @@ inline bool run_straight(int n, T* data, T scale) {
     if constexpr (wide) {
         if (n == 64) return run_straight<64, 8, W, Outside>(data, scale), true;
         if (n == 128) return run_straight<128, 8, W, Outside>(data, scale), true;
+        if (n == 256) return run_straight<256, 16, W, Outside>(data, scale), true;
     }
     return false;
 }

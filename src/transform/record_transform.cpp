@@ -28,8 +28,9 @@ void scale_point(R* x, scalar<R> factor) {
     for (auto& part : values(x)) part *= factor;
 }
 
+/// A transform that may need room.
 template <Record R>
-int take(R* x, bool inverse, scalar<R> factor) {
+[[gnu::noinline]] int take_any(R* x, bool inverse, scalar<R> factor) {
     const int n = x->points;
     if (n > 1) {
         if (!is_power_of_two(n) && make_room_for_convolution(x, n)) return -1;
@@ -41,10 +42,24 @@ int take(R* x, bool inverse, scalar<R> factor) {
     return 0;
 }
 
+/// Short transforms take no longer than a few calls: nothing stands before them that they do
+/// without.
+template <Record R>
+int take(R* x, bool inverse, scalar<R> factor) {
+    const int n = x->points;
+    if (!x->complex || !is_power_of_two(n) ||
+        !transform_straight<R>(bins(x).data(), n, inverse, factor)) {
+        return take_any(x, inverse, factor);
+    }
+    x->delta = reciprocal_spacing<R>(n, x->delta);
+    return 0;
+}
+
 }  // namespace
 
 template <Record R>
 int make_room(R* x, std::int64_t points) {
+    if (x->alloc >= 2 * points) return 0;
     const int had = x->points, was_complex = x->complex;
     x->points = int(points);
     x->complex = 1;

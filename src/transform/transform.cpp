@@ -111,15 +111,18 @@ int transform_apart(int n, bool inverse, scalar<R> scale, Fill fill, Take take) 
 }  // namespace
 
 template <Record R>
+bool transform_straight(Bin<scalar<R>>* z, int n, bool inverse, scalar<R> scale) {
+    return inverse ? kernel::run_straight<Layout::swapped_pairs>(n, &z->re, scale)
+                   : kernel::run_straight<Layout::pairs>(n, &z->re, scale);
+}
+
+template <Record R>
 int transform(Bin<scalar<R>>* z, int n, bool inverse, scalar<R> scale) {
     if (n < 2) {
         if (n == 1) z[0] = z[0] * scale;
         return 0;
     }
-    if (inverse ? kernel::run_straight<Layout::swapped_pairs>(n, &z->re, scale)
-                : kernel::run_straight<Layout::pairs>(n, &z->re, scale)) {
-        return 0;
-    }
+    if (transform_straight<R>(z, n, inverse, scale)) return 0;
     const auto* t = find_transform<R>(n);
     auto* const work = t ? reserve_workspace<R>(t->work_scalars) : nullptr;
     if (!work) return -1;
@@ -133,6 +136,7 @@ template <Record R>
 int transform_real(scalar<R>* x, int n, scalar<R> scale) {
     using T = scalar<R>;
     auto* const bins = reinterpret_cast<Bin<T>*>(x);
+    if (kernel::run_straight_real<false>(n, x, scale / 2)) return 0;
     if (n % 2 == 0) {
         const T* turns = find_half_turns<R>(n / 2);
         if (!turns || transform<R>(bins, n / 2, false, scale / 2)) return -1;
@@ -155,6 +159,7 @@ template <Record R>
 int transform_to_real(scalar<R>* x, int n, scalar<R> scale) {
     using T = scalar<R>;
     auto* const bins = reinterpret_cast<Bin<T>*>(x);
+    if (kernel::run_straight_real<true>(n, x, scale)) return 0;
     if (n % 2 == 0) {
         const T* turns = find_half_turns<R>(n / 2);
         if (!turns) return -1;
@@ -206,6 +211,8 @@ const Bin<scalar<R>>* find_quarter_turns(int n) {
         find_table<R>(shared_state<T>.quarter_turns, thread_state<R>.quarter_turns, n, build));
 }
 
+template bool transform_straight<dsp>(Bin<double>*, int, bool, double);
+template bool transform_straight<dspf>(Bin<float>*, int, bool, float);
 template int transform<dsp>(Bin<double>*, int, bool, double);
 template int transform<dspf>(Bin<float>*, int, bool, float);
 template int transform_real<dsp>(double*, int, double);

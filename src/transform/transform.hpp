@@ -33,6 +33,10 @@ bool is_smooth(int n);
 template <Record R>
 int transform(Bin<scalar<R>>* z, int n, bool inverse, scalar<R> scale);
 
+/// The same where it takes neither tables nor a workspace, as short lengths do; else false.
+template <Record R>
+bool transform_straight(Bin<scalar<R>>* z, int n, bool inverse, scalar<R> scale);
+
 /// The bins 0 .. n/2 of n real samples, in place with room for them; else as transform().
 template <Record R>
 int transform_real(scalar<R>* x, int n, scalar<R> scale);
