@@ -2,6 +2,8 @@
 // side, one in each lane.
 #pragma once
 
+#include <numeric>
+
 #include "kernel/circle.hpp"
 #include "kernel/vector.hpp"
 
@@ -91,6 +93,43 @@ template <int Radix, class T, class Z>
     }
 }
 
+template <int Radix, template <class, int> class Samples, class T, int V>
+void butterfly(Samples<T, V>* z);
+
+/// The bin below A * B that leaves a and b when divided by A and B.
+template <int A, int B>
+constexpr int bin_of(int a, int b) {
+    int k = a;
+    while (k % B != b) k += A;
+    return k;
+}
+
+/// N = A * B samples as B transforms of A and A transforms of B; where the two have a common
+/// factor, with rotations between them, else without (Good, 1958).
+template <int A, int B, template <class, int> class Samples, class T, int V>
+[[gnu::always_inline]] inline void butterfly_of_product(Samples<T, V>* z) {
+    constexpr int N = A * B;
+    constexpr bool coprime = std::gcd(A, B) == 1;
+    Samples<T, V> column[B][A], row[B];
+    unrolled<B>([&](auto b) __attribute__((always_inline)) {
+        for (int a = 0; a < A; ++a) column[b][a] = z[coprime ? (B * a + A * b) % N : B * a + b];
+        butterfly<A>(column[b]);
+    });
+    unrolled<A>([&](auto a) __attribute__((always_inline)) {
+        unrolled<B>([&](auto b) __attribute__((always_inline)) {
+            constexpr bool rotated = !coprime && a > 0 && b > 0;
+            if constexpr (rotated) {
+                row[b] = turned(column[b][a], double(exact_cosine(a * b, N)),
+                                double(exact_sine(a * b, N)));
+            } else {
+                row[b] = column[b][a];
+            }
+        });
+        butterfly<B>(row);
+        for (int b = 0; b < B; ++b) z[coprime ? bin_of<A, B>(a, b) : a + A * b] = row[b];
+    });
+}
+
 /// The transform of `Radix` samples in place.
 template <int Radix, template <class, int> class Samples, class T, int V>
 [[gnu::always_inline]] inline void butterfly(Samples<T, V>* z) {
@@ -126,6 +165,12 @@ template <int Radix, template <class, int> class Samples, class T, int V>
         for (int i = 0; i < 4; ++i) {
             for (int k = i + 1; k < 4; ++k) std::swap(z[4 * i + k], z[4 * k + i]);
         }
+    } else if constexpr (Radix == 9) {
+        butterfly_of_product<3, 3>(z);
+    } else if constexpr (Radix == 12) {
+        butterfly_of_product<4, 3>(z);
+    } else if constexpr (Radix == 15) {
+        butterfly_of_product<3, 5>(z);
     } else {
         butterfly_of_odd<Radix, T>(z);
     }

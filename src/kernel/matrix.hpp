@@ -67,7 +67,7 @@ inline void finish_strip(const Strip<T>& strip) {
     with_power(strip.radix, [&](auto r) {
         columns<V, r, Layout::blocks, Layout::blocks>(strip.samples, 2 * strip.stride,
                                                       strip.samples, 2 * strip.stride, strip.stride,
-                                                      Unrotated(), Unrotated());
+                                                      Unrotated());
     });
 }
 
@@ -80,7 +80,7 @@ inline void finish_strip(const Strip<T>& strip, T* out, std::size_t row, T scale
         const Scaling<T, r> turn{scale};
         for (std::size_t q = 0; q < strip.stride; q += width, out += 2 * row) {
             columns<V, r, Layout::blocks, Out>(strip.samples + 2 * q, 2 * strip.stride, out,
-                                               distance, width, turn, turn);
+                                               distance, width, turn);
         }
     });
 }

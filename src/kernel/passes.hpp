@@ -3,9 +3,9 @@
 // n / r; samples that belong together lie s apart, so that from the stride of a vector on every
 // load and store is contiguous, and no permutation is left to do at the end.
 //
-// Between the passes samples lie in whole vectors ("blocks") where all strides but the first are
-// multiples of four, else in pairs; what is left of a run beside its vectors is then done by a
-// vector that overlaps the one before, or sample by sample.
+// Between the passes samples lie in whole vectors ("blocks"), real parts and imaginary parts apart,
+// where the first passes bring the stride to a multiple of a vector; else in pairs
+// (pair_passes.hpp).
 #pragma once
 
 #include <algorithm>
@@ -21,17 +21,15 @@ struct Passes {
     std::size_t points = 1;
     int count = 0;
     std::array<unsigned char, 31> radices{};
-    int vector = 1;               // lanes of the vectors that go through the passes
     bool blocks = false;          // the samples between passes lie in whole vectors
     const T* twiddles = nullptr;  // pass by pass; none for the last
 };
 
-/// Whether the twiddles of a pass stand lane by lane, one vector of each for a vector of
-/// butterflies; else there is one of each a run.
+/// Whether the twiddles of a pass over blocks stand lane by lane, one vector of each for a vector
+/// of butterflies; else there is one of each a run.
 template <class T>
-inline bool has_twiddles_by_lanes(const Passes<T>& passes, std::size_t part, std::size_t stride) {
-    const auto vector = std::size_t(passes.vector);
-    return stride == 1 ? part >= vector : passes.blocks && stride < vector;
+inline bool has_twiddles_by_lanes(const Passes<T>& passes, std::size_t stride) {
+    return passes.blocks && stride < lanes<T>;
 }
 
 /// The first of the butterflies that the vector from the i-th on holds: the last vector ends with
@@ -80,21 +78,13 @@ template <int V, int Radix, Layout In, Layout Out, class T, class Turn>
     for (std::size_t k = 0; k < Radix; ++k) store_complex<T, V, Out>(out + k * out_distance, z[k]);
 }
 
-/// The butterflies of one rotation over a run of samples. `one` is the turn for single samples.
-template <int V, int Radix, Layout In, Layout Out, class T, class Turn, class TurnOne>
+/// The butterflies of one rotation over a run of samples, whole vectors.
+template <int V, int Radix, Layout In, Layout Out, class T, class Turn>
 [[gnu::always_inline]] inline void columns(const T* in, std::size_t in_distance, T* out,
                                            std::size_t out_distance, std::size_t run,
-                                           const Turn& turn, const TurnOne& one) {
-    const std::size_t whole = run - run % V;
-    const auto several = [&](std::size_t q) {
+                                           const Turn& turn) {
+    for (std::size_t q = 0; q < run; q += V) {
         column<V, Radix, In, Out>(in + 2 * q, in_distance, out + 2 * q, out_distance, turn);
-    };
-    for (std::size_t q = 0; q < whole; q += V) several(q);
-    if constexpr (In != Layout::blocks && V > 1) {
-        if (whole < run && run > V && in != out) return several(run - V);
-        for (std::size_t q = whole; q < run; ++q) {
-            column<1, Radix, In, Out>(in + 2 * q, in_distance, out + 2 * q, out_distance, one);
-        }
     }
 }
 
@@ -104,11 +94,10 @@ template <int V, int Radix, Layout In, Layout Out, class T>
 inline const T* pass(const T* in, std::size_t row, T* out, std::size_t n, std::size_t stride,
                      const T* twiddles) {
     const std::size_t part = n / Radix, distance = 2 * row * part;
-    columns<V, Radix, In, Out>(in, distance, out, 2 * stride, stride, Unrotated(), Unrotated());
+    columns<V, Radix, In, Out>(in, distance, out, 2 * stride, stride, Unrotated());
     for (std::size_t p = 1; p < part; ++p, twiddles += 2 * (Radix - 1)) {
         columns<V, Radix, In, Out>(in + 2 * row * p, distance, out + 2 * stride * Radix * p,
-                                   2 * stride, stride, Rotation<T, V, Radix>{twiddles},
-                                   Rotation<T, 1, Radix>{twiddles});
+                                   2 * stride, stride, Rotation<T, V, Radix>{twiddles});
     }
     return twiddles;
 }
@@ -171,32 +160,6 @@ inline const T* short_pass(const T* in, T* out, std::size_t points, const T* twi
     return twiddles;
 }
 
-/// The first pass into pairs, with a vector of butterflies side by side where there is one.
-template <int V, int Radix, Layout In, class T>
-inline const T* first_pass_into_pairs(const T* in, T* out, std::size_t n, const T* twiddles) {
-    const std::size_t part = n / Radix;
-    if (part < V) return pass<V, Radix, In, Layout::pairs>(in, 1, out, n, 1, twiddles);
-    for (std::size_t i = 0; i < part; i += V) {
-        const auto p = vector_start(i, V, part);
-        Complexes<T, V> z[Radix];
-        for (std::size_t k = 0; k < Radix; ++k) {
-            z[k] = load_complex<T, V, In>(in + 2 * (p + k * part));
-        }
-        butterfly<Radix>(z);
-        for (std::size_t k = 1; k < Radix; ++k, twiddles += 2 * V) {
-            z[k] = z[k] * load_complex<T, V, Layout::blocks>(twiddles);
-        }
-        for (std::size_t lane = 0; lane < V; ++lane) {
-            T* const to = out + 2 * Radix * (p + lane);
-            for (std::size_t k = 0; k < Radix; ++k) {
-                to[2 * k] = z[k].re[lane];
-                to[2 * k + 1] = z[k].im[lane];
-            }
-        }
-    }
-    return twiddles;
-}
-
 /// Calls f with the radix as a constant.
 template <class F>
 inline auto with_radix(int radix, F f) {
@@ -253,63 +216,26 @@ inline const T* next_pass_into_blocks(int radix, const T* in, T* out, std::size_
     });
 }
 
-template <int V, Layout In, class T>
-inline const T* next_pass_into_pairs(int radix, const T* in, T* out, std::size_t n,
-                                     std::size_t stride, const T* twiddles) {
-    return with_radix(radix, [&](auto r) {
-        return stride == 1
-                   ? first_pass_into_pairs<V, r, In>(in, out, n, twiddles)
-                   : pass<V, r, Layout::pairs, Layout::pairs>(in, stride, out, n, stride, twiddles);
-    });
-}
-
 /// Runs the passes between data and workspace to and fro; the last one, which writes where it
 /// reads, ends in the data.
-template <int V, Layout Outside, Layout Between, class T>
+template <Layout Outside, class T>
 void run_passes(const Passes<T>& passes, T* data, T* work, T scale) {
+    constexpr int V = lanes<T>;
     const T* twiddles = passes.twiddles;
     T *from = data, *to = work;
     std::size_t n = passes.points, stride = 1;
     for (int i = 0; i + 1 < passes.count; ++i) {
         const int radix = passes.radices[std::size_t(i)];
-        if constexpr (Between == Layout::blocks) {
-            twiddles = next_pass_into_blocks<V, Outside>(radix, from, to, n, stride, twiddles);
-        } else {
-            twiddles = next_pass_into_pairs<V, Outside>(radix, from, to, n, stride, twiddles);
-        }
+        twiddles = next_pass_into_blocks<V, Outside>(radix, from, to, n, stride, twiddles);
         n /= std::size_t(radix);
         stride *= std::size_t(radix);
         from = to;
         to = from == work ? data : work;
     }
     with_radix(int(n), [&](auto r) {
-        const Scaling<T, r> turn{scale};
         const std::size_t row = 2 * stride;
-        if (passes.count == 1) {
-            column<1, r, Outside, Outside>(data, row, data, row, turn);
-        } else {
-            columns<V, r, Between, Outside>(from, row, data, row, stride, turn, turn);
-        }
+        columns<V, r, Layout::blocks, Outside>(from, row, data, row, stride, Scaling<T, r>{scale});
     });
-}
-
-/// The lanes of vectors for short lengths, where wide ones would not fill.
-template <class T>
-inline constexpr int narrow_lanes = std::min(lanes<T>, 4);
-
-template <Layout Outside, class T>
-inline void run_passes(const Passes<T>& passes, T* data, T* work, T scale) {
-    constexpr int narrow = narrow_lanes<T>, wide = lanes<T>;
-    if constexpr (narrow != wide) {
-        if (passes.vector == wide) {
-            return run_passes<wide, Outside, Layout::blocks>(passes, data, work, scale);
-        }
-    }
-    if (passes.blocks) {
-        run_passes<narrow, Outside, Layout::blocks>(passes, data, work, scale);
-    } else {
-        run_passes<narrow, Outside, Layout::pairs>(passes, data, work, scale);
-    }
 }
 
 }  // namespace wavkit::kernel

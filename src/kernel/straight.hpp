@@ -3,7 +3,7 @@
 #pragma once
 
 #include "kernel/half_spectrum.hpp"
-#include "kernel/passes.hpp"
+#include "kernel/pair_passes.hpp"
 
 namespace wavkit::kernel {
 
@@ -30,19 +30,6 @@ struct StraightTwiddles {
 
 template <class T, int N, int R1, int V>
 inline constexpr StraightTwiddles<T, N, R1, V> straight_twiddles{};
-
-template <class T, int V, Layout L>
-[[gnu::always_inline]] inline Pairs<T, V> load_pairs(const T* p) {
-    const Pairs<T, V> z{load<T, 2 * V>(p)};
-    if constexpr (L == Layout::swapped_pairs) return {swapped(z)};
-    return z;
-}
-
-template <class T, int V, Layout L>
-[[gnu::always_inline]] inline void store_pairs(T* p, Pairs<T, V> z) {
-    if constexpr (L == Layout::swapped_pairs) z = {swapped(z)};
-    store<T, 2 * V>(p, z.parts);
-}
 
 /// Calls f(0), f(1), ... f(N - 1), with constants where that is no more code than registers are
 /// good for.

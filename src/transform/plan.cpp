@@ -16,7 +16,6 @@ namespace {
 using kernel::has_twiddles_by_lanes;
 using kernel::lanes;
 using kernel::Matrix;
-using kernel::narrow_lanes;
 using kernel::Passes;
 using kernel::strip_width;
 
@@ -111,10 +110,11 @@ Passes<T> factorised(std::size_t n, bool eights) {
     return passes;
 }
 
-/// Whether whole vectors of so many lanes go through all passes: the first one fills them, and what
+/// Whether whole vectors go through all passes: the first one fills them, and what
 /// follows brings the stride to a multiple of them.
 template <class T>
-bool fills(const Passes<T>& passes, std::size_t vector) {
+bool fills(const Passes<T>& passes) {
+    constexpr std::size_t vector = lanes<T>;
     std::size_t stride = passes.radices[0];
     if (passes.count < 2 || (stride != 4 && stride != 8) || passes.points / stride < vector) {
         return false;
@@ -130,20 +130,49 @@ bool fills(const Passes<T>& passes, std::size_t vector) {
     return true;
 }
 
+/// Appends a radix if it divides what is left.
+template <class T>
+void add_once(Passes<T>& passes, std::size_t& left, std::size_t radix) {
+    if (left % radix != 0) return;
+    passes.radices[std::size_t(passes.count++)] = static_cast<unsigned char>(radix);
+    left /= radix;
+}
+
+/// Appends a radix as often as it divides what is left.
+template <class T>
+void add_factor(Passes<T>& passes, std::size_t& left, std::size_t radix) {
+    for (; left % radix == 0; left /= radix) {
+        passes.radices[std::size_t(passes.count++)] = static_cast<unsigned char>(radix);
+    }
+}
+
+/// Few passes over pairs: large radices where they have room in the registers, powers of two first.
+template <class T>
+Passes<T> factorised_for_pairs(std::size_t n) {
+    if (!many_registers) return factorised<T>(n, false);
+    Passes<T> passes{.points = n};
+    const int exponent = std::countr_zero(n);
+    std::size_t left = n;
+    // 2 is left over beside sixteens: 4 x 8; 4 beside them: 8 x 8.
+    if (exponent % 4 == 2 && exponent > 2) add_once(passes, left, 8);
+    if (exponent % 4 == 1 && exponent > 1) add_once(passes, left, 4);
+    add_factor(passes, left, 16);
+    for (const std::size_t radix : {8, 4, 2}) add_once(passes, left, radix);
+    while (left % 9 == 0) add_once(passes, left, 9);
+    add_once(passes, left, 15);
+    for (const std::size_t radix : {3, 5, 7, 11, 13}) add_factor(passes, left, radix);
+    return passes;
+}
+
 template <class T>
 Passes<T> passes_of(std::size_t n) {
-    for (const int vector : {lanes<T>, narrow_lanes<T>}) {
-        for (const bool eights : {true, false}) {
-            if (eights && !many_registers) continue;
-            auto passes = factorised<T>(n, eights);
-            passes.vector = vector;
-            passes.blocks = fills(passes, std::size_t(vector));
-            if (passes.blocks) return passes;
-        }
+    for (const bool eights : {true, false}) {
+        if (eights && !many_registers) continue;
+        auto passes = factorised<T>(n, eights);
+        passes.blocks = fills(passes);
+        if (passes.blocks) return passes;
     }
-    auto passes = factorised<T>(n, false);
-    passes.vector = narrow_lanes<T>;
-    return passes;
+    return factorised_for_pairs<T>(n);
 }
 
 /// Twiddles of all passes but the last, those of a pass shorter than a vector lane by lane.
@@ -155,11 +184,14 @@ void write_twiddles(Passes<T>& passes, const Roots<T>& roots, std::size_t stride
     to.align();
     passes.twiddles = to.here();
     std::size_t n = passes.points;
-    const auto vector = std::size_t(passes.vector);
+    constexpr std::size_t vector = lanes<T>;
     for (int i = 0; i + 1 < passes.count; ++i) {
         const std::size_t radix = passes.radices[std::size_t(i)], part = n / radix;
         const std::size_t butterflies = part * stride;
-        if (has_twiddles_by_lanes(passes, part, stride)) {
+        const auto root = [&](std::size_t p, std::size_t k) {
+            return to.here() ? roots(std::int64_t(p * k * step)) : Bin<T>{};
+        };
+        if (has_twiddles_by_lanes(passes, stride)) {
             for (std::size_t first = 0; first < butterflies; first += vector) {
                 const auto start = kernel::vector_start(first, vector, butterflies);
                 for (std::size_t k = 1; k < radix; ++k) {
@@ -168,11 +200,13 @@ void write_twiddles(Passes<T>& passes, const Roots<T>& roots, std::size_t stride
                     });
                 }
             }
+        } else if (stride == 1) {
+            for (std::size_t k = 1; k < radix; ++k) {
+                for (std::size_t p = 0; p < part; ++p) to.put(root(p, k));
+            }
         } else {
             for (std::size_t p = 1; p < part; ++p) {
-                for (std::size_t k = 1; k < radix; ++k) {
-                    to.put(to.here() ? roots(std::int64_t(p * k * step)) : Bin<T>{});
-                }
+                for (std::size_t k = 1; k < radix; ++k) to.put(root(p, k));
             }
         }
         n = part;
@@ -212,7 +246,6 @@ Matrix<T> matrix_of(std::size_t n) {
     for (auto* passes : {&matrix.of_rows, &matrix.of_columns}) {
         *passes =
             factorised<T>(passes == &matrix.of_rows ? matrix.rows : matrix.columns, many_registers);
-        passes->vector = lanes<T>;
     }
     return matrix;
 }

@@ -12,16 +12,18 @@ namespace {
 
 using kernel::Layout;
 
+template <Layout Outside, class T>
+void run(const Transform<T>& t, T* samples, T* work, T scale) {
+    if (t.matrix.rows) return run_matrix<Outside>(t.matrix, samples, work, scale);
+    if (t.passes.blocks) return run_passes<Outside>(t.passes, samples, work, scale);
+    run_pair_passes<Outside>(t.passes, samples, work, scale);
+}
+
 /// An inverse transform is a forward one with real and imaginary parts exchanged on both sides.
 template <class T>
 void run(const Transform<T>& t, T* samples, T* work, bool inverse, T scale) {
-    if (t.matrix.rows) {
-        inverse ? run_matrix<Layout::swapped_pairs>(t.matrix, samples, work, scale)
-                : run_matrix<Layout::pairs>(t.matrix, samples, work, scale);
-    } else {
-        inverse ? run_passes<Layout::swapped_pairs>(t.passes, samples, work, scale)
-                : run_passes<Layout::pairs>(t.passes, samples, work, scale);
-    }
+    inverse ? run<Layout::swapped_pairs>(t, samples, work, scale)
+            : run<Layout::pairs>(t, samples, work, scale);
 }
 
 /// With nk = (n^2 + k^2 - (k - n)^2) / 2 a transform is a product with the chirp, a convolution
