@@ -4,6 +4,7 @@
 
 #include "kernel/half_spectrum.hpp"
 #include "kernel/pair_passes.hpp"
+#include "kernel/prime.hpp"
 
 namespace wavkit::kernel {
 
@@ -171,15 +172,25 @@ inline bool run_straight(int n, T* data, T scale) {
         case 10:
             return run_straight<10, 2, 1, Outside>(data, scale), true;
         case 11:
-            return run_tiny<11, Outside>(data, scale), true;
+            return run_prime<11, Outside>(data, scale), true;
         case 12:
             return run_straight<12, 4, 1, Outside>(data, scale), true;
         case 13:
-            return run_tiny<13, Outside>(data, scale), true;
+            return run_prime<13, Outside>(data, scale), true;
         case 15:
             return run_straight<15, 3, 1, Outside>(data, scale), true;
         case 16:
             return run_straight<16, 4, V, Outside>(data, scale), true;
+        case 17:
+            return run_prime<17, Outside>(data, scale), true;
+        case 19:
+            return run_prime<19, Outside>(data, scale), true;
+        case 23:
+            return run_prime<23, Outside>(data, scale), true;
+        case 29:
+            return run_prime<29, Outside>(data, scale), true;
+        case 31:
+            return run_prime<31, Outside>(data, scale), true;
         case 32:
             return run_straight<32, 8, V, Outside>(data, scale), true;
         default:
