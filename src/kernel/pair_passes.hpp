@@ -103,10 +103,11 @@ template <class T, int V>
 
 /// The first pass, of n samples that all belong together: a vector of butterflies side by side.
 template <int V, int Radix, Layout In, class T>
-const T* first_pair_pass(const T* in, T* out, std::size_t n, const T* twiddles) {
+const T* first_pair_pass(const T* in, T* out, std::size_t n, std::size_t stride,
+                         const T* twiddles) {
     const std::size_t part = n / Radix;
     if constexpr (V > 1) {
-        if (part < V) return first_pair_pass<V / 2, Radix, In>(in, out, n, twiddles);
+        if (part < V) return first_pair_pass<V / 2, Radix, In>(in, out, n, stride, twiddles);
     }
     for (std::size_t i = 0; i < part; i += V) {
         const auto p = vector_start(i, V, part);
@@ -163,32 +164,29 @@ inline auto with_any_radix(int radix, F f) {
     }
 }
 
-/// As run_passes(), the samples in pairs all the way.
-template <Layout Outside, class T>
-void run_pair_passes(const Passes<T>& passes, T* data, T* work, T scale) {
+/// The last pass. Runs begin at the same places in both, so that it may write where it reads.
+template <int Radix, Layout Out, class T>
+void last_pair_pass(const T* in, T* out, std::size_t stride, T scale) {
+    pair_columns<pairs_of_register<T>, Radix, Layout::pairs, Out>(in, 2 * stride, out, 2 * stride,
+                                                                  stride, Scaling<T, Radix>{scale});
+}
+
+/// Chooses the functions of passes over pairs.
+template <class T>
+void choose_passes_over_pairs(Passes<T>& passes) {
     constexpr int V = pairs_of_register<T>;
-    const T* twiddles = passes.twiddles;
-    T *from = data, *to = work;
-    std::size_t n = passes.points, stride = 1;
-    for (int i = 0; i + 1 < passes.count; ++i) {
-        const int radix = passes.radices[std::size_t(i)];
-        twiddles = with_any_radix(radix, [&](auto r) {
-            return stride == 1 ? first_pair_pass<V, r, Outside>(from, to, n, twiddles)
-                               : pair_pass<r>(from, to, n, stride, twiddles);
-        });
-        n /= std::size_t(radix);
-        stride *= std::size_t(radix);
-        from = to;
-        to = from == work ? data : work;
+    const auto count = std::size_t(passes.count);
+    with_any_radix(passes.radices[0], [&](auto r) {
+        passes.first = {first_pair_pass<V, r, Layout::pairs, T>,
+                        first_pair_pass<V, r, Layout::swapped_pairs, T>};
+    });
+    for (std::size_t i = 1; i + 1 < count; ++i) {
+        passes.between[i] =
+            with_any_radix(passes.radices[i], [](auto r) -> Pass<T> { return pair_pass<r, T>; });
     }
-    with_any_radix(int(n), [&](auto r) {
-        const Scaling<T, r> turn{scale};
-        const std::size_t row = 2 * stride;
-        if (passes.count == 1) {
-            pair_column<1, r, Outside, Outside>(data, row, data, row, turn);
-        } else {
-            pair_columns<V, r, Layout::pairs, Outside>(from, row, data, row, stride, turn);
-        }
+    with_any_radix(passes.radices[count - 1], [&](auto r) {
+        passes.last = {last_pair_pass<r, Layout::pairs, T>,
+                       last_pair_pass<r, Layout::swapped_pairs, T>};
     });
 }
 

@@ -15,6 +15,16 @@
 
 namespace wavkit::kernel {
 
+/// A pass over blocks of n samples at a stride, from one place to another; returns the twiddles of
+/// the next pass.
+template <class T>
+using Pass = const T* (*)(const T* in, T* out, std::size_t n, std::size_t stride,
+                          const T* twiddles);
+
+/// The pass that leaves blocks of one sample, scaled; the places may be the same.
+template <class T>
+using LastPass = void (*)(const T* in, T* out, std::size_t stride, T scale);
+
 /// The passes of one length, in their order, and the roots of unity that they read.
 template <class T>
 struct Passes {
@@ -23,7 +33,28 @@ struct Passes {
     std::array<unsigned char, 31> radices{};
     bool blocks = false;          // the samples between passes lie in whole vectors
     const T* twiddles = nullptr;  // pass by pass; none for the last
+
+    // Forward and inverse: these two see the samples as they lie outside.
+    std::array<Pass<T>, 2> first{};
+    std::array<LastPass<T>, 2> last{};
+    std::array<Pass<T>, 31> between{};  // by their number in the order of all
 };
+
+/// Runs the passes between data and workspace to and fro; the last one, which writes where it
+/// reads, ends in the data.
+template <class T>
+void run_passes(const Passes<T>& passes, bool inverse, T* data, T* work, T scale) {
+    const T* twiddles = passes.first[inverse](data, work, passes.points, 1, passes.twiddles);
+    std::size_t stride = passes.radices[0], n = passes.points / stride;
+    T *from = work, *to = data;
+    for (std::size_t i = 1; i + 1 < std::size_t(passes.count); ++i) {
+        twiddles = passes.between[i](from, to, n, stride, twiddles);
+        n /= passes.radices[i];
+        stride *= passes.radices[i];
+        std::swap(from, to);
+    }
+    passes.last[inverse](from, data, stride, scale);
+}
 
 /// Whether the twiddles of a pass over blocks stand lane by lane, one vector of each for a vector
 /// of butterflies; else there is one of each a run.
@@ -189,52 +220,62 @@ inline auto with_power(int radix, F f) {
     return radix == 4 ? f(std::integral_constant<int, 4>()) : f(std::integral_constant<int, 8>());
 }
 
-/// The first pass into blocks, then one more where it leaves runs shorter than a vector.
-template <int V, Layout In, class T>
-inline const T* next_pass_into_blocks(int radix, const T* in, T* out, std::size_t n,
-                                      std::size_t stride, const T* twiddles) {
-    if (stride == 1) {
-        return with_power(radix,
-                          [&](auto r) { return short_pass<V, r, 1, In>(in, out, n, twiddles); });
-    }
-    if constexpr (V > 4) {
-        if (stride == 4) {
-            return with_power(radix, [&](auto r) {
-                return short_pass<V, r, 4, Layout::blocks>(in, out, n * stride, twiddles);
-            });
-        }
-    }
-    if constexpr (V > 8) {
-        if (stride == 8) {
-            return with_power(radix, [&](auto r) {
-                return short_pass<V, r, 8, Layout::blocks>(in, out, n * stride, twiddles);
-            });
-        }
-    }
-    return with_radix(radix, [&](auto r) {
-        return pass<V, r, Layout::blocks, Layout::blocks>(in, stride, out, n, stride, twiddles);
-    });
+/// The passes into blocks: the first, then one more where it leaves runs shorter than a vector.
+template <int Stride, int Radix, Layout In, class T>
+const T* short_pass_into_blocks(const T* in, T* out, std::size_t n, std::size_t,
+                                const T* twiddles) {
+    return short_pass<lanes<T>, Radix, Stride, In>(in, out, n * Stride, twiddles);
 }
 
-/// Runs the passes between data and workspace to and fro; the last one, which writes where it
-/// reads, ends in the data.
-template <Layout Outside, class T>
-void run_passes(const Passes<T>& passes, T* data, T* work, T scale) {
-    constexpr int V = lanes<T>;
-    const T* twiddles = passes.twiddles;
-    T *from = data, *to = work;
-    std::size_t n = passes.points, stride = 1;
-    for (int i = 0; i + 1 < passes.count; ++i) {
-        const int radix = passes.radices[std::size_t(i)];
-        twiddles = next_pass_into_blocks<V, Outside>(radix, from, to, n, stride, twiddles);
-        n /= std::size_t(radix);
-        stride *= std::size_t(radix);
-        from = to;
-        to = from == work ? data : work;
+template <int Radix, class T>
+const T* pass_into_blocks(const T* in, T* out, std::size_t n, std::size_t stride,
+                          const T* twiddles) {
+    return pass<lanes<T>, Radix, Layout::blocks, Layout::blocks>(in, stride, out, n, stride,
+                                                                 twiddles);
+}
+
+template <class T>
+Pass<T> find_pass_into_blocks(int radix, std::size_t stride) {
+    if constexpr (lanes < T >> 4) {
+        if (stride == 4) {
+            return with_power(radix, [](auto r) -> Pass<T> {
+                return short_pass_into_blocks<4, r, Layout::blocks, T>;
+            });
+        }
     }
-    with_radix(int(n), [&](auto r) {
-        const std::size_t row = 2 * stride;
-        columns<V, r, Layout::blocks, Outside>(from, row, data, row, stride, Scaling<T, r>{scale});
+    if constexpr (lanes < T >> 8) {
+        if (stride == 8) {
+            return with_power(radix, [](auto r) -> Pass<T> {
+                return short_pass_into_blocks<8, r, Layout::blocks, T>;
+            });
+        }
+    }
+    return with_radix(radix, [](auto r) -> Pass<T> { return pass_into_blocks<r, T>; });
+}
+
+/// The last pass, out of blocks.
+template <int Radix, Layout Out, class T>
+void last_pass_out_of_blocks(const T* in, T* out, std::size_t stride, T scale) {
+    columns<lanes<T>, Radix, Layout::blocks, Out>(in, 2 * stride, out, 2 * stride, stride,
+                                                  Scaling<T, Radix>{scale});
+}
+
+/// Chooses the functions of passes over blocks.
+template <class T>
+void choose_passes_over_blocks(Passes<T>& passes) {
+    const auto count = std::size_t(passes.count);
+    with_power(passes.radices[0], [&](auto r) {
+        passes.first = {short_pass_into_blocks<1, r, Layout::pairs, T>,
+                        short_pass_into_blocks<1, r, Layout::swapped_pairs, T>};
+    });
+    std::size_t stride = passes.radices[0];
+    for (std::size_t i = 1; i + 1 < count; ++i) {
+        passes.between[i] = find_pass_into_blocks<T>(passes.radices[i], stride);
+        stride *= passes.radices[i];
+    }
+    with_radix(passes.radices[count - 1], [&](auto r) {
+        passes.last = {last_pass_out_of_blocks<r, Layout::pairs, T>,
+                       last_pass_out_of_blocks<r, Layout::swapped_pairs, T>};
     });
 }
 

@@ -8,6 +8,7 @@
 #include <unistd.h>
 #endif
 
+#include "kernel/pair_passes.hpp"
 #include "transform/roots.hpp"
 
 namespace wavkit {
@@ -170,9 +171,14 @@ Passes<T> passes_of(std::size_t n) {
         if (eights && !many_registers) continue;
         auto passes = factorised<T>(n, eights);
         passes.blocks = fills(passes);
-        if (passes.blocks) return passes;
+        if (passes.blocks) {
+            choose_passes_over_blocks(passes);
+            return passes;
+        }
     }
-    return factorised_for_pairs<T>(n);
+    auto passes = factorised_for_pairs<T>(n);
+    if (passes.count > 0) choose_passes_over_pairs(passes);
+    return passes;
 }
 
 /// Twiddles of all passes but the last, those of a pass shorter than a vector lane by lane.

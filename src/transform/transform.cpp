@@ -12,18 +12,16 @@ namespace {
 
 using kernel::Layout;
 
-template <Layout Outside, class T>
-void run(const Transform<T>& t, T* samples, T* work, T scale) {
-    if (t.matrix.rows) return run_matrix<Outside>(t.matrix, samples, work, scale);
-    if (t.passes.blocks) return run_passes<Outside>(t.passes, samples, work, scale);
-    run_pair_passes<Outside>(t.passes, samples, work, scale);
-}
-
 /// An inverse transform is a forward one with real and imaginary parts exchanged on both sides.
 template <class T>
 void run(const Transform<T>& t, T* samples, T* work, bool inverse, T scale) {
-    inverse ? run<Layout::swapped_pairs>(t, samples, work, scale)
-            : run<Layout::pairs>(t, samples, work, scale);
+    if (!t.matrix.rows) {
+        run_passes(t.passes, inverse, samples, work, scale);
+    } else if (inverse) {
+        run_matrix<Layout::swapped_pairs>(t.matrix, samples, work, scale);
+    } else {
+        run_matrix<Layout::pairs>(t.matrix, samples, work, scale);
+    }
 }
 
 /// With nk = (n^2 + k^2 - (k - n)^2) / 2 a transform is a product with the chirp, a convolution
