@@ -29,11 +29,10 @@ std::size_t last_cache() {
     return std::size_t(2) << 20;
 }
 
-/// The longest powers of two that go through passes: data and workspace take a quarter of the last
-/// cache.
+/// The longest powers of two that go through passes: data and workspace take the last cache.
 template <class T>
 std::size_t longest_direct() {
-    static const std::size_t longest = std::bit_floor(last_cache() / (16 * sizeof(T)));
+    static const std::size_t longest = std::bit_floor(last_cache() / (4 * sizeof(T)));
     return longest;
 }
 
