@@ -93,6 +93,33 @@ template <int Radix, class T, class Z>
     }
 }
 
+/// The same for more samples than registers: from memory, a loop for each bin.
+template <int Radix, class T, class Z>
+[[gnu::always_inline]] inline void butterfly_of_large_odd(Z* z) {
+    constexpr int half = Radix / 2;
+    Z sum[half], difference[half];
+    const auto first = z[0];
+    for (int k = 0; k < half; ++k) {
+        sum[k] = z[k + 1] + z[Radix - 1 - k];
+        difference[k] = z[k + 1] - z[Radix - 1 - k];
+        z[0] = z[0] + sum[k];
+    }
+#pragma GCC unroll 1
+    for (int j = 0; j < half; ++j) {
+        const auto& row = circle_matrix<T, Radix>.row[j];
+        auto even = first;
+        Z odd{};
+#pragma GCC unroll 1
+        for (int k = 0; k < half; ++k) {
+            even = even + sum[k] * row.cosine[k];
+            odd = odd + difference[k] * row.sine[k];
+        }
+        const auto turned = times_minus_i(odd);
+        z[j + 1] = even + turned;
+        z[Radix - 1 - j] = even - turned;
+    }
+}
+
 template <int Radix, template <class, int> class Samples, class T, int V>
 void butterfly(Samples<T, V>* z);
 
@@ -171,6 +198,8 @@ template <int Radix, template <class, int> class Samples, class T, int V>
         butterfly_of_product<4, 3>(z);
     } else if constexpr (Radix == 15) {
         butterfly_of_product<3, 5>(z);
+    } else if constexpr (Radix > 13) {
+        butterfly_of_large_odd<Radix, T>(z);
     } else {
         butterfly_of_odd<Radix, T>(z);
     }

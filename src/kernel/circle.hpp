@@ -48,4 +48,25 @@ struct Circle {
 template <int Radix>
 inline constexpr Circle<Radix> circle{};
 
+/// cos and sin of 2 pi j k / Radix, j and k from 1 to half of it.
+template <class T, int Radix>
+struct CircleMatrix {
+    struct Row {
+        T cosine[Radix / 2], sine[Radix / 2];
+    };
+    Row row[Radix / 2];
+
+    constexpr CircleMatrix() : row() {
+        for (int j = 1; j <= Radix / 2; ++j) {
+            for (int k = 1; k <= Radix / 2; ++k) {
+                row[j - 1].cosine[k - 1] = T(exact_cosine(j * k % Radix, Radix));
+                row[j - 1].sine[k - 1] = T(exact_sine(j * k % Radix, Radix));
+            }
+        }
+    }
+};
+
+template <class T, int Radix>
+inline constexpr CircleMatrix<T, Radix> circle_matrix{};
+
 }  // namespace wavkit::kernel

@@ -69,6 +69,20 @@ void join(T* data, std::size_t half, const T* roots) {
     combine_halves<false>(data, half, roots);
 }
 
+/// out[k] = x[k] y[k] for `count` samples, y in pairs, x and out as said; out may be x.
+template <Layout In, Layout Out, class T, int V = lanes<T>>
+inline void multiply_into(const T* x, const T* y, T* out, std::size_t count) {
+    std::size_t k = 0;
+    for (; k + V <= count; k += V) {
+        const auto a = load_complex<T, V, In>(x + 2 * k);
+        const auto b = load_complex<T, V, Layout::pairs>(y + 2 * k);
+        store_complex<T, V, Out>(out + 2 * k, a * b);
+    }
+    if constexpr (V > 1) {
+        multiply_into<In, Out, T, 1>(x + 2 * k, y + 2 * k, out + 2 * k, count - k);
+    }
+}
+
 /// x[k] *= y[k], or its conjugate, for `count` samples in pairs: spectra of a convolution, or of a
 /// correlation.
 template <bool Conjugate, class T, int V = lanes<T>>

@@ -159,6 +159,16 @@ inline auto with_any_radix(int radix, F f) {
             return f(std::integral_constant<int, 15>());
         case 16:
             return f(std::integral_constant<int, 16>());
+        case 17:
+            return f(std::integral_constant<int, 17>());
+        case 19:
+            return f(std::integral_constant<int, 19>());
+        case 23:
+            return f(std::integral_constant<int, 23>());
+        case 29:
+            return f(std::integral_constant<int, 29>());
+        case 31:
+            return f(std::integral_constant<int, 31>());
         default:
             return with_radix(radix, f);
     }

@@ -191,6 +191,8 @@ inline const T* short_pass(const T* in, T* out, std::size_t points, const T* twi
     return twiddles;
 }
 
+inline constexpr int largest_radix_over_blocks = 13;
+
 /// Calls f with the radix as a constant.
 template <class F>
 inline auto with_radix(int radix, F f) {

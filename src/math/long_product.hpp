@@ -63,7 +63,7 @@ bool multiply_by_spectra(std::span<const scalar<R>> a, std::span<const scalar<R>
     if (std::max(a.size(), b.size()) / 64 > std::min(a.size(), b.size())) return false;
     if (!is_level(a) || !is_level(b)) return false;
     int n = int(out.size() + out.size() % 2);
-    while (!is_smooth(n)) n += 2;
+    while (!is_smooth(n, 13)) n += 2;
     const std::size_t room = std::size_t(n) + 16;
     T* const p = reserve_room<R>(n, false, 2 * room);
     if (!p) return false;

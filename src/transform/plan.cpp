@@ -70,6 +70,9 @@ class Writer {
     std::size_t used_ = 0;
 };
 
+/// The prime numbers that passes take beside 2.
+constexpr std::size_t odd_primes[] = {3, 5, 7, 11, 13, 17, 19, 23, 29, 31};
+
 /// Appends the radices of 2^exponent: as many eights as leave fours only, the eights first.
 template <class T>
 void add_eights(Passes<T>& passes, int exponent) {
@@ -102,7 +105,7 @@ Passes<T> factorised(std::size_t n, bool eights) {
     } else {
         add_fours(passes, exponent, odd == 1);
     }
-    for (const std::size_t radix : {3, 5, 7, 11, 13}) {
+    for (const std::size_t radix : odd_primes) {
         for (; odd % radix == 0; odd /= radix) {
             passes.radices[std::size_t(passes.count++)] = static_cast<unsigned char>(radix);
         }
@@ -119,6 +122,8 @@ bool fills(const Passes<T>& passes) {
     if (passes.count < 2 || (stride != 4 && stride != 8) || passes.points / stride < vector) {
         return false;
     }
+    if (passes.radices[std::size_t(passes.count) - 1] > kernel::largest_radix_over_blocks)
+        return false;
     for (int i = 1; stride % vector != 0; ++i) {
         const std::size_t radix = passes.radices[std::size_t(i)];
         const bool short_pass = (radix == 4 || radix == 8) && (stride == 4 || stride == 8);
@@ -160,7 +165,7 @@ Passes<T> factorised_for_pairs(std::size_t n) {
     for (const std::size_t radix : {8, 4, 2}) add_once(passes, left, radix);
     while (left % 9 == 0) add_once(passes, left, 9);
     add_once(passes, left, 15);
-    for (const std::size_t radix : {3, 5, 7, 11, 13}) add_factor(passes, left, radix);
+    for (const std::size_t radix : odd_primes) add_factor(passes, left, radix);
     return passes;
 }
 
@@ -309,9 +314,12 @@ Transform<T> shape_of(int n) {
 
 }  // namespace
 
-bool is_smooth(int n) {
+bool is_smooth(int n, int largest) {
     if (n < 1) return false;
-    for (const int radix : {2, 3, 5, 7, 11, 13}) {
+    n >>= std::countr_zero(unsigned(n));
+    for (const auto prime : odd_primes) {
+        const int radix = int(prime);
+        if (radix > largest) break;
         while (n % radix == 0) n /= radix;
     }
     return n == 1;

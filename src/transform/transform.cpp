@@ -24,24 +24,28 @@ void run(const Transform<T>& t, T* samples, T* work, bool inverse, T scale) {
     }
 }
 
-/// With nk = (n^2 + k^2 - (k - n)^2) / 2 a transform is a product with the chirp, a convolution
-/// with its conjugate, and another product with the chirp. Both directions read the same chirp: an
-/// inverse transform is the conjugate of the forward transform of the conjugate.
+/// The transform of a convolution, which is of another length than t.points.
 template <class T>
-void convolve_with_chirp(const Transform<T>& t, Bin<T>* z, T* work, bool inverse, T scale) {
-    const auto n = std::size_t(t.points), length = t.convolution_points;
-    const auto* const chirp = reinterpret_cast<const Bin<T>*>(t.chirp);
-    auto* const y = reinterpret_cast<Bin<T>*>(work);
-    T* const rest = work + 2 * length;
-    for (std::size_t i = 0; i < n; ++i) y[i] = (inverse ? conj(z[i]) : z[i]) * chirp[i];
-    std::fill(y + n, y + length, Bin<T>{0, 0});
-    run(t, work, rest, false, T(1));
-    kernel::multiply<false>(work, t.filter, length);
-    run(t, work, rest, true, T(scale / T(length)));
-    for (std::size_t i = 0; i < n; ++i) {
-        const auto turned = y[i] * chirp[i];
-        z[i] = inverse ? conj(turned) : turned;
+void run_inner(const Transform<T>& t, T* samples, T* work, bool inverse, T scale) {
+    const int length = int(t.convolution_points);
+    if (!(inverse ? kernel::run_straight<Layout::swapped_pairs>(length, samples, scale)
+                  : kernel::run_straight<Layout::pairs>(length, samples, scale))) {
+        run(t, samples, work, inverse, scale);
     }
+}
+
+/// With nk = (n^2 + k^2 - (k - n)^2) / 2 a transform is a product with the chirp, a convolution
+/// with its conjugate, and another product with the chirp.
+template <Layout Outside, class T>
+void convolve_with_chirp(const Transform<T>& t, T* samples, T* work, T scale) {
+    const auto n = std::size_t(t.points), length = t.convolution_points;
+    T* const rest = work + 2 * length;
+    kernel::multiply_into<Outside, Layout::pairs>(samples, t.chirp, work, n);
+    std::fill(work + 2 * n, rest, T(0));
+    run_inner(t, work, rest, false, T(1));
+    kernel::multiply<false>(work, t.filter, length);
+    run_inner(t, work, rest, true, T(scale / T(length)));
+    kernel::multiply_into<Layout::pairs, Outside>(work, t.chirp, samples, n);
 }
 
 /// A transform of n points, complete.
@@ -86,10 +90,12 @@ const scalar<R>* find_half_turns(int n) {
 template <Record R>
 void run_any(const Transform<scalar<R>>& t, Bin<scalar<R>>* z, scalar<R>* work, bool inverse,
              scalar<R> scale) {
-    if (t.convolution_points) {
-        convolve_with_chirp(t, z, work, inverse, scale);
-    } else {
+    if (!t.convolution_points) {
         run(t, &z->re, work, inverse, scale);
+    } else if (inverse) {
+        convolve_with_chirp<Layout::swapped_pairs>(t, &z->re, work, scale);
+    } else {
+        convolve_with_chirp<Layout::pairs>(t, &z->re, work, scale);
     }
 }
 

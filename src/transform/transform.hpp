@@ -9,7 +9,7 @@ namespace wavkit {
 
 /// What a transform of one length reads; immutable, one block with its tables, shared by threads.
 ///
-/// Lengths without a prime factor above 13 go through passes or, where they are longer than the
+/// Lengths without a prime factor above 31 go through passes or, where they are longer than the
 /// cache is good for, through a matrix. Others are a convolution with a chirp (Bluestein, 1970), of
 /// a length that does so.
 template <class T>
@@ -25,8 +25,8 @@ struct Transform {
     const T* filter;                 // the spectrum of its conjugate
 };
 
-/// Whether n has no prime factor above 13.
-bool is_smooth(int n);
+/// Whether n has no prime factor above the largest one, or above 31, the largest that passes take.
+bool is_smooth(int n, int largest = 31);
 
 /// z[k] = scale * sum z[n] e^(-2 pi i n k / N), or of the conjugate kernel for an inverse, in
 /// place; -1 when memory runs out.
