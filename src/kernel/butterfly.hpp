@@ -99,6 +99,7 @@ template <int Radix, class T, class Z>
     constexpr int half = Radix / 2;
     Z sum[half], difference[half];
     const auto first = z[0];
+#pragma GCC unroll 1
     for (int k = 0; k < half; ++k) {
         sum[k] = z[k + 1] + z[Radix - 1 - k];
         difference[k] = z[k + 1] - z[Radix - 1 - k];

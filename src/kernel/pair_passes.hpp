@@ -49,38 +49,31 @@ template <int V, int Radix, Layout In, Layout Out, class T, class Turn>
     for (std::size_t k = 0; k < Radix; ++k) store_pairs<T, V, Out>(out + k * out_distance, z[k]);
 }
 
-/// The butterflies of one rotation over a run of samples.
-template <int V, int Radix, Layout In, Layout Out, class T, class Turn>
+/// The butterflies of one rotation over a run of samples, from one place to another: the last
+/// vector may overlap the one before.
+template <int V, int Radix, class T>
 inline void pair_columns(const T* in, std::size_t in_distance, T* out, std::size_t out_distance,
-                         std::size_t run, const Turn& turn) {
-    std::size_t q = 0;
-    for (; q + V <= run; q += V) {
-        pair_column<V, Radix, In, Out>(in + 2 * q, in_distance, out + 2 * q, out_distance, turn);
-    }
-    if constexpr (V > 1) {
-        if (q == run) return;
-        if (q > 0 && in != out) {
-            q = run - V;
-            pair_column<V, Radix, In, Out>(in + 2 * q, in_distance, out + 2 * q, out_distance,
-                                           turn);
-        } else {
-            pair_columns<V / 2, Radix, In, Out>(in + 2 * q, in_distance, out + 2 * q, out_distance,
-                                                run - q, turn);
+                         std::size_t run, const PairRotation<T, Radix>& turn) {
+    if constexpr (V > 2) {
+        if (run < V) {
+            return pair_columns<V / 2, Radix>(in, in_distance, out, out_distance, run, turn);
         }
+    }
+    for (std::size_t i = 0; i < run; i += V) {
+        const std::size_t q = 2 * vector_start(i, V, run);
+        pair_column<V, Radix, Layout::pairs, Layout::pairs>(in + q, in_distance, out + q,
+                                                            out_distance, turn);
     }
 }
 
-/// A pass of blocks of n samples at a stride. Returns the twiddles of the next pass.
+/// A pass of blocks of n samples at a stride of two or more. Returns the twiddles of the next pass.
 template <int Radix, class T>
 const T* pair_pass(const T* in, T* out, std::size_t n, std::size_t stride, const T* twiddles) {
-    constexpr int V = pairs_of_register<T>;
     const std::size_t part = n / Radix, distance = 2 * stride * part;
-    pair_columns<V, Radix, Layout::pairs, Layout::pairs>(in, distance, out, 2 * stride, stride,
-                                                         Unrotated());
-    for (std::size_t p = 1; p < part; ++p, twiddles += 2 * (Radix - 1)) {
-        pair_columns<V, Radix, Layout::pairs, Layout::pairs>(
-            in + 2 * stride * p, distance, out + 2 * stride * Radix * p, 2 * stride, stride,
-            PairRotation<T, Radix>{twiddles});
+    for (std::size_t p = 0; p < part; ++p, twiddles += 2 * (Radix - 1)) {
+        pair_columns<pairs_of_register<T>, Radix>(in + 2 * stride * p, distance,
+                                                  out + 2 * stride * Radix * p, 2 * stride, stride,
+                                                  PairRotation<T, Radix>{twiddles});
     }
     return twiddles;
 }
@@ -174,11 +167,21 @@ inline auto with_any_radix(int radix, F f) {
     }
 }
 
-/// The last pass. Runs begin at the same places in both, so that it may write where it reads.
-template <int Radix, Layout Out, class T>
+/// The last pass, which may write where it reads: what its vectors leave goes through narrower
+/// ones.
+template <int Radix, Layout Out, class T, int V = pairs_of_register<T>>
 void last_pair_pass(const T* in, T* out, std::size_t stride, T scale) {
-    pair_columns<pairs_of_register<T>, Radix, Layout::pairs, Out>(in, 2 * stride, out, 2 * stride,
-                                                                  stride, Scaling<T, Radix>{scale});
+    const auto run = [=](auto width, std::size_t from) {
+        std::size_t q = from;
+        for (; q + width <= stride; q += width) {
+            pair_column<width, Radix, Layout::pairs, Out>(in + 2 * q, 2 * stride, out + 2 * q,
+                                                          2 * stride, Scaling<T, Radix>{scale});
+        }
+        return q;
+    };
+    std::size_t done = run(std::integral_constant<int, V>(), 0);
+    if constexpr (V > 2) done = run(std::integral_constant<int, 2>(), done);
+    if constexpr (V > 1) run(std::integral_constant<int, 1>(), done);
 }
 
 /// Chooses the functions of passes over pairs.
@@ -195,8 +198,7 @@ void choose_passes_over_pairs(Passes<T>& passes) {
             with_any_radix(passes.radices[i], [](auto r) -> Pass<T> { return pair_pass<r, T>; });
     }
     with_any_radix(passes.radices[count - 1], [&](auto r) {
-        passes.last = {last_pair_pass<r, Layout::pairs, T>,
-                       last_pair_pass<r, Layout::swapped_pairs, T>};
+        passes.last = {last_pair_pass<r, Layout::pairs>, last_pair_pass<r, Layout::swapped_pairs>};
     });
 }
 

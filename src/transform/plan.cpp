@@ -215,7 +215,7 @@ void write_twiddles(Passes<T>& passes, const Roots<T>& roots, std::size_t stride
                 for (std::size_t p = 0; p < part; ++p) to.put(root(p, k));
             }
         } else {
-            for (std::size_t p = 1; p < part; ++p) {
+            for (std::size_t p = passes.blocks ? 1 : 0; p < part; ++p) {
                 for (std::size_t k = 1; k < radix; ++k) to.put(root(p, k));
             }
         }
@@ -256,6 +256,7 @@ Matrix<T> matrix_of(std::size_t n) {
     for (auto* passes : {&matrix.of_rows, &matrix.of_columns}) {
         *passes =
             factorised<T>(passes == &matrix.of_rows ? matrix.rows : matrix.columns, many_registers);
+        passes->blocks = true;
     }
     return matrix;
 }
