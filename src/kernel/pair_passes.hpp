@@ -167,21 +167,29 @@ inline auto with_any_radix(int radix, F f) {
     }
 }
 
-/// The last pass, which may write where it reads: what its vectors leave goes through narrower
-/// ones.
+/// The last pass. Where it writes what it reads, the vectors cannot overlap: what they leave goes
+/// through narrower ones.
 template <int Radix, Layout Out, class T, int V = pairs_of_register<T>>
 void last_pair_pass(const T* in, T* out, std::size_t stride, T scale) {
-    const auto run = [=](auto width, std::size_t from) {
-        std::size_t q = from;
-        for (; q + width <= stride; q += width) {
-            pair_column<width, Radix, Layout::pairs, Out>(in + 2 * q, 2 * stride, out + 2 * q,
-                                                          2 * stride, Scaling<T, Radix>{scale});
-        }
-        return q;
+    if constexpr (V > 2) {
+        if (stride < V) return last_pair_pass<Radix, Out, T, V / 2>(in, out, stride, scale);
+    }
+    const auto column = [=](auto width, std::size_t q) {
+        pair_column<width, Radix, Layout::pairs, Out>(in + 2 * q, 2 * stride, out + 2 * q,
+                                                      2 * stride, Scaling<T, Radix>{scale});
     };
-    std::size_t done = run(std::integral_constant<int, V>(), 0);
-    if constexpr (V > 2) done = run(std::integral_constant<int, 2>(), done);
-    if constexpr (V > 1) run(std::integral_constant<int, 1>(), done);
+    const bool may_overlap = in != out && stride >= V;
+    const std::size_t whole = may_overlap ? stride : stride - stride % V;
+    std::size_t q = 0;
+    for (; q < whole; q += V) {
+        column(std::integral_constant<int, V>(), vector_start(q, V, stride));
+    }
+    if constexpr (V > 2) {
+        for (; q + 2 <= stride; q += 2) column(std::integral_constant<int, 2>(), q);
+    }
+    if constexpr (V > 1) {
+        for (; q < stride; ++q) column(std::integral_constant<int, 1>(), q);
+    }
 }
 
 /// Chooses the functions of passes over pairs.
