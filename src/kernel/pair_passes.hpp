@@ -78,19 +78,11 @@ const T* pair_pass(const T* in, T* out, std::size_t n, std::size_t stride, const
     return twiddles;
 }
 
-/// A vector of roots of unity, each part twice.
-struct Doubled {
-    template <bool Odd>
-    struct Part {
-        static constexpr int lane(int i) { return i / 2 * 2 + (Odd ? 1 : 0); }
-    };
-};
-
 /// z w, lane by lane.
 template <class T, int V>
 [[gnu::always_inline]] inline Pairs<T, V> rotated(Pairs<T, V> z, Vec<T, 2 * V> w) {
-    const auto re = shuffle<2 * V, Doubled::Part<false>>(w, w);
-    const auto im = shuffle<2 * V, Doubled::Part<true>>(w, w);
+    const auto re = shuffle<2 * V, Twice<false>>(w, w);
+    const auto im = shuffle<2 * V, Twice<true>>(w, w);
     return {z.parts * re + swapped(z) * (alternating<T, V>(-1) * im)};
 }
 

@@ -129,6 +129,12 @@ struct Swapped {
     static constexpr int lane(int i) { return i ^ 1; }
 };
 
+/// The first or the second of every two neighbours, twice.
+template <bool Second>
+struct Twice {
+    static constexpr int lane(int i) { return i / 2 * 2 + (Second ? 1 : 0); }
+};
+
 template <int V>
 struct Backwards {
     static constexpr int lane(int i) { return V - 1 - i; }

@@ -151,21 +151,30 @@ void add_factor(Passes<T>& passes, std::size_t& left, std::size_t radix) {
     }
 }
 
+/// How often a factor divides n.
+constexpr int multiplicity(std::size_t n, std::size_t factor) {
+    return n % factor == 0 ? 1 + multiplicity(n / factor, factor) : 0;
+}
+
 /// Few passes over pairs: large radices where they have room in the registers, powers of two first.
 template <class T>
 Passes<T> factorised_for_pairs(std::size_t n) {
     if (!many_registers) return factorised<T>(n, false);
     Passes<T> passes{.points = n};
-    const int exponent = std::countr_zero(n);
-    std::size_t left = n;
-    // 2 is left over beside sixteens: 4 x 8; 4 beside them: 8 x 8.
+    // A three beside all nines goes with a five or with a four.
+    const bool lone_three = multiplicity(n, 3) % 2 == 1;
+    const bool twelve = lone_three && n % 4 == 0 && n % 5 != 0;
+    std::size_t left = twelve ? n / 12 : n;
+    // What sixteens leave: 8 and 4 rather than 16 and 2, 8 and 8 rather than 16 and 4.
+    const int exponent = std::countr_zero(left);
     if (exponent % 4 == 2 && exponent > 2) add_once(passes, left, 8);
     if (exponent % 4 == 1 && exponent > 1) add_once(passes, left, 4);
     add_factor(passes, left, 16);
     for (const std::size_t radix : {8, 4, 2}) add_once(passes, left, radix);
-    while (left % 9 == 0) add_once(passes, left, 9);
-    add_once(passes, left, 15);
-    for (const std::size_t radix : odd_primes) add_factor(passes, left, radix);
+    if (twelve) left *= 12, add_once(passes, left, 12);
+    if (lone_three) add_once(passes, left, 15);
+    add_factor(passes, left, 9);
+    for (const std::size_t prime : odd_primes) add_factor(passes, left, prime);
     return passes;
 }
 
