@@ -136,8 +136,6 @@ inline auto with_any_radix(int radix, F f) {
             return f(std::integral_constant<int, 9>());
         case 11:
             return f(std::integral_constant<int, 11>());
-        case 12:
-            return f(std::integral_constant<int, 12>());
         case 13:
             return f(std::integral_constant<int, 13>());
         case 15:

@@ -161,18 +161,14 @@ template <class T>
 Passes<T> factorised_for_pairs(std::size_t n) {
     if (!many_registers) return factorised<T>(n, false);
     Passes<T> passes{.points = n};
-    // A three beside all nines goes with a five or with a four.
-    const bool lone_three = multiplicity(n, 3) % 2 == 1;
-    const bool twelve = lone_three && n % 4 == 0 && n % 5 != 0;
-    std::size_t left = twelve ? n / 12 : n;
+    std::size_t left = n;
     // What sixteens leave: 8 and 4 rather than 16 and 2, 8 and 8 rather than 16 and 4.
     const int exponent = std::countr_zero(left);
     if (exponent % 4 == 2 && exponent > 2) add_once(passes, left, 8);
     if (exponent % 4 == 1 && exponent > 1) add_once(passes, left, 4);
     add_factor(passes, left, 16);
     for (const std::size_t radix : {8, 4, 2}) add_once(passes, left, radix);
-    if (twelve) left *= 12, add_once(passes, left, 12);
-    if (lone_three) add_once(passes, left, 15);
+    if (multiplicity(left, 3) % 2 == 1) add_once(passes, left, 15);
     add_factor(passes, left, 9);
     for (const std::size_t prime : odd_primes) add_factor(passes, left, prime);
     return passes;
