@@ -140,7 +140,9 @@ template <int A, int B, template <class, int> class Samples, class T, int V>
     constexpr bool coprime = std::gcd(A, B) == 1;
     Samples<T, V> column[B][A], row[B];
     unrolled<B>([&](auto b) __attribute__((always_inline)) {
-        for (int a = 0; a < A; ++a) column[b][a] = z[coprime ? (B * a + A * b) % N : B * a + b];
+        unrolled<A>([&](auto a) __attribute__((always_inline)) {
+            column[b][a] = z[coprime ? (B * a + A * b) % N : B * a + b];
+        });
         butterfly<A>(column[b]);
     });
     unrolled<A>([&](auto a) __attribute__((always_inline)) {
@@ -154,7 +156,9 @@ template <int A, int B, template <class, int> class Samples, class T, int V>
             }
         });
         butterfly<B>(row);
-        for (int b = 0; b < B; ++b) z[coprime ? bin_of<A, B>(a, b) : a + A * b] = row[b];
+        unrolled<B>([&](auto b) __attribute__((always_inline)) {
+            z[coprime ? bin_of<A, B>(a, b) : a + A * b] = row[b];
+        });
     });
 }
 
@@ -193,8 +197,12 @@ template <int Radix, template <class, int> class Samples, class T, int V>
         for (int i = 0; i < 4; ++i) {
             for (int k = i + 1; k < 4; ++k) std::swap(z[4 * i + k], z[4 * k + i]);
         }
+    } else if constexpr (Radix == 6) {
+        butterfly_of_product<2, 3>(z);
     } else if constexpr (Radix == 9) {
         butterfly_of_product<3, 3>(z);
+    } else if constexpr (Radix == 10) {
+        butterfly_of_product<2, 5>(z);
     } else if constexpr (Radix == 12) {
         butterfly_of_product<4, 3>(z);
     } else if constexpr (Radix == 15) {

@@ -162,7 +162,7 @@ inline bool run_straight(int n, T* data, T scale) {
         case 5:
             return run_tiny<5, Outside>(data, scale), true;
         case 6:
-            return run_straight<6, 2, 1, Outside>(data, scale), true;
+            return run_tiny<6, Outside>(data, scale), true;
         case 7:
             return run_tiny<7, Outside>(data, scale), true;
         case 8:
@@ -170,13 +170,15 @@ inline bool run_straight(int n, T* data, T scale) {
         case 9:
             return run_straight<9, 3, 1, Outside>(data, scale), true;
         case 10:
-            return run_straight<10, 2, 1, Outside>(data, scale), true;
+            return run_tiny<10, Outside>(data, scale), true;
         case 11:
             return run_prime<11, Outside>(data, scale), true;
         case 12:
-            return run_straight<12, 4, 1, Outside>(data, scale), true;
+            return run_tiny<12, Outside>(data, scale), true;
         case 13:
             return run_prime<13, Outside>(data, scale), true;
+        case 14:
+            return run_straight<14, 2, 1, Outside>(data, scale), true;
         case 15:
             return run_straight<15, 3, 1, Outside>(data, scale), true;
         case 16:
