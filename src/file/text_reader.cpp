@@ -325,23 +325,30 @@ struct PlainDecimal {
     /// The nearest value, by one product with a power of ten; false where the 64 bits of the power
     /// do not tell it.
     template <class T>
-    bool round([[maybe_unused]] T& value) const {
+    bool round([[maybe_unused]] bool negative, [[maybe_unused]] T& value) const {
 #if defined(__SIZEOF_INT128__)
         using Limits = std::numeric_limits<T>;
+        using Word = std::conditional_t<sizeof(T) == 8, std::uint64_t, std::uint32_t>;
+        constexpr int mantissa = Limits::digits - 1, bias = Limits::max_exponent - 1;
         if (count > 19 || exponent < lowest_power || exponent > highest_power) return false;
         if (digits == 0) {
-            value = 0;
+            value = negative ? -T(0) : T(0);
             return true;
         }
         const int zeros = std::countl_zero(digits);
         const Scaled scaled(digits << zeros, exponent);
-        const int shift = 127 + int(scaled.product >> 127) - Limits::digits;
-        const int binary = scaled.exponent - zeros + shift;
-        if (binary < Limits::min_exponent || binary > Limits::max_exponent - 2 - Limits::digits)
-            return false;
-        std::uint64_t rounded;
-        if (!scaled.round(shift, rounded)) return false;
-        value = T(rounded) * T(std::bit_cast<double>(std::uint64_t(binary + 1023) << 52));
+        const auto high = std::uint64_t(scaled.product >> 64);
+        const int shift = 63 - Limits::digits + int(high >> 63);
+        const int binary = scaled.exponent - zeros + 64 + shift + mantissa;
+        if (binary <= -bias || binary >= bias) return false;
+        // What lies below the high word matters next to the middle of two neighbours alone.
+        const std::uint64_t half = std::uint64_t(1) << (shift - 1);
+        const std::uint64_t rest = high & (2 * half - 1);
+        std::uint64_t rounded = (high >> shift) + (rest > half);
+        if (rest - (half - 1) < 2 && !scaled.round(64 + shift, rounded)) return false;
+        // The highest bit of the mantissa adds one to the exponent, as it does when it is carried.
+        const Word sign = Word(negative) << (8 * sizeof(T) - 1);
+        value = std::bit_cast<T>((Word(binary + bias - 1) << mantissa) + Word(rounded) + sign);
         return true;
 #else
         return false;
@@ -374,9 +381,10 @@ std::size_t read_plain(std::string_view text, T& value) {
     }
     if (at == end || !is_space(*at)) return 0;
 
-    if (!number.round(value) && std::from_chars(unsigned_part, at, value).ec != std::errc{})
-        return 0;
-    if (negative) value = -value;
+    if (!number.round(negative, value)) [[unlikely]] {
+        if (std::from_chars(unsigned_part, at, value).ec != std::errc{}) return 0;
+        if (negative) value = -value;
+    }
     return std::size_t(at - text.data());
 }
 
