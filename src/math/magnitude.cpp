@@ -67,7 +67,12 @@ int take_magnitude_squared(const R* from, R* to) {
             return capped<R>(z.re, capped<R>(z.im, z.re * z.re + z.im * z.im));
         });
     } else {
-        map(from, to, [](Lanes<T> v) { return capped<R>(v, v * v); });
+        // The squares are in order as the sizes are, of neighbours too.
+        constexpr T most = limits<R>::big * limits<R>::big;
+        map(from, to, [](Lanes<T> v) {
+            const Lanes<T> square = v * v;
+            return square > most ? all<Lanes<T>>(limits<R>::big) : square;
+        });
     }
     return 0;
 }
