@@ -77,10 +77,8 @@ WAVKIT_LANES V exp10(V x) {
                            all<V>(is_double<V> ? T(309) : T(39)));
     const V k = round_product(near, T(3.321928094887362347870L)).number;
     const V r = mul_add(k, -log10_2_low<V>, mul_add(k, -log10_2_high<V>, near));
-    const V linear = r * ln_10;
-    const V linear_lost = mul_add(r, ln_10_low, product_minus(r, all<V>(ln_10), linear));
-    const V sum = T(1) + linear, lost = (T(1) - sum) + linear + linear_lost;
-    return scale(sum + mul_add(r * r, exp10_tail(r), lost), k);
+    const auto [sum, lost] = product_sum(r, all<V>(ln_10), all<V>(T(1)));
+    return scale(sum + mul_add(r * r, exp10_tail(r), mul_add(r, ln_10_low, lost)), k);
 }
 
 /// The hyperbolic functions of x = k ln 2 + r >= 0 are those of r mixed: with w = 4^-k,
@@ -157,12 +155,8 @@ template <class V>
 WAVKIT_LANES V tanh_by_stretches(V a) {
     // The two highest bits of the mantissa and the exponent count the stretches, from 1/8 on.
     constexpr int before_first = (127 - 3) * 4 - 1;
-    const auto stretch =
-        (__m512i)(bits(at_least(a, all<V>(0x1.cp-4f))) >> 21) - (__m512i)(before_first - Bits<V>{});
-    const auto entry = [stretch](const float(&table)[32]) {
-        return (V)_mm512_permutex2var_ps(_mm512_load_ps(table), (__m512i)stretch,
-                                         _mm512_load_ps(table + 16));
-    };
+    const auto stretch = (bits(at_least(a, all<V>(0x1.cp-4f))) >> 21) - before_first;
+    const auto entry = [stretch](const float(&table)[32]) { return look_up<V>(table, stretch); };
     const V d = a - entry(tanh_stretches.centre);
     constexpr int terms = TanhStretches::terms;
     V p = entry(tanh_stretches.c[terms - 1]);

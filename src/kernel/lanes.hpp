@@ -189,6 +189,15 @@ WAVKIT_LANES bool any_bit(Bits<V> b) {
     return set != 0;
 }
 
+#if defined(__AVX512F__)
+/// Of 32 floats those that the lowest five bits of the integers count.
+template <class V>
+WAVKIT_LANES V look_up(const float (&table)[32], Bits<V> which) {
+    return (V)_mm512_permutex2var_ps(_mm512_load_ps(table), (__m512i)which,
+                                     _mm512_load_ps(table + 16));
+}
+#endif
+
 /// The root, rounded as one operation.
 template <class V>
 WAVKIT_LANES V sqrt(V v) {

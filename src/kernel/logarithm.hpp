@@ -6,6 +6,7 @@
 #pragma once
 
 #include "kernel/exponential.hpp"
+#include "kernel/log10_table.hpp"
 
 namespace wavkit::kernel {
 namespace {
@@ -74,10 +75,32 @@ WAVKIT_LANES V log(V x) {
     return mend_logarithm(x, natural_logarithm(k, number - Lane<V>(1)));
 }
 
+#if defined(__AVX512F__)
+/// k log10 2 + log10(number) of floats, 0.75 <= number < 1.5: number is next to that of a table.
+template <class V>
+WAVKIT_LANES V log10_by_stretches(V number, V k) {
+    constexpr float log10_e = 0.4342944819f, log10_e_low = -1.010305e-08f;
+    const auto stretch = bits(number) >> 18;
+    const V reciprocal = look_up<V>(decimal_logarithms.reciprocal, stretch);
+    const V r = mul_add(number, reciprocal, all<V>(-1.0f));
+    const V p =
+        polynomial(r, {log10_e_low, -0.217147246f, 0.144765303f, -0.108589776f, 0.0847484469f});
+    const V high = look_up<V>(decimal_logarithms.high, stretch);
+    const V whole = mul_add(k, all<V>(log10_2_high<V>), high);  // exact
+    const V low = look_up<V>(decimal_logarithms.low, stretch);
+    const V rest = mul_add(k, all<V>(log10_2_low<V>), low);
+    return whole + mul_add(r, all<V>(log10_e), mul_add(r, p, rest));
+}
+#endif
+
 /// Exact where x is a power of ten.
 template <class V>
 WAVKIT_LANES V log10(V x) {
     const auto [number, k] = parts(x);
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64 && !is_double<V>)
+        return mend_logarithm(x, log10_by_stretches(number, k));
+#endif
     return mend_logarithm(x, decimal_logarithm(k, number - Lane<V>(1)));
 }
 
