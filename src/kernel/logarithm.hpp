@@ -84,7 +84,7 @@ WAVKIT_LANES V log10_by_stretches(V number, V k) {
     const V reciprocal = look_up<V>(decimal_logarithms.reciprocal, stretch);
     const V r = mul_add(number, reciprocal, all<V>(-1.0f));
     const V p =
-        polynomial(r, {log10_e_low, -0.217147246f, 0.144765303f, -0.108589776f, 0.0847484469f});
+        polynomial(r, {log10_e_low, -0.217147231f, 0.144765288f, -0.108609296f, 0.0853608325f});
     const V high = look_up<V>(decimal_logarithms.high, stretch);
     const V whole = mul_add(k, all<V>(log10_2_high<V>), high);  // exact
     const V low = look_up<V>(decimal_logarithms.low, stretch);

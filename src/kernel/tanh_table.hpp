@@ -2,8 +2,8 @@
 //
 // Stretch 0 is 0 ... 1/8, the others begin at (4 + m) 2^(e - 2) for m = 0 ... 3 and e = -3 ... 3.
 // In each the function is value + c[0] d + c[1] d^2 + ..., d being the distance from a centre where
-// the value is a float or nearly so; in stretch 0 it is what comes to d itself; the polynomial
-// meets the function at Chebyshev's points.
+// the value is a float or nearly so; in stretch 0 that is what comes to d itself. The polynomials
+// meet the function at Chebyshev's points.
 #pragma once
 
 namespace wavkit::kernel {

@@ -7,13 +7,13 @@
 namespace wavkit {
 namespace {
 
-/// Which bin a value belongs to, as a number: `bins` for one that lies outside. Which do is as
+/// Which bin a value belongs to, as a number: `outside` for one of none. Which have none is as
 /// random as the signal, so there is no branch.
 template <Record R>
 struct Bins {
     using T = scalar<R>;
     using V = kernel::Lanes<T>;
-    T lo, width, bins;
+    T lo, width, bins, outside;
 
     WAVKIT_LANES V operator()(V value) const {
         const V above_lo = value - lo;
@@ -23,7 +23,7 @@ struct Bins {
         // The upper edge, as exactly as the division finds it, belongs to the last bin.
         const T above_top = bins * (1 + 10 * std::numeric_limits<T>::epsilon());
         const V inside = kernel::at_most(where, kernel::all<V>(bins - 1));
-        return (where >= T(0)) & (where < above_top) ? inside : kernel::all<V>(bins);
+        return (where >= T(0)) & (where < above_top) ? inside : kernel::all<V>(outside);
     }
 };
 
@@ -83,16 +83,18 @@ void count(const R* x, R* out, scalar<R> lo, scalar<R> width, Value value) {
     using T = scalar<R>;
     const auto counts = values(out);
     if (counts.empty()) return;
-    const Bins<R> find{lo, width, T(counts.size())};
+    const T bins = T(counts.size());
     if (counts.size() < Tables::most) {
         Tables tables(counts.size() + 1);
-        find_bins(x, find, value, [&](const auto* at, std::size_t n) { tables.count(at, n); });
+        find_bins(x, Bins<R>{lo, width, bins, bins}, value,
+                  [&](const auto* at, std::size_t n) { tables.count(at, n); });
         for (std::size_t i = 0; i < counts.size(); ++i) counts[i] = T(tables[i]);
         return;
     }
-    find_bins(x, find, value, [&](const auto* at, std::size_t n) {
+    find_bins(x, Bins<R>{lo, width, bins, T(-1)}, value, [&](const auto* at, std::size_t n) {
+        const std::size_t last = counts.size() - 1;
         for (std::size_t i = 0; i < n; ++i) {
-            if (std::size_t(at[i]) < counts.size()) counts[std::size_t(at[i])] += 1;
+            if (at[i] >= 0) counts[std::min(std::size_t(at[i]), last)] += 1;
         }
     });
 }

@@ -217,8 +217,9 @@ bool line_of_block(const R* data, std::array<T, 2>& line) {
         return std::array{dy, at.places(first) * dy, dy * dy};
     });
     if (!(yy <= big_squared<R> / 4) || is_poor_shift(s * s, yy * T(n))) return false;
-    const T delta = spacing(data);
-    const T slope = xy / (T(points * (points * points - 1) * (1 / 12.0)) * delta);
+    const T delta = spacing(data), spread = T((points * points - 1) / 12) * delta * delta;
+    if (!(spread > T(0) && spread < std::numeric_limits<T>::infinity())) return false;
+    const T slope = xy / (T(points * (points * points - 1) / 12) * delta);
     line = {slope, shift + s / T(n) - slope * (T(middle) * delta)};
     return true;
 }
