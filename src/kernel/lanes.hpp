@@ -438,7 +438,7 @@ WAVKIT_LANES V scale(V v, V k) {
     return v * power_of_two(half) * power_of_two(k - half);
 }
 
-/// x = number * 2^exponent with 0.75 <= number < 1.5, for every x > 0, subnormal ones too. Of zero,
+/// x = number * 2^exponent with 2/3 < number < 3/2, for every x > 0, subnormal ones too. Of zero,
 /// negative and infinite x without meaning.
 template <class V>
 struct Parts {
@@ -468,9 +468,9 @@ WAVKIT_LANES Parts<V> parts(V x) {
     constexpr T lifted = is_double<V> ? T(54) : T(25);
     const auto subnormal = x < std::numeric_limits<T>::min();
     const auto b = bits(subnormal ? x * lift : x);
-    // From 1.5 on the next power of two is the nearer one.
-    constexpr I half = I(1) << (mantissa - 1), one = I(std::bit_cast<I>(T(1)));
-    const auto up = b + half;
+    // From a third above a power of two on, the number is that below the next one.
+    constexpr I third = (I(1) << mantissa) / 3, one = I(std::bit_cast<I>(T(1)));
+    const auto up = b + ((I(1) << mantissa) - third);
     const auto exponent = (up >> mantissa) & I(is_double<V> ? 0x7ff : 0xff);
     const V number = from_bits<V>(b - (up & ~((I(1) << mantissa) - 1)) + one);
     // An integer below 2^52 (2^23) behind the bits of that number is a number of its own.
