@@ -325,23 +325,30 @@ struct PlainDecimal {
     /// The nearest value, by one product with a power of ten; false where the 64 bits of the power
     /// do not tell it.
     template <class T>
-    bool round([[maybe_unused]] T& value) const {
+    bool round([[maybe_unused]] bool negative, [[maybe_unused]] T& value) const {
 #if defined(__SIZEOF_INT128__)
         using Limits = std::numeric_limits<T>;
+        using Word = std::conditional_t<sizeof(T) == 8, std::uint64_t, std::uint32_t>;
+        constexpr int mantissa = Limits::digits - 1, bias = Limits::max_exponent - 1;
         if (count > 19 || exponent < lowest_power || exponent > highest_power) return false;
         if (digits == 0) {
-            value = 0;
+            value = negative ? -T(0) : T(0);
             return true;
         }
         const int zeros = std::countl_zero(digits);
         const Scaled scaled(digits << zeros, exponent);
-        const int shift = 127 + int(scaled.product >> 127) - Limits::digits;
-        const int binary = scaled.exponent - zeros + shift;
-        if (binary < Limits::min_exponent || binary > Limits::max_exponent - 2 - Limits::digits)
-            return false;
-        std::uint64_t rounded;
-        if (!scaled.round(shift, rounded)) return false;
-        value = T(rounded) * T(std::bit_cast<double>(std::uint64_t(binary + 1023) << 52));
+        const auto high = std::uint64_t(scaled.product >> 64);
+        const int shift = 63 - Limits::digits + int(high >> 63);
+        const int binary = scaled.exponent - zeros + 64 + shift + mantissa;
+        if (binary <= -bias || binary >= bias) return false;
+        // What lies below the high word matters next to the middle of two neighbours alone.
+        const std::uint64_t half = std::uint64_t(1) << (shift - 1);
+        const std::uint64_t rest = high & (2 * half - 1);
+        std::uint64_t rounded = (high >> shift) + (rest > half);
+        if (rest - (half - 1) < 2 && !scaled.round(64 + shift, rounded)) return false;
+        // The highest bit of the mantissa adds one to the exponent, as it does when it is carried.
+        const Word sign = Word(negative) << (8 * sizeof(T) - 1);
+        value = std::bit_cast<T>((Word(binary + bias - 1) << mantissa) + Word(rounded) + sign);
         return true;
 #else
         return false;
@@ -374,9 +381,10 @@ std::size_t read_plain(std::string_view text, T& value) {
     }
     if (at == end || !is_space(*at)) return 0;
 
-    if (!number.round(value) && std::from_chars(unsigned_part, at, value).ec != std::errc{})
-        return 0;
-    if (negative) value = -value;
+    if (!number.round(negative, value)) [[unlikely]] {
+        if (std::from_chars(unsigned_part, at, value).ec != std::errc{}) return 0;
+        if (negative) value = -value;
+    }
     return std::size_t(at - text.data());
 }
 
@@ -393,14 +401,9 @@ bool read_hexadecimal(Characters& in, bool negative, T& value) {
     return true;
 }
 
-/// A number, or a hexadecimal integer: one that begins like a 0 and goes on with "x". At least
-/// `wanted` of them have to come, this one included.
+/// A number, or a hexadecimal integer: one that begins like a 0 and goes on with "x".
 template <class T>
-bool read_value(Characters& in, std::int64_t wanted, T& value) {
-    if (const std::size_t length = read_plain(in.look_ahead(wanted), value)) {
-        in.skip(length);
-        return true;
-    }
+bool read_value(Characters& in, T& value) {
     const bool negative = in.peek() == '-';
     if (!read_number(in, value)) return false;
     if (value != 0 || in.peek() != 'x') return true;
@@ -473,11 +476,32 @@ class Line {
     std::size_t length_ = 0;
 };
 
-/// Room for the next values of a text, whose number nobody knows yet.
+/// Reads plain numbers as far as they are in view, at most so many as have room in `to` and as have
+/// to come; returns how many.
+template <class T>
+std::size_t read_run(Characters& in, std::int64_t wanted, std::span<T> to) {
+    const std::string_view view = in.look_ahead(wanted);
+    const char *at = view.data(), *const end = at + view.size();
+    const std::size_t most = std::size_t(std::min<std::int64_t>(wanted, std::int64_t(to.size())));
+    std::size_t count = 0;
+    for (; count < most; ++count) {
+        const char* number = at;
+        while (number != end && is_space(*number)) ++number;
+        const std::size_t length = read_plain({number, end}, to[count]);
+        if (length == 0) break;
+        at = number + length;
+    }
+    if (at != view.data()) in.skip(std::size_t(at - view.data()));
+    return count;
+}
+
+/// Room for the next values of a text, of which `wanted` are said to come: for no more than there
+/// are already.
 template <Record R>
-bool make_room(R* x, std::int64_t values, int step) {
-    if (values > std::numeric_limits<int>::max() - step) return false;
-    x->points = int(values) + step;
+bool make_room(R* x, std::int64_t values, std::int64_t wanted) {
+    constexpr std::int64_t least = 1024, most = std::numeric_limits<int>::max();
+    if (values > most - least) return false;
+    x->points = int(std::min(values + std::max(std::min(values, wanted), least), most));
     return dsp_realloc(x, int(values), 0) == 0;
 }
 
@@ -485,22 +509,26 @@ bool make_room(R* x, std::int64_t values, int step) {
 /// counts those that were read, also when reading fails.
 template <Record R>
 bool read_values(R* x, Characters& in, Header& header, std::int64_t& values) {
-    constexpr int growth = 1024;
-    if (!make_room(x, values, growth)) return false;
     for (;;) {
+        const std::int64_t wanted = header.wanted_after(values);
+        if (values >= x->points && !make_room(x, values, wanted)) return false;
         skip_space(in);
         const int c = in.peek();
         if (c == EOF) return true;
         // A '#' after the last declared value begins the next signal. A signal without values has
         // no last one: there the header must be whole first.
-        const std::int64_t wanted = header.wanted_after(values);
         if (wanted <= 0 && (c != '#' || values > 0 || header.is_whole())) return true;
         if (c == '#') {
             take_header_line(Line(in), header, x);
             continue;
         }
-        if (!read_value(in, wanted, x->data[values])) return false;
-        if (++values % growth == 0 && !make_room(x, values, growth)) return false;
+        const std::span room(x->data + values, std::size_t(x->points - values));
+        if (const std::size_t count = read_run(in, wanted, room)) {
+            values += std::int64_t(count);
+            continue;
+        }
+        if (!read_value(in, x->data[values])) return false;
+        ++values;
     }
 }
 

@@ -1,8 +1,10 @@
 // FIR designs in closed form. They are computed in double and rounded once.
 #include <algorithm>
+#include <concepts>
 #include <span>
 
 #include "filter/fixed_taps.hpp"
+#include "kernel/elementary.hpp"
 #include "record_view.hpp"
 #include "window/catalogue.hpp"
 #include "window/generate.hpp"
@@ -10,41 +12,72 @@
 namespace wavkit {
 namespace {
 
+using Doubles = kernel::Lanes<double>;
+
 double sinc(double x) { return x == 0 ? 1 : std::sin(x) / x; }
+Doubles sinc(Doubles x) { return kernel::sinc(x); }
 
 /// (cos x - 1) / x^2
-double raised_cosine(double x) { return -0.5 * sinc(x / 2) * sinc(x / 2); }
+Doubles raised_cosine(Doubles x) {
+    const Doubles root = sinc(x * 0.5);
+    return -0.5 * root * root;
+}
 
 /// (sinc x - cos x) / x, the spherical Bessel function of order 1, by its series where the
 /// difference would cancel.
-double bessel_j1(double x) {
-    if (std::fabs(x) >= 1) return (sinc(x) - std::cos(x)) / x;
-    double term = x / 3, sum = term;
+Doubles bessel_j1(Doubles x) {
+    Doubles term = x / 3, sum = term;
     for (int k = 1; k <= 9; ++k) {
-        term *= -x * x / (2 * k * (2 * k + 3));
+        term *= -x * x / (2.0 * k * (2 * k + 3));
         sum += term;
     }
-    return sum;
+    return kernel::abs(x) < 1.0 ? sum : (sinc(x) - kernel::cos(x)) / x;
 }
 
-double low_pass(double edge, double t) { return 2 * edge * sinc(two_pi<double> * edge * t); }
+Doubles low_pass(double edge, Doubles t) { return 2 * edge * sinc(two_pi<double> * edge * t); }
 
-double band_pass(double centre, double width, double t) {
-    return 2 * std::cos(two_pi<double> * centre * t) * low_pass(width / 2, t);
+Doubles band_pass(double centre, double width, Doubles t) {
+    return 2.0 * kernel::cos(two_pi<double> * centre * t) * low_pass(width / 2, t);
 }
 
-double differentiator(double edge, double t) {
+Doubles differentiator(double edge, Doubles t) {
     return -two_pi<double> * edge * 2 * edge * bessel_j1(two_pi<double> * edge * t);
 }
 
-double hilbert(double edge, double t) {
-    const double x = two_pi<double> * edge * t;
+Doubles hilbert(double edge, Doubles t) {
+    const Doubles x = two_pi<double> * edge * t;
     return 2 * edge * x * raised_cosine(x);
 }
 
-double ramp(double edge, double t) {
-    const double x = two_pi<double> * edge * t;
+Doubles ramp(double edge, Doubles t) {
+    const Doubles x = two_pi<double> * edge * t;
     return 4 * edge * edge * (sinc(x) + raised_cosine(x));
+}
+
+/// value(t) for the first `count` of several t; of a value that takes no vector one by one.
+template <class Value>
+Doubles values_at(Value value, Doubles t, [[maybe_unused]] std::size_t count) {
+    if constexpr (std::invocable<Value, Doubles>) {
+        return value(t);
+    } else {
+        Doubles result{};
+        for (std::size_t i = 0; i < count; ++i) result[i] = value(t[i]);
+        return result;
+    }
+}
+
+/// Writes taps one after the other: value(first), value(first + 1), ...; `put(place, taps, count)`
+/// takes them a vector at a time.
+template <class T, class Value, class Put>
+void fill_taps(std::size_t n, double first, Value value, Put put) {
+    constexpr std::size_t V = kernel::lanes<double>;
+    Doubles counted{};
+    for (std::size_t k = 0; k < V; ++k) counted[k] = double(k);
+    for (std::size_t i = 0; i < n; i += V) {
+        const std::size_t count = std::min(V, n - i);
+        const Doubles taps = values_at(value, counted + (double(i) + first), count);
+        put(i, __builtin_convertvector(taps, kernel::Vec<T, int(V)>), count);
+    }
 }
 
 /// Writes a design outward from its centre, value(t) at t samples from it: whole numbers for an odd
@@ -53,14 +86,23 @@ double ramp(double edge, double t) {
 template <Record R, class Value>
 int fill_outward(R* h, double mirror, Value value) {
     using T = scalar<R>;
+    constexpr std::size_t V = kernel::lanes<double>;
     const std::size_t n = length(h), c = n / 2;
     const bool odd = n % 2;
-    if (odd) h->data[c] = mirror < 0 ? T(0) : T(value(0.0));
-    for (std::size_t i = 0; i < c; ++i) {
-        const double v = value(odd ? double(i + 1) : double(i) + 0.5);
-        h->data[odd ? c + 1 + i : c + i] = T(v);
-        h->data[c - 1 - i] = T(mirror * v);
-    }
+    if (odd) h->data[c] = mirror < 0 ? T(0) : T(values_at(value, Doubles{}, 1)[0]);
+    T *const right = h->data + c + odd, *const left = h->data + c;
+    fill_taps<T>(c, odd ? 1 : 0.5, value, [=](std::size_t i, auto taps, std::size_t count) {
+        const auto mirrored = T(mirror) * taps;
+        if (count == V) {
+            kernel::store<T, int(V)>(right + i, taps);
+            kernel::store<T, int(V)>(left - i - V, kernel::reversed<T, int(V)>(mirrored));
+            return;
+        }
+        for (std::size_t k = 0; k < count; ++k) {
+            right[i + k] = taps[k];
+            left[-std::ptrdiff_t(i + k) - 1] = mirrored[k];
+        }
+    });
     return 0;
 }
 
@@ -94,9 +136,11 @@ int scale_to_unit_sum(R* h) {
 template <Record R>
 int delayed_low_pass(R* h, double edge, double delay) {
     const double centre = (double(length(h)) - 1) / 2 + delay;
-    for (std::size_t i = 0; i < length(h); ++i) {
-        h->data[i] = scalar<R>(low_pass(edge, double(i) - centre));
-    }
+    fill_taps<scalar<R>>(
+        length(h), -centre, [=](Doubles t) { return low_pass(edge, t); },
+        [h](std::size_t i, auto taps, std::size_t count) {
+            for (std::size_t k = 0; k < count; ++k) h->data[i + k] = taps[k];
+        });
     return scale_to_unit_sum(h);
 }
 
@@ -196,27 +240,27 @@ template <Record R>
 int fill_design(R* h, int type, double f1, double f2) {
     switch (type) {
         case DSP_FIR_BAND_PASS:
-            return fill_symmetric(h, [=](double t) { return band_pass(f1, f2, t); });
+            return fill_symmetric(h, [=](Doubles t) { return band_pass(f1, f2, t); });
         case DSP_FIR_BAND_STOP:
             return status(fill_design(h, DSP_FIR_BAND_PASS, f1, f2) || complement(h));
         case DSP_FIR_HIGH_PASS:
             return status(fill_design(h, DSP_FIR_LOW_PASS, f1, f2) || complement(h));
         case DSP_FIR_LOW_PASS:
-            return fill_symmetric(h, [=](double t) { return low_pass(f1, t); });
+            return fill_symmetric(h, [=](Doubles t) { return low_pass(f1, t); });
         case DSP_FIR_SINH:
             return f1 == 0 ? best_sinh_kernel(h) : sinh_kernel(h, f1);
         case DSP_FIR_DELAY:
             return delayed_low_pass(h, f1, f2);
         case DSP_FIR_DIFFERENTIATOR:
-            return fill_antisymmetric(h, [=](double t) { return differentiator(f1, t); });
+            return fill_antisymmetric(h, [=](Doubles t) { return differentiator(f1, t); });
         case DSP_FIR_GAUSS:
             return gauss(h, f1);
         case DSP_FIR_HILBERT:
-            return fill_antisymmetric(h, [=](double t) { return hilbert(f1, t); });
+            return fill_antisymmetric(h, [=](Doubles t) { return hilbert(f1, t); });
         case DSP_FIR_SINH_OVER_ROOT:
             return f1 == 0 ? best_sinh_over_root_kernel(h) : sinh_over_root_kernel(h, f1);
         case DSP_FIR_RAMP:
-            return fill_symmetric(h, [=](double t) { return ramp(f1, t); });
+            return fill_symmetric(h, [=](Doubles t) { return ramp(f1, t); });
         default:
             return -1;
     }

@@ -223,29 +223,30 @@ class Integers {
   public:
     explicit Integers(Draws& draws) : draws_(draws) {}
 
-    /// An integer from 0 to count - 1: those left over beyond the last multiple of count are drawn
-    /// again.
+    /// An integer from 0 to count - 1, the high half of a product (D. Lemire, "Fast random integer
+    /// generation in an interval", 2019). Low halves that some integers would have more of are
+    /// drawn again.
     std::uint32_t below(std::uint32_t count) {
-        constexpr std::uint32_t range = std::uint32_t(1) << 31;
         for (;;) {
-            const std::uint32_t drawn = next();
-            if (drawn < range - range % count) return drawn % count;
+            const std::uint64_t product = std::uint64_t(next()) * count;
+            const auto low = std::uint32_t(product);
+            if (low >= count || low >= -count % count) return std::uint32_t(product >> 32);
         }
     }
 
   private:
-    /// From 0 to 2^31 - 1.
     std::uint32_t next() {
         if (used_ == words_.size()) {
             draw_bits(draws_, words_.data(), sizeof words_);
             used_ = 0;
         }
-        return std::uint32_t(words_[used_++] >> 33);
+        return words_[used_++];
     }
 
     Draws& draws_;
-    std::array<std::uint64_t, generators> words_;
-    std::size_t used_ = generators;
+    static constexpr std::size_t drawn = 256;
+    std::array<std::uint32_t, drawn> words_;
+    std::size_t used_ = drawn;
 };
 
 template <Record R, class Samples>

@@ -6,6 +6,7 @@
 #pragma once
 
 #include "kernel/lanes.hpp"
+#include "kernel/tanh_table.hpp"
 
 namespace wavkit::kernel {
 namespace {
@@ -76,10 +77,8 @@ WAVKIT_LANES V exp10(V x) {
                            all<V>(is_double<V> ? T(309) : T(39)));
     const V k = round_product(near, T(3.321928094887362347870L)).number;
     const V r = mul_add(k, -log10_2_low<V>, mul_add(k, -log10_2_high<V>, near));
-    const V linear = r * ln_10;
-    const V linear_lost = mul_add(r, ln_10_low, product_minus(r, all<V>(ln_10), linear));
-    const V sum = T(1) + linear, lost = (T(1) - sum) + linear + linear_lost;
-    return scale(sum + mul_add(r * r, exp10_tail(r), lost), k);
+    const auto [sum, lost] = product_sum(r, all<V>(ln_10), all<V>(T(1)));
+    return scale(sum + mul_add(r * r, exp10_tail(r), mul_add(r, ln_10_low, lost)), k);
 }
 
 /// The hyperbolic functions of x = k ln 2 + r >= 0 are those of r mixed: with w = 4^-k,
@@ -150,6 +149,23 @@ WAVKIT_LANES V cosh(V x) {
     return scale(high + low, parts.k - Lane<V>(1));
 }
 
+#if defined(__AVX512F__)
+/// The tangent of floats from 0 to 10 by the stretch: tables of 32 are a single look-up.
+template <class V>
+WAVKIT_LANES V tanh_by_stretches(V a) {
+    // The two highest bits of the mantissa and the exponent count the stretches, from 1/8 on.
+    constexpr int before_first = (127 - 3) * 4 - 1;
+    const auto stretch = (bits(at_least(a, all<V>(0x1.cp-4f))) >> 21) - before_first;
+    const auto entry = [stretch](const float(&table)[32]) { return look_up<V>(table, stretch); };
+    const V d = a - entry(tanh_stretches.centre);
+    constexpr int terms = TanhStretches::terms;
+    V p = entry(tanh_stretches.c[terms - 1]);
+    unrolled<terms - 1>([&](auto i) { p = mul_add(p, d, entry(tanh_stretches.c[terms - 2 - i])); });
+    const V value = entry(tanh_stretches.value);
+    return mul_add(p, d, a < 0.125f ? a : value);
+}
+#endif
+
 /// Of floats by way of e^2x, which from 0.75 on leaves enough places of 1 - 2 / (e^2x + 1).
 template <class V>
 WAVKIT_LANES V tanh(V x) {
@@ -159,6 +175,9 @@ WAVKIT_LANES V tanh(V x) {
         const auto parts = hyperbolic(a);
         return flip_by_sign_of(quotient(parts.exact_sine(), parts.cosine()), bits(x));
     } else {
+#if defined(__AVX512F__)
+        if constexpr (sizeof(V) == 64) return flip_by_sign_of(tanh_by_stretches(a), bits(x));
+#endif
         const V square = a * a;
         const V p = polynomial(square, {-0.333333313f, 0.133332565f, -0.0539574735f, 0.0217944086f,
                                         -0.00857224409f, 0.00293970713f, -0.000618205115f});

@@ -97,7 +97,7 @@ WAVKIT_LANES V atan2(V y, V x) {
     const V result = flip_by_sign_of(sum + (lost + (whole_low + low)), bits(y));
     // Bring the size of zeros within the range, and ask whether all sizes are.
     const V shown = zero ? all<V>(T(1)) : size;
-    if (any_above(shown, largest_point<T>) || any_below(shown, smallest_point<T>)) [[unlikely]] {
+    if (any_outside(shown, smallest_point<T>, largest_point<T>)) [[unlikely]] {
         V mended = result;
         const V ys = y, xs = x;
         angles_by_lane(mended, ys, xs);

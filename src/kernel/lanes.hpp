@@ -161,6 +161,43 @@ WAVKIT_LANES bool any_below(V v, Lane<V> limit) {
     return any_above(abs(v) < limit ? all<V>(Lane<V>(1)) : V{}, Lane<V>(0));
 }
 
+/// Whether any lane, none of them negative, is not within [low, high]; a NaN is not.
+template <class V>
+WAVKIT_LANES bool any_outside(V v, Lane<V> low, Lane<V> high) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) {  // bits of positive numbers are in order as the numbers are
+        using I = Lane<Bits<V>>;
+        const I first = std::bit_cast<I>(low), span = std::bit_cast<I>(high) - first;
+        const auto above_low = (__m512i)(bits(v) - first);
+        if constexpr (is_double<V>)
+            return _mm512_cmpgt_epu64_mask(above_low, _mm512_set1_epi64(span)) != 0;
+        else
+            return _mm512_cmpgt_epu32_mask(above_low, _mm512_set1_epi32(span)) != 0;
+    }
+#endif
+    return any_above((v >= low) & (v <= high) ? V{} : all<V>(Lane<V>(1)), Lane<V>(0));
+}
+
+/// Whether any bit of any lane is set.
+template <class V>
+WAVKIT_LANES bool any_bit(Bits<V> b) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64) return _mm512_test_epi64_mask((__m512i)b, (__m512i)b) != 0;
+#endif
+    Lane<Bits<V>> set = 0;
+    for (int i = 0; i < count<V>; ++i) set |= b[i];
+    return set != 0;
+}
+
+#if defined(__AVX512F__)
+/// Of 32 floats those that the lowest five bits of the integers count.
+template <class V>
+WAVKIT_LANES V look_up(const float (&table)[32], Bits<V> which) {
+    return (V)_mm512_permutex2var_ps(_mm512_load_ps(table), (__m512i)which,
+                                     _mm512_load_ps(table + 16));
+}
+#endif
+
 /// The root, rounded as one operation.
 template <class V>
 WAVKIT_LANES V sqrt(V v) {
@@ -303,6 +340,28 @@ WAVKIT_LANES V near_reciprocal(Sum<V> v) {
     return mul_add(-mul_add(v.low, near, rest), near, near);
 }
 
+/// Whether a guess at a root and a step of Newton's take less time than the processor's own root.
+template <class V>
+inline constexpr bool has_quick_sqrt = sizeof(V) == 64 && register_bytes == 64 && !is_double<V>;
+
+/// Sizes up to which, and down from the reciprocal of which, a root that is had so meets neither
+/// infinities nor subnormal numbers on the way.
+template <class T>
+inline constexpr T safe_radicand = sizeof(T) == 8 ? T(0x1p1000) : T(0x1p120);
+
+/// The root of v, of sizes within safe_radicand, rounded or very nearly so.
+template <class V>
+WAVKIT_LANES V quick_sqrt(V v) {
+#if defined(__AVX512F__)
+    if constexpr (has_quick_sqrt<V>) {
+        const V guess = (V)_mm512_maskz_rsqrt14_ps(0xffff, (__m512)v);
+        const V root = v * guess, half = guess * Lane<V>(0.5);
+        return mul_add(mul_add(-root, root, v), half, root);
+    }
+#endif
+    return sqrt(v);
+}
+
 /// a / b to one unit in the last place, for sizes far from the limits of the precision. The rest
 /// that a first quotient leaves, which is known exactly enough, is divided once more and added; for
 /// that a good reciprocal will do.
@@ -379,7 +438,7 @@ WAVKIT_LANES V scale(V v, V k) {
     return v * power_of_two(half) * power_of_two(k - half);
 }
 
-/// x = number * 2^exponent with 0.75 <= number < 1.5, for every x > 0, subnormal ones too. Of zero,
+/// x = number * 2^exponent with 2/3 < number < 3/2, for every x > 0, subnormal ones too. Of zero,
 /// negative and infinite x without meaning.
 template <class V>
 struct Parts {
@@ -409,9 +468,9 @@ WAVKIT_LANES Parts<V> parts(V x) {
     constexpr T lifted = is_double<V> ? T(54) : T(25);
     const auto subnormal = x < std::numeric_limits<T>::min();
     const auto b = bits(subnormal ? x * lift : x);
-    // From 1.5 on the next power of two is the nearer one.
-    constexpr I half = I(1) << (mantissa - 1), one = I(std::bit_cast<I>(T(1)));
-    const auto up = b + half;
+    // From a third above a power of two on, the number is that below the next one.
+    constexpr I third = (I(1) << mantissa) / 3, one = I(std::bit_cast<I>(T(1)));
+    const auto up = b + ((I(1) << mantissa) - third);
     const auto exponent = (up >> mantissa) & I(is_double<V> ? 0x7ff : 0xff);
     const V number = from_bits<V>(b - (up & ~((I(1) << mantissa) - 1)) + one);
     // An integer below 2^52 (2^23) behind the bits of that number is a number of its own.

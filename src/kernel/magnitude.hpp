@@ -31,13 +31,11 @@ inline V scaled_magnitude(V a, V b) {
 template <class V>
 WAVKIT_LANES V magnitude(V x, V y) {
     using T = Lane<V>;
-    const V a = abs(x), b = abs(y), large = at_least(b, a);
-    const V lowest = large == T(0) ? all<V>(T(1)) : large;
-    if (any_above(large, safe_size<T>) || any_above(at_least(a, b), safe_size<T>) ||
-        any_below(lowest, 1 / safe_size<T>)) [[unlikely]] {
-        return scaled_magnitude(a, b);
-    }
-    return sqrt(mul_add(x, x, y * y));
+    constexpr T most = safe_size<T> * safe_size<T>;
+    const V square = mul_add(x, x, y * y);
+    if (any_outside(square, 1 / most, most)) [[unlikely]]
+        return scaled_magnitude(abs(x), abs(y));
+    return quick_sqrt(square);
 }
 
 }  // namespace

@@ -16,14 +16,24 @@ int padded(const R* a, const R* b, R* out, Operation operation) {
                         : pointwise<R>(a, extended, out, operation);
 }
 
+struct Sum {
+    using ByParts = void;
+    WAVKIT_LANES auto operator()(auto a, auto b) const { return a + b; }
+};
+
+struct Difference {
+    using ByParts = void;
+    WAVKIT_LANES auto operator()(auto a, auto b) const { return a - b; }
+};
+
 template <Record R>
 int add(const R* a, const R* b, R* out) {
-    return padded(a, b, out, [](auto p, auto q) { return p + q; });
+    return padded(a, b, out, Sum{});
 }
 
 template <Record R>
 int subtract(const R* a, const R* b, R* out) {
-    return padded(a, b, out, [](auto p, auto q) { return p - q; });
+    return padded(a, b, out, Difference{});
 }
 
 template <Record R>
@@ -47,7 +57,9 @@ struct ConjugateProduct {
     Bin<T> operator()(T a, Bin<T> b) const { return a * conj(b); }
     Bin<T> operator()(Bin<T> a, Bin<T> b) const { return a * conj(b); }
 
+    using V = kernel::Lanes<T>;
     using Z = kernel::Complexes<T, kernel::lanes<T>>;
+    WAVKIT_LANES V operator()(V a, V b) const { return a * b; }
     WAVKIT_LANES Z operator()(Z a, Z b) const { return a * conj(b); }
 };
 
@@ -65,9 +77,14 @@ struct Quotient {
     Bin<T> operator()(T a, Bin<T> b) const { return divide(a * conj(b), a == 0, b); }
     Bin<T> operator()(Bin<T> a, Bin<T> b) const { return divide(a * conj(b), is_zero(a), b); }
 
+    using V = kernel::Lanes<T>;
+    WAVKIT_LANES V operator()(V a, V b) const {
+        const V limit = a == T(0) ? V{} : kernel::all<V>(limits<R>::big);
+        return b == T(0) ? limit : a / b;
+    }
+
     using Z = kernel::Complexes<T, kernel::lanes<T>>;
     WAVKIT_LANES Z operator()(Z a, Z b) const {
-        using V = kernel::Lanes<T>;
         const V zero{}, big = kernel::all<V>(limits<R>::big);
         const V square = b.re * b.re + b.im * b.im, factor = T(1) / square;
         const auto all_zero = (a.re == zero) & (a.im == zero) & (b.re == zero) & (b.im == zero);
@@ -94,6 +111,9 @@ template <class T>
 struct WeightedMean {
     T weight;
 
+    using ByParts = void;
+    using V = kernel::Lanes<T>;
+    WAVKIT_LANES V operator()(V a, V b) const { return (a - b) * weight + b; }
     T operator()(T a, T b) const { return (a - b) * weight + b; }
     Bin<T> operator()(Bin<T> a, Bin<T> b) const { return (a - b) * weight + b; }
     Bin<T> operator()(Bin<T> a, T b) const { return (a - b) * weight + b; }

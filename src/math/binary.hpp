@@ -6,7 +6,7 @@
 #include <concepts>
 #include <cstdint>
 
-#include "kernel/lanes.hpp"
+#include "kernel/map.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
@@ -48,9 +48,25 @@ int prepare_output(R& a, R& b, R* out) {
     return size_output(a, b, out, std::int64_t(length(&a)), a.complex || b.complex);
 }
 
+/// Whether an operation works on vectors of real samples, and whether on complex ones part by part.
+template <class T, class Operation>
+concept TakesVectors = std::floating_point<T> && requires(Operation operation, kernel::Lanes<T> v) {
+    { operation(v, v) } -> std::same_as<kernel::Lanes<T>>;
+};
+template <class Operation>
+concept ByParts = requires {
+    typename Operation::ByParts;
+};
+
 template <class A, class B, class Out, class Operation>
 void combine(const A* a, const B* b, Out* out, std::size_t n, Operation operation) {
     for (std::size_t i = 0; i < n; ++i) out[i] = operation(a[i], b[i]);
+}
+
+template <class T, class Operation>
+requires TakesVectors<T, Operation>
+void combine(const T* a, const T* b, T* out, std::size_t n, Operation operation) {
+    kernel::map(a, b, out, n, operation);
 }
 
 /// Complex points that an operation takes in vectors, to the last: a loop that the compiler makes
@@ -116,8 +132,41 @@ int pointwise_from_start(const R* first, const R* second, R* out, Operation oper
     return 0;
 }
 
+/// Whether the scalars of an operand and of an output are the same or have no memory in common.
+template <Record R>
+bool same_or_apart(const R* x, const R* out, std::size_t scalars) {
+    const auto from = reinterpret_cast<std::uintptr_t>(x->data);
+    const auto to = reinterpret_cast<std::uintptr_t>(out->data);
+    const std::uintptr_t bytes = scalars * sizeof(scalar<R>);
+    return from == to || (to - from >= bytes && from - to >= bytes);
+}
+
+/// The usual case without a call on the way: operands of one kind and length, and an output of its
+/// own that has room. False leaves it to the general way.
+template <Record R, class Operation>
+bool pointwise_at_once(const R* a, const R* b, R* out, Operation operation) {
+    using T = scalar<R>;
+    const int points = a->points;
+    const std::size_t scalars = used(a);
+    if (points <= 0 || points != b->points || !a->complex != !b->complex) return false;
+    if (out->alloc <= 0 || scalars > std::size_t(out->alloc)) return false;
+    if (!same_or_apart(a, out, scalars) || !same_or_apart(b, out, scalars)) return false;
+    const T *p = a->data, *q = b->data;
+    out->delta = (a->delta + b->delta) * T(0.5);
+    out->points = points;
+    out->complex = a->complex || b->complex;
+    if (!out->complex || ByParts<Operation>) {
+        combine(p, q, out->data, scalars, operation);
+    } else {
+        combine(reinterpret_cast<const Bin<T>*>(p), reinterpret_cast<const Bin<T>*>(q),
+                bins(out).data(), std::size_t(points), operation);
+    }
+    return true;
+}
+
 template <Record R, class Operation>
 int pointwise(const R* a, const R* b, R* out, Operation operation) {
+    if (pointwise_at_once(a, b, out, operation)) return 0;
     return write_beside(a, b, out,
                         [=](R* result) { return pointwise_from_start(a, b, result, operation); });
 }

@@ -5,24 +5,20 @@
 namespace wavkit {
 namespace {
 
-/// y[i] = (x[i] - x[i-Step]) * rate with nothing before the first ones.
+/// y[i] = (x[i] - x[i-Step]) * rate with nothing before the first ones; from the last to the first,
+/// so that what is read has not been written.
 template <int Step, class T>
 void differences(T* v, std::size_t n, T rate) {
     constexpr int lanes = kernel::lanes<T>;
-    kernel::Lanes<T> before{};
-    std::size_t i = 0;
-    for (; i + lanes <= n; i += lanes) {
-        const auto now = kernel::load<T, lanes>(v + i);
-        kernel::store<T, lanes>(v + i, (now - kernel::lanes_before<Step>(now, before)) * rate);
-        before = now;
+    std::size_t i = n;
+    while (i >= std::size_t(lanes + Step)) {
+        i -= lanes;
+        const auto now = kernel::load<T, lanes>(v + i),
+                   before = kernel::load<T, lanes>(v + i - Step);
+        kernel::store<T, lanes>(v + i, (now - before) * rate);
     }
-    T last[Step];
-    for (int k = 0; k < Step; ++k) last[k] = before[lanes - Step + k];
-    for (; i < n; ++i) {
-        const T now = v[i];
-        v[i] = (now - last[i % Step]) * rate;
-        last[i % Step] = now;
-    }
+    for (; i > Step; --i) v[i - 1] = (v[i - 1] - v[i - 1 - Step]) * rate;
+    for (; i > 0; --i) v[i - 1] *= rate;
 }
 
 template <Record R>

@@ -17,6 +17,8 @@ struct Choice {
     Bin<T> operator()(Bin<T> a, Bin<T> b) const {
         return Beats{}(capped_magnitude_squared<R>(a), capped_magnitude_squared<R>(b)) ? a : b;
     }
+    using V = kernel::Lanes<T>;
+    WAVKIT_LANES V operator()(V a, V b) const { return Beats{}(a, b) ? a : b; }
     using Z = kernel::Complexes<T, kernel::lanes<T>>;
     WAVKIT_LANES Z operator()(Z a, Z b) const {
         const auto a_is_better = Beats{}(capped_lanes<R>(a), capped_lanes<R>(b));

@@ -4,13 +4,14 @@
 #include <algorithm>
 #include <cmath>
 
+#include "kernel/convolve.hpp"
 #include "record_view.hpp"
 #include "transform/transform.hpp"
 
 namespace wavkit {
 namespace {
 
-inline constexpr std::size_t shortest_for_spectra = 512;
+inline constexpr std::size_t shortest_for_spectra = 256;
 inline constexpr std::size_t level_block = 64;
 
 /// Whether the coefficients are about equally large everywhere: none is 0, and the mean magnitudes
@@ -20,12 +21,24 @@ inline constexpr std::size_t level_block = 64;
 template <class T>
 bool is_level(std::span<const T> c) {
     T lowest = std::numeric_limits<T>::max(), highest = 0, smallest = lowest;
+    constexpr int V = kernel::lanes<T>;
     for (std::size_t first = 0; first < c.size(); first += level_block) {
         const auto block = c.subspan(first, std::min(level_block, c.size() - first));
         T sum = 0;
-        for (const T v : block) {
-            sum += std::fabs(v);
-            smallest = std::min(smallest, std::fabs(v));
+        std::size_t i = 0;
+        kernel::Lanes<T> sums{}, least = kernel::all<kernel::Lanes<T>>(smallest);
+        for (; i + V <= block.size(); i += V) {
+            const auto size = kernel::abs(kernel::load<T, V>(&block[i]));
+            sums += size;
+            least = kernel::at_most(least, size);
+        }
+        for (int k = 0; k < V; ++k) {
+            sum += sums[k];
+            smallest = std::min(smallest, least[k]);
+        }
+        for (; i < block.size(); ++i) {
+            sum += std::fabs(block[i]);
+            smallest = std::min(smallest, std::fabs(block[i]));
         }
         const T mean = sum / T(block.size());
         lowest = std::min(lowest, mean);
@@ -37,20 +50,17 @@ bool is_level(std::span<const T> c) {
     return smallest > T(0) && highest <= 8 * lowest && highest < bound && lowest > 1 / bound;
 }
 
-/// The coefficients at either end, which few products make: summed one by one, since beside them
+/// The coefficients at either end, which few products make: summed as they are, since beside them
 /// the errors of the transform are large.
 template <class T>
 void multiply_ends(std::span<const T> a, std::span<const T> b, std::span<T> out) {
     constexpr std::size_t depth = 2 * level_block;
-    for (std::size_t k = 0; k < depth; ++k) {
-        T low = 0, high = 0;
-        for (std::size_t i = 0; i <= k; ++i) {
-            low += a[i] * b[k - i];
-            high += a[a.size() - 1 - i] * b[b.size() - 1 - (k - i)];
-        }
-        out[k] = low;
-        out[out.size() - 1 - k] = high;
-    }
+    T padded[2 * depth - 1] = {};
+    std::ranges::copy(b.first(depth), padded + depth - 1);
+    kernel::convolve<T>({a.data(), 1, depth}, padded + depth - 1, 1, out.data(), depth);
+    std::fill(std::ranges::copy(b.last(depth), padded).out, std::end(padded), T(0));
+    kernel::convolve<T>({a.last(depth).data(), 1, depth}, padded + depth - 1, 1,
+                        out.last(depth).data(), depth);
 }
 
 /// a * b where that is worth transforms and both are level; false leaves it to the direct sum.

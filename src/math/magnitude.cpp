@@ -67,7 +67,12 @@ int take_magnitude_squared(const R* from, R* to) {
             return capped<R>(z.re, capped<R>(z.im, z.re * z.re + z.im * z.im));
         });
     } else {
-        map(from, to, [](Lanes<T> v) { return capped<R>(v, v * v); });
+        // The squares are in order as the sizes are, of neighbours too.
+        constexpr T most = limits<R>::big * limits<R>::big;
+        map(from, to, [](Lanes<T> v) {
+            const Lanes<T> square = v * v;
+            return square > most ? all<Lanes<T>>(limits<R>::big) : square;
+        });
     }
     return 0;
 }
@@ -135,21 +140,34 @@ template <Record R>
 WAVKIT_LANES Samples<scalar<R>> square_root(Samples<scalar<R>> z) {
     using T = scalar<R>;
     using V = Lanes<T>;
+    constexpr T most = std::min(limits<R>::big, kernel::safe_size<T>);
     const V a = kernel::abs(z.re), b = kernel::abs(z.im);
-    const V size = kernel::at_least(a, b), other = kernel::at_least(b, a);
-    const V shown = size == T(0) ? all<V>(T(1)) : size;
-    if (kernel::any_above(size, limits<R>::big) || kernel::any_above(other, limits<R>::big) ||
-        kernel::any_below(shown, 1 / kernel::safe_size<T>)) [[unlikely]] {
+    const V square = kernel::mul_add(a, a, b * b);
+    const auto zero = (kernel::bits(a) | kernel::bits(b)) == 0;
+    const V shown = zero ? all<V>(T(1)) : square;
+    if (kernel::any_outside(shown, 1 / (most * most), most * most / 2)) [[unlikely]] {
         Samples<T> roots;
         const Samples<T> samples = z;
         careful_roots<R>(roots, samples);
         return roots;
     }
-    const V magnitude = kernel::sqrt(kernel::mul_add(a, a, b * b));
-    const V larger = kernel::sqrt(T(0.5) * (magnitude + a)), smaller = b / (larger + larger);
-    const auto right = z.re >= T(0), zero = a + b == T(0);
+    const V sum = T(0.5) * (kernel::quick_sqrt(shown) + a);
+    const V larger = kernel::quick_sqrt(sum), smaller = b / (larger + larger);
+    const auto right = z.re >= T(0);
     const V re = right ? larger : smaller, im = right ? smaller : larger;
     return {zero ? V{} : re, zero ? V{} : kernel::flip_by_sign_of(im, kernel::bits(z.im))};
+}
+
+/// The root of a real sample; what is below 0 counts as 0.
+template <class V>
+WAVKIT_LANES V square_root(V v) {
+    using T = kernel::Lane<V>;
+    if constexpr (kernel::has_quick_sqrt<V>) {
+        constexpr T most = kernel::safe_radicand<T>;
+        if (!kernel::any_outside(v, 1 / most, most)) [[likely]]
+            return kernel::quick_sqrt(v);
+    }
+    return kernel::sqrt(kernel::at_least(v, V{}));
 }
 
 template <Record R>
@@ -159,7 +177,7 @@ int take_square_root(const R* from, R* to) {
         kernel::map_complex(from->data, to->data, length(from),
                             [](Samples<scalar<R>> z) { return square_root<R>(z); });
     } else {
-        map(from, to, [](V v) { return kernel::sqrt(kernel::at_least(v, V{})); });
+        map(from, to, [](V v) { return square_root(v); });
     }
     return 0;
 }

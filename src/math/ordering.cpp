@@ -8,7 +8,8 @@
 #include <type_traits>
 #include <utility>
 
-#include "kernel/lanes.hpp"
+#include "kernel/map.hpp"
+#include "kernel/quicksort.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
@@ -58,8 +59,11 @@ T value_of(Key<T> key) {
     return std::bit_cast<T>(key & sign ? key & ~sign : ~key);
 }
 
-/// Numbers from which on a pass for each byte is faster than comparing.
+/// Numbers, and points with their keys, from which on a pass for each byte of the keys is faster
+/// than comparing.
 constexpr std::size_t shortest_by_digits = 200;
+template <class T>
+constexpr std::size_t fewest_points = sizeof(T) == 8 ? 2000 : 600;
 
 /// Sorts by the bytes of the keys, the lowest first, to and fro between two arrays (D. E. Knuth,
 /// The Art of Computer Programming, vol. 3, 5.2.5); returns the one with the result.
@@ -81,11 +85,30 @@ Item* sort_by_digits(Item* from, Item* to, std::size_t n) {
     return from;
 }
 
-/// Room for the two arrays, or none for few points and when memory lacks.
+/// Room for the two arrays, or none for few items and when memory lacks.
 template <class Item>
-std::unique_ptr<Item[]> two_arrays(std::size_t n) {
-    return std::unique_ptr<Item[]>(n < shortest_by_digits ? nullptr
-                                                          : new (std::nothrow) Item[2 * n]);
+std::unique_ptr<Item[]> two_arrays(std::size_t n, std::size_t fewest) {
+    return std::unique_ptr<Item[]>(n < fewest ? nullptr : new (std::nothrow) Item[2 * n]);
+}
+
+/// Sorts numbers as integers in their place. False, and they are in some order, where splitting
+/// them is unlucky.
+template <class T>
+bool sort_in_vectors(std::span<T> numbers) {
+    if constexpr (kernel::sorts_in_vectors) {
+        using V = kernel::Lanes<T>;
+        const std::size_t n = numbers.size();
+        const auto turn = [](V v) {
+            return kernel::from_bits<V>(kernel::turn_order<T>(kernel::bits(v)));
+        };
+        kernel::map(numbers.data(), numbers.data(), n, turn);
+        // The keys are read and written by vectors alone, which may be of another type.
+        const bool sorted = kernel::sort_keys(
+            reinterpret_cast<kernel::OrderKey<T>*>(numbers.data()), n, kernel::most_splits(n));
+        kernel::map(numbers.data(), numbers.data(), n, turn);
+        return sorted;
+    }
+    return false;
 }
 
 template <Record R>
@@ -95,7 +118,8 @@ void sort_numbers(std::span<scalar<R>> numbers) {
         Key<T> key;
     };
     const std::size_t n = numbers.size();
-    const auto items = two_arrays<Item>(n);
+    if (sort_in_vectors(numbers)) return;
+    const auto items = two_arrays<Item>(n, shortest_by_digits);
     if (!items) return std::sort(numbers.begin(), numbers.end());
     for (std::size_t i = 0; i < n; ++i) items[i] = {key_of(numbers[i])};
     const Item* sorted = sort_by_digits(items.get(), items.get() + n, n);
@@ -111,10 +135,14 @@ void sort_numbers(std::span<Bin<scalar<R>>> numbers) {
         Bin<T> z;
     };
     const std::size_t n = numbers.size();
-    const auto items = two_arrays<Item>(n);
+    const auto items = two_arrays<Item>(n, 2);
     if (!items) return std::sort(numbers.begin(), numbers.end(), precedes<R>);
     for (std::size_t i = 0; i < n; ++i) items[i] = {key_of(weight<R>(numbers[i])), numbers[i]};
-    const Item* sorted = sort_by_digits(items.get(), items.get() + n, n);
+    const Item* sorted = items.get();
+    if (n < fewest_points<T>)
+        std::sort(items.get(), items.get() + n, [](auto& a, auto& b) { return a.key < b.key; });
+    else
+        sorted = sort_by_digits(items.get(), items.get() + n, n);
     for (std::size_t i = 0, first = 0; i < n; ++i) {
         numbers[i] = sorted[i].z;
         if (i + 1 < n && sorted[i + 1].key == sorted[i].key) continue;
@@ -124,9 +152,17 @@ void sort_numbers(std::span<Bin<scalar<R>>> numbers) {
 }
 
 template <Record R>
+bool has_nan(const R* x) {
+    bool any = false;
+    for (const auto value : values(x)) any |= value != value;
+    return any;
+}
+
+template <Record R>
 int sort(R* x) {
     // A NaN has no place in an order; those go behind the numbers, which sort among themselves.
-    const auto numbers = [](auto points) {
+    const auto numbers = [x](auto points) {
+        if (!has_nan(x)) return points;
         const auto end =
             std::partition(points.begin(), points.end(), [](auto v) { return !is_nan(v); });
         return points.first(std::size_t(end - points.begin()));

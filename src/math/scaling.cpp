@@ -52,13 +52,13 @@ int limit(R* x, scalar<R> low, scalar<R> high, int* clipped) {
     using V = kernel::Lanes<T>;
     if (low > high) std::swap(low, high);
     const V lowest = kernel::all<V>(low), highest = kernel::all<V>(high);
-    const V one = kernel::all<V>(T(1));
-    V changed{};
+    kernel::Bits<V> changed{};
     kernel::map(x->data, x->data, used(x), [&](V v) {
-        changed = v < lowest ? one : v > highest ? one : changed;
-        return kernel::at_most(kernel::at_least(v, lowest), highest);
+        const V held = kernel::at_most(kernel::at_least(v, lowest), highest);
+        changed |= kernel::bits(v) ^ kernel::bits(held);
+        return held;
     });
-    if (clipped) *clipped = kernel::any_above(changed, T(0));
+    if (clipped) *clipped = kernel::any_bit<V>(changed);
     return 0;
 }
 
@@ -82,30 +82,29 @@ template <Record R, class Z>
     }
 }
 
-/// The same with |z|^2 to more than the precision, where it is well within the range.
+/// The same where |z|^2 is well within the range. What rounding takes from one of the squares and
+/// from the reciprocal goes to the products.
 template <Record R>
 WAVKIT_LANES Samples<scalar<R>> reciprocal(Samples<scalar<R>> z) {
     using T = scalar<R>;
     using V = kernel::Lanes<T>;
-    const V a = kernel::abs(z.re), b = kernel::abs(z.im);
-    const V larger = kernel::at_least(a, b), smaller = kernel::at_most(a, b);
-    const V p = larger * larger;
-    const auto [square, lost] = kernel::product_sum(smaller, smaller, p);
-    // From this on not even what rounding takes from the square is subnormal.
+    // Within these no part is out of range, and not even what rounding takes from the square is
+    // subnormal.
+    constexpr T most = limits<R>::big * limits<R>::big / 2;
     constexpr T least = std::numeric_limits<T>::min() /
                         (std::numeric_limits<T>::epsilon() * std::numeric_limits<T>::epsilon());
-    if (kernel::any_above(z.re, limits<R>::big) || kernel::any_above(z.im, limits<R>::big) ||
-        kernel::any_below(square, least)) [[unlikely]] {
+    const V p = z.im * z.im, square = kernel::mul_add(z.re, z.re, p);
+    if (kernel::any_outside(square, least, most)) [[unlikely]] {
         Samples<T> results;
         const Samples<T> samples = z;
         limited_reciprocals<R>(results, samples);
         return results;
     }
-    const kernel::Sum<V> exact{square, lost + kernel::product_minus(larger, larger, p)};
-    const V re = kernel::quotient(kernel::Sum<V>{a, V{}}, exact);
-    const V im = kernel::quotient(kernel::Sum<V>{b, V{}}, exact);
-    return {kernel::flip_by_sign_of(re, kernel::bits(z.re)),
-            -kernel::flip_by_sign_of(im, kernel::bits(z.im))};
+    const V factor = T(1) / square, lost = kernel::product_minus(z.im, z.im, p);
+    const V rest = kernel::mul_add(-lost, factor,
+                                   -kernel::product_minus(square, factor, kernel::all<V>(T(1))));
+    const V re = z.re * factor, im = z.im * factor;
+    return {kernel::mul_add(re, rest, re), kernel::mul_add(-im, rest, -im)};
 }
 
 template <Record R>
@@ -114,7 +113,7 @@ int invert(R* x) {
     using V = kernel::Lanes<T>;
     if (x->complex) {
         kernel::map_complex(x->data, x->data, length(x),
-                            [](Samples<scalar<R>> z) { return reciprocal<R>(z); });
+                            [](Samples<T> z) { return reciprocal<R>(z); });
     } else {
         kernel::map(x->data, x->data, used(x),
                     [](V v) { return v == T(0) ? kernel::all<V>(limits<R>::big) : T(1) / v; });

@@ -39,11 +39,11 @@ struct Points {
         return kernel::load_complex<T, V, kernel::Layout::pairs>(rest);
     }
 
-    /// The places of the points within their block.
-    kernel::Lanes<T> places() const {
+    /// The places of the points within their block, counted from `from`.
+    kernel::Lanes<T> places(T from) const {
         kernel::Lanes<T> lane{};
         for (int k = 0; k < V; ++k) lane[k] = T(k);
-        return (lane + T(int(ahead))) + T(int(step));
+        return (lane + T(int(ahead))) + (T(int(step)) + from);
     }
     /// v, with `otherwise` in the lanes that hold no point.
     kernel::Lanes<T> only_points(kernel::Lanes<T> v,

@@ -53,23 +53,48 @@ WAVKIT_LANES kernel::Lanes<T> best_of(std::size_t begin, std::size_t end, kernel
     return chain[C - 1];
 }
 
-/// The best among `start` and the keys of the points [0, n).
-template <class Order, class T, class Key>
-[[gnu::flatten]] T best_key(std::size_t n, T start, Key key) {
-    const auto best = best_of<Order, T>(0, n, kernel::all<kernel::Lanes<T>>(start), key);
-    return folded(best, [](auto a, auto b) {
-        if constexpr (std::is_same_v<decltype(a), T>)
+/// The best of the lanes.
+template <class Order, class V>
+WAVKIT_LANES kernel::Lane<V> best_lane(V keys) {
+    return folded(keys, [](auto a, auto b) {
+        if constexpr (std::is_same_v<decltype(a), kernel::Lane<V>>)
             return Order::beats(b, a) ? b : a;
         else
             return Order::better(a, b);
     });
 }
 
-/// The first of the points [0, n) with the key `wanted`; n when there is none.
+/// The best among `start` and the keys of the points [0, n).
+template <class Order, class T, class Key>
+[[gnu::flatten]] T best_key(std::size_t n, T start, Key key) {
+    return best_lane<Order>(best_of<Order, T>(0, n, kernel::all<kernel::Lanes<T>>(start), key));
+}
+
+/// A best key, and where the block begins that has it first.
+template <class T>
+struct BestBlock {
+    T key;
+    std::size_t begin, end;
+};
+
+/// The same by the block, so that what has the best key need not be looked for everywhere.
+template <class Order, class T, class Key>
+[[gnu::flatten]] BestBlock<T> best_block(std::size_t n, T start, Key key) {
+    BestBlock<T> best{start, n, n};
+    for (std::size_t begin = 0; begin < n; begin += block_points) {
+        const std::size_t end = std::min(n, begin + block_points);
+        const T other = best_lane<Order>(
+            best_of<Order, T>(begin, end, kernel::all<kernel::Lanes<T>>(best.key), key));
+        if (Order::beats(other, best.key)) best = {other, begin, end};
+    }
+    return best;
+}
+
+/// The first of the points [begin, n) with the key `wanted`; n when there is none.
 template <class T, class Key>
-[[gnu::flatten]] std::size_t first_with_key(std::size_t n, T wanted, Key key) {
+[[gnu::flatten]] std::size_t first_with_key(std::size_t begin, std::size_t n, T wanted, Key key) {
     constexpr std::size_t V = kernel::lanes<T>, step = 4 * V;
-    std::size_t i = 0;
+    std::size_t i = begin;
     for (; n - i >= step; i += step) {
         kernel::Lanes<T> unequal = kernel::all<kernel::Lanes<T>>(T(1));
         for (std::size_t k = 0; k < step; k += V)
@@ -91,8 +116,8 @@ template <class T, class Key>
 /// is none.
 template <class Order, class T, class Key>
 std::size_t first_extreme(std::size_t n, T start, Key key) {
-    const T best = best_key<Order>(n, start, key);
-    return Order::beats(best, start) ? first_with_key(n, best, key) : n;
+    const auto best = best_block<Order>(n, start, key);
+    return best.begin < n ? first_with_key(best.begin, best.end, best.key, key) : n;
 }
 
 }  // namespace

@@ -1,6 +1,9 @@
 // Median.
 #include <algorithm>
+#include <memory>
+#include <new>
 
+#include "kernel/quicksort.hpp"
 #include "stats/result.hpp"
 
 namespace wavkit {
@@ -18,6 +21,39 @@ int median_value(R* points, R* out) {
     return store(out, (*std::max_element(v.begin(), upper, precedes) + *upper) * scalar<R>(0.5));
 }
 
+/// The keys of n numbers; that of a NaN, whatever its sign, is behind all others.
+template <class T>
+void put_keys(const T* numbers, std::size_t n, kernel::OrderKey<T>* keys) {
+    using Key = kernel::OrderKey<T>;
+    for (std::size_t i = 0; i < n; ++i) {
+        const auto key = kernel::turn_order<T>(std::bit_cast<Key>(numbers[i]));
+        keys[i] = numbers[i] == numbers[i] ? key : std::numeric_limits<Key>::max();
+    }
+}
+
+/// The median of some numbers; false where there is no memory or selecting it is unlucky.
+template <class T>
+bool select_median([[maybe_unused]] std::span<const T> numbers, [[maybe_unused]] T& median) {
+    if constexpr (kernel::sorts_in_vectors) {
+        using Key = kernel::OrderKey<T>;
+        constexpr std::size_t room = 1024;
+        const std::size_t n = numbers.size();
+        if (n < 2) return false;
+        Key near[room];
+        const std::unique_ptr<Key[]> far(n > room ? new (std::nothrow) Key[n] : nullptr);
+        if (n > room && !far) return false;
+        Key* const keys = far ? far.get() : near;
+        kernel::Neighbours<Key> middle;
+        put_keys(numbers.data(), n, keys);
+        if (!kernel::select_key(keys, n, n / 2, middle)) return false;
+        const T before = std::bit_cast<T>(kernel::turn_order<T>(middle.before));
+        const T at = std::bit_cast<T>(kernel::turn_order<T>(middle.at));
+        median = n % 2 ? at : (before + at) * T(0.5);
+        return true;
+    }
+    return false;
+}
+
 template <Record R>
 int median_point(R* points, R* out) {
     const auto z = bins(points);
@@ -30,6 +66,8 @@ int median_point(R* points, R* out) {
 
 template <Record R>
 int median(const R* x, R* out) {
+    scalar<R> value;
+    if (!x->complex && select_median<scalar<R>>(values(x), value)) return store(out, value);
     Temporary<R> points;
     if (dsp_copy(points, x)) return -1;
     return x->complex ? median_point<R>(points, out) : median_value<R>(points, out);

@@ -16,7 +16,7 @@ struct Axis {
 };
 
 /// Means, variances and covariance of x and y, and the mean squares of what the line of y on x and
-/// that of x on y leave over.
+/// that of x on y leave over; the latter and r only where they are asked for.
 template <class T>
 struct Fit {
     Axis<T> x, y;
@@ -47,12 +47,13 @@ Fit<T> fit_of(std::size_t points, Means<T> m, Origin<T> from, bool residues, aut
     const Axis<T> x{m.x + from.x, std::max(m.xx - m.x * m.x, T(0))};
     const Axis<T> y{m.y + from.y, std::max(m.yy - m.y * m.y, T(0))};
     const T covariance = m.xy - m.x * m.y;
+    if (!residues) return {x, y, covariance, T(0), T(0), T(0)};
     const bool flat = x.variance == T(0) || y.variance == T(0);
     const T r =
         flat ? T(0) : within_one(covariance / (std::sqrt(x.variance) * std::sqrt(y.variance)));
     const T unexplained = 1 - r * r;
     Fit<T> fit{x, y, covariance, r, unexplained * y.variance, unexplained * x.variance};
-    if (!residues || !(unexplained < T(0.25))) return fit;
+    if (!(unexplained < T(0.25))) return fit;
     const T slope = covariance / x.variance, inverse = covariance / y.variance;
     const auto [of_y, of_x] = blockwise_sums<T>(points, [=](auto at) {
         const auto d = pairs(at);
@@ -122,6 +123,11 @@ struct Ramp {
     explicit Ramp(std::size_t n)
         : points(double(n)), middle(0.5 * (double(std::min(n, block_points)) - 1)) {
         constexpr double p = double(block_points);
+        if (n <= block_points) {
+            mean = 0;
+            mean_square = (points * points - 1) / 12;
+            return;
+        }
         const std::size_t blocks = n / block_points;
         const double whole = double(blocks), rest = double(n % block_points);
         const double off = 0.5 * (rest - 1) - middle;
@@ -142,14 +148,14 @@ Fit<scalar<R>> fit_ramp(const R* data, bool residues) {
     const auto about = [=](T shift, auto deviation) {
         const auto [s, xy, yy] = blockwise_sums<T>(n, [=](auto points) {
             const auto dy = deviation(points(y), shift);
-            return std::array{dy, (points.places() - middle) * dy, dy * dy};
+            return std::array{dy, points.places(-middle) * dy, dy * dy};
         });
         return Means<T>{T(ramp.mean) * delta, s / T(n), T(ramp.mean_square) * delta * delta,
                         xy / T(n) * delta, yy / T(n)};
     };
     const auto finish = [=](T shift, Means<T> m, auto deviation) {
         return fit_of<T>(n, m, {middle * delta, shift}, residues, [=](auto points) {
-            return kernel::Complexes<T, kernel::lanes<T>>{(points.places() - middle) * delta,
+            return kernel::Complexes<T, kernel::lanes<T>>{points.places(-middle) * delta,
                                                           deviation(points(y), shift)};
         });
     };
@@ -166,41 +172,77 @@ Fit<scalar<R>> fit_ramp(const R* data, bool residues) {
     return finish(near, m, plain);
 }
 
+template <Record R>
+Fit<scalar<R>> fit_signal(const R* data, bool residues) {
+    return data->complex ? fit_pairs(data, residues) : fit_ramp(data, residues);
+}
+
+/// The line of `v` on `u`: slope and intercept.
+template <Record R, class T = scalar<R>>
+std::array<T, 2> line(Axis<T> u, Axis<T> v, T covariance) {
+    constexpr T big = limits<R>::big;
+    if (u.variance == T(0)) return {big, big};
+    const T slope = covariance / u.variance;
+    return {slope, v.mean - slope * u.mean};
+}
+
 /// The line of `v` on `u`: slope, intercept, residual variance, variances of slope and intercept,
 /// their covariance and their correlation.
 template <Record R, class T = scalar<R>>
-std::array<T, 7> line(Axis<T> u, Axis<T> v, T covariance, T residue, T n) {
-    constexpr T big = limits<R>::big;
-    const T freedom = n < T(3) ? T(0) : n / (n - 2);
+std::array<T, 7> line(Axis<T> u, Axis<T> v, T covariance, T residue, T n, T freedom) {
+    const auto [slope, intercept] = line<R>(u, v, covariance);
     const T square = u.mean * u.mean + u.variance;  // mean square of u
-    const bool upright = u.variance == T(0);
-    const T uncertainty = upright ? big : residue / (n * u.variance);
-    return {upright ? big : covariance / u.variance,
-            upright ? big : v.mean - covariance * u.mean / u.variance,
+    const T uncertainty =
+        (u.variance == T(0) ? limits<R>::big : residue / (n * u.variance)) * freedom;
+    return {slope,
+            intercept,
             residue * freedom,
-            uncertainty * freedom,
-            uncertainty * square * freedom,
-            -uncertainty * u.mean * freedom,
+            uncertainty,
+            uncertainty * square,
+            -uncertainty * u.mean,
             square == T(0) ? T(0) : within_one(-u.mean / std::sqrt(square))};
+}
+
+/// Slope and intercept of a real signal of one block, about the middle of which the abscissae add
+/// up to 0. False where its values are so large, or lie so unevenly, that this takes more care.
+template <Record R, class T = scalar<R>>
+bool line_of_block(const R* data, std::array<T, 2>& line) {
+    const std::size_t n = length(data);
+    if (data->complex || n < 2 || n > block_points) return false;
+    const auto y = data->data;
+    const double points = double(n), middle = 0.5 * (points - 1);
+    const T shift = median_of_three<T>(n, [=](std::size_t i) { return y[i]; });
+    const auto [s, xy, yy] = blockwise_sums<T>(n, [=, first = T(-middle)](auto at) {
+        const auto dy = at(y) - shift;
+        return std::array{dy, at.places(first) * dy, dy * dy};
+    });
+    if (!(yy <= big_squared<R> / 4) || is_poor_shift(s * s, yy * T(n))) return false;
+    const T delta = spacing(data), spread = T((points * points - 1) / 12) * delta * delta;
+    if (!(spread > T(0) && spread < std::numeric_limits<T>::infinity())) return false;
+    const T slope = xy / (T(points * (points * points - 1) / 12) * delta);
+    line = {slope, shift + s / T(n) - slope * (T(middle) * delta)};
+    return true;
 }
 
 /// Both lines, then means, sample variances, sample covariance and correlation of x and y. Of a
 /// single point no more than where it lies.
 template <Record R, class T = scalar<R>>
-Table<T> fit(const R* data, bool residues) {
+Table<T> fit(const R* data) {
     const std::size_t points = length(data);
     Table<T> table{};
     if (points == 0) return table;
     const T n = T(points);
-    const Fit<T> f = data->complex ? fit_pairs(data, residues) : fit_ramp(data, residues);
+    const Fit<T> f = fit_signal(data, true);
     if (points == 1) {
         table[1] = table[15] = f.y.mean;
         table[8] = table[14] = f.x.mean;
         return table;
     }
-    const T sample = n / (n - 1);
-    std::ranges::copy(line<R>(f.x, f.y, f.covariance, f.y_residue, n), table.begin());
-    std::ranges::copy(line<R>(f.y, f.x, f.covariance, f.x_residue, n), table.begin() + 7);
+    const T sample = n / (n - 1), freedom = n < T(3) ? T(0) : n / (n - 2);
+    std::ranges::copy(line<R>(f.x, f.y, f.covariance, f.y_residue, n, freedom), table.begin());
+    std::array<T, 2> in_short;  // both functions give the same line
+    if (line_of_block(data, in_short)) std::ranges::copy(in_short, table.begin());
+    std::ranges::copy(line<R>(f.y, f.x, f.covariance, f.x_residue, n, freedom), table.begin() + 7);
     std::ranges::copy(std::array{f.x.mean, f.y.mean, sample * f.x.variance, sample * f.y.variance,
                                  sample * f.covariance, f.r},
                       table.begin() + 14);
@@ -218,13 +260,19 @@ int store(std::span<const scalar<R>> entries, R* out) {
 
 template <Record R>
 int regress(const R* data, R* out) {
-    const auto table = fit(data, false);
-    return store<R>(std::span(table).first(2), out);
+    using T = scalar<R>;
+    std::array<T, 2> slope_intercept{};
+    if (!line_of_block(data, slope_intercept) && length(data) > 0) {
+        const Fit<T> f = fit_signal(data, false);
+        slope_intercept =
+            length(data) == 1 ? std::array{T(0), f.y.mean} : line<R>(f.x, f.y, f.covariance);
+    }
+    return store<R>(slope_intercept, out);
 }
 
 template <Record R>
 int regress_in_full(const R* data, R* out) {
-    const auto table = fit(data, true);
+    const auto table = fit(data);
     out->delta = 1;
     return store<R>(table, out);
 }

@@ -25,7 +25,8 @@ int mean(const R* x, R* out) {
     const std::size_t n = length(x);  // before the output is written, which may be x
     if (dsps_sum(x, out)) return -1;
     if (n == 0) return 0;
-    for (auto& part : values(out)) part /= scalar<R>(n);
+    out->data[0] /= scalar<R>(n);
+    if (out->complex) out->data[1] /= scalar<R>(n);
     return 0;
 }
 

@@ -1,6 +1,7 @@
 // Signs, scaling, limits, reciprocals; order of the points.
 #include <algorithm>
 #include <climits>
+#include <functional>
 
 #include "support/signals.hpp"
 
@@ -67,10 +68,24 @@ BOTH_PRECISIONS(Scaling, SortKeepsEveryValue) {
         dspi_sort,
         complex<R>({{0, nan}, {2 * big, 1}, {0, -5}, {3, 4}, {-3 * big, 1}, {3, -4}, {-5, 0}, 1}),
         complex<R>({1, {-5, 0}, {0, -5}, {3, -4}, {3, 4}, {-3 * big, 1}, {2 * big, 1}, {0, nan}})));
-    const auto noise = Noise().real<R>(1000);
-    auto expected = noise;
-    std::sort(expected->data, expected->data + expected->points);
-    EXPECT_TRUE(turns(dspi_sort, noise, expected));
+    // Noise, few different values, equal ones, rising, falling, and values that swing wider.
+    const std::function<T(int, T)> shapes[] = {
+        [](int, T v) { return v; },         [](int, T v) { return T(int(4 * v)); },
+        [](int, T) { return T(-1); },       [](int i, T) { return T(i); },
+        [](int i, T) { return T(50 - i); }, [](int i, T v) { return T(i % 2 ? -i : i) + v; }};
+    for (const int n : {1, 9, 31, 64, 129, 200, 257, 500, 1000, 4099}) {
+        for (const auto& shape : shapes) {
+            auto x = Noise().real<R>(n);
+            for (int i = 0; i < n; ++i) x->data[i] = shape(i, x->data[i]);
+            auto expected = x;
+            std::sort(expected->data, expected->data + n);
+            EXPECT_TRUE(turns(dspi_sort, x, expected)) << n;
+            Signal<R> middle;
+            ASSERT_EQ(dsps_median(x, middle), 0);
+            const T upper = expected->data[n / 2], lower = expected->data[(n - 1) / 2];
+            EXPECT_EQ(middle->data[0], (lower + upper) * T(0.5)) << n;
+        }
+    }
     std::vector<std::complex<long double>> corners, in_order;  // magnitudes equal in pairs
     for (int i = 1; i <= 300; ++i) {
         corners.insert(corners.begin(), {{(long double)i, 0}, {-(long double)i, 0}});
