@@ -24,49 +24,24 @@ int join_parts(const R* a, const R* b, R* out) {
     return write_beside(a, b, out, [=](R* result) { return join_from_start(a, b, result); });
 }
 
-/// out[j] += factor * b[j] in whole vectors; returns how many products they held.
-template <class T>
-std::size_t add_products(T factor, std::span<const T> b, T* out) {
-    constexpr std::size_t V = kernel::lanes<T>;
-    std::size_t j = 0;
-    for (; j + V <= b.size(); j += V) {
-        kernel::store<T, V>(out + j,
-                            kernel::load<T, V>(out + j) +
-                                kernel::broadcast<T, V>(factor) * kernel::load<T, V>(b.data() + j));
-    }
-    return j;
-}
-
-/// out[i + j] += a[i] * b[j], the longer operand in the inner loop.
-template <class A, class B, class Out>
-void convolve(std::span<const A> a, std::span<const B> b, std::span<Out> out) {
-    if (a.size() > b.size()) return convolve(b, a, out);
-    for (std::size_t i = 0; i < a.size(); ++i) {
-        std::size_t j = 0;
-        if constexpr (std::floating_point<B>) {
-            if constexpr (std::same_as<A, B>) j = add_products<B>(a[i], b, &out[i]);
-        }
-        for (; j < b.size(); ++j) out[i + j] += a[i] * b[j];
-    }
-}
-
 template <Record R>
 int multiply_apart(const R* a, const R* b, R* out) {
     const auto n = std::int64_t(length(a)), m = std::int64_t(length(b));
     R p = *a, q = *b;
     out->delta = (p.delta + q.delta) * scalar<R>(0.5);
     if (size_output(p, q, out, n && m ? n + m - 1 : 0, p.complex || q.complex)) return -1;
-    if (!a->complex && !b->complex && multiply_by_spectra<R>(values(a), values(b), values(out)))
-        return 0;
-    std::ranges::fill(values(out), scalar<R>(0));
+    const auto multiply = [](auto first, auto second, auto product) {
+        if (!multiply_by_spectra<R>(first, second, product))
+            convolve<scalar<R>>(first, second, product);
+    };
     if (a->complex && b->complex) {
-        convolve(bins(a), bins(b), bins(out));
+        multiply(bins(a), bins(b), bins(out));
     } else if (a->complex) {
-        convolve(bins(a), values(b), bins(out));
+        multiply(bins(a), values(b), bins(out));
     } else if (b->complex) {
-        convolve(values(a), bins(b), bins(out));
+        multiply(values(a), bins(b), bins(out));
     } else {
-        convolve(values(a), values(b), values(out));
+        multiply(values(a), values(b), values(out));
     }
     return 0;
 }
