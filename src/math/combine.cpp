@@ -37,7 +37,7 @@ int multiply_apart(const R* a, const R* b, R* out) {
     if (a->complex && b->complex) {
         multiply(bins(a), bins(b), bins(out));
     } else if (a->complex) {
-        multiply(bins(a), values(b), bins(out));
+        multiply(values(b), bins(a), bins(out));
     } else if (b->complex) {
         multiply(values(a), bins(b), bins(out));
     } else {

@@ -12,7 +12,7 @@
 namespace wavkit {
 namespace {
 
-inline constexpr std::size_t shortest_for_spectra = 192;
+inline constexpr std::size_t shortest_for_spectra = 128;
 inline constexpr std::size_t level_block = 64;
 
 /// Sum and least of the magnitudes of a block.
@@ -70,12 +70,25 @@ bool is_level(std::span<const T> c) {
 template <class T, class A, class B, class Out>
 void multiply_ends(std::span<const A> a, std::span<const B> b, std::span<Out> out) {
     constexpr std::size_t most = 2 * level_block;
-    const std::size_t depth = std::min({most, a.size() / 4, b.size() / 4});
+    const std::size_t depth = std::min({most, a.size() / 8, b.size() / 8});
     std::array<Out, 2 * most> room;
     const auto products = std::span(room).first(2 * depth - 1);
-    convolve<T>(a.first(depth), b.first(depth), products);
+    const auto multiply_corner = [&](auto p, auto q, auto partners) {
+        std::ranges::fill(products, Out{});
+        for (std::size_t i = 0; i < depth; i += product_rows) {
+            const std::size_t count = std::min<std::size_t>(product_rows, depth - i);
+            const auto [first, last] = partners(i, i + count - 1);
+            convolve_rows<T>(p.subspan(i, count), q.subspan(first, last - first),
+                             products.subspan(i + first));
+        }
+    };
+    multiply_corner(a.first(depth), b.first(depth), [=](std::size_t begin, std::size_t) {
+        return std::pair{std::size_t(0), depth - begin};
+    });
     std::ranges::copy(products.first(depth), out.begin());
-    convolve<T>(a.last(depth), b.last(depth), products);
+    multiply_corner(a.last(depth), b.last(depth), [=](std::size_t, std::size_t end) {
+        return std::pair{depth - 1 - end, depth};
+    });
     std::ranges::copy(products.last(depth), out.end() - std::ptrdiff_t(depth));
 }
 
@@ -99,12 +112,11 @@ bool multiply_by_spectra(std::span<const A> a, std::span<const B> b, std::span<O
     T* const q = p + room;
     const auto spectrum = [n](auto c, T* to) {
         auto* const z = reinterpret_cast<Out*>(to);
-        std::ranges::transform(c, z, [](auto coefficient) {
-            if constexpr (std::same_as<decltype(coefficient), Out>)
-                return coefficient;
-            else
-                return Out{coefficient, 0};
-        });
+        if constexpr (std::same_as<std::remove_cvref_t<decltype(c[0])>, Out>) {
+            std::ranges::copy(c, z);
+        } else {
+            std::ranges::transform(c, z, [](T coefficient) { return Out{coefficient, 0}; });
+        }
         std::fill(z + c.size(), z + n, Out{});
         if constexpr (complex)
             return transform<R>(z, n, false, T(1)) == 0;

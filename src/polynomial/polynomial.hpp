@@ -134,6 +134,7 @@ bool improve(std::span<const T> c, std::span<const Bin<T>> roots, Bin<T>& root) 
     if (root.im == T(0)) step.im = 0;
     if (one_norm(step) > nearest / 4) step = step * (nearest / 4 / one_norm(step));
     const auto next = root - step;
+    if (next.re == root.re && next.im == root.im) return false;
     if (!(one_norm(tangent(c, next).value) < one_norm(at.value))) return false;
     root = next;
     return true;
