@@ -1,6 +1,6 @@
 // Two signals joined otherwise than point by point: as the parts of a complex one, as polynomials,
 // as a dot product.
-#include "kernel/vector.hpp"
+#include "kernel/in_turn.hpp"
 #include "math/binary.hpp"
 #include "math/long_product.hpp"
 #include "stats/blockwise.hpp"
@@ -14,8 +14,7 @@ int join_from_start(const R* real_parts, const R* imaginary_parts, R* out) {
     if (a.complex || b.complex || length(&a) != length(&b)) return -1;
     out->delta = (a.delta + b.delta) * scalar<R>(0.5);
     if (size_output(a, b, out, std::int64_t(length(&a)), true)) return -1;
-    // Backwards: in place, point i overwrites the samples 2i and 2i + 1 of either operand.
-    for (std::size_t i = length(&a); i-- > 0;) bins(out)[i] = {a.data[i], b.data[i]};
+    kernel::put_in_turn<1>(a.data, b.data, out->data, length(&a));
     return 0;
 }
 
