@@ -61,7 +61,7 @@ CachedWindow<R>* claim(int points) {
 
 /// A window that cannot be filled keeps its place, as zeros: asked for again, it is found.
 template <Record R>
-R* make(int points, int window, int options, scalar<R> win_length) {
+[[gnu::noinline]] R* make(int points, int window, int options, scalar<R> win_length) {
     CachedWindow<R>* slot = claim<R>(points);
     if (!slot) return nullptr;
     const int failed = window_fill(&slot->samples, window, options, win_length);

@@ -160,6 +160,28 @@ BOTH_PRECISIONS(Binary, LengthsAndWrongOperands) {
     EXPECT_EQ(out->data, nullptr);
 }
 
+BOTH_PRECISIONS(Binary, ProductsOfWholePolynomialsAreWhole) {
+    Noise noise;
+    for (const double size : {3.0, 900.0}) {
+        Signal<R> a = noise.real<R>(300), b = noise.complex<R>(400), c = noise.real<R>(400), out;
+        for (R* x : {a.get(), b.get(), c.get()}) {
+            for (auto& v : values(x)) v = std::copysign(std::ceil(std::fabs(v) * T(size)), v);
+        }
+        ASSERT_EQ(dspb_pmul(a, c, out), 0);
+        for (int k = 0; k < 699; ++k) {
+            std::int64_t sum = 0;
+            for (int i = std::max(0, k - 399); i <= std::min(k, 299); ++i)
+                sum += std::int64_t(a[i]) * std::int64_t(c[k - i]);
+            // Above 2^24 not even the sums of single precision are exact.
+            if (size < 10 || sizeof(T) == 8) {
+                ASSERT_EQ(out[k], T(sum)) << k;
+            }
+        }
+        ASSERT_EQ(dspb_pmul(a, b, out), 0);
+        for (const T v : values(out.get())) EXPECT_EQ(v, std::rint(v));
+    }
+}
+
 BOTH_PRECISIONS(Binary, PolynomialsKeepEveryCoefficient) {
     Noise noise;
     for (const auto& [n, m] : {std::pair{1, 9}, {7, 40}, {61, 30}, {130, 150}, {700, 1100}}) {
