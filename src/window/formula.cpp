@@ -101,13 +101,12 @@ constexpr scalar<R> beta_limit(int mode) {
 
 template <Record R>
 int normalise(R* w, int mode, scalar<R> mean) {
-    scalar<R> value;
-    R measured{1, &value, 1, 1, 0, 0};  // with room for one value
+    Temporary<R> measured;
     if (mode == DSP_SCALE_MEAN) {
-        return status(dsps_mean(w, &measured) || dspi_scale(w, mean / value));
+        return status(dsps_mean(w, measured) || dspi_scale(w, mean / measured->data[0]));
     }
     if (mode == DSP_SCALE_RMS) {
-        return status(dsps_rms(w, &measured) || dspi_scale(w, 1 / value));
+        return status(dsps_rms(w, measured) || dspi_scale(w, 1 / measured->data[0]));
     }
     return 0;
 }
