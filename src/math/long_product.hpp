@@ -129,7 +129,7 @@ bool multiply_by_spectra(std::span<const A> a, std::span<const B> b, std::span<O
         if constexpr (std::same_as<std::remove_cvref_t<decltype(c[0])>, Out>) {
             std::ranges::copy(c, z);
         } else {
-            std::ranges::transform(c, z, [](T coefficient) { return Out{coefficient, 0}; });
+            std::ranges::transform(c, z, [](auto coefficient) { return Out{coefficient, 0}; });
         }
         std::fill(z + c.size(), z + n, Out{});
         if constexpr (complex)

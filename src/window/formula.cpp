@@ -47,7 +47,7 @@ WAVKIT_LANES Doubles decay(Doubles x) {
         const Doubles near = kernel::at_least(x, kernel::all<Doubles>(-746));
         const Doubles k = kernel::round_product(near, std::numbers::log2e).number;
         const Doubles r = kernel::mul_add(k, -std::numbers::ln2, near);
-        return kernel::scale(kernel::polynomial(r, {1, 1, 1 / 2.0, 1 / 6.0, 1 / 24.0, 1 / 120.0,
+        return kernel::scale(kernel::polynomial(r, {1.0, 1.0, 1 / 2.0, 1 / 6.0, 1 / 24.0, 1 / 120.0,
                                                     1 / 720.0, 1 / 5040.0, 1 / 40320.0}),
                              k);
     }
