@@ -94,8 +94,8 @@ WAVKIT_API int dspfb_ritoc(const dspf *a, const dspf *b, dspf *out);
 
 /** Multiplies two polynomials in ascending powers, which is the whole linear convolution of two
  *  sequences: out[k] = sum of a[i] * b[k - i] over all i. Summed directly, in time proportional to
- *  the product of the lengths; two real operands of 512 points or more, without zeros and about
- *  equally large throughout, are multiplied through their spectra, integers then no longer exactly.
+ *  the product of the lengths; operands of 128 points or more, without zeros and about equally
+ *  large throughout, are multiplied through their spectra. Whole numbers stay whole.
  *  @param a,b  coefficients, any lengths
  *  @param out  a.points + b.points - 1 points, none when an operand has none; may be a or b
  *  @return 0, or -1 when memory runs out or the length exceeds 2147483647 */

@@ -47,6 +47,10 @@ int resize(R* x, std::uint64_t points, bool is_complex) {
 template <Record R>
 int filter_directly(const FilterCall<R>& call, R* work, scalar<R>* out);
 
+/// The same for outputs from `first` on that the block's own samples suffice for.
+template <Record R>
+void filter_inside(const FilterCall<R>& call, std::size_t first, std::size_t count, scalar<R>* out);
+
 /// Through transforms, for real taps and blocks of no fewer samples than the order, which is at
 /// least 1.
 template <Record R>

@@ -79,18 +79,26 @@ int resume(const FilterCall<R>& call, std::size_t n, R* work, scalar<R>* out) {
 }  // namespace
 
 template <Record R>
+void filter_inside(const FilterCall<R>& call, std::size_t first, std::size_t count,
+                   scalar<R>* out) {
+    const std::size_t w = width(&call.in), out_width = w == 2 || call.taps.complex ? 2 : 1;
+    convolve(call, call.in.data + w * first, count, out + out_width * first);
+}
+
+template <Record R>
 int filter_directly(const FilterCall<R>& call, R* work, scalar<R>* out) {
     const std::size_t n = call.samples(), first = std::min(n, call.order());
-    const std::size_t w = width(&call.in), out_width = w == 2 || call.taps.complex ? 2 : 1;
     if (call.has_state && call.order() > 0) {
         if (resume(call, first, work, out)) return -1;
     } else {
         begin(call, first, out);
     }
-    convolve(call, call.in.data + w * first, n - first, out + out_width * first);
+    filter_inside(call, first, n - first, out);
     return 0;
 }
 
+template void filter_inside(const FilterCall<dsp>&, std::size_t, std::size_t, double*);
+template void filter_inside(const FilterCall<dspf>&, std::size_t, std::size_t, float*);
 template int filter_directly(const FilterCall<dsp>&, dsp*, double*);
 template int filter_directly(const FilterCall<dspf>&, dspf*, float*);
 

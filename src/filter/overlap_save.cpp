@@ -19,43 +19,52 @@ constexpr double same_taps = 5 * std::numeric_limits<double>::epsilon();
 /// Longer transforms are refused.
 constexpr int highest_exponent = 30;
 
-/// Time to transform, multiply and transform back 2^exponent samples, in no particular unit: the
-/// arithmetic grows with the logarithm of the length, and the way to memory with it.
-double effort(int exponent) { return std::ldexp(70.0 + exponent * exponent, exponent) + 7000; }
+/// Time to transform, multiply and transform back 2^exponent samples, and to compute outputs by the
+/// definition; in no particular unit, measured.
+double effort(int exponent) { return std::ldexp(20.0 + exponent, exponent) + 2000; }
+double direct_effort(std::size_t taps, std::size_t outputs) {
+    return 1.2 * double(taps) * double(outputs);
+}
 
-/// The transform length for n samples, as an exponent; 0 when there is none. A stretch has at least
-/// as many new samples as old ones. `standing` is the length of a spectrum that there is already;
-/// another one takes a transform, half of what a stretch takes.
-int best_exponent(std::size_t n, std::size_t order, int standing) {
-    int best = 0;
+/// How n samples go through transforms: stretches of 2^exponent samples, and outputs behind the
+/// last whole one that cost less when they are computed directly.
+struct Division {
+    int exponent = 0;  // 0: there is none
+    std::size_t direct = 0;
+};
+
+/// The cheapest division. A stretch has at least as many new samples as old ones. `standing` is the
+/// exponent of a spectrum that there is already; another one takes a transform, half of what a
+/// stretch takes.
+Division best_division(std::size_t n, std::size_t order, int standing) {
+    Division best;
     double least = std::numeric_limits<double>::infinity();
     for (int e = std::bit_width(2 * order - 1); e <= highest_exponent; ++e) {
-        const std::size_t fresh = (std::size_t(1) << e) - order;
-        const std::size_t stretches = (n + fresh - 1) / fresh;
-        const double total = (double(stretches) + (e == standing ? 0 : 0.5)) * effort(e);
+        const std::size_t fresh = (std::size_t(1) << e) - order, whole = n / fresh;
+        const double rest = direct_effort(order + 1, n % fresh), stretch = effort(e);
+        const bool direct = whole > 0 && rest < stretch;
+        const double last = direct ? rest : n % fresh > 0 ? stretch : 0;
+        const double total = double(whole) * stretch + last + (e == standing ? 0 : stretch / 2);
         if (total < least) {
             least = total;
-            best = e;
+            best = {e, direct ? n % fresh : 0};
         }
-        if (stretches == 1) break;
+        if (whole == 0) break;
     }
     return best;
 }
 
-template <Record R>
-bool are_finite(const R* taps) {
-    const auto v = values(taps);
-    return std::all_of(v.begin(), v.end(), [](auto tap) { return std::isfinite(tap); });
-}
-
-/// Whether taps are those of the last call. A comparison takes a NaN for anything.
+/// Whether taps are those of the last call. What is not finite is never the same.
 template <Record R>
 bool are_current(const R* taps) {
     const R* last = &thread_state<R>.tap_cache.taps;
+    if (length(taps) != length(last)) return false;
     const auto tolerance = std::fabs(taps->data[0]) * scalar<R>(same_taps);
-    int difference;
-    return are_finite(taps) && are_finite(last) &&
-           dsp_cmp(taps, last, tolerance, &difference) == 0 && difference == 0;
+    bool same = true;
+    for (std::size_t k = 0; k < length(taps); ++k) {
+        same &= std::fabs(taps->data[k] - last->data[k]) <= tolerance;
+    }
+    return same;
 }
 
 /// The spectrum of the current taps, divided by the length of the stretches, which one transform
@@ -84,9 +93,10 @@ int fill_spectrum(TapSpectrum<R>* spectrum, int exponent, bool whole) {
     return 0;
 }
 
-/// The spectrum of the taps for a call, as cached or anew; null when memory runs out.
+/// The spectrum of the taps for a call, as cached or anew, and the division of its samples; null
+/// when memory runs out.
 template <Record R>
-const TapSpectrum<R>* find_spectrum(const FilterCall<R>& call) {
+const TapSpectrum<R>* find_spectrum(const FilterCall<R>& call, Division& division) {
     auto& c = thread_state<R>.tap_cache;
     if (!are_current(&call.taps)) {
         c.half.exponent = c.whole.exponent = 0;
@@ -98,7 +108,8 @@ const TapSpectrum<R>* find_spectrum(const FilterCall<R>& call) {
     }
     const bool whole = call.in.complex;
     auto* spectrum = whole ? &c.whole : &c.half;
-    const int exponent = best_exponent(call.samples(), call.order(), spectrum->exponent);
+    division = best_division(call.samples(), call.order(), spectrum->exponent);
+    const int exponent = division.exponent;
     if (exponent == 0) return nullptr;
     if (exponent != spectrum->exponent && fill_spectrum(spectrum, exponent, whole)) return nullptr;
     return spectrum;
@@ -132,7 +143,8 @@ void copy_stretch(const FilterCall<R>& call, std::size_t first, std::size_t coun
 
 template <Record R>
 int filter_by_transform(const FilterCall<R>& call, scalar<R>* out) {
-    const TapSpectrum<R>* spectrum = find_spectrum(call);
+    Division division;
+    const TapSpectrum<R>* spectrum = find_spectrum(call, division);
     if (!spectrum) return -1;
     const std::size_t w = width(&call.in), order = call.order(), n = call.samples();
     const int p = 1 << spectrum->exponent;
@@ -140,12 +152,16 @@ int filter_by_transform(const FilterCall<R>& call, scalar<R>* out) {
     // A real stretch has one bin more than half its samples.
     scalar<R>* const stretch = reserve_room<R>(p, w == 2, scalars + 2);
     if (!stretch) return -1;
-    for (std::size_t first = 0; first < n; first += fresh) {
-        const std::size_t count = std::min(fresh, n - first);
+    const std::size_t end = n - division.direct;
+    for (std::size_t first = 0; first < end; first += fresh) {
+        const std::size_t count = std::min(fresh, end - first);
         copy_stretch(call, first, count, {stretch, scalars});
         if (filter_stretch(stretch, p, w == 2, &spectrum->bins)) return -1;
         std::copy_n(stretch + w * order, w * count, out + w * first);
     }
+    FilterCall<R> rest = call;  // as the same taps as the stretches had
+    rest.taps = thread_state<R>.tap_cache.taps;
+    filter_inside(rest, end, division.direct, out);
     return 0;
 }
 

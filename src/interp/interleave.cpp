@@ -1,24 +1,23 @@
 // Two signals whose points take turns.
+#include "kernel/in_turn.hpp"
 #include "math/binary.hpp"
 
 namespace wavkit {
 namespace {
 
-template <class Out, class Sample>
-Out as(Sample sample) {
-    if constexpr (std::same_as<Out, Sample>) {
-        return sample;
-    } else {
-        return {sample, 0};
-    }
-}
-
-/// Backwards, and both points read before either is written: in place, the points 2i and 2i + 1
-/// take the room of operand points that have had their turn.
-template <class Out, class A, class B>
-void interleave(Out* out, const A* a, const B* b, std::size_t n) {
+/// A complex operand beside a real one, whose points get imaginary parts of 0. Backwards, and both
+/// points read before either is written: in place, the points 2i and 2i + 1 take the room of
+/// operand points that have had their turn.
+template <class T, class A, class B>
+void interleave_kinds(Bin<T>* out, const A* a, const B* b, std::size_t n) {
+    const auto widened = [](auto point) {
+        if constexpr (std::floating_point<decltype(point)>)
+            return Bin<T>{point, 0};
+        else
+            return point;
+    };
     for (std::size_t i = n; i-- > 0;) {
-        const Out first = as<Out>(a[i]), second = as<Out>(b[i]);
+        const Bin<T> first = widened(a[i]), second = widened(b[i]);
         out[2 * i] = first;
         out[2 * i + 1] = second;
     }
@@ -33,13 +32,13 @@ int take_turns_from_start(const R* first, const R* second, R* out) {
     if (size_output(a, b, out, 2 * std::int64_t(n), a.complex || b.complex)) return -1;
     const auto p = bins(&a).data(), q = bins(&b).data(), points = bins(out).data();
     if (a.complex && b.complex) {
-        interleave(points, p, q, n);
+        kernel::put_in_turn<2>(a.data, b.data, out->data, n);
     } else if (a.complex) {
-        interleave(points, p, b.data, n);
+        interleave_kinds(points, p, b.data, n);
     } else if (b.complex) {
-        interleave(points, a.data, q, n);
+        interleave_kinds(points, a.data, q, n);
     } else {
-        interleave(out->data, a.data, b.data, n);
+        kernel::put_in_turn<1>(a.data, b.data, out->data, n);
     }
     return 0;
 }

@@ -1,4 +1,5 @@
 // Tabulated data at new abscissae: held, along lines, parabolas or a cubic spline.
+#include "kernel/lookup.hpp"
 #include "math/binary.hpp"
 
 namespace wavkit {
@@ -12,108 +13,152 @@ struct Knots {
     const T *x, *y, *moments;  // the moments for the spline only
 };
 
-// A rule gives the values within a piece of the table. `passed` tells whether t lies beyond piece
-// k; `enter` moves to piece k and tells whether it has a length.
+// A rule gives the values within the pieces of the table. `passed` tells whether t lies beyond
+// piece k, `has_length` whether the piece is one, `ascends` whether so are its knots; `at(pick, t)`
+// is the value, pick(table, offset) being an entry of the table `offset` knots from the end of the
+// piece. A piece and t are one, or as many as a vector holds.
 
 /// The pieces of most rules: segments between the knots k - 1 and k.
+template <class T>
 struct Segments {
-    template <class T>
-    static bool passed(const Knots<T>& at, std::size_t k, T t) {
-        return k < at.count - 1 && t >= at.x[k];
-    }
+    const Knots<T>& knots;
+
+    auto passed(std::size_t k, auto t) const { return t >= knots.x[k]; }
+    std::size_t last() const { return knots.count - 1; }
+    bool has_length(std::size_t k) const { return knots.x[k] - knots.x[k - 1] != T(0); }
+    bool ascends(std::size_t k) const { return knots.x[k] > knots.x[k - 1]; }
 };
 
 template <class T>
-struct Held : Segments {
-    T value;
-
-    bool enter(const Knots<T>& at, std::size_t k) {
-        value = at.y[k - 1];
-        return at.x[k] - at.x[k - 1] != T(0);
-    }
-    T operator()(T) const { return value; }
+struct Held : Segments<T> {
+    WAVKIT_LANES auto at(auto pick, auto) const { return pick(this->knots.y, -1); }
 };
 
 template <class T>
-struct Line : Segments {
-    T x0, x1, h, rate, y0, y1;
-
-    bool enter(const Knots<T>& at, std::size_t k) {
-        x0 = at.x[k - 1];
-        x1 = at.x[k];
-        h = x1 - x0;
-        rate = T(1) / h;
-        y0 = at.y[k - 1];
-        y1 = at.y[k];
-        return h != T(0);
+struct Line : Segments<T> {
+    WAVKIT_LANES auto at(auto pick, auto t) const {
+        const auto x0 = pick(this->knots.x, -1), x1 = pick(this->knots.x, 0);
+        const auto y0 = pick(this->knots.y, -1), y1 = pick(this->knots.y, 0);
+        return ((t - x0) * y1 + (x1 - t) * y0) / (x1 - x0);
     }
-    T operator()(T t) const { return ((t - x0) * y1 + (x1 - t) * y0) * rate; }
 };
 
 /// The line between the knots and the cubics that vanish there, whose second derivatives are the
 /// moments.
 template <class T>
-struct Cubic : Segments {
-    Line<T> line;
-    T m0, m1;
-
-    bool enter(const Knots<T>& at, std::size_t k) {
-        m0 = at.moments[k - 1] / 6;
-        m1 = at.moments[k] / 6;
-        return line.enter(at, k);
-    }
-    T operator()(T t) const {
-        const T a = line.x1 - t, b = t - line.x0, h = line.h, rate = line.rate;
-        return line(t) + (a * (a * a * rate - h) * m0 + b * (b * b * rate - h) * m1);
+struct Cubic : Segments<T> {
+    WAVKIT_LANES auto at(auto pick, auto t) const {
+        const auto x0 = pick(this->knots.x, -1), x1 = pick(this->knots.x, 0);
+        const auto y0 = pick(this->knots.y, -1), y1 = pick(this->knots.y, 0);
+        const auto m0 = pick(this->knots.moments, -1), m1 = pick(this->knots.moments, 0);
+        const auto a = x1 - t, b = t - x0, h = x1 - x0, rate = T(1) / h;
+        const auto bent = a * (a * a * rate - h) * m0 + b * (b * b * rate - h) * m1;
+        return (b * y1 + a * y0) * rate + bent * T(1.0L / 6);
     }
 };
 
 /// The parabola through the knots k - 1, k and k + 1, of which k is the nearest; Newton's form.
 template <class T>
 struct Parabola {
-    T x0, x1, y1, slope, curvature;
+    const Knots<T>& knots;
 
-    static bool passed(const Knots<T>& at, std::size_t k, T t) {
-        return k < at.count - 2 && t - at.x[k] > at.x[k + 1] - t;
-    }
-    bool enter(const Knots<T>& at, std::size_t k) {
-        x0 = at.x[k - 1];
-        x1 = at.x[k];
-        y1 = at.y[k];
-        const T h1 = x1 - x0, h2 = at.x[k + 1] - x1;
-        slope = (y1 - at.y[k - 1]) / h1;
-        curvature = ((at.y[k + 1] - y1) / h2 - slope) / (h1 + h2);
+    auto passed(std::size_t k, auto t) const { return t - knots.x[k] > knots.x[k + 1] - t; }
+    std::size_t last() const { return knots.count - 2; }
+    bool has_length(std::size_t k) const {
+        const T h1 = knots.x[k] - knots.x[k - 1], h2 = knots.x[k + 1] - knots.x[k];
         return h1 != T(0) && h2 != T(0) && h1 + h2 != T(0);
     }
-    T operator()(T t) const { return y1 + (t - x1) * (slope + curvature * (t - x0)); }
+    bool ascends(std::size_t k) const {
+        return knots.x[k] > knots.x[k - 1] && knots.x[k + 1] > knots.x[k];
+    }
+    WAVKIT_LANES auto at(auto pick, auto t) const {
+        const auto x0 = pick(knots.x, -1), x1 = pick(knots.x, 0), y1 = pick(knots.y, 0);
+        const auto h1 = x1 - x0, h2 = pick(knots.x, 1) - x1;
+        const auto slope = (y1 - pick(knots.y, -1)) / h1;
+        const auto curvature = ((pick(knots.y, 1) - y1) / h2 - slope) / (h1 + h2);
+        return y1 + (t - x1) * (slope + curvature * (t - x0));
+    }
 };
 
 /// Goes on to the piece of t; false where one on the way has no length.
 template <class T, class Rule>
-bool advance(const Knots<T>& at, T t, std::size_t& k, Rule& rule) {
-    while (Rule::passed(at, k, t)) {
-        if (!rule.enter(at, ++k)) return false;
+bool advance(const Rule& rule, T t, std::size_t& k) {
+    while (k < rule.last() && rule.passed(k, t)) {
+        if (!rule.has_length(++k)) return false;
     }
     return true;
+}
+
+template <class T, class Rule>
+T value_at(const Rule& rule, std::size_t k, T t) {
+    return rule.at([k](const T* table, int offset) { return table[k + std::size_t(offset)]; }, t);
+}
+
+/// The pieces of a vector of ascending t, from piece k on, which moves to the piece of the last of
+/// them; false, and k as it was, where the knots on the way do not ascend.
+template <class T, class Rule>
+bool advance_lanes(const Rule& rule, kernel::Lanes<T> t, std::size_t& k,
+                   kernel::Places<T>& pieces) {
+    constexpr std::size_t V = kernel::lanes<T>;
+    std::size_t at = k;
+    const auto go_on = [&](T to, auto count) {
+        while (at < rule.last() && rule.passed(at, to)) {
+            count(at);
+            if (!rule.ascends(++at)) return false;
+        }
+        return true;
+    };
+    if (!go_on(t[0], [](std::size_t) {})) return false;
+    const std::size_t begin = at;
+    kernel::Bits<kernel::Lanes<T>> passed{};
+    if (!go_on(t[V - 1], [&](std::size_t j) { passed -= rule.passed(j, t); })) return false;
+    k = at;
+    // One knot before the first piece and one behind the last may be asked for.
+    const std::size_t count = rule.knots.count, room = count < 2 * V ? 0 : count - 2 * V;
+    pieces.first = std::min(begin - 1, room);
+    pieces.place = passed + typename kernel::Lane<decltype(passed)>(begin - pieces.first);
+    pieces.close = count >= 2 * V && at + 1 - pieces.first < 2 * V;
+    return true;
+}
+
+template <class T>
+bool ascend(const T* times) {
+    constexpr int V = kernel::lanes<T>;
+    bool ascending = true;
+    for (int i = 1; i < V; ++i) ascending &= times[i] >= times[i - 1];
+    return ascending;
 }
 
 /// The search only moves forward. With `hold_end`, the first t at or behind the last knot and
 /// whatever follows it get the last value. `out` may be `times`.
 template <class Rule, class T>
-int follow(const Knots<T>& at, std::span<const T> times, T* out, bool hold_end) {
+int follow(const Knots<T>& knots, std::span<const T> times, T* out, bool hold_end) {
+    constexpr std::size_t V = kernel::lanes<T>;
     if (times.empty()) return 0;
+    const Rule rule{knots};
     std::size_t k = 1;
-    Rule rule{};
-    if (!rule.enter(at, k)) return -1;
-    const T end = at.x[at.count - 1];
-    for (std::size_t i = 0; i < times.size(); ++i) {
-        const T t = times[i];
-        if (!advance(at, t, k, rule)) return -1;
-        if (hold_end && t >= end) {
-            std::fill_n(out + i, times.size() - i, at.y[at.count - 1]);
-            break;
+    if (!rule.has_length(k)) return -1;
+    const T end = knots.x[knots.count - 1];
+    for (std::size_t i = 0; i < times.size();) {
+        const std::size_t some = std::min(V, times.size() - i);
+        if (some == V && ascend(&times[i]) && !(hold_end && times[i + V - 1] >= end)) {
+            const auto t = kernel::load<T, V>(&times[i]);
+            kernel::Places<T> pieces;
+            if (advance_lanes(rule, t, k, pieces)) {
+                kernel::store<T, V>(out + i, rule.at(pieces, t));
+                i += V;
+                continue;
+            }
         }
-        out[i] = rule(t);
+        for (const std::size_t next = i + some; i < next; ++i) {
+            const T t = times[i];
+            if (!advance(rule, t, k)) return -1;
+            if (hold_end && t >= end) {
+                std::fill_n(out + i, times.size() - i, knots.y[knots.count - 1]);
+                return 0;
+            }
+            out[i] = value_at(rule, k, t);
+        }
     }
     return 0;
 }
@@ -123,8 +168,8 @@ template <class T>
 int follow_nothing(const Knots<T>& at, std::span<const T> times, T* out) {
     if (times.empty()) return 0;
     std::size_t k = 1;
-    Held<T> rule{};
-    if (!rule.enter(at, k) || !advance(at, times[0], k, rule)) return -1;
+    const Held<T> rule{at};
+    if (!rule.has_length(k) || !advance(rule, times[0], k)) return -1;
     std::fill_n(out, times.size(), at.y[k]);
     return 0;
 }

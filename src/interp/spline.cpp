@@ -1,8 +1,6 @@
 // Second derivatives of a cubic spline at its knots, its moments.
-#include <cstdlib>
-#include <memory>
-
 #include "math/binary.hpp"
+#include "state.hpp"
 
 namespace wavkit {
 namespace {
@@ -44,9 +42,6 @@ template <class T>
 struct Row {
     T upper, right;
 };
-
-template <class T>
-using Workspace = std::unique_ptr<Row<T>[], decltype(&std::free)>;
 
 /// The knots and, from `first` to `last`, the unknowns of the system. Under not-a-knot the unknown
 /// of the end knot stands in the place of the second knot.
@@ -131,9 +126,9 @@ int find_from_start(const R* abscissae, const R* ordinates, R* out, scalar<R> d0
     if (n < 5 || !is_end(start) || !is_end(end)) return -1;
     const Knots<T> knots({x.data, n}, {y.data, n}, start, end);
     if (!knots.ascend()) return -1;
-    const Workspace<T> rows(static_cast<Row<T>*>(std::calloc(n, sizeof(Row<T>))), &std::free);
+    auto* const rows = reinterpret_cast<Row<T>*>(reserve_workspace<R>(2 * n));
     if (!rows) return -1;
-    solve(knots, start, end, d0, dn, rows.get(), out->data);
+    solve(knots, start, end, d0, dn, rows, out->data);
     return 0;
 }
 

@@ -26,13 +26,17 @@ constexpr int block_vectors = 8, sharing_taps = 4;
 /// sums[u] += tap * the vector of samples at in + u V, for taps that are `distance` scalars and
 /// whose samples are V scalars apart.
 template <class T, int V, int Vectors, int Sharing>
-inline void add_products(Vec<T, V> (&sums)[Vectors], const T* tap, std::size_t distance,
-                         const T* in) {
+[[gnu::always_inline]] inline void add_products(Vec<T, V> (&sums)[Vectors], const T* tap,
+                                                std::size_t distance, const T* in) {
     Vec<T, V> h[Sharing];
     unrolled<Sharing>([&](auto t) { h[t] = broadcast<T, V>(tap[t * distance]); });
     const T* oldest = in - (Sharing - 1) * V;
     unrolled<Vectors + Sharing - 1>([&](auto j) {
-        const auto x = load<T, V>(oldest + j * V);
+        auto x = load<T, V>(oldest + j * V);
+#if defined(__x86_64__)
+        // Or the compiler has every product read the samples again.
+        if constexpr (Sharing > 1) asm("" : "+v"(x));
+#endif
         unrolled<Sharing>([&](auto t) {
             constexpr int u = int(j) - (Sharing - 1) + int(t);
             if constexpr (u >= 0 && u < Vectors) sums[u] = mul_add(h[t], x, sums[u]);
@@ -40,18 +44,29 @@ inline void add_products(Vec<T, V> (&sums)[Vectors], const T* tap, std::size_t d
     });
 }
 
+/// The products of as many taps from tap k on as make whole groups of sharing ones; returns the
+/// next.
+template <int Sharing, class T, int V, int Vectors>
+[[gnu::always_inline]] inline std::size_t add_groups(Vec<T, V> (&sums)[Vectors],
+                                                     const Taps<T>& taps, std::size_t k,
+                                                     const T* in, std::size_t delay) {
+    const std::size_t period = V / delay, group = Sharing * period;
+    for (; k + group <= taps.count; k += group) {
+        for (std::size_t first = k; first < k + period; ++first) {
+            add_products<T, V, Vectors, Sharing>(sums, taps.first + first * taps.step,
+                                                 period * taps.step, in - first * delay);
+        }
+    }
+    return k;
+}
+
 template <class T, int V, int Vectors>
 inline void convolve_block(const Taps<T>& taps, const T* in, std::size_t delay, T* out) {
     Vec<T, V> sums[Vectors] = {};
     std::size_t k = 0;
     if constexpr (V > 1) {
-        const std::size_t period = V / delay, group = sharing_taps * period;
-        for (; k + group <= taps.count; k += group) {
-            for (std::size_t first = k; first < k + period; ++first) {
-                add_products<T, V, Vectors, sharing_taps>(sums, taps.first + first * taps.step,
-                                                          period * taps.step, in - first * delay);
-            }
-        }
+        k = add_groups<sharing_taps, T, V, Vectors>(sums, taps, k, in, delay);
+        k = add_groups<2, T, V, Vectors>(sums, taps, k, in, delay);
     }
     for (; k < taps.count; ++k) {
         add_products<T, V, Vectors, 1>(sums, taps.first + k * taps.step, 0, in - k * delay);

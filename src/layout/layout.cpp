@@ -4,6 +4,7 @@
 #include <limits>
 #include <optional>
 
+#include "kernel/in_turn.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
@@ -95,26 +96,62 @@ int trim(R* x, int n, int mode) {
     return 0;
 }
 
-/// Moves the first `count` points behind the others.
-template <Record R>
-int rotate(R* x, std::size_t count) {
-    const auto turn = [count](auto points) {
-        std::rotate(points.begin(), points.begin() + std::ptrdiff_t(count), points.end());
-    };
-    if (x->complex) {
-        turn(bins(x));
-    } else {
-        turn(values(x));
+/// Exchanges two stretches of so many scalars.
+template <class T>
+void exchange(T* a, T* b, std::size_t count) {
+    constexpr std::size_t V = kernel::lanes<T>;
+    std::size_t i = 0;
+    for (; i + V <= count; i += V) {
+        const auto p = kernel::load<T, V>(a + i), q = kernel::load<T, V>(b + i);
+        kernel::store<T, V>(a + i, q);
+        kernel::store<T, V>(b + i, p);
     }
-    return 0;
+    std::swap_ranges(a + i, a + count, b + i);
 }
 
-template <class Sample>
-void spread(Sample* samples, std::size_t count) {
-    for (std::size_t i = count; i-- > 0;) {
-        samples[2 * i] = samples[i];
-        samples[2 * i + 1] = {};
+/// to[i] = x[i], x[i] = from[i] for `count` scalars, from the first or from the last on. `to`
+/// begins a point before `from`, backwards a point behind: what is written there has been read by
+/// then.
+template <bool Backwards, class T>
+void pass_on(T* x, const T* from, T* to, std::size_t count) {
+    constexpr std::size_t V = kernel::lanes<T>;
+    std::size_t i = 0;
+    for (; i + V <= count; i += V) {
+        const std::size_t at = Backwards ? count - V - i : i;
+        const auto moved = kernel::load<T, V>(x + at), next = kernel::load<T, V>(from + at);
+        kernel::store<T, V>(to + at, moved);
+        kernel::store<T, V>(x + at, next);
     }
+    for (; i < count; ++i) {
+        const std::size_t at = Backwards ? count - 1 - i : i;
+        const T moved = x[at], next = from[at];
+        to[at] = moved;
+        x[at] = next;
+    }
+}
+
+/// Exchanges the halves; a middle point comes last, or else first.
+template <Record R>
+int rotate(R* x, bool middle_last) {
+    using T = scalar<R>;
+    const std::size_t n = length(x), w = width(x), half = n / 2 * w;
+    if (n < 2) return 0;
+    T* const data = x->data;
+    if (n % 2 == 0) {
+        exchange(data, data + half, half);
+        return 0;
+    }
+    T kept[2];
+    T* const place = middle_last ? data + half : data + 2 * half;
+    std::copy_n(place, w, kept);
+    if (middle_last) {
+        pass_on<false>(data, data + half + w, data + half, half);
+        std::copy_n(kept, w, data + 2 * half);
+    } else {
+        pass_on<true>(data, data + half, data + half + w, half);
+        std::copy_n(kept, w, data + half);
+    }
+    return 0;
 }
 
 template <Record R>
@@ -128,10 +165,11 @@ int interleave_zeros(R* x) {
     }
     x->points = 2 * n;
     if (dsp_realloc(x, n, x->complex)) return -1;
+    constexpr const scalar<R>* zeros = nullptr;
     if (x->complex) {
-        spread(bins(x).data(), std::size_t(n));
+        kernel::put_in_turn<2>(x->data, zeros, x->data, std::size_t(n));
     } else {
-        spread(x->data, std::size_t(n));
+        kernel::put_in_turn<1>(x->data, zeros, x->data, std::size_t(n));
     }
     return 0;
 }
@@ -139,11 +177,11 @@ int interleave_zeros(R* x) {
 }  // namespace
 }  // namespace wavkit
 
-int dspi_swap_halves(dsp* x) { return wavkit::rotate(x, (wavkit::length(x) + 1) / 2); }
-int dspfi_swap_halves(dspf* x) { return wavkit::rotate(x, (wavkit::length(x) + 1) / 2); }
+int dspi_swap_halves(dsp* x) { return wavkit::rotate(x, true); }
+int dspfi_swap_halves(dspf* x) { return wavkit::rotate(x, true); }
 
-int dspi_swap_halves2(dsp* x) { return wavkit::rotate(x, wavkit::length(x) / 2); }
-int dspfi_swap_halves2(dspf* x) { return wavkit::rotate(x, wavkit::length(x) / 2); }
+int dspi_swap_halves2(dsp* x) { return wavkit::rotate(x, false); }
+int dspfi_swap_halves2(dspf* x) { return wavkit::rotate(x, false); }
 
 int dspi_zpad(dsp* x, int n) { return wavkit::pad(x, n, DSP_PAD_AT_START | DSP_PAD_UNSCALED); }
 int dspfi_zpad(dspf* x, int n) { return wavkit::pad(x, n, DSP_PAD_AT_START | DSP_PAD_UNSCALED); }

@@ -1,9 +1,8 @@
 // Two signals joined otherwise than point by point: as the parts of a complex one, as polynomials,
 // as a dot product.
-#include "kernel/convolve.hpp"
+#include "kernel/in_turn.hpp"
 #include "math/binary.hpp"
 #include "math/long_product.hpp"
-#include "state.hpp"
 #include "stats/blockwise.hpp"
 
 namespace wavkit {
@@ -15,8 +14,7 @@ int join_from_start(const R* real_parts, const R* imaginary_parts, R* out) {
     if (a.complex || b.complex || length(&a) != length(&b)) return -1;
     out->delta = (a.delta + b.delta) * scalar<R>(0.5);
     if (size_output(a, b, out, std::int64_t(length(&a)), true)) return -1;
-    // Backwards: in place, point i overwrites the samples 2i and 2i + 1 of either operand.
-    for (std::size_t i = length(&a); i-- > 0;) bins(out)[i] = {a.data[i], b.data[i]};
+    kernel::put_in_turn<1>(a.data, b.data, out->data, length(&a));
     return 0;
 }
 
@@ -25,57 +23,24 @@ int join_parts(const R* a, const R* b, R* out) {
     return write_beside(a, b, out, [=](R* result) { return join_from_start(a, b, result); });
 }
 
-/// out[i + j] += a[i] * b[j], the longer operand in the inner loop.
-template <class A, class B, class Out>
-void convolve(std::span<const A> a, std::span<const B> b, std::span<Out> out) {
-    if (a.size() > b.size()) return convolve(b, a, out);
-    for (std::size_t i = 0; i < a.size(); ++i) {
-        for (std::size_t j = 0; j < b.size(); ++j) out[i + j] += a[i] * b[j];
-    }
-}
-
-/// The same with the shorter polynomial as the taps of a filter, and zeros around the longer one.
-/// False where that does not pay, and beside an infinity, of which a zero would make a NaN.
-template <Record R, class T = scalar<R>>
-bool multiply_as_filter(std::span<const T> a, std::span<const T> b, std::span<T> out) {
-    constexpr std::size_t fewest = 16;
-    if (a.size() > b.size()) return multiply_as_filter<R>(b, a, out);
-    const auto is_finite = [](std::span<const T> c) {
-        const auto [none] = blockwise_sums<T>(
-            c.size(), [v = c.data()](auto points) { return std::array{points(v) * T(0)}; });
-        return none == T(0);
-    };
-    if (a.size() < fewest || !is_finite(a) || !is_finite(b)) return false;
-    const std::size_t order = a.size() - 1;
-    T* const padded = reserve_workspace<R>(b.size() + 2 * order);
-    if (!padded) return false;
-    std::fill_n(padded, order, T(0));
-    std::ranges::copy(b, padded + order);
-    std::fill_n(padded + order + b.size(), order, T(0));
-    kernel::convolve<T>({a.data(), 1, a.size()}, padded + order, 1, out.data(), out.size());
-    return true;
-}
-
 template <Record R>
 int multiply_apart(const R* a, const R* b, R* out) {
     const auto n = std::int64_t(length(a)), m = std::int64_t(length(b));
     R p = *a, q = *b;
     out->delta = (p.delta + q.delta) * scalar<R>(0.5);
     if (size_output(p, q, out, n && m ? n + m - 1 : 0, p.complex || q.complex)) return -1;
-    if (!a->complex && !b->complex &&
-        (multiply_by_spectra<R>(values(a), values(b), values(out)) ||
-         multiply_as_filter<R>(values(a), values(b), values(out)))) {
-        return 0;
-    }
-    std::ranges::fill(values(out), scalar<R>(0));
+    const auto multiply = [](auto first, auto second, auto product) {
+        if (!multiply_by_spectra<R>(first, second, product))
+            convolve<scalar<R>>(first, second, product);
+    };
     if (a->complex && b->complex) {
-        convolve(bins(a), bins(b), bins(out));
+        multiply(bins(a), bins(b), bins(out));
     } else if (a->complex) {
-        convolve(bins(a), values(b), bins(out));
+        multiply(values(b), bins(a), bins(out));
     } else if (b->complex) {
-        convolve(values(a), bins(b), bins(out));
+        multiply(values(a), bins(b), bins(out));
     } else {
-        convolve(values(a), values(b), values(out));
+        multiply(values(a), values(b), values(out));
     }
     return 0;
 }

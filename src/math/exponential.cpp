@@ -1,5 +1,5 @@
 // Logarithms, decibels and exponentials of the samples.
-#include "kernel/elementary.hpp"
+#include "math/limited.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
@@ -44,8 +44,7 @@ int take_logarithm(R* x) {
         kernel::map_complex(x->data, x->data, length(x),
                             [](Samples<scalar<R>> z) { return logarithm<R>(z); });
     } else {
-        kernel::map(x->data, x->data, used(x),
-                    [](V v) { return kernel::log(kernel::at_least(v, all<V>(limits<R>::floor))); });
+        kernel::map(x->data, x->data, used(x), [](V v) { return limited_logarithm<R>(v); });
     }
     return 0;
 }
@@ -84,9 +83,7 @@ template <Record R>
 int take_exponential(R* x) {
     using T = scalar<R>;
     using V = Lanes<T>;
-    const auto bounded = [](V v) {
-        return v > limits<R>::exp_limit ? all<V>(limits<R>::big) : kernel::exp(v);
-    };
+    const auto bounded = [](V v) { return limited_exponential<R>(v); };
     if (x->complex) {
         kernel::map_complex(x->data, x->data, length(x),
                             [=](Samples<T> z) { return from_polar<T>(bounded(z.re), z.im); });

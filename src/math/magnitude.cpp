@@ -2,7 +2,7 @@
 #include <algorithm>
 #include <limits>
 
-#include "kernel/elementary.hpp"
+#include "math/limited.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
@@ -53,19 +53,11 @@ int take_magnitude(const R* from, R* to) {
     return 0;
 }
 
-/// `result`, or the saturation value where the size of v is out of range.
-template <Record R, class V>
-V capped(V v, V result) {
-    return kernel::abs(v) > limits<R>::big ? all<V>(limits<R>::big) : result;
-}
-
 template <Record R>
 int take_magnitude_squared(const R* from, R* to) {
     using T = scalar<R>;
     if (from->complex) {
-        fold(from, to, [](Samples<T> z) {
-            return capped<R>(z.re, capped<R>(z.im, z.re * z.re + z.im * z.im));
-        });
+        fold(from, to, [](Samples<T> z) { return limited_magnitude_squared<R>(z); });
     } else {
         // The squares are in order as the sizes are, of neighbours too.
         constexpr T most = limits<R>::big * limits<R>::big;

@@ -1,7 +1,7 @@
 // Signs, scaling, limits and reciprocals of the samples.
 #include <utility>
 
-#include "kernel/elementary.hpp"
+#include "math/limited.hpp"
 #include "record_view.hpp"
 
 namespace wavkit {
@@ -115,8 +115,7 @@ int invert(R* x) {
         kernel::map_complex(x->data, x->data, length(x),
                             [](Samples<T> z) { return reciprocal<R>(z); });
     } else {
-        kernel::map(x->data, x->data, used(x),
-                    [](V v) { return v == T(0) ? kernel::all<V>(limits<R>::big) : T(1) / v; });
+        kernel::map(x->data, x->data, used(x), [](V v) { return limited_reciprocal_of<R>(v); });
     }
     return 0;
 }

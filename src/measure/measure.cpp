@@ -4,6 +4,7 @@
 #include <cstdint>
 
 #include "transform/record_transform.hpp"
+#include "window/generate.hpp"
 #include "window/tolerance.hpp"
 
 namespace wavkit {
@@ -45,6 +46,13 @@ int taper(R* x, int window, int flags, scalar<R> width) {
     return window > 0 || flags & rotated ? dspi_swap_halves2(x) : 0;
 }
 
+/// Whether a window is applied, and rotates, on the way to another record.
+template <Record R>
+bool tapers_apart(const R* in, int points, const R* out, int window, int flags) {
+    return points > 0 && window > 0 && !(flags & (DSP_SPECTRUM_NO_WINDOW | DSP_SPECTRUM_RAW)) &&
+           !shares_memory(in, out);
+}
+
 /// What a transform is multiplied by: nothing for a sum, else what makes it the mean over the
 /// measured points. A one-sided spectrum shows what the negative frequencies hold as well.
 template <class T>
@@ -74,7 +82,13 @@ int to_spectrum(const R* in, R* out, int npts, scalar<R> fraction, int window, i
     const auto [n, part] = frame<R>(npts, fraction, available, flags);
     if (n == 0) return -1;
     const T measured = std::min(T(n) * part, T(available));
-    if (dspu_subvec(in, out, 0, tol_ceil(measured))) return -1;
+    const int points = std::min(tol_ceil(measured), available);
+    if (tapers_apart(in, points, out, window, flags)) {
+        if (window_apart(in, points, out, n, window, DSP_SCALE_MEAN | DSP_SCALE_WIDTH, measured))
+            return -1;
+        return take_centred(out, full, forward_factor<T>(std::size_t(points), flags));
+    }
+    if (dspu_subvec(in, out, 0, points)) return -1;
     if (flags & DSP_SPECTRUM_RAW) return status(dspi_zpad(out, n) || dspi_fft(out, 0));
     const T factor = forward_factor<T>(length(out), flags);
     return status(taper(out, window, flags, measured) ||
@@ -127,6 +141,11 @@ int measure(const R* in, R* out, int npts, scalar<R> fraction, int window, int f
 template <Record R>
 int to_spectrum_of_length(const R* in, R* out, int window, int flags) {
     const bool full = is_full(in, flags);
+    const int points = int(length(in));
+    if (tapers_apart(in, points, out, window, flags)) {
+        if (window_apart(in, points, out, points, window, DSP_SCALE_MEAN, scalar<R>(0))) return -1;
+        return take_centred(out, full, forward_factor<scalar<R>>(length(in), flags));
+    }
     if (dsp_copy(out, in)) return -1;
     if (flags & DSP_SPECTRUM_RAW) return dspi_dft(out, 0);
     const bool rotates = window != 0 || flags & rotated;

@@ -62,11 +62,24 @@ Roots<T> solve_quadratic(T c2, T c1, T c0) {
     return roots;
 }
 
+/// The cube root; one of more than double precision by a step of Newton's from that of a double.
+template <class T>
+T cube_root(T x) {
+    if constexpr (std::same_as<T, long double>) {
+        const double near = std::cbrt(double(x));
+        if (!std::isnormal(near)) return std::cbrt(x);
+        const T root = near, square = root * root;
+        return root - (square * root - x) / (3 * square);
+    } else {
+        return std::cbrt(x);
+    }
+}
+
 /// x^3 + b2 x^2 + b1 x + b0: Cardano's formula where one root is real, Vieta's cosines where three
 /// are.
 template <class T>
 Roots<T> solve_cubic(T b2, T b1, T b0) {
-    const T third_turn = pi<T> / 3, half_root_of_3 = std::sqrt(T(3)) / 2;
+    constexpr T half_root_of_3 = T(0.866025403784438646763723170752936183L);
     const T p = b2 / 3;
     const T q = b1 / 3 - p * p;
     const T r = (b1 / 2 - p * p) * p - b0 / 2;
@@ -74,7 +87,7 @@ Roots<T> solve_cubic(T b2, T b1, T b0) {
     Roots<T> roots;
     if (discriminant > T(0)) {
         const T s = std::sqrt(discriminant);
-        const T outer = r > T(0) ? std::cbrt(s + r) : -std::cbrt(s - r);
+        const T outer = r > T(0) ? cube_root(s + r) : -cube_root(s - r);
         const T inner = -q / outer;
         const T sum = outer + inner;
         roots.add(sum - p);
@@ -82,10 +95,10 @@ Roots<T> solve_cubic(T b2, T b1, T b0) {
     } else {
         const T cosine = q == T(0) ? T(1) : r / (-q * std::sqrt(-q));
         const T angle = std::acos(std::clamp(cosine, T(-1), T(1))) / 3;
-        const T m = 2 * std::sqrt(-q);
-        roots.add(-m * std::cos(angle - third_turn) - p);
-        roots.add(-m * std::cos(angle + third_turn) - p);
-        roots.add(m * std::cos(angle) - p);
+        const T m = 2 * std::sqrt(-q), c = std::cos(angle), s = std::sin(angle);
+        roots.add(-m * (c / 2 + s * half_root_of_3) - p);  // cos(angle - pi / 3)
+        roots.add(-m * (c / 2 - s * half_root_of_3) - p);  // cos(angle + pi / 3)
+        roots.add(m * c - p);
     }
     return roots;
 }

@@ -103,7 +103,7 @@ Bin<scalar<R>> laguerre_step(Coefficients<scalar<R>> c, Bin<scalar<R>> z) {
     const auto h = g2 - quotient<R>(second_derivative(c, z), p);
     const auto s = square_root<R>((n * h - g2) * (n - 1));
     const auto sum = g + s, difference = g - s;
-    const bool larger = std::hypot(sum.re, sum.im) > std::hypot(difference.re, difference.im);
+    const bool larger = g.re * s.re + g.im * s.im > T(0);  // than the difference, in modulus
     const auto denominator = larger ? sum : difference;
     if (denominator.re == T(0) && denominator.im == T(0)) return {limits<R>::big, limits<R>::big};
     return quotient<R>({n, 0}, denominator);

@@ -1,6 +1,8 @@
 // A signal times a window, rotated on the way.
 #pragma once
 
+#include <algorithm>
+
 #include "kernel/lanes.hpp"
 #include "record_view.hpp"
 
@@ -19,25 +21,25 @@ inline void load_factors(const T* window, kernel::Vec<T, V> (&factors)[Width]) {
     }
 }
 
-/// samples[i] *= window[i]
+/// to[i] = from[i] * window[i]; to may be from.
 template <int Width, class T>
-void multiply(T* samples, const T* window, std::size_t n) {
+void multiply(const T* from, const T* window, T* to, std::size_t n) {
     constexpr int V = kernel::lanes<T>;
     std::size_t i = 0;
     for (; i + V <= n; i += V) {
-        T* const place = samples + Width * i;
         kernel::Vec<T, V> w[Width];
         load_factors<Width, T, V>(window + i, w);
         for (int k = 0; k < Width; ++k) {
-            kernel::store<T, V>(place + k * V, kernel::load<T, V>(place + k * V) * w[k]);
+            const std::size_t place = Width * i + std::size_t(k * V);
+            kernel::store<T, V>(to + place, kernel::load<T, V>(from + place) * w[k]);
         }
     }
     for (; i < n; ++i) {
-        for (int k = 0; k < Width; ++k) samples[Width * i + k] *= window[i];
+        for (int k = 0; k < Width; ++k) to[Width * i + k] = from[Width * i + k] * window[i];
     }
 }
 
-/// The same, with the halves of an even number of samples exchanged.
+/// The same in place, with the halves of an even number of samples exchanged.
 template <int Width, class T>
 void multiply_and_exchange(T* samples, const T* window, std::size_t half) {
     constexpr int V = kernel::lanes<T>;
@@ -71,8 +73,18 @@ int multiply_owned(R* x, const R* window, bool rotate) {
         multiply_and_exchange<Width>(x->data, window->data, n / 2);
         return 0;
     }
-    multiply<Width>(x->data, window->data, n);
+    multiply<Width>(x->data, window->data, x->data, n);
     return rotate ? dspi_swap_halves2(x) : 0;
+}
+
+/// Writes the first points of a signal, as many as the window has, times the window and rotated,
+/// with zeros between the two halves where there is room for more points.
+template <int Width, Record R>
+void multiply_apart(const R* in, const R* window, R* out) {
+    const std::size_t n = length(window), half = n / 2, room = length(out);
+    multiply<Width>(in->data + Width * half, window->data + half, out->data, n - half);
+    std::fill(out->data + Width * (n - half), out->data + Width * (room - half), scalar<R>(0));
+    multiply<Width>(in->data, window->data, out->data + Width * (room - half), half);
 }
 
 /// Multiplies a signal by a window of its length and spacing and, where asked to, rotates it.

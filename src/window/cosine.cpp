@@ -9,6 +9,21 @@
 namespace wavkit {
 namespace {
 
+/// sin(x) of |x| <= pi / 4: in double to one unit in the last place or, for what is rounded to
+/// single precision, to a 2^-35th.
+template <class T>
+WAVKIT_LANES Doubles sine_of_eighth(Doubles x) {
+    const Doubles square = x * x;
+    if constexpr (std::same_as<T, double>) {
+        return x + kernel::sine_tail(x, Doubles{}, square);
+    } else {
+        const auto tail =
+            kernel::polynomial(square, {-0.1666666666385529, 0.008333331874710208,
+                                        -0.00019840086735384846, 2.724992580305979e-06});
+        return kernel::mul_add(x * square, tail, x);
+    }
+}
+
 /// Sum of a[k] cos(k phi) at phi = 2 pi * position / period, position within half a period, by
 /// Clenshaw's recurrence. Reinsch's form of it, which carries 2 cos(phi) - 2 in the half of the
 /// window next to the centre and 2 cos(phi) + 2 in the outer one, does not lose digits where the
@@ -25,7 +40,7 @@ class CosineSum {
         const Vector signed_step = rounded(positions, [this](Doubles position) {
             const auto inner = 2 * position <= half_period_;
             const Doubles angle = (inner ? position : half_period_ - position) * half_step_;
-            const Doubles sine = angle + kernel::sine_tail(angle, Doubles{}, angle * angle);
+            const Doubles sine = sine_of_eighth<T>(angle);
             return (inner ? Doubles{} + 4.0 : Doubles{} - 4.0) * (sine * sine);
         });
         const Vector step = -signed_step;

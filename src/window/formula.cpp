@@ -1,6 +1,7 @@
 // Windows given by a formula: triangle, Kaiser, Gauss, powers of a sinc.
 #include <algorithm>
 #include <array>
+#include <numbers>
 
 #include "math/bessel.hpp"
 #include "window/generate.hpp"
@@ -34,6 +35,22 @@ int normalise_unit_peak(R* w, int mode) {
     if (mode == DSP_SCALE_PEAK) return 0;
     if (mode == 3) return dspi_scale(w, 0);
     return normalise(w, mode);
+}
+
+/// e^x of x <= 0: in double to one unit in the last place or, for what is rounded to single
+/// precision, to a 2^-32nd.
+template <class T>
+WAVKIT_LANES Doubles decay(Doubles x) {
+    if constexpr (std::same_as<T, double>) {
+        return kernel::exp(x);
+    } else {
+        const Doubles near = kernel::at_least(x, kernel::all<Doubles>(-746));
+        const Doubles k = kernel::round_product(near, std::numbers::log2e).number;
+        const Doubles r = kernel::mul_add(k, -std::numbers::ln2, near);
+        return kernel::scale(kernel::polynomial(r, {1.0, 1.0, 1 / 2.0, 1 / 6.0, 1 / 24.0, 1 / 120.0,
+                                                    1 / 720.0, 1 / 5040.0, 1 / 40320.0}),
+                             k);
+    }
 }
 
 /// s^p, continued to where s is not positive for the powers that allow it.
@@ -152,7 +169,7 @@ int gauss_fill(R* w, scalar<R> sigma, int scale_type) {
                      [](Doubles t) { return t < 1.0 ? kernel::all<Doubles>(1) : Doubles{}; });
     } else {
         const double deviation = w->points * double(sigma), k = -0.5 / (deviation * deviation);
-        fill_outward(w, symmetric, T(1), [=](Doubles t) { return kernel::exp(k * (t * t)); });
+        fill_outward(w, symmetric, T(1), [=](Doubles t) { return decay<T>(k * (t * t)); });
     }
     return normalise_unit_peak(w, scale_mode(scale_type));
 }

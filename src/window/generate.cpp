@@ -61,7 +61,7 @@ CachedWindow<R>* claim(int points) {
 
 /// A window that cannot be filled keeps its place, as zeros: asked for again, it is found.
 template <Record R>
-R* make(int points, int window, int options, scalar<R> win_length) {
+[[gnu::noinline]] R* make(int points, int window, int options, scalar<R> win_length) {
     CachedWindow<R>* slot = claim<R>(points);
     if (!slot) return nullptr;
     const int failed = window_fill(&slot->samples, window, options, win_length);
@@ -80,11 +80,17 @@ bool leaves_samples_alone(const R* x, int window, int scale_type, scalar<R> win_
     return !(scale_type & DSP_SCALE_SYMMETRIC) && tol_ceil(win_length) >= x->points;
 }
 
+/// The samples of a window, kept or made; null when it cannot be.
+template <Record R>
+R* obtain(int points, int window, int scale_type, scalar<R> win_length) {
+    const int options = scale_type & shape_options;
+    CachedWindow<R>* known = find<R>(points, window, options, win_length);
+    return known ? &known->samples : make<R>(points, window, options, win_length);
+}
+
 template <Record R>
 int apply_cached(R* x, int window, int scale_type, scalar<R> win_length, bool rotate) {
-    const int options = scale_type & shape_options;
-    CachedWindow<R>* known = find<R>(x->points, window, options, win_length);
-    R* samples = known ? &known->samples : make<R>(x->points, window, options, win_length);
+    R* samples = obtain<R>(x->points, window, scale_type, win_length);
     if (!samples) return -1;
     samples->delta = x->delta;
     return apply_samples(x, samples, rotate);
@@ -124,8 +130,26 @@ int window_fill(R* w, int window, int scale_type, scalar<R> win_length) {
     return cosine_window_fill(w, window, scale_type, win_length);
 }
 
+template <Record R>
+int window_apart(const R* in, int points, R* out, int room, int window, int scale_type,
+                 scalar<R> win_length) {
+    R* const samples = obtain<R>(points, window, scale_type, win_length);
+    if (!samples) {
+        dspu_subvec(in, out, 0, points);
+        return -1;
+    }
+    out->points = room;
+    out->complex = in->complex;
+    samples->delta = out->delta = in->delta;
+    if (dsp_alloc(out)) return -1;
+    in->complex ? multiply_apart<2>(in, samples, out) : multiply_apart<1>(in, samples, out);
+    return 0;
+}
+
 template int window_fill(dsp*, int, int, double);
 template int window_fill(dspf*, int, int, float);
+template int window_apart(const dsp*, int, dsp*, int, int, int, double);
+template int window_apart(const dspf*, int, dspf*, int, int, int, float);
 
 }  // namespace wavkit
 

@@ -15,6 +15,12 @@ constexpr int scale_mode(int scale_type) { return scale_type & 3; }
 template <Record R>
 int window_fill(R* w, int window, int scale_type, scalar<R> win_length);
 
+/// What copying the first `points` >= 1 points, dspi_window2() of a window that rotates and padding
+/// to `room` points amid them leave in `out`, in one pass; `out` shares no memory with the signal.
+template <Record R>
+int window_apart(const R* in, int points, R* out, int room, int window, int scale_type,
+                 scalar<R> win_length);
+
 /// a[0] + a[1] cos(phi) + ..., not normalised.
 template <Record R>
 int cosine_sum_fill(R* w, std::span<const scalar<R>> a, int scale_type, scalar<R> win_length);

@@ -53,6 +53,45 @@ BOTH_PRECISIONS(Interpolate, EveryMethodInsideAndOutsideTheTable) {
     }
 }
 
+BOTH_PRECISIONS(Interpolate, LongTablesAtAnyDensityAndOutOfOrder) {
+    constexpr int n = 150, places = 400;
+    Noise noise;
+    for (const double step : {0.01, 0.4, 1.1, 9.0}) {
+        auto x = noise.real<R>(n), y = noise.real<R>(n), t = noise.real<R>(places);
+        for (int i = 0; i < n; ++i) x[i] = T(i + 0.4 * x[i]);
+        for (int j = 0; j < places; ++j) t[j] = T(step * (j + 0.5 * t[j]) - 3);
+        if (step == 0.4) t[77] = t[301] = t[12], t[102] = T(nan);
+        const auto slope = [&](int k) {
+            return ((long double)y[k] - y[k - 1]) / (x[k] - x[k - 1]);
+        };
+        for (const unsigned method : {0u, 1u, 3u, 1u | DSP_INTERP_HOLD_ENDS}) {
+            const bool parabola = method == 3, ends = method & DSP_INTERP_HOLD_ENDS;
+            bool leads = ends, held = false;
+            Signal<R> out;
+            ASSERT_EQ(dsp_interp(x, y, nullptr, t, out, method), 0);
+            for (int j = 0, k = 1; j < places; ++j) {
+                const T v = t[j];
+                while (parabola ? k < n - 2 && v - x[k] > x[k + 1] - v : k < n - 1 && v >= x[k])
+                    ++k;
+                leads = leads && v < x[0];
+                held = held || ((ends || method == 0) && v >= x[n - 1]);
+                const long double d = (long double)v - x[k - 1], e = (long double)v - x[k];
+                long double want = y[k - 1], size = 1;
+                if (method != 0) want += d * slope(k), size += 8 * std::fabs(d);
+                if (parabola) {
+                    want += d * e * (slope(k + 1) - slope(k)) / (x[k + 1] - x[k - 1]);
+                    size += 8 * std::fabs(d * e);
+                }
+                if (leads) want = y[0];
+                if (held) want = y[n - 1];
+                ASSERT_TRUE(std::isnan(want) ? std::isnan(out[j])
+                                             : std::fabs(out[j] - want) <= 8 * size * epsilon<R>)
+                    << step << ' ' << method << ' ' << j;
+            }
+        }
+    }
+}
+
 BOTH_PRECISIONS(Interpolate, Refusals) {
     const auto x = real<R>({0, 1, 2, 3, 4}), z = complex<R>({0, 1, 2, 3, 4});
     const auto four = real<R>({0, 1, 2, 3});

@@ -60,6 +60,36 @@ BOTH_PRECISIONS(Average, EachTypeByHand) {
     }
 }
 
+BOTH_PRECISIONS(Average, LongSpectraUpToTheEndsOfTheRange) {
+    constexpr long double big = limits<R>::big, tiny = std::numeric_limits<T>::min();
+    const auto reciprocal = [](long double v) { return v == 0 ? big : 1 / v; };
+    const auto logarithm = [](long double v) { return std::log(std::fmax(v, tiny)); };
+    Noise noise;
+    for (const int flags : {1, 4, 5, 0x21, 0x24, 0x25}) {
+        const bool power = flags & DSP_AVG_POWER;
+        auto x = power ? noise.complex<R>(53) : noise.real<R>(53), avg = noise.real<R>(53);
+        for (auto& v : values(x.get())) v = std::fabs(v) + T(0.1);
+        for (auto& v : values(avg.get())) v = std::fabs(v) + T(0.1);
+        x[0] = avg[4] = 0, x[9] = T(2 * big), x[20] = avg[20] = T(tiny), avg[30] = T(big / 2);
+        const Samples in = samples_of<R>(x), old = samples_of<R>(avg);
+        Borrowed<R> host(avg);
+        ASSERT_EQ(dsph_avg(x, host, null<R>, flags, 3, 0, T(0.25), 0), 0);
+        ASSERT_EQ(dsph_avg(x, avg, null<R>, flags, 3, 0, T(0.25), 0), 0);
+        EXPECT_TRUE(scalars<R>(avg) == scalars<R>(host));
+        for (std::size_t i = 0; i < 53; ++i) {
+            const bool beyond = in[i].real() > big || in[i].imag() > big;
+            const long double a = !power ? in[i].real() : beyond ? big : std::norm(in[i]);
+            const long double b = old[i].real();
+            long double want = a / 4 + b * 3 / 4;
+            if ((flags & 15) == 4) want = reciprocal(reciprocal(a) / 4 + reciprocal(b) * 3 / 4);
+            if ((flags & 15) == 5) want = std::exp(logarithm(a) / 4 + logarithm(b) * 3 / 4);
+            // Logarithms of up to 708 become relative errors.
+            EXPECT_LE(std::fabs(avg[int(i)] - want), (flags & 1 ? 800 : 8) * epsilon<R> * want)
+                << flags << ' ' << i;
+        }
+    }
+}
+
 BOTH_PRECISIONS(Average, TheInputMayServeAsScratch) {
     auto x = complex<R>({{3, 4}, {0, 2}});
     auto avg = real<R>({5, 0});
