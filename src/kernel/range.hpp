@@ -20,28 +20,6 @@ WAVKIT_LANES bool all_set(Bits<V> mask) {
     return all != 0;
 }
 
-/// Whether any lane's magnitude is not within low ... high; a NaN is not.
-template <class V>
-WAVKIT_LANES bool any_outside(V v, Lane<V> low, Lane<V> high) {
-    const V size = abs(v);
-#if defined(__AVX512F__)
-    if constexpr (sizeof(V) == 64) {
-        if constexpr (is_double<V>) {
-            const auto within = _mm512_mask_cmp_pd_mask(
-                _mm512_cmp_pd_mask((__m512d)size, _mm512_set1_pd(high), _CMP_LE_OQ), (__m512d)size,
-                _mm512_set1_pd(low), _CMP_GE_OQ);
-            return within != 0xff;
-        } else {
-            const auto within = _mm512_mask_cmp_ps_mask(
-                _mm512_cmp_ps_mask((__m512)size, _mm512_set1_ps(high), _CMP_LE_OQ), (__m512)size,
-                _mm512_set1_ps(low), _CMP_GE_OQ);
-            return within != 0xffff;
-        }
-    }
-#endif
-    return !all_set<V>((size >= low) & (size <= high));
-}
-
 /// Whether any lane is above `high` or a NaN.
 template <class V>
 WAVKIT_LANES bool any_beyond(V v, Lane<V> high) {

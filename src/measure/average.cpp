@@ -136,8 +136,8 @@ WAVKIT_LANES V harmonic_mean(V a, V b, scalar<R> weight) {
     using T = scalar<R>;
     constexpr T safe = sizeof(T) == 8 ? T(0x1p500) : T(0x1p50);
     const V product = a * b, sum = kernel::mul_add(b - a, weight, a);
-    if (kernel::any_outside(product, 1 / safe, safe) || kernel::any_outside(sum, 1 / safe, safe))
-        [[unlikely]] {
+    if (kernel::any_outside(kernel::abs(product), 1 / safe, safe) ||
+        kernel::any_outside(kernel::abs(sum), 1 / safe, safe)) [[unlikely]] {
         const V u = limited_reciprocal_of<R>(a), v = limited_reciprocal_of<R>(b);
         return limited_reciprocal_of<R>((u - v) * weight + v);
     }
