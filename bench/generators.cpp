@@ -101,10 +101,13 @@ void waveforms(const Family<R>& f) {
           {{"loop", [](O o) {
                 for (std::size_t i = 0; i < o.n; ++i) o.a[i] += T(.5) * std::cos(angle<T>(i));
             }}});
+    // The library adds step after step, as it says, and so rounds each time.
     f.row("line", x, [](R* r) { return dspc_line(r, T(.001), 1); },
-          {{"loop", [](O o) {
+          {{"loop",
+            [](O o) {
                 for (int i = 0; i < int(o.n); ++i) o.a[i] = 1 + T(i) * T(.001);
-            }}});
+            }}},
+          {{}, sizeof(T) == 8 ? 1e-9 : 5e-2});
     if (f.n > 65536) return;
     f.row("fir, low-pass", x, [](R* r) { return dspc_fir(r, DSP_FIR_LOW_PASS, T(.1), 0); },
           {{"loop", [](O o) {

@@ -1,6 +1,4 @@
 // Mathematics in place, sample by sample, and points put into another order.
-#include <gsl/gsl_randist.h>
-#include <gsl/gsl_rng.h>
 #include <gsl/gsl_sf_bessel.h>
 #include <hwy/contrib/sort/vqsort.h>
 
@@ -112,24 +110,25 @@ void running(const Family<R>& f) {
               return dspi_limit(r, -5, 5, &clipped);
           },
           {loop<T>([](T v) { return std::min(std::max(v, T(-5)), T(5)); })});
-    f.row("differ", x, dspi_differ, {{"loop", [](Operands<T> o) {
-                                          for (std::size_t i = o.n; i-- > 1;) o.a[i] -= o.a[i - 1];
-                                      }}});
-    f.row("integ", x, dspi_integ,
-          {{"loop", [](Operands<T> o) { std::partial_sum(o.a, o.a + o.n, o.a); }}});
+    const auto differences = [](Operands<T> o) {
+        for (std::size_t i = o.n; i-- > 1;) o.a[i] -= o.a[i - 1];
+    };
+    const auto sums = [](Operands<T> o) { std::partial_sum(o.a, o.a + o.n, o.a); };
+    const auto unwrapped = [](Operands<T> o) {
+        T turns = 0, last = o.a[0];
+        for (std::size_t i = 1; i < o.n; ++i) {
+            const T v = o.a[i];
+            turns -= std::round((v - last) * (1 / two_pi<T>));
+            last = v;
+            o.a[i] = v + turns * two_pi<T>;
+        }
+    };
     const Input wrapped{[](std::size_t i) {
         return std::remainder(.37 * double(i) + uniform(-1, 1), two_pi<double>);
     }};
-    f.row("unwrap", wrapped, dspi_unwrap, {{"loop", [](Operands<T> o) {
-                                                T turns = 0, last = o.a[0];
-                                                for (std::size_t i = 1; i < o.n; ++i) {
-                                                    const T v = o.a[i];
-                                                    turns -=
-                                                        std::round((v - last) * (1 / two_pi<T>));
-                                                    last = v;
-                                                    o.a[i] = v + turns * two_pi<T>;
-                                                }
-                                            }}});
+    f.row("differ", x, dspi_differ, {{"loop", differences}});
+    f.row("integ", x, dspi_integ, {{"loop", sums}});
+    f.row("unwrap", wrapped, dspi_unwrap, {{"loop", unwrapped}});
 }
 
 template <Record R, class T = scalar<R>>
@@ -182,15 +181,10 @@ void orders(const Family<R>& f) {
         std::sort(result.begin(), result.end());
         return result;
     };
-    f.row("shuffle", x, dspi_shuffle,
-          {{"std::shuffle",
-            [bits = std::mt19937_64()](O o) mutable { std::shuffle(o.a, o.a + o.n, bits); }},
-           {"GSL",
-            [](O o) {
-                static gsl_rng* const bits = gsl_rng_alloc(gsl_rng_taus2);
-                gsl_ran_shuffle(bits, o.a, o.n, sizeof(T));
-            }}},
-          {any_order});
+    const auto shuffle = [bits = std::mt19937_64()](O o) mutable {
+        std::shuffle(o.a, o.a + o.n, bits);
+    };
+    f.row("shuffle", x, dspi_shuffle, {{"std::shuffle", shuffle}}, {any_order});
 }
 
 [[maybe_unused]] const bool added = at_every_size("mathematics", [](const auto& f) {

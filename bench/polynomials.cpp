@@ -1,6 +1,5 @@
 // Polynomials and tables: values, roots, interpolation, splines.
 #include <gsl/gsl_poly.h>
-#include <gsl/gsl_spline.h>
 
 #include <unsupported/Eigen/Polynomials>
 #include "peers.hpp"
@@ -110,21 +109,6 @@ void tables(const Family<R>& f) {
             return dsp_interp(knots->get(), v, moments->get(), t, out, method);
         };
     };
-    // GSL's tables are doubles.
-    const auto gsl = [&](const gsl_interp_type* type) {
-        const std::vector<double> xd(x.get(), x.get() + n), yd(y.get(), y.get() + n);
-        gsl_spline* const curve = gsl_spline_alloc(type, n);
-        gsl_spline_init(curve, xd.data(), yd.data(), n);
-        const std::shared_ptr<gsl_spline> owned(curve, gsl_spline_free);
-        const std::shared_ptr<gsl_interp_accel> place(gsl_interp_accel_alloc(),
-                                                      gsl_interp_accel_free);
-        return Peer<T>{"GSL", [=](Operands<T> o) {
-                           for (std::size_t i = 0; i < o.n; ++i) {
-                               o.y[i] =
-                                   T(gsl_spline_eval(owned.get(), double(o.b[i]), place.get()));
-                           }
-                       }};
-    };
     const Input values{[y, n](std::size_t i) { return i < n ? double(y[i]) : 0; }};
     const Input ascending{[n](std::size_t i) {
         return 1 + (double(i) + uniform(0, .5)) * (double(n) - 3) / double(n);
@@ -132,19 +116,15 @@ void tables(const Family<R>& f) {
     f.row("hold", values, ascending, ours(DSP_INTERP_HOLD),
           {walk<T>(x, 1, [](const T* v, std::size_t k, T) { return v[k]; })});
     f.row("linear", values, ascending, ours(DSP_INTERP_LINEAR),
-          {walk<T>(x, 2,
-                   [x](const T* v, std::size_t k, T t) {
-                       return v[k] + (v[k + 1] - v[k]) * (t - x[k]) / (x[k + 1] - x[k]);
-                   }),
-           gsl(gsl_interp_linear)});
+          {walk<T>(x, 2, [x](const T* v, std::size_t k, T t) {
+              return v[k] + (v[k + 1] - v[k]) * (t - x[k]) / (x[k + 1] - x[k]);
+          })});
     f.row("spline", values, ascending, ours(DSP_INTERP_SPLINE),
-          {walk<T>(x, 2,
-                   [=](const T* v, std::size_t k, T t) {
-                       const T h = x[k + 1] - x[k], a = x[k + 1] - t, b = t - x[k];
-                       const T bend = a * (a * a - h * h) * m[k] + b * (b * b - h * h) * m[k + 1];
-                       return (a * v[k] + b * v[k + 1] + bend * T(1 / 6.)) / h;
-                   }),
-           gsl(gsl_interp_cspline)});
+          {walk<T>(x, 2, [=](const T* v, std::size_t k, T t) {
+              const T h = x[k + 1] - x[k], a = x[k + 1] - t, b = t - x[k];
+              const T bend = a * (a * a - h * h) * m[k] + b * (b * b - h * h) * m[k + 1];
+              return (a * v[k] + b * v[k + 1] + bend * T(1 / 6.)) / h;
+          })});
     f.row("spline, moments", values,
           [=](R* v, R* out) {
               return dspb_cspline_2d(knots->get(), v, out, 0, 0, DSP_SPLINE_NATURAL,
@@ -153,16 +133,18 @@ void tables(const Family<R>& f) {
           {{"loop", [=](Operands<T> o) { solve(x.get(), o.a, o.y, o.n, work.get()); }}});
 }
 
-[[maybe_unused]] const bool added = at_every_size("polynomials", [](const auto& f) { value(f); }) &&
-                                    add_family([] {
-                                        for (const std::size_t degree : {3, 4, 5, 8, 20, 40}) {
-                                            roots<dsp>(degree);
-                                            roots<dspf>(degree);
-                                        }
-                                    }) &&
-                                    at_every_size("interpolation", [](const auto& f) {
-                                        if (f.wants("hold, linear, spline, moments")) tables(f);
-                                    });
+void all_roots() {
+    for (const std::size_t degree : {3, 4, 5, 8, 20, 40}) {
+        roots<dsp>(degree);
+        roots<dspf>(degree);
+    }
+}
+
+[[maybe_unused]] const bool added[] = {
+    at_every_size("polynomials", [](const auto& f) { value(f); }), add_family(all_roots),
+    at_every_size("interpolation", [](const auto& f) {
+        if (f.wants("hold, linear, spline, moments")) tables(f);
+    })};
 
 }  // namespace
 }  // namespace wavkit::bench

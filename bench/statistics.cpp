@@ -1,6 +1,5 @@
 // Signals reduced to a value, a histogram or a line.
 #include <gsl/gsl_cblas.h>
-#include <gsl/gsl_histogram.h>
 #include <hwy/contrib/sort/vqsort.h>
 
 #include "peers.hpp"
@@ -153,16 +152,8 @@ void ranks(const Family<R>& f) {
                 for (std::size_t k = 0; k < bins_of_histogram; ++k) {
                     o.y[k] = T(counts[0][k] + counts[1][k] + counts[2][k] + counts[3][k]);
                 }
-            }},
-           {"GSL",
-            [](O o) {
-                static gsl_histogram* const counts = gsl_histogram_alloc(bins_of_histogram);
-                gsl_histogram_set_ranges_uniform(counts, 0, 1);
-                for (std::size_t i = 0; i < o.n; ++i)
-                    gsl_histogram_increment(counts, double(o.a[i]));
-                std::copy_n(counts->bin, bins_of_histogram, o.y);
             }}},
-          {cumulative});
+          {cumulative, 4 / double(f.n) + 1e-5});
 }
 
 template <Record R, class T = scalar<R>>
