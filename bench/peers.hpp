@@ -161,11 +161,18 @@ void multiply(T* __restrict z, const T* __restrict h, std::size_t bins, T factor
     }
 }
 
+/// Where the transform of x goes: to a buffer of `count` scalars, or for long ones back to x. Plans
+/// between two long buffers take minutes to measure, and are no faster.
+template <class T>
+Samples<T> target_of(const Samples<T>& x, std::size_t count) {
+    return count > 1 << 19 ? x : samples<T>(count);
+}
+
 /// A real transform to and fro in buffers of its own: samples x, bins z.
 template <class T>
 struct RealPair {
     std::size_t n;
-    Samples<T> x = samples<T>(n + 2), z = samples<T>(n + 2);
+    Samples<T> x = samples<T>(n + 2), z = target_of(x, n + 2);
     Plan<T> forward = Plan<T>::real(n, x.get(), z.get());
     Plan<T> back = Plan<T>::inverse(n, z.get(), x.get());
 

@@ -151,8 +151,8 @@ int run(int argc, char** argv) {
     if (options["library"].empty()) options["library"] = beside / "../lib/libwavkit.so";
     sets = load_sets(options["library"]);
     openblas_set_num_threads(1);
-    fftw_set_timelimit(4);
-    fftwf_set_timelimit(4);
+    fftw_set_timelimit(20);
+    fftwf_set_timelimit(20);
     output.open(options["output"]);
     output << "{\"about\": \"" << options["about"] << "\", \"seed\": " << options["seed"]
            << ", \"cells\": [";

@@ -8,12 +8,12 @@ namespace {
 
 template <Record R, class T = scalar<R>>
 void cosine_transforms(const Family<R>& f) {
-    const auto plan_of = [x = samples<T>(f.n), y = samples<T>(f.n), n = f.n](fftw_r2r_kind kind,
-                                                                             T scale) {
-        return [=, plan = Plan<T>::cosine(n, x.get(), y.get(), kind)](Operands<T> o) {
-            std::copy_n(o.a, o.n, x.get());
+    const auto in = samples<T>(f.n), out = target_of(in, f.n);
+    const auto plan_of = [=, n = f.n](fftw_r2r_kind kind, T scale) {
+        return [=, plan = Plan<T>::cosine(n, in.get(), out.get(), kind)](Operands<T> o) {
+            std::copy_n(o.a, o.n, in.get());
             plan();
-            for (std::size_t i = 0; i < o.n; ++i) o.a[i] = y[i] * scale;
+            for (std::size_t i = 0; i < o.n; ++i) o.a[i] = out[i] * scale;
         };
     };
     std::vector<Peer<T>> peers{{"FFTW", plan_of(FFTW_REDFT10, T(.5) / T(f.n))}};
@@ -49,7 +49,7 @@ void cosine_transforms(const Family<R>& f) {
 template <Record R, class T = scalar<R>>
 void phase_shifts(const Family<R>& f) {
     const RealPair<T> pair{f.n};
-    const auto z = samples<T>(2 * f.n), out = samples<T>(2 * f.n);
+    const auto z = samples<T>(2 * f.n), out = target_of(z, 2 * f.n);
     const auto back = Plan<T>::complex(f.n, z.get(), out.get(), FFTW_BACKWARD);
     const std::size_t inner = 2 * ((f.n + 1) / 2), all = 2 * (f.n / 2 + 1);  // scalars of bins
     f.row("analytic", real(-1, 1), dspi_analytic, {{"FFTW", [=](Operands<T> o) {

@@ -92,7 +92,8 @@ std::size_t largest(std::size_t n, F f) {
         if (here > most) best = first;
         most = here;
     }
-    while (f(best) != most) ++best;
+    const std::size_t end = std::min(best + block, n);
+    for (std::size_t i = best; i < end; ++i) best = f(i) > f(best) ? i : best;
     return best;
 }
 

@@ -49,7 +49,7 @@ void add(const std::string& family, std::size_t n, bool real, std::size_t bytes,
             }
         }
     };
-    const auto in = samples<T>(made + offset), out = samples<T>(made + offset);
+    const auto in = samples<T>(made + offset), out = target_of(in, made + offset);
     const auto peer = [&](const char* name, T* to) {
         T* const from = in.get() + offset;
         const auto plan = real ? Plan<T>::real(n, from, to) : Plan<T>::complex(n, from, to);
@@ -59,12 +59,9 @@ void add(const std::string& family, std::size_t n, bool real, std::size_t bytes,
         };
         return runner(name, from, to, run, 1 / double(n));
     };
-    race({family,
-          std::to_string(n),
-          column,
-          double(n),
-          runner("", x.data, x.data, ours, 1),
-          {peer("FFTW", out.get() + offset), peer("FFTW in place", in.get() + offset)},
+    std::vector<Runner> peers{peer("FFTW in place", in.get() + offset)};
+    if (out != in) peers.push_back(peer("FFTW", out.get() + offset));
+    race({family, std::to_string(n), column, double(n), runner("", x.data, x.data, ours, 1), peers,
           sizeof(T) == 8 ? 1e-12 : 1e-4});
 }
 
@@ -91,7 +88,9 @@ std::size_t largest_prime(std::size_t n) {
 void lengths(const char* family, std::vector<std::size_t> all, bool smooth) {
     for (const std::size_t enough = all.size() + 5; all.size() < enough;) {
         const std::size_t n = drawn(6, 300000);
-        if (!std::has_single_bit(n) && (largest_prime(n) <= 7) == smooth) all.push_back(n);
+        const bool known = std::find(all.begin(), all.end(), n) != all.end();
+        if (known || std::has_single_bit(n) || (largest_prime(n) <= 7) != smooth) continue;
+        all.push_back(n);
     }
     std::sort(all.begin(), all.end());
     for (const std::size_t n : all) {
