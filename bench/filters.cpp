@@ -1,162 +1,140 @@
-// FIR filters beside the plain loop and overlap-save through FFTW (MEASURE), at the transform
-// length that serves it best.
-//
-// Each filters block after block with the history of the ones before. Small random samples: sums of
-// zeros would spare nobody anything, but decaying ones could become subnormal.
-#include <benchmark/benchmark.h>
-#include <fftw3.h>
-#include <wavkit/dsp.h>
+// FIR filters, block after block with the history of the ones before, beside a loop over vectors of
+// outputs, overlap-save through FFTW and liquid-dsp.
+#include <complex>
 
-#include <algorithm>
+#include <liquid/liquid.h>
+
 #include <bit>
 #include <chrono>
-#include <complex>
-#include <cstdlib>
-#include <memory>
-#include <string>
-#include <vector>
 
-#include "ratios.hpp"
+#include "peers.hpp"
 
+namespace wavkit::bench {
 namespace {
 
-using Samples = std::vector<double>;
+/// Outputs to the samples behind the first `taps - 1` points of a stream.
+template <class T>
+using Filter = std::function<void(const T* stream, T* out, std::size_t points)>;
 
-Samples noise(std::size_t n) {
-    Samples x(n);
-    for (auto& v : x) v = std::rand() / double(RAND_MAX) - 0.5;
-    return x;
-}
-
-dsp borrowed(Samples& x) { return {1, x.data(), 0, int(x.size()), 0, 0}; }
-
-void wavkit_filter(benchmark::State& state, std::size_t taps, std::size_t block) {
-    auto h = noise(taps), x = noise(block);
-    const dsp filter = borrowed(h), in = borrowed(x);
-    dsp out, history;
-    dsp_init(&out);
-    dsp_init(&history);
-    for (auto _ : state) {
-        if (dspd_fir(&in, &out, &filter, &history)) state.SkipWithError("filtering failed");
-        benchmark::ClobberMemory();
-    }
-    dsp_destroy(&out);
-    dsp_destroy(&history);
-}
-
-void loop_filter(benchmark::State& state, std::size_t taps, std::size_t block) {
-    const auto h = noise(taps), x = noise(block);
-    Samples stream(taps - 1 + block), out(block);
-    for (auto _ : state) {
-        std::copy(stream.end() - std::ptrdiff_t(taps - 1), stream.end(), stream.begin());
-        std::copy(x.begin(), x.end(), stream.begin() + std::ptrdiff_t(taps - 1));
-        for (std::size_t n = 0; n < block; ++n) {
-            double sum = 0;
-            for (std::size_t k = 0; k < taps; ++k) sum += h[k] * stream[n + taps - 1 - k];
-            out[n] = sum;
+/// Taps one by one, for as many outputs at a time as registers hold. Writes whole lots of them.
+template <class T>
+Filter<T> direct(const std::vector<T>& taps, std::size_t width) {
+    return [=](const T* stream, T* out, std::size_t points) {
+        constexpr std::size_t lot = 512 / sizeof(T);
+        for (std::size_t i = 0; i < points * width; i += lot) {
+            T sums[lot] = {};
+            for (std::size_t k = 0; k < taps.size(); ++k) {
+                const T* const x = stream + i + width * (taps.size() - 1 - k);
+                for (std::size_t j = 0; j < lot; ++j) sums[j] += taps[k] * x[j];
+            }
+            std::copy_n(sums, lot, out + i);
         }
-        benchmark::ClobberMemory();
-    }
+    };
 }
 
 /// Overlap-save with transforms of one length.
-class OverlapSave {
-  public:
-    OverlapSave(const Samples& taps, int length)
-        : length_(std::size_t(length)),
-          order_(taps.size() - 1),
-          samples_(fftw_alloc_real(length_), fftw_free),
-          bins_(fftw_alloc_complex(length_ / 2 + 1), fftw_free),
-          forward_(fftw_plan_dft_r2c_1d(length, samples_.get(), bins_.get(), FFTW_MEASURE)),
-          back_(fftw_plan_dft_c2r_1d(length, bins_.get(), samples_.get(), FFTW_MEASURE)) {
-        std::fill_n(samples_.get(), length_, 0);
-        std::transform(taps.begin(), taps.end(), samples_.get(),
-                       [=](double h) { return h / length; });
-        fftw_execute(forward_);
-        spectrum_.assign(bins(), bins() + length_ / 2 + 1);
-    }
-    OverlapSave(const OverlapSave&) = delete;
-    OverlapSave& operator=(const OverlapSave&) = delete;
-    ~OverlapSave() {
-        fftw_destroy_plan(forward_);
-        fftw_destroy_plan(back_);
-    }
-
-    /// Outputs to the samples behind the first `order` ones of a stream.
-    void run(const Samples& stream, Samples& out) {
-        const std::size_t fresh = length_ - order_;
-        for (std::size_t first = 0; first < out.size(); first += fresh) {
-            const std::size_t count = std::min(fresh, out.size() - first);
-            std::copy_n(stream.data() + first, order_ + count, samples_.get());
-            std::fill_n(samples_.get() + order_ + count, fresh - count, 0);
-            fftw_execute(forward_);
-            for (std::size_t i = 0; i < spectrum_.size(); ++i) {
-                const auto x = bins()[i], h = spectrum_[i];
-                bins()[i] = {x.real() * h.real() - x.imag() * h.imag(),
-                             x.real() * h.imag() + x.imag() * h.real()};
-            }
-            fftw_execute(back_);
-            std::copy_n(samples_.get() + order_, count, out.data() + first);
+template <class T>
+Filter<T> overlap_save(const std::vector<T>& taps, std::size_t width, std::size_t length) {
+    const std::size_t order = taps.size() - 1, bins = width == 2 ? length : length / 2 + 1;
+    const auto x = samples<T>(2 * length), z = samples<T>(2 * bins), h = samples<T>(2 * bins);
+    const auto forward = width == 2 ? Plan<T>::complex(length, x.get(), z.get())
+                                    : Plan<T>::real(length, x.get(), z.get());
+    const auto back = width == 2 ? Plan<T>::complex(length, z.get(), x.get(), FFTW_BACKWARD)
+                                 : Plan<T>::inverse(length, z.get(), x.get());
+    std::fill_n(x.get(), 2 * length, T(0));
+    for (std::size_t k = 0; k <= order; ++k) x[width * k] = taps[k] / T(length);
+    forward();
+    std::copy_n(z.get(), 2 * bins, h.get());
+    return [=](const T* stream, T* out, std::size_t points) {
+        const std::size_t fresh = length - order;
+        for (std::size_t first = 0; first < points; first += fresh) {
+            const std::size_t count = std::min(fresh, points - first);
+            T* const end = std::copy_n(stream + width * first, width * (order + count), x.get());
+            std::fill(end, x.get() + width * length, T(0));
+            forward();
+            multiply(z.get(), h.get(), bins);
+            back();
+            std::copy_n(x.get() + width * order, width * count, out + width * first);
         }
-    }
+    };
+}
 
-  private:
-    std::complex<double>* bins() { return reinterpret_cast<std::complex<double>*>(bins_.get()); }
-
-    std::size_t length_, order_;
-    std::unique_ptr<double, void (*)(void*)> samples_;
-    std::unique_ptr<fftw_complex, void (*)(void*)> bins_;
-    fftw_plan forward_, back_;
-    std::vector<std::complex<double>> spectrum_;
-};
-
-/// The fastest of the lengths that are worth a try.
-std::unique_ptr<OverlapSave> best_overlap_save(const Samples& taps, const Samples& stream,
-                                               Samples& out) {
+/// The fastest of the transform lengths that are worth a try.
+template <class T>
+Filter<T> best_overlap_save(const std::vector<T>& taps, std::size_t width, std::size_t points) {
     using Clock = std::chrono::steady_clock;
-    std::unique_ptr<OverlapSave> best;
+    const auto in = samples<T>(width * (taps.size() + points)), out = samples<T>(width * points);
+    Filter<T> best;
     auto least = Clock::duration::max();
-    for (auto length = std::bit_ceil(2 * taps.size()); !best || length <= 1 << 18; length *= 2) {
-        auto filter = std::make_unique<OverlapSave>(taps, int(length));
-        filter->run(stream, out);
-        const auto start = Clock::now();
-        filter->run(stream, out);
-        const auto time = Clock::now() - start;
-        if (time < least) {
+    for (auto length = std::bit_ceil(2 * taps.size()); !best || length <= 1 << 17; length *= 2) {
+        const auto filter = overlap_save(taps, width, length);
+        for (int turn = 0; turn < 4; ++turn) {
+            const auto start = Clock::now();
+            filter(in.get(), out.get(), points);
+            const auto time = Clock::now() - start;
+            if (turn == 0 || time >= least) continue;
             least = time;
-            best = std::move(filter);
+            best = filter;
         }
-        if (length >= stream.size()) break;
+        if (length >= points + taps.size()) break;
     }
     return best;
 }
 
-void fftw_filter(benchmark::State& state, std::size_t taps, std::size_t block) {
-    const auto h = noise(taps), x = noise(block);
-    Samples stream(taps - 1 + block), out(block);
-    const auto filter = best_overlap_save(h, stream, out);
-    for (auto _ : state) {
-        std::copy(stream.end() - std::ptrdiff_t(taps - 1), stream.end(), stream.begin());
-        std::copy(x.begin(), x.end(), stream.begin() + std::ptrdiff_t(taps - 1));
-        filter->run(stream, out);
-        benchmark::ClobberMemory();
+/// A filter in a stream: the history before the block is the end of the one before.
+template <class T>
+Peer<T> streamed(const char* name, const Filter<T>& filter, std::size_t taps, std::size_t width,
+                 std::size_t points) {
+    const std::size_t history = width * (taps - 1);
+    const auto stream = samples<T>(history + width * points + 1024);
+    return {name, [=](Operands<T> o) {
+                T* const s = stream.get();
+                std::copy_n(s + width * o.n, history, s);
+                std::copy_n(o.a, width * o.n, s + history);
+                filter(s, o.y, o.n);
+            }};
+}
+
+template <Record R, class T = scalar<R>>
+void filters(const Family<R>& f) {
+    const auto row = [&](std::size_t taps, const char* kind, std::size_t width, std::size_t given,
+                         auto filter) {
+        const auto name = std::to_string(taps) + " taps" + kind;
+        if (!f.wants(name)) return;
+        const auto tap = [=](std::size_t k) {
+            return std::cos(double(std::min(k, taps - 1 - k) % 97)) / double(taps);
+        };
+        std::vector<T> h(taps);
+        for (std::size_t k = 0; k < taps; ++k) h[k] = T(tap(k));
+        std::vector<Peer<T>> peers{
+            streamed<T>("FFTW", best_overlap_save(h, width, f.n), taps, width, f.n)};
+        if (taps * f.n <= 20000000) {
+            peers.push_back(streamed<T>("loop", direct(h, width), taps, width, f.n));
+        }
+        if constexpr (sizeof(T) == 4) {
+            if (width == 1 && taps * f.n <= 20000000) {
+                peers.push_back({"liquid-dsp", [of = firfilt_rrrf_create(h.data(), unsigned(taps))](
+                                                   Operands<T> o) {
+                                     firfilt_rrrf_execute_block(of, o.a, unsigned(o.n), o.y);
+                                 }});
+            }
+        }
+        f.row(name, width == 2 ? complex(-1, 1) : real(-1, 1), Input{tap, false, given},
+              [=, state = std::make_shared<Signal<R>>()](R* in, R* b, R* out) {
+                  return filter(in, out, b, state->get());
+              },
+              peers, {{}, sizeof(T) == 8 ? 1e-9 : 2e-3, {}, long(taps / f.n + 2)});
+    };
+    for (const std::size_t taps : {16, 64, 256, 2048}) {
+        row(taps, "", 1, taps, dspd_fir);
+        row(taps, ", complex", 2, taps, dspd_fir);
+        row(taps, ", symmetric", 1, taps / 2,
+            [](R* in, R* out, R* half, R* state) { return dspd_sfir(in, out, half, 0, 0, state); });
     }
 }
+
+[[maybe_unused]] const bool added =
+    at_every_size("FIR filtering", [](const auto& f) { filters(f); });
 
 }  // namespace
-
-int main(int argc, char** argv) {
-    using wavkit::bench::add;
-    constexpr double most_products = 1e8;  // that the loop is given the time for
-    for (const std::size_t taps : {5, 20, 45, 46, 100, 400, 2000, 20000}) {
-        for (const std::size_t block : {256, 4096, 65536, 1 << 20}) {
-            const auto what = std::to_string(taps) + " taps, " + std::to_string(block);
-            add(what, "wavkit", [=](auto& state) { wavkit_filter(state, taps, block); });
-            if (double(taps) * double(block) <= most_products) {
-                add(what, "loop", [=](auto& state) { loop_filter(state, taps, block); });
-            }
-            add(what, "FFTW", [=](auto& state) { fftw_filter(state, taps, block); });
-        }
-    }
-    return wavkit::bench::run_and_compare(argc, argv);
-}
+}  // namespace wavkit::bench

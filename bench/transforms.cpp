@@ -1,140 +1,115 @@
-// Transforms beside FFTW (MEASURE) and KissFFT: powers of two, and round, smooth and prime lengths.
+// Transforms beside FFTW's, measured plans in place and from one buffer to another.
 //
-// wavkit works in place; the peers go from one buffer to another, which is what they do fastest.
-// All of them transform zeros: the time does not depend on the samples as long as none is
-// subnormal, and zeros neither decay nor grow when a transform runs over its own result.
-#include <benchmark/benchmark.h>
-#include <fftw3.h>
-#include <wavkit/dsp.h>
+// Everybody transforms zeros: the time does not depend on the samples as long as none is subnormal,
+// and zeros neither decay nor grow when a transform runs over its own result.
+#include <bit>
 
-#include <complex>
-#include <kissfft.hh>
-#include <string>
-#include <vector>
+#include "peers.hpp"
 
-#include "ratios.hpp"
-
+namespace wavkit::bench {
 namespace {
 
-/// The names of one precision.
-struct Double {
-    using Scalar = double;
-    using Record = dsp;
-    using Plan = fftw_plan;
-    static constexpr const char* name = "double";
-    static int dft(Record* x) { return dspi_dft(x, 0); }
-    static int rdft(Record* x) { return dspi_rdft(x); }
-    static void init(Record* x) { dsp_init(x); }
-    static int reserve(Record* x) { return dsp_alloc(x); }
-    static void release(Record* x) { dsp_destroy(x); }
-    static Scalar* allocate(std::size_t n) { return fftw_alloc_real(n); }
-    static void free(void* p) { fftw_free(p); }
-    static Plan plan_complex(int n, Scalar* in, Scalar* out) {
-        return fftw_plan_dft_1d(n, reinterpret_cast<fftw_complex*>(in),
-                                reinterpret_cast<fftw_complex*>(out), FFTW_FORWARD, FFTW_MEASURE);
-    }
-    static Plan plan_real(int n, Scalar* in, Scalar* out) {
-        return fftw_plan_dft_r2c_1d(n, in, reinterpret_cast<fftw_complex*>(out), FFTW_MEASURE);
-    }
-    static void execute(Plan plan) { fftw_execute(plan); }
-    static void destroy(Plan plan) { fftw_destroy_plan(plan); }
-};
-
-struct Single {
-    using Scalar = float;
-    using Record = dspf;
-    using Plan = fftwf_plan;
-    static constexpr const char* name = "float";
-    static int dft(Record* x) { return dspfi_dft(x, 0); }
-    static int rdft(Record* x) { return dspfi_rdft(x); }
-    static void init(Record* x) { dspf_init(x); }
-    static int reserve(Record* x) { return dspf_alloc(x); }
-    static void release(Record* x) { dspf_destroy(x); }
-    static Scalar* allocate(std::size_t n) { return fftwf_alloc_real(n); }
-    static void free(void* p) { fftwf_free(p); }
-    static Plan plan_complex(int n, Scalar* in, Scalar* out) {
-        return fftwf_plan_dft_1d(n, reinterpret_cast<fftwf_complex*>(in),
-                                 reinterpret_cast<fftwf_complex*>(out), FFTW_FORWARD, FFTW_MEASURE);
-    }
-    static Plan plan_real(int n, Scalar* in, Scalar* out) {
-        return fftwf_plan_dft_r2c_1d(n, in, reinterpret_cast<fftwf_complex*>(out), FFTW_MEASURE);
-    }
-    static void execute(Plan plan) { fftwf_execute(plan); }
-    static void destroy(Plan plan) { fftwf_destroy_plan(plan); }
-};
-
-template <class P>
-void wavkit_transform(benchmark::State& state, int n, bool real) {
-    typename P::Record x;
-    P::init(&x);
-    x.points = 4 * n;  // room for the convolution behind lengths that are no power of two
-    x.complex = 1;
-    if (P::reserve(&x)) state.SkipWithError("out of memory");
-    std::fill_n(x.data, 8 * std::size_t(n), 0);
-    for (auto _ : state) {
-        x.points = n;
-        x.complex = !real;
-        if (real ? P::rdft(&x) : P::dft(&x)) state.SkipWithError("transform failed");
-        benchmark::ClobberMemory();
-    }
-    P::release(&x);
-}
-
-template <class P>
-void fftw_transform(benchmark::State& state, int n, bool real) {
-    auto* in = P::allocate(2 * std::size_t(n));
-    auto* out = P::allocate(2 * std::size_t(n) + 2);
-    const auto plan = real ? P::plan_real(n, in, out) : P::plan_complex(n, in, out);
-    std::fill_n(in, 2 * std::size_t(n), 0);
-    for (auto _ : state) {
-        P::execute(plan);
-        benchmark::ClobberMemory();
-    }
-    P::destroy(plan);
-    P::free(in);
-    P::free(out);
-}
-
-template <class P>
-void kiss_transform(benchmark::State& state, int n, bool real) {
-    using T = typename P::Scalar;
-    std::vector<std::complex<T>> in(std::size_t(n) / (real ? 2 : 1)), out(std::size_t(n) + 1);
-    kissfft<T> transform(in.size(), false);
-    for (auto _ : state) {
-        if (real) {
-            transform.transform_real(reinterpret_cast<T*>(in.data()), out.data());
-        } else {
-            transform.transform(in.data(), out.data());
+/// A length and kind, with samples that begin some bytes behind a cache line.
+template <Record R>
+void add(const std::string& family, std::size_t n, bool real, std::size_t bytes,
+         const std::string& column) {
+    using T = scalar<R>;
+    const bool power = std::has_single_bit(n);
+    const std::size_t offset = bytes / sizeof(T), taken = real ? n : 2 * n,
+                      made = real ? n / 2 * 2 + 2 : 2 * n;
+    const auto noise = samples<T>(taken);
+    for (std::size_t i = 0; i < taken; ++i) noise[i] = T(uniform(-1, 1));
+    /// The result is that of noise; it leaves zeros.
+    const auto runner = [=](const char* name, T* in, T* out, auto run, double scale) {
+        return Runner{name, {}, run, [=]() mutable {
+                          std::copy_n(noise.get(), taken, in);
+                          run(1);
+                          Values values(out, out + made);
+                          for (auto& value : values) value *= scale;
+                          std::fill_n(in, made, T(0));
+                          std::fill_n(out, made, T(0));
+                          return values;
+                      }};
+    };
+    // A record may have to hold more than the samples while it is transformed.
+    const std::size_t room = power ? 2 * n + 2 : 2 * std::bit_ceil(2 * n);
+    const auto block = samples<T>(room + offset);
+    R x{};
+    x.data = block.get() + offset;
+    x.alloc = int(room);
+    const auto ours = [=](long count) mutable {
+        for (long i = 0; i < count; ++i) {
+            x.delta = 1;
+            x.points = int(n);
+            x.complex = !real;
+            if (real) {
+                power ? dspi_rfft(&x) : dspi_rdft(&x);
+            } else {
+                power ? dspi_fft(&x, 0) : dspi_dft(&x, 0);
+            }
         }
-        benchmark::ClobberMemory();
+    };
+    const auto in = samples<T>(made + offset), out = target_of(in, made + offset);
+    const auto peer = [&](const char* name, T* to) {
+        T* const from = in.get() + offset;
+        const auto plan = real ? Plan<T>::real(n, from, to) : Plan<T>::complex(n, from, to);
+        std::fill_n(from, made, T(0));
+        const auto run = [=](long count) {
+            for (long i = 0; i < count; ++i) plan();
+        };
+        return runner(name, from, to, run, 1 / double(n));
+    };
+    std::vector<Runner> peers{peer("FFTW in place", in.get() + offset)};
+    if (out != in) peers.push_back(peer("FFTW", out.get() + offset));
+    race({family, std::to_string(n), column, double(n), runner("", x.data, x.data, ours, 1), peers,
+          sizeof(T) == 8 ? 1e-12 : 1e-4});
+}
+
+void powers_of_two(const char* family, bool real) {
+    for (std::size_t n = 4; n <= 1 << 22; n *= 2) {
+        if (!wanted(family, std::to_string(n))) continue;
+        // A host's array is aligned to 16 bytes.
+        add<dsp>(family, n, real, 0, "double");
+        add<dsp>(family, n, real, 16, "double, 16 bytes");
+        add<dspf>(family, n, real, 0, "single");
+        add<dspf>(family, n, real, 16, "single, 16 bytes");
     }
 }
 
-template <class P>
-void add_lengths(bool real) {
-    using wavkit::bench::add;
-    std::vector<int> lengths;
-    for (int n = 16; n <= 1 << 20; n *= 2) lengths.push_back(n);
-    for (const int n : {60, 100, 127, 360, 1000, 1009, 4800, 6007, 10000, 10007, 44100, 48000,
-                        96000, 100003, 480000, 1000000}) {
-        lengths.push_back(n);
+std::size_t largest_prime(std::size_t n) {
+    std::size_t p = 2;
+    for (std::size_t f = 2; n > 1; ++f) {
+        for (; n % f == 0; n /= f) p = f;
     }
-    for (const int n : lengths) {
-        const std::string what =
-            std::string(real ? "real " : "complex ") + P::name + " " + std::to_string(n);
-        add(what, "wavkit", [=](auto& state) { wavkit_transform<P>(state, n, real); });
-        add(what, "FFTW", [=](auto& state) { fftw_transform<P>(state, n, real); });
-        if (!real || n % 2 == 0)
-            add(what, "KissFFT", [=](auto& state) { kiss_transform<P>(state, n, real); });
+    return p;
+}
+
+/// The lengths given, and some that nobody chose: products of primes up to 7, or others.
+void lengths(const char* family, std::vector<std::size_t> all, bool smooth) {
+    for (const std::size_t enough = all.size() + 5; all.size() < enough;) {
+        const std::size_t n = drawn(6, 300000);
+        const bool known = std::find(all.begin(), all.end(), n) != all.end();
+        if (known || std::has_single_bit(n) || (largest_prime(n) <= 7) != smooth) continue;
+        all.push_back(n);
+    }
+    std::sort(all.begin(), all.end());
+    for (const std::size_t n : all) {
+        if (!wanted(family, std::to_string(n))) continue;
+        add<dsp>(family, n, false, 0, "complex double");
+        add<dspf>(family, n, false, 0, "complex single");
+        add<dsp>(family, n, true, 0, "real double");
+        add<dspf>(family, n, true, 0, "real single");
     }
 }
+
+[[maybe_unused]] const bool added = add_family([] {
+    powers_of_two("complex transforms", false);
+    powers_of_two("real transforms", true);
+    lengths("smooth lengths",
+            {6, 12, 20, 60, 100, 360, 480, 1000, 1536, 1920, 10000, 44100, 48000, 100000, 1000000},
+            true);
+    lengths("other lengths", {11, 13, 22, 77, 101, 154, 1009, 1100, 10007, 65537, 100003}, false);
+});
 
 }  // namespace
-
-int main(int argc, char** argv) {
-    add_lengths<Double>(false);
-    add_lengths<Double>(true);
-    add_lengths<Single>(false);
-    add_lengths<Single>(true);
-    return wavkit::bench::run_and_compare(argc, argv);
-}
+}  // namespace wavkit::bench

@@ -109,7 +109,9 @@ int transform_apart(int n, bool inverse, scalar<R> scale, Fill fill, Take take) 
     if (!block) return -1;
     auto* const z = reinterpret_cast<Bin<T>*>(block);
     fill(z);
-    run_any<R>(*t, z, block + own, inverse, scale);
+    if (!transform_straight<R>(z, n, inverse, scale)) {
+        run_any<R>(*t, z, block + own, inverse, scale);
+    }
     take(z);
     return 0;
 }
