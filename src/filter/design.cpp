@@ -2,15 +2,13 @@
 #include <algorithm>
 #include <span>
 
+#include "filter/design.hpp"
 #include "filter/fixed_taps.hpp"
-#include "record_view.hpp"
 #include "window/catalogue.hpp"
 #include "window/generate.hpp"
 
 namespace wavkit {
 namespace {
-
-double sinc(double x) { return x == 0 ? 1 : std::sin(x) / x; }
 
 /// (cos x - 1) / x^2
 double raised_cosine(double x) { return -0.5 * sinc(x / 2) * sinc(x / 2); }
@@ -220,15 +218,6 @@ int fill_design(R* h, int type, double f1, double f2) {
         default:
             return -1;
     }
-}
-
-/// Writes real taps into a record of either kind. It keeps its kind unless the design fails.
-template <Record R, class Fill>
-int fill_either_kind(R* h, Fill fill) {
-    if (dsp_alloc(h)) return -1;
-    const bool was_complex = h->complex;
-    h->complex = 0;
-    return status(fill() || (was_complex && dspi_rtoc(h)));
 }
 
 template <Record R>

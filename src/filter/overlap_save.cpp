@@ -6,15 +6,12 @@
 #include <bit>
 
 #include "filter/convolution.hpp"
+#include "filter/tap_spectrum.hpp"
 #include "kernel/half_spectrum.hpp"
-#include "state.hpp"
 #include "transform/transform.hpp"
 
 namespace wavkit {
 namespace {
-
-/// Taps that differ by less than this fraction of the first one count as the same.
-constexpr double same_taps = 5 * std::numeric_limits<double>::epsilon();
 
 /// Longer transforms are refused.
 constexpr int highest_exponent = 30;
@@ -23,85 +20,23 @@ constexpr int highest_exponent = 30;
 /// arithmetic grows with the logarithm of the length, and the way to memory with it.
 double effort(int exponent) { return std::ldexp(70.0 + exponent * exponent, exponent) + 7000; }
 
-/// The transform length for n samples, as an exponent; 0 when there is none. A stretch has at least
-/// as many new samples as old ones. `standing` is the length of a spectrum that there is already;
-/// another one takes a transform, half of what a stretch takes.
-int best_exponent(std::size_t n, std::size_t order, int standing) {
+/// The transform length for n samples; 0 when there is none. A stretch has at least as many new
+/// samples as old ones. `standing` is the length of a spectrum that there is already; another one
+/// takes a transform, half of what a stretch takes.
+int best_length(std::size_t n, std::size_t order, int standing) {
     int best = 0;
     double least = std::numeric_limits<double>::infinity();
     for (int e = std::bit_width(2 * order - 1); e <= highest_exponent; ++e) {
         const std::size_t fresh = (std::size_t(1) << e) - order;
         const std::size_t stretches = (n + fresh - 1) / fresh;
-        const double total = (double(stretches) + (e == standing ? 0 : 0.5)) * effort(e);
+        const double total = (double(stretches) + (1 << e == standing ? 0 : 0.5)) * effort(e);
         if (total < least) {
             least = total;
-            best = e;
+            best = 1 << e;
         }
         if (stretches == 1) break;
     }
     return best;
-}
-
-template <Record R>
-bool are_finite(const R* taps) {
-    const auto v = values(taps);
-    return std::all_of(v.begin(), v.end(), [](auto tap) { return std::isfinite(tap); });
-}
-
-/// Whether taps are those of the last call. A comparison takes a NaN for anything.
-template <Record R>
-bool are_current(const R* taps) {
-    const R* last = &thread_state<R>.tap_cache.taps;
-    const auto tolerance = std::fabs(taps->data[0]) * scalar<R>(same_taps);
-    int difference;
-    return are_finite(taps) && are_finite(last) &&
-           dsp_cmp(taps, last, tolerance, &difference) == 0 && difference == 0;
-}
-
-/// The spectrum of the current taps, divided by the length of the stretches, which one transform
-/// there and one back multiply by.
-template <Record R>
-int fill_spectrum(TapSpectrum<R>* spectrum, int exponent, bool whole) {
-    using T = scalar<R>;
-    const int p = 1 << exponent;
-    const auto scale = T(1) / T(p);
-    R* x = &spectrum->bins;
-    spectrum->exponent = 0;
-    keep_until_thread_ends<R>();
-    if (resize(x, whole ? std::uint64_t(p) : std::uint64_t(p) / 2 + 1, true)) return -1;
-    const auto taps = values(&thread_state<R>.tap_cache.taps);
-    std::ranges::fill(values(x), T(0));
-    if (whole) {
-        for (std::size_t k = 0; k < taps.size(); ++k) bins(x)[k].re = taps[k];
-    } else {
-        std::ranges::copy(taps, x->data);
-    }
-    if (whole ? transform<R>(bins(x).data(), p, false, scale)
-              : transform_real<R>(x->data, p, scale)) {
-        return -1;
-    }
-    spectrum->exponent = exponent;
-    return 0;
-}
-
-/// The spectrum of the taps for a call, as cached or anew; null when memory runs out.
-template <Record R>
-const TapSpectrum<R>* find_spectrum(const FilterCall<R>& call) {
-    auto& c = thread_state<R>.tap_cache;
-    if (!are_current(&call.taps)) {
-        c.half.exponent = c.whole.exponent = 0;
-        keep_until_thread_ends<R>();
-        if (dsp_copy(&c.taps, &call.taps)) {
-            c.taps.points = 0;
-            return nullptr;
-        }
-    }
-    const bool whole = call.in.complex;
-    auto* spectrum = whole ? &c.whole : &c.half;
-    const int exponent = best_exponent(call.samples(), call.order(), spectrum->exponent);
-    if (exponent == 0) return nullptr;
-    if (exponent != spectrum->exponent && fill_spectrum(spectrum, exponent, whole)) return nullptr;
-    return spectrum;
 }
 
 /// A stretch of p samples, filtered circularly.
@@ -118,7 +53,7 @@ int filter_stretch(scalar<R>* x, int p, bool is_complex, const R* spectrum) {
 template <Record R>
 void copy_stretch(const FilterCall<R>& call, std::size_t first, std::size_t count,
                   std::span<scalar<R>> stretch) {
-    const std::size_t w = width(&call.in), order = call.order();
+    const std::size_t w = width(&call.in), order = call.order;
     if (first == 0) {
         call.write_history(stretch.data());
     } else {
@@ -132,10 +67,11 @@ void copy_stretch(const FilterCall<R>& call, std::size_t first, std::size_t coun
 
 template <Record R>
 int filter_by_transform(const FilterCall<R>& call, scalar<R>* out) {
-    const TapSpectrum<R>* spectrum = find_spectrum(call);
+    auto* const spectrum = find_spectrum<R>(&call.taps, call.in.complex);
     if (!spectrum) return -1;
-    const std::size_t w = width(&call.in), order = call.order(), n = call.samples();
-    const int p = 1 << spectrum->exponent;
+    const std::size_t w = width(&call.in), order = call.order, n = call.samples();
+    const int p = best_length(n, order, spectrum->points);
+    if (p == 0 || fill_spectrum(spectrum, p, w == 2)) return -1;
     const std::size_t fresh = std::size_t(p) - order, scalars = w * std::size_t(p);
     // A real stretch has one bin more than half its samples.
     scalar<R>* const stretch = reserve_room<R>(p, w == 2, scalars + 2);
