@@ -14,7 +14,7 @@
  *  `delta` is neither read nor changed. A filter of N taps delays by (N - 1) / 2 samples.
  *
  *  dspd_deci(), dspd_hwfilt(), dspd_rsmp() and dspd_rsmp2() filter and change the sampling rate;
- * they have designs of their own, dspc_rsmp() and the two behind it.
+ *  they have designs of their own, dspc_rsmp() and the two behind it.
  *
  *  See A. V. Oppenheim and R. W. Schafer, "Discrete-Time Signal Processing", chapter 7 (windowed
  *  designs), and J. F. Kaiser, "Nonrecursive digital filter design using the I0-sinh window
@@ -165,10 +165,10 @@ enum {
  *  The stream goes on from block to block as with dspd_fir(), whatever the blocks' lengths: any cut
  *  of a signal gives the outputs of one call, bit for bit where all calls run directly (with fewer
  *  than 32 taps an output always), to rounding where some go through transforms. Its place is one
- * more sample of the state, behind the history: how many samples of the next block to pass over
- * before the next output, 0 to D - 1, of a complex state in the real part. So one record holds the
- * whole stream; a fresh one, padded with zeros, is at place 0. (A longer state that comes from
- * elsewhere has the sample at M - 1 read as a place.)
+ *  more sample of the state, behind the history: how many samples of the next block to pass over
+ *  before the next output, 0 to D - 1, of a complex state in the real part. So one record holds the
+ *  whole stream; a fresh one, padded with zeros, is at place 0. (A longer state that comes from
+ *  elsewhere has the sample at M - 1 read as a place.)
  *
  *  Long taps go through transforms with the spectrum that dspd_fir() keeps, and back at a D-th of
  *  the length. Otherwise a NaN or an infinity spoils just the outputs that it takes part in. Any of
@@ -182,7 +182,7 @@ enum {
  *  @param factor  D
  *  @param state   M - 1 samples and the place; or null
  *  @return 0, or -1: a factor below 1 (in single precision also above 2^24), a place that is no
- * whole number from 0 to D - 1 (nothing is then touched), or memory that ran out */
+ *          whole number from 0 to D - 1 (nothing is then touched), or memory that ran out */
 WAVKIT_API int dspd_deci(const dsp *in, dsp *out, const dsp *taps, int factor, dsp *state);
 WAVKIT_API int dspfd_deci(const dspf *in, dspf *out, const dspf *taps, int factor, dspf *state);
 
@@ -200,13 +200,13 @@ WAVKIT_API int dspfd_deci(const dspf *in, dspf *out, const dspf *taps, int facto
  *  1977, and F. Mintzer, "On half-band, third-band, and Nth-band FIR filters and their design",
  *  1982.
  *  @param out    N points; N / 2, rounded up from the place, with DSP_HALF_DOWN; 2N with
- * DSP_HALF_UP. Complex if input or taps are; `delta` of the input, twice or half of it.
+ *                DSP_HALF_UP. Complex if input or taps are; the input's `delta`, twice or half it.
  *  @param taps   4J - 1 taps, real or complex
  *  @param mode   DSP_HALF_SAME, DSP_HALF_DOWN or DSP_HALF_UP
  *  @param state  4J - 2 samples, with DSP_HALF_DOWN and the place behind them, 0 or 1; 2J - 1
  *                samples with DSP_HALF_UP; or null
  *  @return 0, or -1: another number of taps, another mode, a place that is neither 0 nor 1, too
- * many outputs (nothing is then touched), or memory that ran out */
+ *          many outputs (nothing is then touched), or memory that ran out */
 WAVKIT_API int dspd_hwfilt(const dsp *in, dsp *out, const dsp *taps, int mode, dsp *state);
 WAVKIT_API int dspfd_hwfilt(const dspf *in, dspf *out, const dspf *taps, int mode, dspf *state);
 
@@ -230,16 +230,16 @@ WAVKIT_API int dspfi_hwfilt(dspf *x, const dspf *taps, int mode, dspf *state);
  *  @param taps     M taps, real or complex; none stand for the one tap 1
  *  @param state    (M - 1) / up samples, rounded down, and the place; or null
  *  @return 0, or -1: a number below 1 (in single precision also above 2^24), a place that is no
- * whole number from 0 to down - 1, more than 2147483647 outputs (nothing is then touched), or
- *          memory that ran out */
+ *          whole number from 0 to down - 1, more than 2147483647 outputs (nothing is then touched),
+ *          or memory that ran out */
 WAVKIT_API int dspd_rsmp(const dsp *in, dsp *out, const dsp *taps, int up, int down, dsp *state);
 WAVKIT_API int dspfd_rsmp(const dspf *in, dspf *out, const dspf *taps, int up, int down,
                           dspf *state);
 
 /** Reads a signal at any positions: out[m] = sum over n of x[n] k(at[m] - n), for a kernel k of
- * which the record holds `phases` values a sample, k(i / phases) = kernel[i]. Between these it runs
- * along the cubic through four of them, beyond its ends it is 0. One function for clock drift,
- * irrational ratios, delays by a fraction of a sample, jitter, and tracking of orders.
+ *  which the record holds `phases` values a sample, k(i / phases) = kernel[i]. Between these it
+ *  runs along the cubic through four of them, beyond its ends it is 0. One function for drifting
+ *  clocks, irrational ratios, delays by a fraction of a sample, jitter, and tracking of orders.
  *
  *  The kernel's gain is 1 for a sum of `phases`, as dspc_rsmp() designs it; a symmetric one of M
  *  values delays by (M - 1) / (2 phases) samples: ask for that much later positions to get the
@@ -247,8 +247,8 @@ WAVKIT_API int dspfd_rsmp(const dspf *in, dspf *out, const dspf *taps, int up, i
  *
  *  A stream goes on from block to block with the samples before the block in the state; the caller
  *  keeps count of the positions. What lies neither in the block nor in the state counts as 0.
- * Blocks give what one call gives for positions from 0 to below their length, exactly so where the
- * first two values of the kernel and the last one are 0 (Kaiser's are some 1e-10 of the middle).
+ *  Blocks give what one call gives for positions from 0 to below their length, exactly so where the
+ *  first two values of the kernel and the last one are 0 (Kaiser's are some 1e-10 of the middle).
  *
  *  @param in      N samples, real or complex
  *  @param out     as many points as positions, complex if input or kernel are; `delta` of the
@@ -256,10 +256,10 @@ WAVKIT_API int dspfd_rsmp(const dspf *in, dspf *out, const dspf *taps, int up, i
  *  @param kernel  M values, real or complex
  *  @param phases  values a sample
  *  @param at      positions in samples from the first one of this block, in any order; a real
- * record, in double precision for both. A NaN, or what is beyond 2^31 in size, gives 0.
+ *                 record, in double precision for both. A NaN, or a size beyond 2^31, gives 0.
  *  @param state   (M - 1) / phases samples, rounded down, or null
  *  @return 0, or -1: no kernel, phases below 1, complex positions (nothing is then touched), or
- * memory that ran out */
+ *          memory that ran out */
 WAVKIT_API int dspd_rsmp2(const dsp *in, dsp *out, const dsp *kernel, int phases, const dsp *at,
                           dsp *state);
 WAVKIT_API int dspfd_rsmp2(const dspf *in, dspf *out, const dspf *kernel, int phases, const dsp *at,
@@ -267,7 +267,7 @@ WAVKIT_API int dspfd_rsmp2(const dspf *in, dspf *out, const dspf *kernel, int ph
 
 /** Designs a kernel for changing the rate: a low-pass at `phases` times the input's rate, through a
  *  Kaiser window as long as it takes. Every phase, that is every phases-th tap from any of the
- * first ones on, has the sum 1, so that a constant keeps its value.
+ *  first ones on, has the sum 1, so that a constant keeps its value.
  *
  *  The number of points is odd and at most 5 % above Kaiser's estimate of
  *  1 + phases (attenuation - 7.95) / (14.36 (stop - pass)), which is some decibels short where the
@@ -277,8 +277,8 @@ WAVKIT_API int dspfd_rsmp2(const dspf *in, dspf *out, const dspf *kernel, int ph
  *
  *  Where pass + stop is 1, interpolation gives the old samples exactly (all taps at whole samples
  *  from the centre are 0), and with 2 phases the points are 4J - 1, a half-band filter, to be
- * scaled by 1/2 for dspd_hwfilt(). `delta` stays as it is, and a complex record complex, with
- * imaginary parts 0, in this and the other designs.
+ *  scaled by 1/2 for dspd_hwfilt(). `delta` stays as it is, and a complex record complex, with
+ *  imaginary parts 0, in this and the other designs.
  *
  *  @param h            the points are set; a borrowed buffer is replaced
  *  @param phases       `up` of dspd_rsmp(), rows of dspd_rsmp2(), 1 for dspd_deci()
@@ -292,11 +292,11 @@ WAVKIT_API int dspfc_rsmp(dspf *h, int phases, float pass, float stop, float att
 /** Designs a kernel of as many points as the record has: with t the distance from the centre in
  *  taps (halves between them for even N), a sinc(2 pi cutoff t / phases) times a sum of cosines
  *  a[0] + a[1] cos(2 pi t / N) + a[2] cos(4 pi t / N) + ..., as in dspi_window_cos(). Every phase
- * has the sum 1 unless it is 0 before.
+ *  has the sum 1 unless it is 0 before.
  *  @param cutoff  where the gain is a half, in cycles an input sample
  *  @param coefs   the coefficients a[0], a[1], ..., a real record; may be h
  *  @return 0; -1 for phases below 1, a cutoff that is not above 0, or complex coefficients (nothing
- * is then touched), or when memory runs out */
+ *          is then touched), or when memory runs out */
 WAVKIT_API int dspc_rsmp_cos(dsp *h, int phases, double cutoff, const dsp *coefs);
 WAVKIT_API int dspfc_rsmp_cos(dspf *h, int phases, float cutoff, const dspf *coefs);
 
