@@ -12,28 +12,35 @@ constexpr double farthest = 2147483648.0;
 /// Tables of more scalars than this are not made.
 constexpr std::int64_t most_table_scalars = std::int64_t(1) << 24;
 
-/// A position: the last sample before it, the row of the kernel's table before it, and how far it
-/// lies on the way to the next one.
-struct Place {
-    std::int64_t sample, row;
-    double fraction;
+/// Positions, some at a time: the last sample before each, the row of the kernel's table before it,
+/// and how much the rows around it count by Lagrange's cubic.
+template <class T, int Count>
+struct Places {
+    double samples[Count], rows[Count];
+    bool near[Count];
 
-    Place(double position, std::int64_t phases) {
-        const double before = std::floor(position), rows = (position - before) * double(phases);
-        sample = std::int64_t(before);
-        row = std::min(std::int64_t(rows), phases - 1);
-        fraction = rows - double(row);
+    void find(const double* positions, double phases, T (&weights)[4][Count]) {
+        constexpr int V = std::min(Count, kernel::lanes<double>);
+        for (int i = 0; i < Count; i += V) {
+            using Vector = kernel::Vec<double, V>;
+            const auto given = kernel::load<double, V>(positions + i);
+            const auto is_near = kernel::abs(given) <= farthest;
+            const Vector position = is_near ? given : Vector{};
+            const Vector before = kernel::floor(position), place = (position - before) * phases;
+            Vector row = kernel::floor(place);
+            row = row > phases - 1 ? kernel::all<Vector>(phases - 1) : row;
+            const Vector x = place - row, back = x - 1.0, on = x + 1.0, far = x - 2.0;
+            const Vector cubic[] = {x * back * far * (-1 / 6.0), on * back * far * 0.5,
+                                    on * x * far * -0.5, on * x * back * (1 / 6.0)};
+            kernel::store<double, V>(samples + i, before);
+            kernel::store<double, V>(rows + i, row);
+            for (int k = 0; k < V; ++k) {
+                near[i + k] = is_near[k] != 0;
+                for (int r = 0; r < 4; ++r) weights[r][i + k] = T(cubic[r][k]);
+            }
+        }
     }
 };
-
-/// What the rows before, at, and behind a place count, and the one behind that.
-template <class T>
-void cubic_weights(double x, T* weights) {
-    weights[0] = T(-x * (x - 1) * (x - 2) / 6);
-    weights[1] = T((x + 1) * (x - 1) * (x - 2) / 2);
-    weights[2] = T(-(x + 1) * x * (x - 2) / 2);
-    weights[3] = T((x + 1) * x * (x - 1) / 6);
-}
 
 template <Record R>
 class AnyPlace {
@@ -83,42 +90,46 @@ class AnyPlace {
     void outputs(const double* at, std::size_t points, T* out) {
         constexpr std::size_t G = kernel::dots_at_once<T, W>;
         static_assert(G <= most_at_once);
-        kernel::MixedRows<T> rows[G];
-        const T* window[G];
+        kernel::MixedRows<T, W> rows;
+        Places<T, int(G)> places;
+        double last[G];
         for (std::size_t m = 0; m < points; m += G) {
             const std::size_t some = std::min(G, points - m);
-            for (std::size_t g = 0; g < some; ++g) {
-                prepare(at[m + g], g, rows[g], window[g]);
+            const double* positions = at + m;
+            if (some < G) {
+                for (std::size_t g = 0; g < G; ++g) last[g] = positions[std::min(g, some - 1)];
+                positions = last;
             }
-            for (std::size_t g = some; g < G; ++g)
-                rows[g] = rows[some - 1], window[g] = window[some - 1];
+            places.find(positions, double(phases_), rows.weights);
+            for (std::size_t g = 0; g < G; ++g) {
+                prepare(std::int64_t(places.samples[g]), std::int64_t(places.rows[g]),
+                        places.near[g], g, rows.first[g], rows.window[g]);
+            }
             T left[G * W];
             T* const to = some == G ? out + m * W : left;
-            kernel::mixed_dots<T, W>(rows, windows_.scalars(), window, windows_.scalars(), to);
+            kernel::mixed_dots<T, W>(rows, windows_.scalars(), to);
             if (some < G) std::copy_n(left, some * W, out + m * W);
         }
     }
 
-    void prepare(double position, std::size_t slot, kernel::MixedRows<T>& rows, const T*& window) {
-        // Nothing is near what is no number or lies too far away.
-        const bool near = std::fabs(position) <= farthest;
-        const Place place(near ? position : 0.0, phases_);
+    void prepare(std::int64_t sample, std::int64_t row, bool near, std::size_t slot,
+                 const T*& first_row, const T*& window) {
         const auto span = std::int64_t(windows_.scalars());
         if (whole_) {
-            rows.first = table_ + place.row * span;
+            first_row = table_ + row * span;
         } else {
             T* const own = table_ + std::int64_t(slot) * 4 * span;
-            fill_rows(place.row - 1, 4, own);
-            rows.first = own;
+            fill_rows(row - 1, 4, own);
+            first_row = own;
         }
-        cubic_weights(place.fraction, rows.weights);
-        const std::int64_t newest = place.sample + ahead_;
+        const std::int64_t newest = sample + ahead_;
         if (near && windows_.finite() && windows_.covers(newest)) {
             window = windows_.reaching(newest);
             return;
         }
-        const std::int64_t latest = place.sample + (place.row + 2) / phases_;
-        const std::int64_t oldest = place.sample + 1 - (count_ - place.row + phases_) / phases_;
+        // Nothing is near what is no number or lies too far away.
+        const std::int64_t latest = sample + (row + 2) / phases_;
+        const std::int64_t oldest = sample + 1 - (count_ - row + phases_) / phases_;
         const T* none = nullptr;
         windows_.isolate(int(slot), newest, oldest, near ? latest : oldest - 1, window, none);
     }

@@ -120,18 +120,19 @@ inline void dots_of_one_row(const T* row, const T* const* windows, std::size_t n
     store_sums<T, W>(sums, out);
 }
 
-/// Four neighbouring rows of a table, and what each of them counts.
-template <class T>
+/// Sums of four neighbouring rows of a table, each with a window of its own.
+template <class T, int W>
 struct MixedRows {
-    const T* first;
-    T weights[4];
+    static constexpr int count = dots_at_once<T, W>;
+    const T* first[count];
+    T weights[4][count];
+    const T* window[count];
 };
 
-template <class T>
-WAVKIT_LANES Lanes<T> mixed_products(const MixedRows<T>& rows, std::size_t distance, const T* x,
-                                     std::size_t n) {
+template <class T, int W>
+WAVKIT_LANES Lanes<T> mixed_products(const MixedRows<T, W>& rows, int g, std::size_t n) {
     constexpr int V = lanes<T>;
-    const T *a = rows.first, *b = a + distance, *c = b + distance, *d = c + distance;
+    const T *a = rows.first[g], *b = a + n, *c = b + n, *d = c + n, *x = rows.window[g];
     Lanes<T> of_a{}, of_b{}, of_c{}, of_d{};
     for (std::size_t k = 0; k < n; k += V) {
         const auto samples = load<T, V>(x + k);
@@ -140,21 +141,25 @@ WAVKIT_LANES Lanes<T> mixed_products(const MixedRows<T>& rows, std::size_t dista
         of_c = mul_add(load<T, V>(c + k), samples, of_c);
         of_d = mul_add(load<T, V>(d + k), samples, of_d);
     }
-    const auto weight = [&](int r) { return all<Lanes<T>>(rows.weights[r]); };
+    const auto weight = [&](int r) { return all<Lanes<T>>(rows.weights[r][g]); };
     return mul_add(of_a, weight(0), of_b * weight(1)) + mul_add(of_c, weight(2), of_d * weight(3));
 }
 
-/// out[g] = the weighted sum of four rows, `distance` apart, times window g.
+/// out[g] = the weighted sum of four rows of n scalars times their window.
 template <class T, int W>
-inline void mixed_dots(const MixedRows<T>* rows, std::size_t distance, const T* const* windows,
-                       std::size_t n, T* out) {
+inline void mixed_dots(const MixedRows<T, W>& rows, std::size_t n, T* out) {
     constexpr int G = dots_at_once<T, W>;
     Lanes<T> sums[G];
 #pragma GCC unroll 16
-    for (int g = 0; g < G; ++g) {
-        sums[g] = mixed_products<T>(rows[g], distance, windows[g], n);
-    }
+    for (int g = 0; g < G; ++g) sums[g] = mixed_products<T, W>(rows, g, n);
     store_sums<T, W>(sums, out);
+}
+
+/// The largest whole numbers that are no larger, for |v| < 2^51.
+template <class V>
+WAVKIT_LANES V floor(V v) {
+    const V nearest = (v + to_whole<V>)-to_whole<V>;
+    return nearest > v ? nearest - Lane<V>(1) : nearest;
 }
 
 /// Whether no value is a NaN or an infinity, each of which leaves a NaN times 0.

@@ -2,16 +2,19 @@
 
 #include <algorithm>
 #include <cmath>
+#include <limits>
 #include <numeric>
 #include <utility>
 
 namespace wavkit::tool {
 namespace {
 
-__extension__ typedef __int128 Wide;  // products of two numbers of 64 bits
+// Products of two numbers of 64 bits.
+__extension__ typedef __int128 Wide;
+__extension__ typedef unsigned __int128 UnsignedWide;
 
 constexpr std::int64_t longest_unit = 1 << 14;  // of a spectral change, in samples
-constexpr std::size_t tail_points = 1 << 13;
+constexpr std::size_t most_at_once = 1 << 13;   // samples of each signal: what the cache holds
 
 /// Rates that fall further than this do so in several steps.
 constexpr double deepest = 1.0 / 16;
@@ -24,10 +27,32 @@ Band band_of(double ratio, const RateQuality& quality) {
 
 /// m times a ratio of whole numbers, without rounding.
 SamplePlace product(std::int64_t m, std::int64_t by, std::int64_t over) {
+    constexpr std::int64_t largest = std::numeric_limits<std::int64_t>::max();
+    if (m <= largest / by) {
+        const std::int64_t whole = m * by;
+        return {whole / over, double(whole % over) / double(over)};
+    }
     const auto whole = static_cast<Wide>(m) * by;
     const auto sample = static_cast<std::int64_t>(whole / over);
     return {sample, double(static_cast<std::int64_t>(whole % over)) / double(over)};
 }
+
+/// m times a number that is kept in units of 2^-64, as far as its digits tell.
+class Multiples {
+  public:
+    explicit Multiples(long double step)
+        : whole_(std::int64_t(step)),
+          rest_(std::uint64_t(std::ldexp(step - static_cast<long double>(whole_), 64))) {}
+
+    SamplePlace operator()(std::int64_t m) const {
+        const auto rest = static_cast<UnsignedWide>(rest_) * std::uint64_t(m);
+        return {m * whole_ + std::int64_t(rest >> 64), double(std::uint64_t(rest)) * 0x1p-64};
+    }
+
+  private:
+    std::int64_t whole_;
+    std::uint64_t rest_;
+};
 
 }  // namespace
 
@@ -119,13 +144,9 @@ void RateChange::read_between(const RateRatio& left, const RateQuality& quality)
     const PlaceOf exact = [=](std::int64_t m) {
         return product(m, left.inputs * up, left.outputs * down);
     };
-    const PlaceOf rounded = [=](std::int64_t m) {
-        const long double at = static_cast<long double>(m) * rate / left.value;
-        const long double whole = std::floor(at);
-        return SamplePlace{std::int64_t(whole), double(at - whole)};
-    };
-    stages_.push_back(reading_at(block_.size(), left.exact() ? exact : rounded, -1,
-                                 {edge, 1 - edge, quality.attenuation}));
+    const Multiples rounded(static_cast<long double>(rate) / left.value);
+    stages_.push_back(reading_evenly(block_.size(), left.exact() ? exact : PlaceOf(rounded),
+                                     rate / left.value, {edge, 1 - edge, quality.attenuation}));
 }
 
 std::int64_t RateChange::outputs(std::int64_t n) const {
@@ -139,35 +160,41 @@ std::int64_t RateChange::outputs(std::int64_t n) const {
 
 std::span<const double> RateChange::pass(std::span<const double> values) {
     const std::size_t width = block_.size(), points = values.size() / width;
-    for (std::size_t c = 0; c < width; ++c) {
-        block_[c].resize(points);
-        for (std::size_t i = 0; i < points; ++i) block_[c][i] = values[i * width + c];
+    out_.clear();
+    for (std::size_t first = 0; first < points; first += most_at_once) {
+        const std::size_t some = std::min(most_at_once, points - first);
+        for (std::size_t c = 0; c < width; ++c) {
+            block_[c].resize(some);
+            const double* from = values.data() + first * width + c;
+            for (std::size_t i = 0; i < some; ++i) block_[c][i] = from[i * width];
+        }
+        taken_ += std::int64_t(some);
+        run();
     }
-    taken_ += std::int64_t(points);
-    return run(points);
+    return out_;
 }
 
 std::span<const double> RateChange::finish() {
-    while (given_ < outputs(taken_)) {
-        for (auto& plane : block_) plane.assign(tail_points, 0.0);
-        const auto some = run(tail_points);
-        if (!some.empty()) return some;
+    out_.clear();
+    while (out_.empty() && given_ < outputs(taken_)) {
+        for (auto& plane : block_) plane.assign(most_at_once, 0.0);
+        run();
     }
-    return {};
+    return out_;
 }
 
-std::span<const double> RateChange::run(std::size_t points) {
-    if (points == 0) return {};
+/// Adds to the outputs what the stages make of the block.
+void RateChange::run() {
     for (const auto& stage : stages_) stage->pass(block_);
-    const std::size_t width = block_.size();
+    const std::size_t width = block_.size(), before = out_.size();
     const auto some =
         std::size_t(std::min(std::int64_t(block_[0].size()), outputs(taken_) - given_));
-    out_.resize(some * width);
+    out_.resize(before + some * width);
     for (std::size_t c = 0; c < width; ++c) {
-        for (std::size_t i = 0; i < some; ++i) out_[i * width + c] = block_[c][i];
+        double* const to = out_.data() + before + c;
+        for (std::size_t i = 0; i < some; ++i) to[i * width] = block_[c][i];
     }
     given_ += std::int64_t(some);
-    return out_;
 }
 
 }  // namespace wavkit::tool

@@ -49,7 +49,7 @@ class RateChange {
     void build(const RateRatio& ratio, const RateQuality& quality);
     void decimate(RateRatio& left, const RateQuality& quality);
     void read_between(const RateRatio& left, const RateQuality& quality);
-    std::span<const double> run(std::size_t points);
+    void run();
 
     RateRatio ratio_;
     std::int64_t places_ = -1;  // where places are given, how many

@@ -142,8 +142,8 @@ class SpectralChange : public RateStage {
 
 class ReadingAt : public RateStage {
   public:
-    ReadingAt(std::size_t planes, PlaceOf place, std::int64_t places, const Band& band)
-        : place_(std::move(place)), places_(places), kernel_(kernel_for(rows, band)) {
+    ReadingAt(std::size_t planes, PlaceOf place, double step, std::int64_t places, const Band& band)
+        : place_(std::move(place)), step_(step), places_(places), kernel_(kernel_for(rows, band)) {
         delay_ = (kernel_->points - 1) / (2.0 * rows);
         reach_ = kernel_->points / rows + 3;
         pending_.assign(planes, std::vector<double>(std::size_t(reach_)));
@@ -172,17 +172,29 @@ class ReadingAt : public RateStage {
     void collect_places() {
         at_.clear();
         const double last = double(pending_[0].size()) - 2;
-        for (; places_ < 0 || next_ < places_; ++next_) {
+        while (next_ < places_) {
             const auto place = place_(next_);
             const double at = double(place.sample - start_) + (place.fraction + delay_);
             if (!(at < last)) return;
             at_.push_back(at);
+            ++next_;
+            if (step_ > 0) follow(at, last);
         }
+    }
+
+    /// Some places behind one, as many as do not add up rounding errors.
+    void follow(double at, double last) {
+        constexpr double most = 255;
+        const auto count = std::size_t(std::clamp((last - at) / step_ - 1, 0.0, most));
+        const std::size_t first = at_.size();
+        at_.resize(first + count);
+        for (std::size_t i = 0; i < count; ++i) at_[first + i] = at + double(i + 1) * step_;
+        next_ += std::int64_t(count);
     }
 
     /// Drops samples that no place can reach any more.
     void forget() {
-        if (places_ >= 0 && next_ >= places_) {
+        if (next_ >= places_) {
             for (auto& samples : pending_) samples.clear();
             return;
         }
@@ -194,6 +206,7 @@ class ReadingAt : public RateStage {
     }
 
     PlaceOf place_;
+    double step_;  // between all places, or 0
     std::int64_t places_, next_ = 0;
     Signal kernel_, out_;
     double delay_;
@@ -221,7 +234,13 @@ std::unique_ptr<RateStage> spectral_change(std::size_t planes, int up, int down,
 
 std::unique_ptr<RateStage> reading_at(std::size_t planes, PlaceOf place, std::int64_t places,
                                       const Band& band) {
-    return std::make_unique<ReadingAt>(planes, std::move(place), places, band);
+    return std::make_unique<ReadingAt>(planes, std::move(place), 0, places, band);
+}
+
+std::unique_ptr<RateStage> reading_evenly(std::size_t planes, PlaceOf place, double step,
+                                          const Band& band) {
+    constexpr auto endless = std::numeric_limits<std::int64_t>::max();
+    return std::make_unique<ReadingAt>(planes, std::move(place), step, endless, band);
 }
 
 }  // namespace wavkit::tool

@@ -46,9 +46,12 @@ struct SamplePlace {
 };
 using PlaceOf = std::function<SamplePlace(std::int64_t)>;
 
-/// Reads a signal, of which the band up to band.pass counts, at places that ascend: so many of
-/// them, or with a negative number any.
+/// Reads a signal, of which the band up to band.pass counts, at so many places, which ascend.
 std::unique_ptr<RateStage> reading_at(std::size_t planes, PlaceOf place, std::int64_t places,
                                       const Band& band);
+
+/// The same at places that are `step` apart, without end.
+std::unique_ptr<RateStage> reading_evenly(std::size_t planes, PlaceOf place, double step,
+                                          const Band& band);
 
 }  // namespace wavkit::tool
