@@ -24,11 +24,11 @@ double transform_effort(double n) {
     return n * (32 + exponent * exponent / 2) + 3500;
 }
 constexpr double product_effort = 4;
-constexpr double output_effort = 16;
+constexpr double output_effort = 250, vector_effort = 35;
 
 template <Record R>
 double dot_effort(std::size_t taps) {
-    return output_effort + 28 * double(taps) / kernel::lanes<scalar<R>>;
+    return output_effort + vector_effort * double(taps) / kernel::lanes<scalar<R>>;
 }
 
 /// The largest divisor of n that a transform handles in passes and that shares none with `up`.
