@@ -140,7 +140,8 @@ int try_kaiser(dsp* h, std::int64_t count, double less_beta, const Wanted& wante
 /// The kernel of so many points with the beta that lacks least.
 int best_kaiser(dsp* h, std::int64_t count, const Wanted& wanted) {
     double best = usual_less_beta, least = std::numeric_limits<double>::infinity();
-    for (double less = -0.2; less < 0.5; less += 0.05) {
+    for (int step = -4; step < 10; ++step) {
+        const double less = 0.05 * step;
         double lack;
         if (try_kaiser(h, count, less, wanted, &lack)) return -1;
         if (lack <= 0) return 0;

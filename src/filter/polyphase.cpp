@@ -48,9 +48,10 @@ class Polyphase {
         // Phases come in turn, each of them once before the first one comes again.
         const auto period = std::size_t(rate_.up / std::gcd(rate_.up, rate_.down));
         one_row_ = period == 1;
-        const std::size_t most = std::max<std::size_t>(most_row_scalars / windows_.scalars(), 64);
+        const std::size_t span = std::max<std::size_t>(windows_.scalars(), 1);
+        const std::size_t most = std::max<std::size_t>(most_row_scalars / span, 64);
         const std::size_t rows = std::min({period, points, most});
-        if (resize(&scratch.rows, rows * std::uint64_t(windows_.scalars()), false)) return -1;
+        if (resize(&scratch.rows, rows * std::uint64_t(span), false)) return -1;
         Positions at(rate_);
         for (std::size_t m = 0; m < points;) {
             // Rows for what follows, or once and for all.

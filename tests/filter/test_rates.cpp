@@ -355,17 +355,16 @@ BOTH_PRECISIONS(Rates, RefusalsTouchNothing) {
     expect_refused(__LINE__, [&] { return dspd_rsmp2(x, y, h, 0, at, state); });
     expect_refused(__LINE__, [&] { return dspd_rsmp2(x, y, h, 1, turned, state); });
     const T inf = std::numeric_limits<T>::infinity();
-    for (const auto& [pass, stop, decibels] :
-         std::vector<std::array<T, 3>>{{0, 1, 50},
-                                       {1, 1, 50},
-                                       {nan, 1, 50},
-                                       {T(0.1), nan, 50},
-                                       {T(0.1), inf, 50},
-                                       {T(0.1), T(0.2), T(7.95)},
-                                       {T(0.1), T(0.2), nan},
-                                       {T(0.1), T(0.2), inf},
-                                       {T(1e-30), T(2e-30), 50}}) {
-        expect_refused(__LINE__, [&] { return dspc_rsmp(y, 2, pass, stop, decibels); });
+    for (const auto& k : std::vector<std::array<T, 3>>{{0, 1, 50},
+                                                       {1, 1, 50},
+                                                       {nan, 1, 50},
+                                                       {T(0.1), nan, 50},
+                                                       {T(0.1), inf, 50},
+                                                       {T(0.1), T(0.2), T(7.95)},
+                                                       {T(0.1), T(0.2), nan},
+                                                       {T(0.1), T(0.2), inf},
+                                                       {T(1e-30), T(2e-30), 50}}) {
+        expect_refused(__LINE__, [&] { return dspc_rsmp(y, 2, k[0], k[1], k[2]); });
     }
     for (const T cutoff : {T(0), T(-1), nan}) {
         expect_refused(__LINE__, [&] { return dspc_rsmp_cos(y, 2, cutoff, h); });

@@ -134,7 +134,8 @@ TEST_F(ResampleTest, CallsWithoutSenseAreRefused) {
     write("late.txt", "1\n3\n");
     for (const std::string options :
          {"", "--rate 2 --ratio 2", "--ratio 0", "--ratio 2/0", "--ratio 1/2/3", "--ratio x",
-          "--rate 0", "--rate nan", "--to-times early.txt --ppm 3", "--rate 2 --quality top"}) {
+          "--rate 0", "--rate nan", "--to-times early.txt --to csv --with-time",
+          "--to-times early.txt --ppm 3", "--rate 2 --quality top"}) {
         EXPECT_EQ(shell("wavkit resample x.txt -o y.dsp " + options).status, 2) << options;
     }
     for (const std::string times : {"falling", "early", "late"}) {

@@ -58,6 +58,9 @@ void check_usage(ResampleOptions& options) {
             throw UsageError("--ppm is for --rate and --ratio, or alone");
         }
         if (options.ratio) given_ratio(*options.ratio);
+        if (!options.times.empty() && options.writing.time) {
+            throw UsageError("--with-time is for samples that are equally spaced, not --to-times");
+        }
         if (options.times == "-" && options.in == "-") {
             throw UsageError("standard input holds either the signal or the times");
         }
@@ -221,7 +224,7 @@ Examples:
   wavkit decimate log.csv --time --by 10 --quality fast -o tenth.csv --with-time)";
 
 std::shared_ptr<ResampleOptions> declare_common(CLI::App& command, bool with_rate) {
-    const auto shared = std::make_shared<ResampleOptions>();
+    auto shared = std::make_shared<ResampleOptions>();
     auto& options = *shared;
     command.add_option("IN", options.in, "file to read; - is standard input")
         ->required()
