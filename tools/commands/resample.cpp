@@ -22,6 +22,9 @@ namespace {
 
 constexpr std::size_t block_scalars = 1 << 16;
 
+/// Beyond these a block would become too large, or too few samples would come of any signal.
+constexpr double lowest_ratio = 1e-6, highest_ratio = 1000;
+
 struct ResampleOptions {
     std::string in, out, times;
     std::optional<double> rate, ppm;
@@ -94,6 +97,10 @@ Target target_for(const ResampleOptions& options, double delta) {
     }
     // A clock that was fast has taken more samples than it should.
     if (options.ppm) target.ratio = ratio_of(target.ratio.value / (1 + *options.ppm * 1e-6));
+    if (!(target.ratio.value >= lowest_ratio && target.ratio.value <= highest_ratio)) {
+        throw Error("a rate of " + number(target.ratio.value) +
+                    " times that of the signal is out of reach");
+    }
     return target;
 }
 
@@ -149,7 +156,7 @@ class ResampleRun {
             shape.points = std::size_t(points);
         }
         writer_->begin(shape);
-        pass(stream, *changed, width);
+        pass(stream, *changed, width, target.ratio.value);
         writer_->end();
     }
 
@@ -162,9 +169,11 @@ class ResampleRun {
         };
     }
 
-    void pass(SampleStream& stream, RateChange& changed, std::size_t width) {
+    void pass(SampleStream& stream, RateChange& changed, std::size_t width, double ratio) {
         Progress progress("changing the rate of " + input_.name());
-        std::vector<double> block(std::max<std::size_t>(block_scalars / width, 1) * width);
+        // What comes of a block shall not be much larger than one.
+        const auto grown = std::size_t(std::max(ratio, 1.0)) * width;
+        std::vector<double> block(std::max<std::size_t>(block_scalars / grown, 1) * width);
         long taken = 0;
         for (std::size_t count = block.size(); count == block.size();) {
             count = stream.read(block);
@@ -267,7 +276,7 @@ void add_decimate(CLI::App& program) {
     auto& options = *declare_common(*command, true);
     command->add_option("--by", options.by, "D, input samples for an output sample")
         ->required()
-        ->check(CLI::Range(1, 1 << 24))
+        ->check(CLI::Range(1, 1000000))
         ->type_name("D");
     command->footer(about_decimate);
 }

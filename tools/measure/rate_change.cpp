@@ -16,8 +16,9 @@ __extension__ typedef unsigned __int128 UnsignedWide;
 constexpr std::int64_t longest_unit = 1 << 14;  // of a spectral change, in samples
 constexpr std::size_t most_at_once = 1 << 13;   // samples of each signal: what the cache holds
 
-/// Rates that fall further than this do so in several steps.
-constexpr double deepest = 1.0 / 16;
+/// Rates that fall further than this do so in several steps, and those that rise further not
+/// through spectra.
+constexpr double deepest = 1.0 / 16, steepest = 64;
 
 /// The band of a change by `ratio` in cycles an input sample.
 Band band_of(double ratio, const RateQuality& quality) {
@@ -63,7 +64,7 @@ RateRatio ratio_of(std::int64_t outputs, std::int64_t inputs) {
 
 RateRatio ratio_of(double value) {
     // The continued fraction, as far as the terms are not those of a rounding error.
-    constexpr double tolerance = 1e-13;
+    constexpr double tolerance = 4 * std::numeric_limits<double>::epsilon();
     constexpr std::int64_t largest = std::int64_t(1) << 31;
     std::int64_t above = 1, below = 0, last_above = 0, last_below = 1;
     double rest = value;
@@ -105,7 +106,8 @@ void RateChange::build(const RateRatio& ratio, const RateQuality& quality) {
     if (ratio.exact() && ratio.outputs == ratio.inputs) return;
     auto left = ratio;
     while (left.value < deepest) decimate(left, quality);
-    const bool is_short = left.exact() && std::max(left.outputs, left.inputs) <= longest_unit;
+    const bool is_short = left.exact() && left.value <= steepest &&
+                          std::max(left.outputs, left.inputs) <= longest_unit;
     const auto band = band_of(left.value, quality);
     if (is_short && left.outputs == 1) {
         stages_.push_back(decimation(block_.size(), int(left.inputs), band));
