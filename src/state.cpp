@@ -13,14 +13,15 @@ namespace {
 
 template <Record R>
 int free_tap_cache(TapCache<R>& cache) {
-    cache.half.exponent = cache.whole.exponent = 0;
+    cache.half.points = cache.whole.points = 0;
     return status(dsp_destroy(&cache.taps) || dsp_destroy(&cache.half.bins) ||
                   dsp_destroy(&cache.whole.bins));
 }
 
 template <Record R>
 int free_scratch(FilterScratch<R>& scratch) {
-    return status(dsp_destroy(&scratch.output) || dsp_destroy(&scratch.work));
+    return status(dsp_destroy(&scratch.output) || dsp_destroy(&scratch.work) ||
+                  dsp_destroy(&scratch.rows));
 }
 
 template <Record R>

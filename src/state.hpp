@@ -70,11 +70,11 @@ struct WindowCache {
     int newest = 0;
 };
 
-/// The spectrum of a filter's taps for stretches of 2^exponent samples; 0: there is none.
+/// The spectrum of a filter's taps and zeros behind them, `points` in all; 0: there is none.
 template <Record R>
 struct TapSpectrum {
     R bins{};
-    int exponent = 0;
+    int points = 0;
 };
 
 /// The taps of the last filter that worked through transforms, and their spectra: the first half,
@@ -90,6 +90,7 @@ template <Record R>
 struct FilterScratch {
     R output{};  // of filters whose output overlaps an operand
     R work{};
+    R rows{};  // taps in the order in which outputs take them
 };
 
 /// Random numbers of one thread: generators side by side, the first words of their states first.

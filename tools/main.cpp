@@ -52,6 +52,8 @@ void run(CLI::App& program, int argc, char** argv) {
     wavkit::tool::add_design(program);
     wavkit::tool::add_filter(program);
     wavkit::tool::add_generate(program);
+    wavkit::tool::add_resample(program);
+    wavkit::tool::add_decimate(program);
     program.parse(argc, argv);
 }
 

@@ -12,25 +12,26 @@ namespace wavkit {
 /// The output is written where it overlaps none of them, and the state only after the last read.
 template <Record R>
 struct FilterCall {
+    FilterCall(const R* input, const R* h, const R* history, std::size_t past)
+        : in(*input), taps(*h), state(history ? *history : R{}), has_state(history), order(past) {}
+
     R in, taps;
     R state;  // no points when there is none
     bool has_state;
+    std::size_t order;  // samples before the block that its outputs depend on
 
     std::size_t samples() const { return length(&in); }
-
-    /// Samples before the block that its outputs depend on.
-    std::size_t order() const { return length(&taps) - 1; }
 
     /// Writes them, oldest first, in the kind of the input; those that the state lacks are zeros at
     /// the end.
     void write_history(scalar<R>* to) const {
-        const std::size_t w = width(&in), known = std::min(order(), length(&state));
+        const std::size_t w = width(&in), known = std::min(order, length(&state));
         const std::size_t step = width(&state);
         for (std::size_t i = 0; i < known; ++i) {
             to[w * i] = state.data[step * i];
             if (w == 2) to[w * i + 1] = step == 2 ? state.data[step * i + 1] : 0;
         }
-        std::fill(to + w * known, to + w * order(), scalar<R>(0));
+        std::fill(to + w * known, to + w * order, scalar<R>(0));
     }
 };
 

@@ -3,9 +3,9 @@
 #include <concepts>
 #include <span>
 
+#include "filter/design.hpp"
 #include "filter/fixed_taps.hpp"
 #include "kernel/elementary.hpp"
-#include "record_view.hpp"
 #include "window/catalogue.hpp"
 #include "window/generate.hpp"
 
@@ -14,12 +14,9 @@ namespace {
 
 using Doubles = kernel::Lanes<double>;
 
-double sinc(double x) { return x == 0 ? 1 : std::sin(x) / x; }
-Doubles sinc(Doubles x) { return kernel::sinc(x); }
-
 /// (cos x - 1) / x^2
 Doubles raised_cosine(Doubles x) {
-    const Doubles root = sinc(x * 0.5);
+    const Doubles root = kernel::sinc(x * 0.5);
     return -0.5 * root * root;
 }
 
@@ -31,10 +28,12 @@ Doubles bessel_j1(Doubles x) {
         term *= -x * x / (2.0 * k * (2 * k + 3));
         sum += term;
     }
-    return kernel::abs(x) < 1.0 ? sum : (sinc(x) - kernel::cos(x)) / x;
+    return kernel::abs(x) < 1.0 ? sum : (kernel::sinc(x) - kernel::cos(x)) / x;
 }
 
-Doubles low_pass(double edge, Doubles t) { return 2 * edge * sinc(two_pi<double> * edge * t); }
+Doubles low_pass(double edge, Doubles t) {
+    return 2 * edge * kernel::sinc(two_pi<double> * edge * t);
+}
 
 Doubles band_pass(double centre, double width, Doubles t) {
     return 2.0 * kernel::cos(two_pi<double> * centre * t) * low_pass(width / 2, t);
@@ -51,7 +50,7 @@ Doubles hilbert(double edge, Doubles t) {
 
 Doubles ramp(double edge, Doubles t) {
     const Doubles x = two_pi<double> * edge * t;
-    return 4 * edge * edge * (sinc(x) + raised_cosine(x));
+    return 4 * edge * edge * (kernel::sinc(x) + raised_cosine(x));
 }
 
 /// value(t) for the first `count` of several t; of a value that takes no vector one by one.
@@ -264,15 +263,6 @@ int fill_design(R* h, int type, double f1, double f2) {
         default:
             return -1;
     }
-}
-
-/// Writes real taps into a record of either kind. It keeps its kind unless the design fails.
-template <Record R, class Fill>
-int fill_either_kind(R* h, Fill fill) {
-    if (dsp_alloc(h)) return -1;
-    const bool was_complex = h->complex;
-    h->complex = 0;
-    return status(fill() || (was_complex && dspi_rtoc(h)));
 }
 
 template <Record R>

@@ -1,5 +1,5 @@
 // Windows for FIR designs, chosen for a bandwidth.
-#include "record_view.hpp"
+#include "filter/design.hpp"
 
 namespace wavkit {
 namespace {
@@ -14,17 +14,10 @@ int taper_by_gauss(R* h, double bandwidth) {
     return dspi_window_gauss(h, scalar<R>(sigma), tapering);
 }
 
-/// The beta of the window whose filters attenuate by so many decibels (Kaiser, 1974).
-double kaiser_beta_for(double attenuation) {
-    if (attenuation < 21) return 0;
-    if (attenuation > 50) return 0.1102 * (attenuation - 8.7);
-    return 0.5842 * std::pow(attenuation - 21, 0.4) + 0.07886 * (attenuation - 21);
-}
-
 template <Record R>
 int taper_by_kaiser(R* h, double transition) {
     if (length(h) == 0) return 0;
-    const double attenuation = (double(length(h)) - 1) * 14.36 * transition + 7.95;
+    const double attenuation = kaiser_attenuation(double(length(h)), transition);
     return dspi_window_kaiser(h, scalar<R>(kaiser_beta_for(attenuation)), tapering);
 }
 

@@ -68,8 +68,8 @@ void begin(const FilterCall<R>& call, std::size_t n, scalar<R>* out) {
 /// The first n outputs of a signal with a history, which is put before its first samples.
 template <Record R>
 int resume(const FilterCall<R>& call, std::size_t n, R* work, scalar<R>* out) {
-    const std::size_t w = width(&call.in), past = w * call.order();
-    if (resize(work, std::uint64_t(call.order()) + n, call.in.complex)) return -1;
+    const std::size_t w = width(&call.in), past = w * call.order;
+    if (resize(work, std::uint64_t(call.order) + n, call.in.complex)) return -1;
     call.write_history(work->data);
     std::copy_n(call.in.data, w * n, work->data + past);
     convolve(call, work->data + past, n, out);
@@ -87,8 +87,8 @@ void filter_inside(const FilterCall<R>& call, std::size_t first, std::size_t cou
 
 template <Record R>
 int filter_directly(const FilterCall<R>& call, R* work, scalar<R>* out) {
-    const std::size_t n = call.samples(), first = std::min(n, call.order());
-    if (call.has_state && call.order() > 0) {
+    const std::size_t n = call.samples(), first = std::min(n, call.order);
+    if (call.has_state && call.order > 0) {
         if (resume(call, first, work, out)) return -1;
     } else {
         begin(call, first, out);

@@ -6,15 +6,12 @@
 #include <bit>
 
 #include "filter/convolution.hpp"
+#include "filter/tap_spectrum.hpp"
 #include "kernel/half_spectrum.hpp"
-#include "state.hpp"
 #include "transform/transform.hpp"
 
 namespace wavkit {
 namespace {
-
-/// Taps that differ by less than this fraction of the first one count as the same.
-constexpr double same_taps = 5 * std::numeric_limits<double>::epsilon();
 
 /// Longer transforms are refused.
 constexpr int highest_exponent = 30;
@@ -26,15 +23,15 @@ double direct_effort(std::size_t taps, std::size_t outputs) {
     return 1.2 * double(taps) * double(outputs);
 }
 
-/// How n samples go through transforms: stretches of 2^exponent samples, and outputs behind the
-/// last whole one that cost less when they are computed directly.
+/// How n samples go through transforms: the points of a stretch, and outputs behind the last whole
+/// one that cost less when they are computed directly.
 struct Division {
-    int exponent = 0;  // 0: there is none
+    int points = 0;  // 0: there is none
     std::size_t direct = 0;
 };
 
 /// The cheapest division. A stretch has at least as many new samples as old ones. `standing` is the
-/// exponent of a spectrum that there is already; another one takes a transform, half of what a
+/// length of a spectrum that there is already; another one takes a transform, half of what a
 /// stretch takes.
 Division best_division(std::size_t n, std::size_t order, int standing) {
     Division best;
@@ -44,75 +41,15 @@ Division best_division(std::size_t n, std::size_t order, int standing) {
         const double rest = direct_effort(order + 1, n % fresh), stretch = effort(e);
         const bool direct = whole > 0 && rest < stretch;
         const double last = direct ? rest : n % fresh > 0 ? stretch : 0;
-        const double total = double(whole) * stretch + last + (e == standing ? 0 : stretch / 2);
+        const double total =
+            double(whole) * stretch + last + (1 << e == standing ? 0 : stretch / 2);
         if (total < least) {
             least = total;
-            best = {e, direct ? n % fresh : 0};
+            best = {1 << e, direct ? n % fresh : 0};
         }
         if (whole == 0) break;
     }
     return best;
-}
-
-/// Whether taps are those of the last call. What is not finite is never the same.
-template <Record R>
-bool are_current(const R* taps) {
-    const R* last = &thread_state<R>.tap_cache.taps;
-    if (length(taps) != length(last)) return false;
-    const auto tolerance = std::fabs(taps->data[0]) * scalar<R>(same_taps);
-    bool same = true;
-    for (std::size_t k = 0; k < length(taps); ++k) {
-        same &= std::fabs(taps->data[k] - last->data[k]) <= tolerance;
-    }
-    return same;
-}
-
-/// The spectrum of the current taps, divided by the length of the stretches, which one transform
-/// there and one back multiply by.
-template <Record R>
-int fill_spectrum(TapSpectrum<R>* spectrum, int exponent, bool whole) {
-    using T = scalar<R>;
-    const int p = 1 << exponent;
-    const auto scale = T(1) / T(p);
-    R* x = &spectrum->bins;
-    spectrum->exponent = 0;
-    keep_until_thread_ends<R>();
-    if (resize(x, whole ? std::uint64_t(p) : std::uint64_t(p) / 2 + 1, true)) return -1;
-    const auto taps = values(&thread_state<R>.tap_cache.taps);
-    std::ranges::fill(values(x), T(0));
-    if (whole) {
-        for (std::size_t k = 0; k < taps.size(); ++k) bins(x)[k].re = taps[k];
-    } else {
-        std::ranges::copy(taps, x->data);
-    }
-    if (whole ? transform<R>(bins(x).data(), p, false, scale)
-              : transform_real<R>(x->data, p, scale)) {
-        return -1;
-    }
-    spectrum->exponent = exponent;
-    return 0;
-}
-
-/// The spectrum of the taps for a call, as cached or anew, and the division of its samples; null
-/// when memory runs out.
-template <Record R>
-const TapSpectrum<R>* find_spectrum(const FilterCall<R>& call, Division& division) {
-    auto& c = thread_state<R>.tap_cache;
-    if (!are_current(&call.taps)) {
-        c.half.exponent = c.whole.exponent = 0;
-        keep_until_thread_ends<R>();
-        if (dsp_copy(&c.taps, &call.taps)) {
-            c.taps.points = 0;
-            return nullptr;
-        }
-    }
-    const bool whole = call.in.complex;
-    auto* spectrum = whole ? &c.whole : &c.half;
-    division = best_division(call.samples(), call.order(), spectrum->exponent);
-    const int exponent = division.exponent;
-    if (exponent == 0) return nullptr;
-    if (exponent != spectrum->exponent && fill_spectrum(spectrum, exponent, whole)) return nullptr;
-    return spectrum;
 }
 
 /// A stretch of p samples, filtered circularly.
@@ -129,7 +66,7 @@ int filter_stretch(scalar<R>* x, int p, bool is_complex, const R* spectrum) {
 template <Record R>
 void copy_stretch(const FilterCall<R>& call, std::size_t first, std::size_t count,
                   std::span<scalar<R>> stretch) {
-    const std::size_t w = width(&call.in), order = call.order();
+    const std::size_t w = width(&call.in), order = call.order;
     if (first == 0) {
         call.write_history(stretch.data());
     } else {
@@ -143,11 +80,12 @@ void copy_stretch(const FilterCall<R>& call, std::size_t first, std::size_t coun
 
 template <Record R>
 int filter_by_transform(const FilterCall<R>& call, scalar<R>* out) {
-    Division division;
-    const TapSpectrum<R>* spectrum = find_spectrum(call, division);
+    auto* const spectrum = find_spectrum<R>(&call.taps, call.in.complex);
     if (!spectrum) return -1;
-    const std::size_t w = width(&call.in), order = call.order(), n = call.samples();
-    const int p = 1 << spectrum->exponent;
+    const std::size_t w = width(&call.in), order = call.order, n = call.samples();
+    const auto division = best_division(n, order, spectrum->points);
+    const int p = division.points;
+    if (p == 0 || fill_spectrum(spectrum, p, w == 2)) return -1;
     const std::size_t fresh = std::size_t(p) - order, scalars = w * std::size_t(p);
     // A real stretch has one bin more than half its samples.
     scalar<R>* const stretch = reserve_room<R>(p, w == 2, scalars + 2);

@@ -100,4 +100,29 @@ inline void multiply(T* x, const T* y, std::size_t count) {
     if constexpr (V > 1) multiply<Conjugate, T, 1>(x + 2 * k, y + 2 * k, count - k);
 }
 
+/// z[k] = x[k] * y[k]
+template <class T, int V = lanes<T>>
+inline void multiply_to(const T* x, const T* y, T* z, std::size_t count) {
+    std::size_t k = 0;
+    for (; k + V <= count; k += V) {
+        const auto a = load_complex<T, V, Layout::pairs>(x + 2 * k);
+        const auto b = load_complex<T, V, Layout::pairs>(y + 2 * k);
+        store_complex<T, V, Layout::pairs>(z + 2 * k, a * b);
+    }
+    if constexpr (V > 1) multiply_to<T, 1>(x + 2 * k, y + 2 * k, z + 2 * k, count - k);
+}
+
+/// z[k] = conj(x[-k]) * y[k]: the other half of a real signal's spectrum.
+template <class T, int V = lanes<T>>
+inline void multiply_backwards(const T* x, const T* y, T* z, std::size_t count) {
+    std::size_t k = 0;
+    for (; k + V <= count; k += V) {
+        const auto back = load_complex<T, V, Layout::pairs>(x - 2 * (k + V - 1));
+        const Complexes<T, V> a{reversed<T, V>(back.re), -reversed<T, V>(back.im)};
+        const auto b = load_complex<T, V, Layout::pairs>(y + 2 * k);
+        store_complex<T, V, Layout::pairs>(z + 2 * k, a * b);
+    }
+    if constexpr (V > 1) multiply_backwards<T, 1>(x - 2 * k, y + 2 * k, z + 2 * k, count - k);
+}
+
 }  // namespace wavkit::kernel

@@ -11,7 +11,7 @@ namespace {
 template <Record R, class Check>
 void each_call(Check check) {
     for (const auto& c : every_case<R>()) {
-        for (const int n : {1, 5, 6, 8, 9, 200}) {
+        for (const int n : {1, 5, 6, 7, 8, 9, 200}) {
             for (int kinds = 0; kinds < (c.is_const.size() > 1 ? 4 : 2); ++kinds) {
                 SCOPED_TRACE(::testing::Message() << c << ' ' << n << " points, kinds " << kinds);
                 check(c, n, kinds);

@@ -101,6 +101,18 @@ std::vector<Call<R>> calls() {
     other("corr", [](Operands<R>& x, R* out) { return dspb_corr(&x[0], &x[1], out, &x[2], 3); });
     other("fir", [](Operands<R>& x, R* out) { return dspd_fir(&x[0], out, &x[1], &x[2]); });
     other("sfir", [](Operands<R>& x, R* out) { return dspd_sfir(&x[0], out, &x[1], 1, 0, &x[2]); });
+    other("deci", [](Operands<R>& x, R* out) {
+        x[2].points = 5;
+        return dspd_deci(&x[0], out, &x[1], 2, &x[2]);
+    });
+    other("rsmp", [](Operands<R>& x, R* out) {
+        x[2].points = 1;
+        return dspd_rsmp(&x[0], out, &x[1], 3, 2, &x[2]);
+    });
+    other("half-band", [](Operands<R>& x, R* out) {
+        x[1].points = 3;
+        return dspd_hwfilt(&x[0], out, &x[1], DSP_HALF_UP, &x[2]);
+    });
     return all;
 }
 

@@ -19,5 +19,7 @@ void add_interp(CLI::App& program);
 void add_design(CLI::App& program);
 void add_filter(CLI::App& program);
 void add_generate(CLI::App& program);
+void add_resample(CLI::App& program);
+void add_decimate(CLI::App& program);
 
 }  // namespace wavkit::tool

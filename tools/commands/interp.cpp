@@ -99,6 +99,15 @@ Signal places_at_rate(const Table& table, double rate) {
                        1 / rate);
 }
 
+/// Tells where a signal of a lower rate shows what is too fast for it as something slow.
+void tell_of_aliases(double delta, double rate) {
+    if (!(rate * delta < 1 - 1e-9)) return;
+    std::fprintf(stderr,
+                 "wavkit: at the lower rate %s, whatever is above %s in the signal shows below it; "
+                 "'wavkit resample' removes it\n",
+                 number(rate).c_str(), number(rate / 2).c_str());
+}
+
 Signal read_places(const std::string& path) {
     auto places = first_signal(path, {});
     if (places->complex) throw Error("the places of --at are one column, real numbers");
@@ -194,6 +203,7 @@ void run(InterpOptions options) {
             const auto table = table_of(x, options);
             Signal places;
             if (options.rate) {
+                if (!options.table) tell_of_aliases(x->delta, *options.rate);
                 places = places_at_rate(table, *options.rate);
             } else {
                 check(dsp_copy(places, at), "interpolating");
@@ -206,8 +216,8 @@ void run(InterpOptions options) {
 
 constexpr const char* about =
     R"(--rate gives a signal of RATE samples a second (or whatever the spacing counts), from the first
-sample of IN to the last; going to a lower rate wants what is above half of it removed before. --at
-gives the values at the places that a file lists, one column, in any order. Sample n of IN lies at
+sample of IN to the last; to a lower rate rather use 'wavkit resample', which removes what is above half
+of it. --at gives the values at the places that a file lists, one column, in any order. Sample n of IN lies at
 n delta, or with --table at the first column of IN, whose second one holds the values.
 
 Methods: hold keeps each value until the next sample, linear draws lines (the default), quadratic
