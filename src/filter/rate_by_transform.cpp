@@ -17,14 +17,17 @@
 namespace wavkit {
 namespace {
 
-/// Time of a transform of n real samples, of a bin of a product, and of an output of a dot product:
-/// in the unit that overlap-save counts in.
+/// Time of a transform of n real samples, in the unit that overlap-save counts in.
 double transform_effort(double n) {
     const double exponent = std::log2(n);
     return n * (32 + exponent * exponent / 2) + 3500;
 }
-constexpr double product_effort = 4;
-constexpr double output_effort = 250, vector_effort = 35;
+
+/// Of a bin of a product, of an output of a dot product, and of each vector that it takes.
+constexpr double product_effort = 4, output_effort = 250, vector_effort = 35;
+
+/// The part of the calls in which the spectrum of the taps is made anew.
+constexpr double new_spectrum = 0.25;
 
 template <Record R>
 double dot_effort(std::size_t taps) {
@@ -261,10 +264,9 @@ RateTransforms choose_transforms(const FilterCall<R>& call, const Rate& rate, st
         const double whole = double(samples) * double(rate.up);
         const double each = transform_effort(double(samples)) +
                             transform_effort(double(samples) * step) + product_effort * whole;
-        const auto& cache = thread_state<R>.tap_cache;
-        const bool stands = (width == 2 ? cache.whole : cache.half).points == int(whole);
-        const double total =
-            width * (double(stretches) * each + (stands ? 0 : transform_effort(whole)));
+        // What is there already must not count: any thread is to get the same.
+        const double spectrum = new_spectrum * transform_effort(whole);
+        const double total = width * (double(stretches) * each + spectrum);
         if (total < least) {
             least = total;
             best = {int(samples), folded};
