@@ -1,6 +1,5 @@
 // Running averages of spectra. Means of two signals of one kind, the usual ones, are formed in one
 // pass over both; everything else is put together from the operations on whole records.
-#include "kernel/range.hpp"
 #include "math/limited.hpp"
 #include "record_view.hpp"
 
@@ -77,13 +76,13 @@ template <Record R>
 WAVKIT_LANES kernel::Lanes<scalar<R>> powers(const scalar<R>* z) {
     using T = scalar<R>;
     constexpr int V = kernel::lanes<T>;
-    // Below it no part is out of range.
+    // Up to it no part is out of range.
     constexpr T clear = limits<R>::big * limits<R>::big / 2;
     const auto a = kernel::load<T, V>(z), b = kernel::load<T, V>(z + V);
     const auto p = a * a, q = b * b;
     const auto sum = kernel::shuffle<V, kernel::EveryOther<false>>(p, q) +
                      kernel::shuffle<V, kernel::EveryOther<true>>(p, q);
-    if (kernel::any_beyond(sum, clear)) [[unlikely]] {
+    if (kernel::any_outside(sum, T(0), clear)) [[unlikely]] {
         return limited_magnitude_squared<R>(kernel::load_complex<T, V, kernel::Layout::pairs>(z));
     }
     return sum;
