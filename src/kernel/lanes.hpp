@@ -175,7 +175,7 @@ WAVKIT_LANES bool any_outside(V v, Lane<V> low, Lane<V> high) {
             return _mm512_cmpgt_epu32_mask(above_low, _mm512_set1_epi32(span)) != 0;
     }
 #endif
-    return any_above((v >= low) & (v <= high) ? V{} : all<V>(Lane<V>(1)), Lane<V>(0));
+    return any_above(((v >= low) & (v <= high)) ? V{} : all<V>(Lane<V>(1)), Lane<V>(0));
 }
 
 /// Whether any bit of any lane is set.
