@@ -23,7 +23,7 @@ struct Bins {
         // The upper edge, as exactly as the division finds it, belongs to the last bin.
         const T above_top = bins * (1 + 10 * std::numeric_limits<T>::epsilon());
         const V inside = kernel::at_most(where, kernel::all<V>(bins - 1));
-        return (where >= T(0)) & (where < above_top) ? inside : kernel::all<V>(outside);
+        return ((where >= T(0)) & (where < above_top)) ? inside : kernel::all<V>(outside);
     }
 };
 
