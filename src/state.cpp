@@ -58,18 +58,16 @@ struct AtThreadEnd {
         free_windows(own.windows);
         std::free(std::exchange(own.conversion, nullptr));
     }
-    bool set_up = true;
 };
-
-template <Record R>
-thread_local AtThreadEnd<R> at_thread_end;
 
 }  // namespace
 
 template <Record R>
 void keep_until_thread_ends() {
     if (thread_state<R>.released_at_end) return;
-    thread_state<R>.released_at_end = at_thread_end<R>.set_up;
+    // Only the way past its definition, not a look at it, has its destructor run.
+    static thread_local AtThreadEnd<R> at_thread_end;
+    thread_state<R>.released_at_end = true;
 }
 
 template <Record R>

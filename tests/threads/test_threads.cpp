@@ -1,6 +1,7 @@
 // Every function from several threads at once, on records of their own.
 #include <thread>
 
+#include "support/failing_allocator.hpp"
 #include "support/functions.hpp"
 
 namespace wavkit::test {
@@ -73,6 +74,21 @@ TEST(Threads, GetWhatASingleThreadGets) {
                 [&, first] { repeat(std::span(of_single).subspan(k * part, part), first); });
         }
     }
+}
+
+BOTH_PRECISIONS(Threads, ReleaseTheirPartWhenTheyEnd) {
+    const FailingAllocator<R> hooks;
+    int kept = 0;
+    std::thread([&] {
+        R x = {1, nullptr, 0, 100, 0, 0};
+        dsp_alloc(&x);
+        dspc_line(&x, 0, 1);
+        dspi_window(&x, DSP_WINDOW_HANN, 0);
+        dsp_destroy(&x);
+        kept = hooks.blocks();
+    }).join();
+    EXPECT_EQ(kept, 1);  // the window
+    EXPECT_EQ(hooks.blocks(), 0);
 }
 
 }  // namespace
