@@ -168,11 +168,13 @@ WAVKIT_LANES bool any_outside(V v, Lane<V> low, Lane<V> high) {
     if constexpr (sizeof(V) == 64) {  // bits of positive numbers are in order as the numbers are
         using I = Lane<Bits<V>>;
         const I first = std::bit_cast<I>(low), span = std::bit_cast<I>(high) - first;
-        const auto above_low = (__m512i)(bits(v) - first);
-        if constexpr (is_double<V>)
+        if constexpr (is_double<V>) {
+            const auto above_low = _mm512_sub_epi64((__m512i)v, _mm512_set1_epi64(first));
             return _mm512_cmpgt_epu64_mask(above_low, _mm512_set1_epi64(span)) != 0;
-        else
+        } else {
+            const auto above_low = _mm512_sub_epi32((__m512i)v, _mm512_set1_epi32(first));
             return _mm512_cmpgt_epu32_mask(above_low, _mm512_set1_epi32(span)) != 0;
+        }
     }
 #endif
     return any_above(((v >= low) & (v <= high)) ? V{} : all<V>(Lane<V>(1)), Lane<V>(0));
@@ -462,20 +464,21 @@ WAVKIT_LANES Parts<V> parts(V x) {
     }
 #endif
     using T = Lane<V>;
-    using I = Lane<Bits<V>>;
+    using I = std::make_unsigned_t<Lane<Bits<V>>>;  // those of a NaN may wrap
+    using Words = Vec<I, count<V>>;
     constexpr int mantissa = is_double<V> ? 52 : 23;
     constexpr T lift = is_double<V> ? T(0x1p54) : T(0x1p25);
     constexpr T lifted = is_double<V> ? T(54) : T(25);
     const auto subnormal = x < std::numeric_limits<T>::min();
-    const auto b = bits(subnormal ? x * lift : x);
+    const auto b = (Words)bits(subnormal ? x * lift : x);
     // From a third above a power of two on, the number is that below the next one.
-    constexpr I third = (I(1) << mantissa) / 3, one = I(std::bit_cast<I>(T(1)));
+    constexpr I third = (I(1) << mantissa) / 3, one = std::bit_cast<I>(T(1));
     const auto up = b + ((I(1) << mantissa) - third);
     const auto exponent = (up >> mantissa) & I(is_double<V> ? 0x7ff : 0xff);
-    const V number = from_bits<V>(b - (up & ~((I(1) << mantissa) - 1)) + one);
+    const V number = from_bits<V>((Bits<V>)(b - (up & ~((I(1) << mantissa) - 1)) + one));
     // An integer below 2^52 (2^23) behind the bits of that number is a number of its own.
     constexpr T base = is_double<V> ? T(0x1p52) : T(0x1p23);
-    const V shifted = from_bits<V>(exponent | std::bit_cast<I>(base));
+    const V shifted = from_bits<V>((Bits<V>)(exponent | std::bit_cast<I>(base)));
     const T bias = base + T(is_double<V> ? 1023 : 127);
     return {number, shifted - (subnormal ? all<V>(bias + lifted) : all<V>(bias))};
 }
