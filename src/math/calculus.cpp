@@ -9,9 +9,9 @@ namespace {
 /// so that what is read has not been written.
 template <int Step, class T>
 void differences(T* v, std::size_t n, T rate) {
-    constexpr int lanes = kernel::lanes<T>;
+    constexpr std::size_t lanes = kernel::lanes<T>;
     std::size_t i = n;
-    while (i >= std::size_t(lanes + Step)) {
+    while (i >= lanes + Step) {
         i -= lanes;
         const auto now = kernel::load<T, lanes>(v + i),
                    before = kernel::load<T, lanes>(v + i - Step);

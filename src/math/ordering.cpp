@@ -154,7 +154,7 @@ void sort_numbers(std::span<Bin<scalar<R>>> numbers) {
 template <Record R>
 bool has_nan(const R* x) {
     bool any = false;
-    for (const auto value : values(x)) any |= value != value;
+    for (const auto value : values(x)) any |= is_nan(value);
     return any;
 }
 

@@ -183,12 +183,12 @@ template <Record R>
 int average(R* input, R* avg, R* scratch, int flags, int count, int every, scalar<R> weight,
             scalar<R> limit) {
     const scalar<R> share = avg_weight(flags, count, weight, limit);
-    if (count > 1 && scratch != input && scratch != avg && folds_in_one_pass(input, avg, flags)) {
-        return fold_in_one_pass(input, avg, flags, share);
-    }
     Temporary<R> local;
     const bool usable = scratch && (scratch == avg || !shares_memory(scratch, avg));
     R* const work = usable ? scratch : local.get();
+    if (count > 1 && work != input && work != avg && folds_in_one_pass(input, avg, flags)) {
+        return fold_in_one_pass(input, avg, flags, share);
+    }
     bool failed = false;
     if (flags & DSP_AVG_POWER) {
         failed = fails_into(work, dspu_magsq(input, work));

@@ -27,7 +27,7 @@ void put_keys(const T* numbers, std::size_t n, kernel::OrderKey<T>* keys) {
     using Key = kernel::OrderKey<T>;
     for (std::size_t i = 0; i < n; ++i) {
         const auto key = kernel::turn_order<T>(std::bit_cast<Key>(numbers[i]));
-        keys[i] = numbers[i] == numbers[i] ? key : std::numeric_limits<Key>::max();
+        keys[i] = std::isnan(numbers[i]) ? std::numeric_limits<Key>::max() : key;
     }
 }
 
