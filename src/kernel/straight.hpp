@@ -47,7 +47,7 @@ template <int N, bool Unrolled, class F>
 template <int N, int R1, int V, Layout Outside, class T>
 [[gnu::noinline]] void run_straight(T* data, T scale) {
     constexpr int R2 = N / R1;
-    constexpr bool in_registers = N / V <= 32;
+    constexpr bool in_registers = N / V <= ((N & (N - 1)) == 0 ? 32 : 16);
     Vec<T, 2 * V> y[N / V];
     repeated<R2 / V, in_registers>([&](auto i) __attribute__((always_inline)) {
         Pairs<T, V> z[R1];
@@ -149,7 +149,9 @@ inline bool run_straight_real(int n, T* data, T scale) {
 /// Transforms n samples in place, where there is a straight line for them; else false.
 template <Layout Outside, class T>
 inline bool run_straight(int n, T* data, T scale) {
-    constexpr int V = std::max(1, std::min(4, lanes<T> / 2));  // complex samples of a vector
+    // Complex samples of a vector.
+    constexpr int P = std::max(1, std::min(2, lanes<T> / 2));
+    constexpr int V = std::max(1, std::min(4, lanes<T> / 2));
     constexpr int W = std::max(1, std::min(8, lanes<T> / 2));
     constexpr bool wide = register_bytes == 64;
     switch (n) {
@@ -185,16 +187,44 @@ inline bool run_straight(int n, T* data, T scale) {
             return run_straight<16, 4, V, Outside>(data, scale), true;
         case 17:
             return run_prime<17, Outside>(data, scale), true;
+        case 18:
+            return run_straight<18, 3, 1, Outside>(data, scale), true;
         case 19:
             return run_prime<19, Outside>(data, scale), true;
+        case 20:
+            return run_straight<20, 4, 1, Outside>(data, scale), true;
+        case 21:
+            return run_straight<21, 3, 1, Outside>(data, scale), true;
         case 23:
             return run_prime<23, Outside>(data, scale), true;
+        case 24:
+            return run_straight<24, 4, P, Outside>(data, scale), true;
+        case 25:
+            return run_straight<25, 5, 1, Outside>(data, scale), true;
         case 29:
             return run_prime<29, Outside>(data, scale), true;
+        case 30:
+            return run_straight<30, 5, 1, Outside>(data, scale), true;
         case 31:
             return run_prime<31, Outside>(data, scale), true;
         case 32:
             return run_straight<32, 8, V, Outside>(data, scale), true;
+        case 36:
+            return run_straight<36, 6, P, Outside>(data, scale), true;
+        case 40:
+            return run_straight<40, 4, P, Outside>(data, scale), true;
+        case 48:
+            return run_straight<48, 8, P, Outside>(data, scale), true;
+        case 60:
+            return run_straight<60, 6, P, Outside>(data, scale), true;
+        case 72:
+            return run_straight<72, 6, P, Outside>(data, scale), true;
+        case 80:
+            return run_straight<80, 8, P, Outside>(data, scale), true;
+        case 96:
+            return run_straight<96, 8, V, Outside>(data, scale), true;
+        case 144:
+            return run_straight<144, 12, V, Outside>(data, scale), true;
         default:
             break;
     }

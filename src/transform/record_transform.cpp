@@ -17,9 +17,13 @@ constexpr bool is_power_of_two(std::int64_t n) {
 
 /// Room for the convolution behind a transform of n >= 2 points that is no power of two, 2^m >= 2n
 /// - 2 complex ones, which stays with the record whatever way the transform takes.
+constexpr std::int64_t convolution_room(int n) {
+    return std::int64_t(std::bit_ceil(2 * std::uint64_t(n) - 2));
+}
+
 template <Record R>
 int make_room_for_convolution(R* x, int n) {
-    const auto points = std::int64_t(std::bit_ceil(2 * std::uint64_t(n) - 2));
+    const auto points = convolution_room(n);
     return points > longest_transform ? -1 : make_room(x, points);
 }
 
@@ -48,8 +52,8 @@ template <Record R>
 template <Record R>
 int take(R* x, bool inverse, scalar<R> factor) {
     const int n = x->points;
-    if (!x->complex || !is_power_of_two(n) ||
-        !transform_straight<R>(bins(x).data(), n, inverse, factor)) {
+    const bool has_room = is_power_of_two(n) || (n > 1 && x->alloc >= 2 * convolution_room(n));
+    if (!x->complex || !has_room || !transform_straight<R>(bins(x).data(), n, inverse, factor)) {
         return take_any(x, inverse, factor);
     }
     x->delta = reciprocal_spacing<R>(n, x->delta);
