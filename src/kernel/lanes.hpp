@@ -326,18 +326,33 @@ struct Sum {
     V high, low;
 };
 
+/// 1 / v to half of the digits at least, of sizes far from the limits of the precision: for what a
+/// step of Newton's makes whole.
+template <class V>
+WAVKIT_LANES V half_reciprocal(V v) {
+#if defined(__AVX512F__)
+    if constexpr (sizeof(V) == 64 && is_double<V>) {
+        const V guess = (V)_mm512_maskz_rcp14_pd(0xff, (__m512d)v);
+        return mul_add(mul_add(-v, guess, all<V>(1.0)), guess, guess);
+    } else if constexpr (sizeof(V) == 64) {
+        return (V)_mm512_maskz_rcp14_ps(0xffff, (__m512)v);
+    }
+#endif
+    return Lane<V>(1) / v;
+}
+
+/// 1 / v, rounded or nearly so, of sizes as for quick_sqrt().
+template <class V>
+WAVKIT_LANES V quick_reciprocal(V v) {
+    const V near = half_reciprocal(v);
+    if constexpr (register_bytes < 64 || sizeof(V) != 64) return near;
+    return mul_add(-product_minus(v, near, all<V>(Lane<V>(1))), near, near);
+}
+
 /// 1 / v of floats, rounded or nearly so.
 template <class V>
 WAVKIT_LANES V near_reciprocal(Sum<V> v) {
-    V near;
-#if defined(__AVX512F__)
-    if constexpr (sizeof(V) == 64) {
-        near = (V)_mm512_maskz_rcp14_ps(0xffff, (__m512)v.high);
-    } else
-#endif
-    {
-        near = Lane<V>(1) / v.high;
-    }
+    const V near = half_reciprocal(v.high);
     const V rest = product_minus(v.high, near, all<V>(Lane<V>(1)));
     return mul_add(-mul_add(v.low, near, rest), near, near);
 }
@@ -373,19 +388,10 @@ WAVKIT_LANES V quotient(Sum<V> a, Sum<V> b) {
     const auto rest_of = [&](V q) {
         return mul_add(-q, b.low, a.low) - product_minus(q, b.high, a.high);
     };
-#if defined(__AVX512F__)
     if constexpr (sizeof(V) == 64) {
-        V reciprocal;
-        if constexpr (is_double<V>) {
-            reciprocal = (V)_mm512_maskz_rcp14_pd(0xff, (__m512d)whole_b);
-            reciprocal = mul_add(mul_add(-whole_b, reciprocal, Lane<V>(1)), reciprocal, reciprocal);
-        } else {
-            reciprocal = (V)_mm512_maskz_rcp14_ps(0xffff, (__m512)whole_b);
-        }
-        const V q = whole_a * reciprocal;
+        const V reciprocal = half_reciprocal(whole_b), q = whole_a * reciprocal;
         return mul_add(rest_of(q), reciprocal, q);
     }
-#endif
     const V q = whole_a / whole_b;
     return q + rest_of(q) / whole_b;
 }

@@ -85,11 +85,16 @@ struct Quotient {
 
     using Z = kernel::Complexes<T, kernel::lanes<T>>;
     WAVKIT_LANES Z operator()(Z a, Z b) const {
-        const V zero{}, big = kernel::all<V>(limits<R>::big);
-        const V square = b.re * b.re + b.im * b.im, factor = T(1) / square;
+        constexpr T most = kernel::safe_radicand<T>;
+        const V square = b.re * b.re + b.im * b.im;
+        const Z quotient = a * conj(b);
+        if (!kernel::any_outside(square, 1 / most, most)) [[likely]] {
+            const V factor = kernel::quick_reciprocal(square);
+            return {quotient.re * factor, quotient.im * factor};
+        }
+        const V zero{}, big = kernel::all<V>(limits<R>::big), factor = T(1) / square;
         const auto all_zero = (a.re == zero) & (a.im == zero) & (b.re == zero) & (b.im == zero);
         const V limit = all_zero != 0 ? zero : big;
-        const Z quotient = a * conj(b);
         return {square <= T(0) ? limit : quotient.re * factor,
                 square <= T(0) ? limit : quotient.im * factor};
     }
