@@ -48,6 +48,10 @@ TEST_F(ConvertTest, EveryFormatGivesBackWhatItWasGiven) {
         {pair, "x.wav", "--bits float", single},
         {pair, "x.wav", "--bits 16", bits16},
         {pair, "x.wav", "--bits 24", bits24},
+        {pair, "x.wav", "--bits 32", 1e-9},
+        {pair, "x.wav", "--bits 64", exact},
+        {mixed, "x.mat", "", exact},
+        {mixed, "x.mat", "--compress --type float", single},
         {pair, "x.flac", "", bits24},
         {one, "x.flac", "--bits 16", bits16},
     };
@@ -63,38 +67,79 @@ TEST_F(ConvertTest, EveryFormatGivesBackWhatItWasGiven) {
     expect_near(imaginary, {real<dsp>({-0.2L, 1.0L / 7}, step)}, single);
 }
 
+/// What comes of a table, and the guesses that are told about it.
+struct TableCase {
+    std::string text, options, want, told = "";
+};
+
 TEST_F(ConvertTest, CsvDialects) {
-    const std::tuple<std::string, std::string, std::string> cases[] = {
+    const TableCase cases[] = {
         {"1\n2\n3\n", "", "value\n1\n2\n3\n"},
-        {"value\n1\n\n\n", "--rate 4", "# delta = 0.25\nvalue\n1\n"},
-        {"a;b\n1,5;-2e3\n", "", "re,im\n1.5,-2000\n"},
+        {"value\n1\n\n\n", "--rate 4", "# delta = 0.25\n# axis = s\nvalue\n1\n"},
+        {"a;b\n1,5;-2e3\n", "", "a,b\n1.5,-2000\n"},
         {"1\t2,5\n", "--column 2", "value\n2.5\n"},
-        {"\"t\",\"v\"\r\n0,+7,\r\n0.5,8,\r\n", "", "# delta = 0.5\nvalue\n7\n8\n"},
-        {"# c\nTime [s], U\n1,4\n1.25,5\n# a\n1.5,6\n", "", "# delta = 0.25\nvalue\n4\n5\n6\n"},
-        {"frequency,re,im\n-1,2,3\n0,4,5\n", "", "re,im\n2,3\n4,5\n"},
-        {"10 1\n  20   2\n30 3 \n", "--time", "# delta = 10\nvalue\n1\n2\n3\n"},
-        {"t,u,i\n0,1,2\n1,3,4\n", "--column i", "value\n2\n4\n"},
-        {"d,u,i\nMo,1,2\nTu,3,4\n", "--column u,3 --delta 9", "# delta = 9\nre,im\n1,2\n3,4\n"},
-        {"NaN,inf\n-INF,nan\n", "", "re,im\nnan,inf\n-inf,nan\n"},
+        {"\"t\",\"v\"\r\n0,+7,\r\n0.5,8,\r\n", "", "# delta = 0.5\nv\n7\n8\n"},
+        {"# c\nTime [s], U\n1,4\n1.25,5\n# a\n1.5,6\n", "",
+         "# delta = 0.25\n# start = 1\n# axis = s\nU\n4\n5\n6\n"},
+        {"frequency,Re,IM\n-1,2,3\n0,4,5\n", "", "# start = -1\nre,im\n2,3\n4,5\n"},
+        {"10 1\n  20   2\n30 3 \n", "--time", "# delta = 10\n# start = 10\nvalue\n1\n2\n3\n"},
+        {"t,u (V),i\n0,1,2\n1,3,4\n", "--column \"U (V),I\"", "u (V),i\n1,2\n3,4\n"},
+        {"d,u,i\nMo,1,2\nTu,3,4\n", "--column u,3 --delta 9 --complex-columns",
+         "# delta = 9\nre,im\n1,2\n3,4\n"},
+        {"d,u,i\nMo,1,2\nTu,3,4\n", "", "u,i\n1,2\n3,4\n", "'d' holds no numbers"},
+        {"NaN,inf\n-INF,nan\n", "", "value 1,value 2\nnan,inf\n-inf,nan\n"},
         {"0.00 1\n0.33 2\n0.67 3\n1 4\n", "--time --delta 1", "value\n1\n2\n3\n4\n"},
-        {"# delta = 5\nv\n1\n\nu,v\n2,3\n", "", "# delta = 5\nvalue\n1\n\nre,im\n2,3\n"},
+        {"# delta = 5\nv\n1\n\nre,im\n2,3\n", "", "# delta = 5\nv\n1\n\nre,im\n2,3\n"},
         {"1e-400,1\n", "--column 1", "value\n0\n"},
+        // As instruments and spreadsheets write tables.
+        {"\xEF\xBB\xBFtime,v\n1,4\n2,5\n", "", "# start = 1\nv\n4\n5\n"},
+        {std::string("\xFF\xFEu\0;\0v\0\n\0001\0,\0005\0;\0002\0\n\0", 22), "", "u,v\n1.5,2\n"},
+        {"Time,U\n(ms),(V)\n0,1\n1,2\n", "--with-time", "time (s),U (V)\n0,1\n0.001,2\n",
+         "times in ms are taken in seconds; line 2 is taken for the units"},
+        {"Scope,X1\nInterval,4e-8\n\nTIME,CH1,CH2\n0,1,2\n1e-3,3,4\n", "",
+         "# delta = 0.001\nCH1,CH2\n1,2\n3,4\n", "2 lines above the table"},
+        {"ID 7\n8 9\nv\n1\n2\n", "--skip 2", "v\n1\n2\n"},
+        {"Wert\n1,5\n2,7\n", "", "Wert\n1.5\n2.7\n", "taken for decimal points"},
+        {"1,05\n-2,5\n", "", "value\n1.05\n-2.5\n", "taken for decimal points"},
+        {"1,2\n4,5\n", "", "value 1,value 2\n1,2\n4,5\n", "taken to separate columns"},
+        {"\"1,5\",\"2,5\"\n", "--decimal comma", "value 1,value 2\n1.5,2.5\n"},
+        {"0,1.5\n0.1,2.5\n0.2,3.5\n", "", "# delta = 0.1\nvalue\n1.5\n2.5\n3.5\n",
+         "column 1 ascends in equal steps"},
+        {"sample,a,b\n1,5,6\n2,7,8\n3,9,9\n", "", "a,b\n5,6\n7,8\n9,9\n", "counts the rows"},
+        {"# time, u\n0,1.5\n1,2\n", "", "u\n1.5\n2\n", "the comment in line 1"},
+        {"at,x\n2026-03-01T12:00:00+01:00,1\n2026-03-01T12:00:00.5+01:00,2\n", "--with-time",
+         "# origin = 2026-03-01T11:00:00Z\ntime (s),x\n0,1\n0.5,2\n", "dates"},
+        {"Date;Time;U\n1.3.2026;12:00:59,5;1,5\n1.3.2026;12:01:00;2\n", "",
+         "# delta = 0.5\n# origin = 2026-03-01T12:00:59.5\n# axis = s\nU\n1.5\n2\n"},
+        // What is missing.
+        {"v\nNA\nNA\n1\n\n", "--missing hold", "v\n1\n1\n1\n"},
+        {"u,v\n1,\n,5\n3,\n4,9\n", "--missing linear", "u,v\n1,5\n2,5\n3,7\n4,9\n"},
+        {"t,v\n0,1\n1,2\n4,5\n5,nan\n", "--missing linear", "v\n1\n2\n3\n4\n5\n5\n"},
+        {"t,v\n0,1\n1,2\n,\n4,5\n", "--missing hold", "v\n1\n2\n2\n2\n5\n"},
     };
-    for (const auto& [text, options, want] : cases) {
+    for (const auto& [text, options, want, told] : cases) {
         write("in.csv", text);
-        EXPECT_EQ(printed("convert in.csv - --to csv " + options), want) << text;
+        const auto done = shell("wavkit convert in.csv - --to csv " + options);
+        EXPECT_EQ(done.out, want) << text << done.err;
+        EXPECT_EQ(std::count(done.err.begin(), done.err.end(), '\n'), told.empty() ? 0 : 1);
+        EXPECT_NE(done.err.find(told), std::string::npos) << done.err;
     }
 }
 
 TEST_F(ConvertTest, CsvFaultsAreFoundWhereTheyAre) {
     const std::tuple<std::string, std::string, std::string> cases[] = {
         {"1\n2\nx\n", "", "in.csv:3: 'x' is not a number"},
-        {"# c\nv\n\n1,2\n3,\n", "", "in.csv:5: expected 2 fields, found 1"},
-        {"1,,2\n", "--column 2", "in.csv:1: '' is not a number"},
-        {"1,2,3\n", "", "in.csv:1: 3 columns; choose with --column"},
+        {"# c\nu,v\n\n1,2\n3\n", "", "in.csv:5: expected 2 fields, found 1"},
+        {"v\nNA\n1\n", "", "in.csv:2: the value of 'v' is missing ('NA')"},
+        {"u,v\n1,2\n3,\n", "", "in.csv:3: the value of 'v' is missing"},
         {"a,b\n1,2\n", "--column c", "in.csv:2: there is no column 'c'"},
-        {"0,1\n1,2\n3,3\n4,4\n", "--time", "in.csv:2: the time column is not equally spaced"},
-        {"2,1\n1,2\n", "--time", "in.csv:1: the time column is not equally spaced and increasing"},
+        {"1,2,3\n", "--complex-columns", "in.csv:1: a complex signal takes two columns, not 3"},
+        {"0,1\n1,2\n3,3\n4,4\n", "--time", "in.csv:3: the time column is not equally spaced: 1 "},
+        {"0,1\n1,2\n2,1\n9,3\n10,0\n12,0\n", "--time",
+         "in.csv:4: the time column is not equally spaced: 6 samples are missing between 2 and 9, "
+         "and some in 1 other place"},
+        {"0,1\n1,2\n2,1\n2.4,3\n3,3\n4,0\n", "--time", "in.csv:4: the time column is not equally"},
+        {"2,1\n1,2\n", "--time", "in.csv:2: the time column is not equally spaced and increasing"},
         {"0\n1\n", "--time", "in.csv:1: no column beside the time"},
         {"time,value\n", "", "there is no signal in in.csv"},
     };
@@ -111,8 +156,13 @@ TEST_F(ConvertTest, TheFormatIsToldFromTheContents) {
     EXPECT_EQ(printed("convert plain.txt - --to csv --delta 3"), "# delta = 3\nvalue\n1\n2\n16\n");
     write("table.txt", "u, i\n1, 2\n");
     write("at.txt", "1 2\n3 4\n");
-    EXPECT_EQ(printed("convert table.txt - --to csv"), "re,im\n1,2\n");
-    EXPECT_EQ(printed("convert at.txt - --to csv --from csv"), "re,im\n1,2\n3,4\n");
+    EXPECT_EQ(printed("convert table.txt - --to csv"), "u,i\n1,2\n");
+    EXPECT_EQ(printed("convert at.txt - --to csv --from csv"), "value 1,value 2\n1,2\n3,4\n");
+    // Its own CSV through a pipe, with a header and without.
+    const std::string made = "generate cos 0.1 --delta 0.5 --points 3 --to csv | ";
+    const std::string want = printed("generate cos 0.1 --delta 0.5 --points 3 --to csv");
+    EXPECT_EQ(printed(made + "wavkit convert - - --to csv"), want);
+    EXPECT_EQ(printed(made + "grep -v value | wavkit convert - - --to csv"), want);
     write("x.dsp", Signals{sine(50, 2, 0.5, 0.125)});
     printed("convert x.dsp x.wav && mv x.wav misnamed.csv");
     EXPECT_NE(printed("info misnamed.csv").find("WAV"), std::string::npos);
@@ -136,7 +186,7 @@ TEST_F(ConvertTest, ReadingWholeAndBlockByBlockAreOne) {
         same("x.txt", want);
     }
     write("x.csv", "v\n1\n\nno other\n\n");
-    same("x.csv", "value\n1\n");
+    same("x.csv", "v\n1\n");
     write("x.dsp", Signals{real<dsp>({5}), real<dsp>({6})});
     write("mixed.dsp", contents("x.dsp") + "7 8");
     same("mixed.dsp", "value\n5\n\nvalue\n6\n\nvalue\n7\n8\n");
@@ -193,7 +243,7 @@ TEST_F(ConvertTest, CommandsPipe) {
     write("x.csv", "time,value\n0,1\n0.5,2\n1,-1\n");
     const auto done =
         shell("wavkit convert x.csv - | wavkit convert - - --to wav | wavkit convert - - --to csv");
-    EXPECT_EQ(done.out, "# delta = 0.5\nvalue\n1\n2\n-1\n") << done.err;
+    EXPECT_EQ(done.out, "# delta = 0.5\n# axis = s\nvalue\n1\n2\n-1\n") << done.err;
 }
 
 TEST_F(ConvertTest, AFailureLeavesEverythingAsItWas) {

@@ -63,7 +63,7 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {2, "spectrum x.txt --fraction nan", "between"},
         // Options that do not go together, or not with the output
         {2, "convert x.txt o.csv --rate 1 --delta 1", "--delta"},
-        {2, "convert x.txt o.csv --column 1,2,3", "one column or two"},
+        {2, "convert x.txt o.csv --missing no", "--missing"},
         {2, "convert x.txt o.txt --with-time", "--with-time is for CSV"},
         {2, "convert x.txt o.flac --bits float", "FLAC"},
         {2, "correlate x.txt x.txt -o c.dsp --lags 0 1", "--lags goes with CSV"},

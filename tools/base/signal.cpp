@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <limits>
+#include <utility>
 
 #include "base/error.hpp"
 
@@ -13,9 +14,12 @@ void check(int status, const std::string& what) {
 
 Signal::Signal() { dsp_init(&record_); }
 Signal::Signal(double delta) : Signal() { record_.delta = delta; }
-Signal::Signal(Signal&& other) noexcept : record_(other.record_) { dsp_init(&other.record_); }
+Signal::Signal(Signal&& other) noexcept : facts(std::move(other.facts)), record_(other.record_) {
+    dsp_init(&other.record_);
+}
 Signal& Signal::operator=(Signal&& other) noexcept {
     std::swap(record_, other.record_);
+    std::swap(facts, other.facts);
     return *this;
 }
 Signal::~Signal() { dsp_destroy(&record_); }

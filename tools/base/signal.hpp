@@ -6,6 +6,8 @@
 #include <span>
 #include <string>
 
+#include "base/facts.hpp"
+
 namespace wavkit::tool {
 
 /// Throws when a step of the library failed; `what` says which: "computing the spectrum".
@@ -36,6 +38,11 @@ class Signal {
 
     /// Makes a real signal of interleaved pairs complex.
     void pair();
+
+    /// The place of a sample on the axis.
+    double place(double sample) const { return facts.start + sample * record_.delta; }
+
+    Facts facts;  // the library's functions leave them as they are
 
   private:
     dsp record_;

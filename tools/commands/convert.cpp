@@ -20,25 +20,27 @@ void run(const ConvertOptions& options) {
 }
 
 constexpr const char* about_formats =
-    R"(Names ending in .dsp .sig .bin are binary signal files, .txt .dsa text ones, .csv .wav .flac
-what they say; - is binary unless --to says otherwise.
+    R"(Names ending in .dsp .sig .bin are binary signal files, .txt .dsa text ones, .csv .wav .flac .npy
+.mat what they say; - is binary unless --to says otherwise. Universal File Format (data sets 58),
+TDMS and whatever libsndfile opens are read as well.
 
-Every channel of a sound file is a signal of its own; a complex signal becomes two channels.
-Several signals in one CSV file are separated by a blank line. CSV has one column, or two (re,im)
-of a complex signal; separators may be commas, semicolons, tabs or blanks, and lines without
-numbers at the top are a header.
+Every channel of a sound file and every column of a CSV file is a signal of its own; columns called
+re,im are a complex one, and a complex signal becomes two channels. Several tables in one CSV file
+are separated by a blank line. What is guessed about a file is told on standard error.
 
 Examples:
   wavkit convert tone.wav tone.csv --channel 1 --with-time
   wavkit convert log.csv log.dsp --time --column 3
   wavkit convert readings.txt readings.dsp --rate 360
+  wavkit convert scope.csv volts.npy --column Voltage --missing linear
   wavkit convert log.dsp - --to csv | head)";
 
 }  // namespace
 
 void add_convert(CLI::App& program) {
     auto* const command = program.add_subcommand(
-        "convert", "Writes the signals of a file in another format: signal files, CSV, WAV, FLAC.");
+        "convert",
+        "Writes the signals of a file in another format: signal files, CSV, sound, .npy, .mat.");
     const auto options = std::make_shared<ConvertOptions>();
     command->add_option("IN", options->in, "file to read; - is standard input")
         ->required()

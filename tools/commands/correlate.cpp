@@ -9,6 +9,7 @@
 #include "base/number.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
+#include "files/moment.hpp"
 #include "files/output.hpp"
 #include "files/recording.hpp"
 #include "measure/peaks.hpp"
@@ -29,8 +30,9 @@ struct Correlation {
     Signal values;  // from lag -first on
     int first;
     double to_coefficient;  // takes a value to the share of the greatest possible one
+    double later = 0;       // by which B starts behind A
 
-    double lag(int i) const { return (double(i) - first) * values->delta; }
+    double lag(int i) const { return later + (double(i) - first) * values->delta; }
 };
 
 void check_usage(const CorrelateOptions& options) {
@@ -66,6 +68,13 @@ double energy(const Signal& x) {
     return sum;
 }
 
+/// By how much B starts behind A, as far as both are told to begin.
+double later_start(const Signal& a, const Signal& b) {
+    const auto from = moment_of(a.facts.origin), to = moment_of(b.facts.origin);
+    const double places = b.facts.start - a.facts.start;
+    return from && to ? places + to->since(*from) : places;
+}
+
 /// The correlation at every lag at which the two overlap, with zeros beyond the ends of B.
 Correlation correlated(const Signal& a, Signal b) {
     if (std::fabs(a->delta - b->delta) > 1e-6 * std::fabs(a->delta)) {
@@ -77,7 +86,9 @@ Correlation correlated(const Signal& a, Signal b) {
     constexpr long longest = 1L << 30;
     if (b->points + 2L * shift > longest) throw Error("the signals are too long to correlate");
     b->delta = a->delta;
-    Correlation result{{}, shift, energies > 0 ? a->points / std::sqrt(energies) : 0};
+    Correlation result{
+        {}, shift, energies > 0 ? a->points / std::sqrt(energies) : 0, later_start(a, b)};
+    result.values.facts.start = result.lag(0);
     check(dspi_zpad2(b, b->points + shift, DSP_PAD_UNSCALED | DSP_PAD_AT_END) ||
               dspi_zpad(b, b->points + shift) || dspb_corr(a, b, result.values, nullptr, a->points),
           "correlating");

@@ -41,8 +41,7 @@ void print_summary(const std::vector<Signal>& envelopes) {
         const auto values = y.values();
         const auto highest = std::ranges::max_element(values) - values.begin();
         std::printf("%12.6g %12.6g %12.6g %12.6g\n", statistic(dsps_mean, y),
-                    statistic(dsps_min, y), values[std::size_t(highest)],
-                    double(highest) * y->delta);
+                    statistic(dsps_min, y), values[std::size_t(highest)], y.place(double(highest)));
     }
 }
 
@@ -87,7 +86,7 @@ void add_envelope(CLI::App& program) {
         ->type_name("");
     command->add_option("-o,--output", options->out, "file to write; - is standard output")
         ->type_name("FILE");
-    add_choice(*command, "--to", options->writing.format, formats(),
+    add_choice(*command, "--to", options->writing.format, written_formats(),
                "format of the output (default: by its name)");
     command->add_flag("--with-time", options->writing.time, "CSV: begin with a column of times");
     command->add_flag("--detrend", options->detrend, "remove the mean first");

@@ -159,8 +159,8 @@ class Comparison {
   public:
     Comparison(const FilterOptions& options, const SampleStream& stream, bool sound)
         : options_(options),
-          seconds_(sound || options.reading.rate),
-          before_(outline(stream.delta)),
+          unit_(stream.facts_of(0).axis(sound || options.reading.rate)),
+          before_(outline(stream)),
           after_(before_),
           width_(stream.channels) {}
 
@@ -173,18 +173,20 @@ class Comparison {
         std::vector panels{before_.curve(), after_.curve()};
         panels[0].title = short_name(options_.in);
         panels[1].title = "filtered";
-        for (auto& panel : panels) panel.x_label = with_unit("time", seconds_ ? "s" : "");
+        for (auto& panel : panels) panel.x_label = with_unit("time", unit_);
         tool::draw(panels, options_.plot);
     }
 
   private:
-    Outline outline(double delta) const {
-        return options_.span.empty() ? Outline(delta)
-                                     : Outline(delta, options_.span[0], options_.span[1]);
+    Outline outline(const SampleStream& stream) const {
+        const double start = stream.facts_of(0).start;
+        return options_.span.empty()
+                   ? Outline(stream.delta, start)
+                   : Outline(stream.delta, start, options_.span[0], options_.span[1]);
     }
 
     const FilterOptions& options_;
-    bool seconds_;
+    std::string unit_;
     Outline before_, after_;
     std::size_t width_;
 };
@@ -201,9 +203,9 @@ class FilterRun {
             output_.emplace(options_.out);
             writer_ = block_writer(output_->stream(), *format_, options_.writing);
         }
-        // The channels of a sound file belong together in another one, and are signals one after
-        // the other elsewhere.
-        const bool together = format_ && is_sound(*format_);
+        // Channels stay together where the format allows it, and become signals one after the other
+        // elsewhere.
+        const bool together = format_ && takes_channels(*format_);
         const auto source = together ? open_channels(input_, options_.reading)
                                      : open_signals(input_, options_.reading);
         while (auto* const stream = source->next()) filter(*stream, source->sound);
@@ -219,7 +221,8 @@ class FilterRun {
         if (draws && filter.complex_output()) throw Error("--plot draws real signals only");
         if (draws) comparison_.emplace(options_, stream, sound);
         if (writer_)
-            writer_->begin({stream.delta, filter.complex_output(), stream.channels, stream.length});
+            writer_->begin({stream.delta, filter.complex_output(), stream.channels, stream.length,
+                            stream.facts});
         {
             Progress progress("filtering " + input_.name());
             filter.run([&](std::span<const double> in, std::span<const double> out) {

@@ -47,7 +47,7 @@ Signal pairs_of(Signal x) {
     pairs->complex = 1;
     check(dsp_alloc(pairs), "fitting a line");
     for (int i = 0; i < x->points; ++i) {
-        pairs->data[2 * i] = i * step;
+        pairs->data[2 * i] = x.facts.start + i * step;
         pairs->data[2 * i + 1] = x->data[i];
     }
     return pairs;
@@ -118,7 +118,9 @@ void run(const FitOptions& options) {
     if (options.json && options.plot == "-") {
         throw UsageError("standard output takes only one of --json and --plot -");
     }
-    auto x = first_signal(options.in, options.reading);
+    auto reading = options.reading;
+    reading.csv.complex |= reading.csv.columns.size() == 2;
+    auto x = first_signal(options.in, reading);
     if (x->points < 1) throw Error("the signal has no samples");
     check_finite(x.values(), x->complex);
     Signal table;

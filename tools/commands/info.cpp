@@ -42,11 +42,21 @@ std::string point(int (*reduce)(const dsp*, dsp*), const Signal& x) {
     return text;
 }
 
-void describe(const Signal& x, bool seconds) {
+void describe(const Signal& x, bool sound) {
+    if (!x.facts.name.empty()) line("name", x.facts.name);
+    if (!x.facts.unit.empty()) line("unit", x.facts.unit);
+    const auto axis = x.facts.axis(sound);
+    const bool seconds = axis == "s";
+    const std::string of_axis = axis.empty() ? "" : " " + axis;
     line("points", std::to_string(x->points));
     line("kind", x->complex ? "complex" : "real");
-    line("delta", number(x->delta) + (seconds ? " s (" + brief(1 / x->delta) + " Hz)" : ""));
-    line("duration", number(x->points * x->delta) + (seconds ? " s" : ""));
+    line("delta",
+         number(x->delta) + of_axis + (seconds ? " (" + brief(1 / x->delta) + " Hz)" : ""));
+    if (x.facts.placed() || !x.facts.origin.empty()) {
+        line("start", number(x.facts.start) + of_axis +
+                          (x.facts.origin.empty() ? "" : " after " + x.facts.origin));
+    }
+    line("duration", number(x->points * x->delta) + of_axis);
     if (x->points == 0) return;
     line("mean", point(dsps_mean, x));
     line("rms", point(dsps_rms, x));

@@ -13,6 +13,7 @@
 #include "base/options.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
+#include "files/facts_text.hpp"
 #include "files/output.hpp"
 #include "files/recording.hpp"
 #include "measure/prepare.hpp"
@@ -70,7 +71,9 @@ Signal even_places(int points, double first, double step) {
 Table table_of(const Signal& x, const InterpOptions& options) {
     if (x->points < 1) throw Error("a signal has no samples");
     if (options.table && !x->complex) throw Error("--table takes two columns, x and y");
-    Table table{options.table ? part_of(x, dspi_real) : even_places(x->points, 0, x->delta), {}};
+    Table table{
+        options.table ? part_of(x, dspi_real) : even_places(x->points, x.facts.start, x->delta),
+        {}};
     if (!options.table) table.columns.push_back(part_of(x, dspi_real));
     if (x->complex) table.columns.push_back(part_of(x, dspi_imag));
 
@@ -162,7 +165,9 @@ Sampled sampled(const Table& table, Signal places, const InterpOptions& options)
 void write_tables(std::FILE* to, const std::vector<Sampled>& results) {
     for (const auto& [places, values] : results) {
         if (&places != &results[0].places) std::fputc('\n', to);
-        std::fprintf(to, "t,%s\n", values->complex ? "re,im" : "value");
+        const auto& facts = values.facts;
+        std::fprintf(to, "%s,%s\n", heading("t", facts.axis_unit).c_str(),
+                     values->complex ? "re,im" : "value");
         const std::size_t width = values->complex ? 2 : 1;
         for (int i = 0; i < places->points; ++i) {
             std::fputs(number(places->data[i]).c_str(), to);
@@ -194,6 +199,7 @@ void run(InterpOptions options) {
     check_usage(options);
     auto& columns = options.reading.csv.columns;
     if (options.table && columns.empty()) columns = {"1", "2"};
+    options.reading.csv.complex |= options.table;
     const auto recording = read_recording(options.in, options.reading);
     const auto at = options.rate ? Signal() : read_places(options.at);
     std::vector<Sampled> results;
@@ -209,6 +215,14 @@ void run(InterpOptions options) {
                 check(dsp_copy(places, at), "interpolating");
             }
             results.push_back(sampled(table, std::move(places), options));
+            auto& facts = results.back().values.facts;
+            facts = x.facts;
+            if (options.rate) {
+                facts.start = table.first();
+            } else {
+                facts.start = 0;
+                facts.axis_unit = facts.origin = "";
+            }
         }
     }
     write(std::move(results), options);
@@ -260,7 +274,7 @@ void add_interp(CLI::App& program) {
     command->add_flag("--table", options->table, "IN has two columns, x and y");
     command->add_option("-o,--output", options->out, "file to write; - is standard output")
         ->type_name("FILE");
-    add_choice(*command, "--to", options->writing.format, formats(),
+    add_choice(*command, "--to", options->writing.format, written_formats(),
                "format of the output (default: by its name)");
     options->reading.declare(*command, false);
     command->footer(about);

@@ -117,8 +117,8 @@ class ResampleRun {
     }
 
     void run() {
-        const auto source = is_sound(format_) ? open_channels(input_, options_.reading)
-                                              : open_signals(input_, options_.reading);
+        const auto source = takes_channels(format_) ? open_channels(input_, options_.reading)
+                                                    : open_signals(input_, options_.reading);
         while (auto* const stream = source->next()) change(*stream);
         output_.commit();
     }
@@ -130,12 +130,14 @@ class ResampleRun {
         const auto values = times_.values();
         check_finite(values, false);
         if (!std::ranges::is_sorted(values)) throw Error("the times of --to-times must ascend");
-        if (!values.empty() && values[0] < 0) {
-            throw Error(number(values[0]) + " lies before the signal, which begins at 0");
-        }
     }
 
     void change(SampleStream& stream) {
+        const double start = stream.facts_of(0).start;
+        if (times_->points > 0 && times_->data[0] < start) {
+            throw Error(number(times_->data[0]) + " lies before the signal, which begins at " +
+                        number(start));
+        }
         const std::size_t width = stream.channels * (stream.complex ? 2 : 1);
         const auto quality = options_.quality.value_or(normal_rates);
         Target target{{1, 1, 1}, stream.delta};
@@ -144,10 +146,16 @@ class ResampleRun {
             target = target_for(options_, stream.delta);
             changed.emplace(width, target.ratio, quality);
         } else {
-            changed.emplace(width, places_at(stream.delta), std::int64_t(times_->points), quality);
+            changed.emplace(width, places_at(stream.delta, start), std::int64_t(times_->points),
+                            quality);
             target.delta = 1;
         }
-        SignalShape shape{target.delta, stream.complex, stream.channels, std::nullopt};
+        SignalShape shape{target.delta, stream.complex, stream.channels, std::nullopt,
+                          stream.facts};
+        if (!options_.times.empty()) {
+            // The values lie wherever their times do, on no axis.
+            for (auto& facts : shape.facts) facts.start = 0, facts.axis_unit = facts.origin = "";
+        }
         if (stream.length || !options_.times.empty()) {
             const auto points = changed->outputs(std::int64_t(stream.length.value_or(0)));
             if (points > std::numeric_limits<int>::max() && !is_sound(format_)) {
@@ -161,10 +169,10 @@ class ResampleRun {
     }
 
     /// Times in samples.
-    PlaceOf places_at(double delta) const {
+    PlaceOf places_at(double delta, double start) const {
         const auto times = times_.values();
         return [=](std::int64_t m) {
-            const double at = times[std::size_t(m)] / delta, whole = std::floor(at);
+            const double at = (times[std::size_t(m)] - start) / delta, whole = std::floor(at);
             return SamplePlace{std::int64_t(whole), at - whole};
         };
     }
@@ -184,8 +192,9 @@ class ResampleRun {
             progress.done(stream.done());
         }
         if (times_->points > 0) {
-            const double last = times_.values().back(), end = double(taken - 1) * stream.delta;
-            if (last > end * (1 + 1e-12)) {
+            const double last = times_.values().back(), start = stream.facts_of(0).start;
+            const double end = start + double(taken - 1) * stream.delta;
+            if (last > end + 1e-12 * std::max(std::fabs(start), std::fabs(end))) {
                 throw Error(number(last) + " lies behind the signal, which ends at " + number(end));
             }
         }

@@ -84,13 +84,13 @@ void check_usage(const SpectrumOptions& options) {
 }
 
 /// The band and the unit that a report shows.
-SpectrumReport report_of(const SpectrumOptions& options, Spectrum spectrum, bool sound) {
+SpectrumReport report_of(const SpectrumOptions& options, Spectrum spectrum, const Facts& facts,
+                         bool sound) {
     const auto& report = options.report;
     Band band;
     if (!report.band.empty()) band = {report.band[0], report.band[1]};
-    const bool seconds = sound || options.reading.rate;
     return {report, std::move(spectrum), band,
-            report.unit.empty() && seconds ? std::string("s") : report.unit};
+            report.unit.empty() ? facts.axis(sound || options.reading.rate) : report.unit};
 }
 
 SpectrumReport measured_whole(const SpectrumOptions& options) {
@@ -101,7 +101,7 @@ SpectrumReport measured_whole(const SpectrumOptions& options) {
     if (options.segments.slope) take_slope(x);
     if (options.segments.detrend) remove_mean(x);
     check_finite(x.values(), x->complex);
-    return report_of(options, measure(x, options.settings), source->sound);
+    return report_of(options, measure(x, options.settings), x.facts, source->sound);
 }
 
 SpectrumReport measured_in_segments(const SpectrumOptions& options) {
@@ -109,11 +109,11 @@ SpectrumReport measured_in_segments(const SpectrumOptions& options) {
     const auto source = open_signals(input, options.reading);
     auto* const stream = source->next();
     SpectrumAverage average(options.averaging);
-    auto report = report_of(options, {}, source->sound);
+    auto report = report_of(options, {}, stream->facts_of(0), source->sound);
     std::optional<Waterfall> waterfall;
     if (!options.waterfall.empty()) {
         waterfall.emplace(report.band, options.report.density,
-                          options.segments.step() * stream->delta);
+                          options.segments.step() * stream->delta, stream->facts_of(0).start);
     }
     {
         Progress progress("measuring " + input.name());

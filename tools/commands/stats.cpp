@@ -85,7 +85,7 @@ std::vector<Figure> figures(const Signal& x) {
         const std::string name = smallest ? "min" : "max";
         const double sample = place(x, smallest);
         list.push_back({name + "_sample", {sample}, true});
-        list.push_back({name + "_at", {sample * x->delta}});
+        list.push_back({name + "_at", {x.place(sample)}});
     }
     if (!x->complex) list.push_back({"range", {statistic(dsps_max, x) - statistic(dsps_min, x)}});
     return list;
@@ -99,7 +99,8 @@ JsonMembers members(const Signal& x) {
     return list;
 }
 
-void print(const Signal& x, bool seconds) {
+void print(const Signal& x, bool sound) {
+    const auto unit = x.facts.axis(sound);
     std::printf("%-22s %s\n", "kind", x->complex ? "complex" : "real");
     for (auto figure : figures(x)) {
         const bool time =
@@ -109,7 +110,7 @@ void print(const Signal& x, bool seconds) {
         const char* const format = figure.whole ? "%.0f" : "%.9g";
         std::printf(format, figure.parts[0]);
         if (figure.parts.size() == 2) std::printf(",%.9g", figure.parts[1]);
-        std::puts(time && seconds ? " s" : "");
+        std::puts(time && !unit.empty() ? (" " + unit).c_str() : "");
     }
 }
 

@@ -134,7 +134,7 @@ void add_window(CLI::App& program) {
         ->type_name("N");
     command->add_option("-o,--output", options->out, "write the samples; - is standard output")
         ->type_name("FILE");
-    add_choice(*command, "--to", options->writing.format, formats(),
+    add_choice(*command, "--to", options->writing.format, written_formats(),
                "format of the output (default: by its name)");
     command
         ->add_option("--plot", options->plot,

@@ -9,6 +9,9 @@
 #include "base/error.hpp"
 #include "base/number.hpp"
 #include "base/scratch.hpp"
+#include "files/facts_text.hpp"
+#include "files/mat.hpp"
+#include "files/npy.hpp"
 #include "files/sound.hpp"
 #include "files/writing.hpp"
 
@@ -31,6 +34,8 @@ class SignalFileWriter : public BlockWriter {
     SignalFileWriter(std::FILE* to, bool text) : to_(to), text_(text) {}
 
     void begin(const SignalShape& shape) override {
+        facts_ = shape.facts_of(0);
+        if (!text_) tell_of_lost_start(facts_);
         part_ = {Scalar(shape.delta), nullptr, 0, int(shape.points.value_or(0)), shape.complex, 0};
         promised_ = shape.points.value_or(0);
         points_ = 0;
@@ -73,10 +78,12 @@ class SignalFileWriter : public BlockWriter {
     void put_header(std::size_t points) {
         part_.points = int(points);
         put(part_, to_, format() | header_alone);
+        if (text_) write_facts(to_, facts_, true);
     }
 
     std::FILE* to_;
     bool text_;
+    Facts facts_;
     Record part_{};  // borrows the samples of a block
     std::vector<Scalar> samples_;
     std::size_t promised_ = 0, points_ = 0;
@@ -84,8 +91,8 @@ class SignalFileWriter : public BlockWriter {
     Stream waiting_{nullptr, std::fclose};
 };
 
-/// Signals one after the other, each with a header; numbers have as many digits as it takes to read
-/// the same value again.
+/// Signals side by side or one after the other, each with a header; values have as many digits as
+/// it takes to read the same one again, and times as many as a double holds for certain.
 class CsvWriter : public BlockWriter {
   public:
     CsvWriter(std::FILE* to, bool time) : to_(to), time_(time) {}
@@ -95,18 +102,33 @@ class CsvWriter : public BlockWriter {
         first_ = false;
         shape_ = shape;
         point_ = 0;
-        if (!time_ && shape.delta != 1) {
+        auto facts = shape.facts_of(0);
+        if (time_) {
+            facts.start = 0;
+            facts.axis_unit.clear();
+        } else if (shape.delta != 1) {
             std::fprintf(to_, "# delta = %s\n", number(shape.delta).c_str());
         }
-        std::fprintf(to_, "%s%s\n", time_ ? "time," : "", shape.complex ? "re,im" : "value");
+        write_facts(to_, facts, shape.complex);
+        if (time_) {
+            std::fprintf(to_, "%s,", field(heading("time", shape.facts_of(0).axis_unit)).c_str());
+        }
+        if (shape.complex) std::fputs("re,im", to_);
+        for (std::size_t c = 0; c < shape.channels && !shape.complex; ++c) {
+            std::fprintf(to_, "%s%s", c > 0 ? "," : "", field(heading_of_channel(c)).c_str());
+        }
+        std::fputc('\n', to_);
     }
 
     void write(std::span<const double> values) override {
-        const std::size_t width = shape_.complex ? 2 : 1;
+        const std::size_t width = shape_.complex ? 2 : shape_.channels;
+        const double start = shape_.facts_of(0).start;
         for (std::size_t i = 0; i < values.size(); i += width, ++point_) {
-            if (time_) std::fprintf(to_, "%s,", number(double(point_) * shape_.delta).c_str());
-            std::fputs(number(values[i]).c_str(), to_);
-            if (width == 2) std::fprintf(to_, ",%s", number(values[i + 1]).c_str());
+            if (time_) std::fprintf(to_, "%.15g,", start + double(point_) * shape_.delta);
+            for (std::size_t c = 0; c < width; ++c) {
+                if (c > 0) std::fputc(',', to_);
+                std::fputs(number(values[i + c]).c_str(), to_);
+            }
             std::fputc('\n', to_);
         }
     }
@@ -114,6 +136,23 @@ class CsvWriter : public BlockWriter {
     void end() override {}
 
   private:
+    std::string heading_of_channel(std::size_t c) const {
+        const auto facts = shape_.facts_of(c);
+        // A first column that is called time would be read as one.
+        const bool misleading = c == 0 && !time_ && names_an_axis(facts.name);
+        if (!facts.name.empty() && !misleading) return heading(facts.name, facts.unit);
+        return heading(shape_.channels > 1 ? "value " + std::to_string(c + 1) : "value",
+                       facts.unit);
+    }
+
+    /// In quotes where a field holds a separator or begins like a comment.
+    static std::string field(const std::string& text) {
+        if (text.find_first_of(",;\t\"") == text.npos && !text.starts_with('#')) return text;
+        std::string result = "\"";
+        for (const char c : text) result += c == '"' ? '\'' : c;
+        return result + '"';
+    }
+
     std::FILE* to_;
     bool time_, first_ = true;
     SignalShape shape_;
@@ -126,6 +165,10 @@ std::unique_ptr<BlockWriter> block_writer(std::FILE* to, Format format,
                                           const WriteOptions& options) {
     if (is_sound(format)) return sound_writer(to, format, options.samples);
     if (format == Format::csv) return std::make_unique<CsvWriter>(to, options.time);
+    if (format == Format::npy) return npy_writer(to, options.single.value_or(false));
+    if (format == Format::mat) {
+        return mat_writer(to, options.single.value_or(false), options.compressed);
+    }
     const bool text = format == Format::text;
     if (options.single.value_or(false)) {
         return std::make_unique<SignalFileWriter<dspf>>(to, text);

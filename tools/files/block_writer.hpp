@@ -5,7 +5,9 @@
 #include <memory>
 #include <optional>
 #include <span>
+#include <vector>
 
+#include "base/facts.hpp"
 #include "files/format.hpp"
 
 namespace wavkit::tool {
@@ -16,8 +18,13 @@ struct WriteOptions;
 struct SignalShape {
     double delta = 1.0;
     bool complex = false;
-    std::size_t channels = 1;  // signals of a sound file, sample by sample in turn
+    std::size_t channels = 1;  // signals side by side, sample by sample in turn
     std::optional<std::size_t> points;
+    std::vector<Facts> facts = {};  // of each channel, as far as they are known
+
+    Facts facts_of(std::size_t channel) const {
+        return channel < facts.size() ? facts[channel] : Facts();
+    }
 };
 
 /// Writes one signal after the other; each format as it is documented for `convert`.
@@ -32,8 +39,8 @@ class BlockWriter {
     virtual void end() = 0;
 };
 
-/// A writer into a file that can go back. Only signal files and CSV take more than one signal, and
-/// only sound more than one channel.
+/// A writer into a file that can go back. Sound takes one signal; more than one channel is for
+/// the formats of takes_channels().
 std::unique_ptr<BlockWriter> block_writer(std::FILE* to, Format format,
                                           const WriteOptions& options);
 

@@ -1,231 +1,256 @@
 #include "files/csv.hpp"
 
 #include <algorithm>
-#include <cctype>
-#include <charconv>
 #include <cmath>
 #include <cstdlib>
+#include <limits>
 #include <optional>
 #include <string_view>
 
 #include "base/error.hpp"
 #include "base/number.hpp"
-#include "files/csv_row.hpp"
+#include "files/csv_columns.hpp"
+#include "files/csv_lines.hpp"
+#include "files/csv_table.hpp"
+#include "files/encoding.hpp"
+#include "files/gap_filler.hpp"
+#include "files/time_axis.hpp"
 
 namespace wavkit::tool {
 namespace {
 
 constexpr std::size_t block_values = 8192;
+constexpr std::int64_t longest_gap = 10000000;  // rows that --missing puts in one place
+constexpr double nothing = std::numeric_limits<double>::quiet_NaN();
 
-std::string lower(std::string_view text) {
-    std::string result(text);
-    std::ranges::transform(result, result.begin(),
-                           [](unsigned char c) { return char(std::tolower(c)); });
-    return result;
-}
-
-/// Whether a header calls its first column the axis of the others: "time", "t [s]", "frequency".
-bool names_an_axis(std::string_view name) {
-    const auto word = lower(name.substr(0, name.find_first_of(" ([_/")));
-    return word == "time" || word == "t" || word == "frequency" || word == "f";
-}
-
-/// The lines of a file, without the blanks around them.
-class Lines {
-  public:
-    explicit Lines(InputFile& input) : input_(input) {}
-    ~Lines() { std::free(line_); }
-    Lines(const Lines&) = delete;
-    Lines& operator=(const Lines&) = delete;
-
-    struct Place {
-        long offset = 0;
-        std::size_t number = 0;
-    };
-
-    bool next() {
-        const auto count = getline(&line_, &room_, input_.stream());
-        if (count < 0) return false;
-        before_ = here_;
-        here_.offset += long(count);
-        ++here_.number;
-        text_ = trimmed({line_, std::size_t(count)});
-        return true;
-    }
-
-    std::string_view text() const { return text_; }
-    bool is_comment() const { return text_.starts_with('#'); }
-    std::size_t number() const { return here_.number; }
-    double done() const { return double(here_.offset) / double(input_.size()); }
-
-    /// The place of the line that next() read, to read it again.
-    Place place() const { return before_; }
-    void go_to(Place place) {
-        std::fseek(input_.stream(), place.offset, SEEK_SET);
-        here_ = place;
-    }
-
-    [[noreturn]] void fail(const std::string& what) const {
-        throw Error(input_.name() + ":" + std::to_string(number()) + ": " + what);
-    }
-
-  private:
-    InputFile& input_;
-    char* line_ = nullptr;
-    std::size_t room_ = 0;
-    std::string_view text_;
-    Place before_, here_;
-};
-
-/// A file signal by signal, and a signal row by row.
+/// A file table by table, and a table row by row, as often as it is asked for.
 class CsvReader {
   public:
     CsvReader(InputFile& input, const CsvLayout& layout) : lines_(input), layout_(layout) {}
 
-    /// Goes to the first row of the next signal; the one before must have been read to its end.
-    bool next_signal() {
-        names_.clear();
-        std::optional<double> told;
-        while (lines_.next()) {
-            if (lines_.is_comment()) take_comment(told);
-            if (lines_.text().empty() || lines_.is_comment()) continue;
-            separator_ = separator_of(lines_.text());
-            split(lines_.text(), separator_, fields_);
-            if (take_header()) continue;
-            const auto first_row = lines_.place();
-            choose_columns();
-            delta_ = told.value_or(1.0);
-            ended_ = false;
-            if (has_time_) measure_times();
-            lines_.go_to(first_row);
-            ended_ = false;
-            return true;
+    void guess(const std::string& what) { guesses_.push_back(what); }
+
+    /// Goes to the next table, behind the one before.
+    bool next_table() {
+        if (end_) lines_.go_to(*end_);
+        if (!end_ && !ended_) {
+            while (next_row()) {
+            }
         }
-        return false;
-    }
-
-    /// Adds what the next rows hold, until the signal ends or there is a block of it.
-    void read(std::vector<double>& values) {
-        while (values.size() < block_values && next_row()) {
-            for (const auto column : columns_) values.push_back(required(column));
-            if (has_time_) check_time();
-        }
-    }
-
-    double delta() const { return delta_; }
-    bool complex() const { return columns_.size() == 2; }
-    double done() const { return lines_.done(); }
-
-  private:
-    void take_comment(std::optional<double>& told) const {
-        double delta;
-        const std::string text(lines_.text());
-        if (std::sscanf(text.c_str(), "# delta = %lf", &delta) == 1) told = delta;
-    }
-
-    /// Lines without any number, before the first row, are headers; the last one names the columns.
-    bool take_header() {
-        if (std::ranges::any_of(
-                fields_, [&](auto field) { return value_of(field, separator_).has_value(); })) {
-            return false;
-        }
-        names_.assign(fields_.begin(), fields_.end());
+        auto table = tool::next_table(lines_, layout_);
+        if (!table) return false;
+        table_ = std::move(*table);
+        columns_ = columns_of(table_, layout_, lines_);
+        end_.reset();
+        delta_ = table_.delta.value_or(1.0);
+        settle_facts();
+        if (columns_.time) measure_times();
+        tell_guesses();
         return true;
     }
 
-    /// Settles, at the first row of a signal, which columns are read.
-    void choose_columns() {
-        width_ = fields_.size();
-        columns_.clear();
-        for (const auto& column : layout_.columns) columns_.push_back(column_index(column));
-        // An axis that is asked for as a value may be as uneven as any other column.
-        const bool wanted = std::ranges::count(columns_, 0u) > 0;
-        has_time_ = layout_.time || (!wanted && !names_.empty() && names_an_axis(names_[0]));
-        if (!columns_.empty()) return;
-        for (std::size_t i = has_time_ ? 1 : 0; i < width_; ++i) columns_.push_back(i);
-        if (columns_.empty()) lines_.fail("no column beside the time");
-        if (columns_.size() > 2) {
-            lines_.fail(std::to_string(width_) +
-                        " columns; choose with --column, or --time where the first is the time");
+    const Columns& columns() const { return columns_; }
+    double delta() const { return delta_; }
+    double done() const { return lines_.done(); }
+
+    Facts facts(std::size_t column) const {
+        auto facts = table_.facts;
+        if (!table_.headings.empty() && !columns_.complex) {
+            const auto& heading = table_.headings[column];
+            const bool usual = lower(heading.name) == "value" && columns_.values.size() == 1;
+            if (!usual) facts.name = heading.name;
+            facts.unit = heading.unit;
+        }
+        return facts;
+    }
+
+    /// Begins to read some of the columns, at the first row.
+    void begin(std::vector<std::size_t> columns) {
+        chosen_ = std::move(columns);
+        row_.resize(chosen_.size());
+        filler_.emplace(layout_.missing, chosen_.size());
+        position_ = -1;
+        start_rows();
+    }
+
+    /// Adds what the next rows hold, until the table ends or there is a block of it.
+    void read(std::vector<double>& values) {
+        while (values.size() < block_values && next_row()) {
+            if (columns_.time && !check_time(values)) continue;
+            for (std::size_t i = 0; i < chosen_.size(); ++i) row_[i] = value(chosen_[i]);
+            put(values);
+        }
+        if (!ended_ || filled_) return;
+        filled_ = true;
+        if (!filler_->finish(values)) lines_.fail("a column holds no values");
+    }
+
+  private:
+    void start_rows() {
+        lines_.go_to(table_.first_row);
+        ended_ = filled_ = false;
+    }
+
+    void put(std::vector<double>& values) {
+        if (layout_.missing == Missing::error) {
+            values.insert(values.end(), row_.begin(), row_.end());
+        } else {
+            filler_->add(row_, values);
         }
     }
 
-    std::size_t column_index(const std::string& column) const {
-        const auto named = std::ranges::find(names_, column);
-        if (named != names_.end()) return std::size_t(named - names_.begin());
-        std::size_t number = 0;
-        const auto [end, error] =
-            std::from_chars(column.data(), column.data() + column.size(), number);
-        if (error != std::errc() || *end != '\0' || number < 1 || number > width_) {
-            lines_.fail("there is no column '" + column + "'");
-        }
-        return number - 1;
-    }
-
-    /// False at the end of the signal.
+    /// False at the end of the table.
     bool next_row() {
-        while (!ended_ && lines_.next() && !lines_.text().empty()) {
+        while (!ended_ && lines_.next() && !lines_.is_empty()) {
             if (lines_.is_comment()) continue;
-            split(lines_.text(), separator_, fields_);
-            if (fields_.size() != width_) {
-                lines_.fail("expected " + std::to_string(width_) + " fields, found " +
+            const char separator = table_.dialect.separator;
+            split(lines_.text(), separator, fields_);
+            // An empty last field looks like a separator at the end.
+            if (fields_.size() + 1 == table_.width && trimmed_end(lines_.text()) == separator) {
+                fields_.emplace_back();
+            }
+            if (fields_.size() != table_.width) {
+                lines_.fail("expected " + std::to_string(table_.width) + " fields, found " +
                             std::to_string(fields_.size()));
             }
             return true;
         }
+        if (!ended_) end_ = lines_.behind();
         ended_ = true;
         return false;
     }
 
-    double required(std::size_t column) const {
+    static char trimmed_end(std::string_view line) {
+        while (line.ends_with(' ')) line.remove_suffix(1);
+        return line.empty() ? '\0' : line.back();
+    }
+
+    double value(std::size_t column) const {
         const auto field = fields_[column];
-        const auto result = value_of(field, separator_);
-        if (!result) lines_.fail("'" + std::string(field) + "' is not a number");
-        return *result;
+        if (const auto result = value_of(field, table_.dialect)) return *result;
+        const std::string text(field);
+        if (!is_missing(field)) lines_.fail("'" + text + "' is not a number");
+        if (layout_.missing != Missing::error) return nothing;
+        const auto name = table_.name(column);
+        lines_.fail("the value" + (name.empty() ? "" : " of '" + name + "'") + " is missing" +
+                    (text.empty() ? "" : " ('" + text + "')") +
+                    "; --missing hold or linear fills it in");
+    }
+
+    void settle_facts() {
+        auto& facts = table_.facts;
+        scale_ = 1;
+        if (!columns_.time || table_.headings.empty()) return;
+        const auto& heading = table_.headings[*columns_.time];
+        const double seconds = seconds_of(heading.unit);
+        facts.axis_unit = seconds > 0 ? "s" : heading.unit;
+        if (heading.unit.empty() && lower(heading.name).starts_with("seconds")) {
+            facts.axis_unit = "s";
+        }
+        if (seconds <= 0 || seconds == 1) return;
+        scale_ = seconds;
+        guess("times in " + heading.unit + " are taken in seconds");
+    }
+
+    std::optional<RowTime> row_time() {
+        const auto field = fields_[*columns_.time];
+        if (field.empty() && std::ranges::all_of(fields_, is_missing)) return std::nullopt;
+        const auto beside = columns_.time_of_day ? fields_[*columns_.time_of_day] : "";
+        auto time = (*times_)(field, beside);
+        if (!time || !std::isfinite(time->value)) {
+            lines_.fail("'" + std::string(field) + "' is no time");
+        }
+        time->line = lines_.number();
+        return time;
     }
 
     /// The step of the time column is known only at its end: it is read once for the step, and
     /// again, with the values, to see that it keeps to it.
     void measure_times() {
-        first_time_ = required(0);
-        double last = first_time_;
-        std::size_t steps = 0;
-        for (; next_row(); ++steps) last = required(0);
-        if (steps > 0) delta_ = (last - first_time_) / double(steps);
-        rows_ = 0;
+        times_.emplace(table_.dialect, scale_);
+        axis_ = {};
+        start_rows();
+        while (next_row()) {
+            if (const auto time = row_time()) axis_.add(*time);
+        }
+        axis_.end();
+        if (const auto fault = axis_.fault(layout_.missing == Missing::error)) {
+            lines_.fail_at(fault->line, fault->what);
+        }
+        delta_ = axis_.delta();
+        table_.facts.start = axis_.start();
+        if (const auto& origin = times_->origin()) {
+            table_.facts.origin = iso_text(*origin);
+            table_.facts.axis_unit = "s";
+        }
     }
 
-    /// Each time may be off by a twentieth of a step, which forgives printed times their rounding
-    /// and still shows a single missing sample.
-    void check_time() {
-        constexpr double tolerance = 0.05;
-        const double time = required(0), expected = first_time_ + double(rows_++) * delta_;
-        if (delta_ > 0 && std::fabs(time - expected) <= tolerance * delta_) return;
-        lines_.fail("the time column is not equally spaced and increasing (" + number(time) +
-                    " where " + number(expected) + " was expected)");
+    /// Puts in the rows that are missing before this one. False for a row of nothing.
+    bool check_time(std::vector<double>& values) {
+        const auto time = row_time();
+        if (!time) return false;
+        const auto position = axis_.position(time->value);
+        const auto missing = position ? *position - position_ - 1 : 0;
+        const bool fits =
+            position && (missing == 0 || (missing > 0 && layout_.missing != Missing::error));
+        if (!fits) {
+            const double expected = axis_.start() + double(position_ + 1) * delta_;
+            lines_.fail("the time column is not equally spaced and increasing (" +
+                        number(time->value) + " where " + number(expected) + " was expected)");
+        }
+        if (missing > longest_gap) {
+            lines_.fail(std::to_string(missing) + " missing samples are too many to fill in");
+        }
+        std::ranges::fill(row_, nothing);
+        for (std::int64_t i = 0; i < missing; ++i) put(values);
+        position_ = *position;
+        return true;
+    }
+
+    void tell_guesses() {
+        guesses_.insert(guesses_.end(), table_.guesses.begin(), table_.guesses.end());
+        std::string line;
+        for (const auto& what : guesses_) line += (line.empty() ? "" : "; ") + what;
+        if (!line.empty()) {
+            std::fprintf(stderr, "wavkit: %s: %s\n", readable(lines_.name()).c_str(),
+                         readable(line).c_str());
+        }
+        guesses_.clear();
     }
 
     Lines lines_;
     const CsvLayout& layout_;
+    std::vector<std::string> guesses_;
 
-    // The signal being read.
-    char separator_ = blanks;
-    std::vector<std::string> names_;
+    Table table_;
+    Columns columns_;
+    std::optional<Lines::Place> end_;  // of the table, once it has been read
+    double delta_ = 1, scale_ = 1;     // of times to the axis
+    std::optional<TimeReader> times_;
+    TimeAxis axis_;
+
+    // The rows as they are read.
+    std::vector<std::size_t> chosen_;
     std::vector<std::string_view> fields_;  // of the line
-    std::size_t width_ = 0;                 // fields in a row
-    std::vector<std::size_t> columns_;
-    double delta_ = 1;
-    bool has_time_ = false, ended_ = true;
-    double first_time_ = 0;
-    std::size_t rows_ = 0;  // whose times have been checked
+    std::vector<double> row_;
+    std::optional<GapFiller> filler_;
+    std::int64_t position_ = -1;  // of the row on the axis
+    bool ended_ = true, filled_ = true;
 };
 
+/// Some columns of a table.
 class CsvSignal : public BlockStream {
   public:
-    explicit CsvSignal(CsvReader& reader) : reader_(reader) {
+    CsvSignal(CsvReader& reader, const std::vector<std::size_t>& columns) : reader_(reader) {
         delta = reader.delta();
-        complex = reader.complex();
+        complex = reader.columns().complex;
+        channels = complex ? 1 : columns.size();
+        for (const auto column : columns) facts.push_back(reader.facts(column));
+        reader.begin(columns);
     }
+
+    /// Other columns are read from the first row, and other tables from the end of this one.
+    void skip() override {}
 
     double done() const override { return reader_.done(); }
 
@@ -237,31 +262,72 @@ class CsvSignal : public BlockStream {
 
 class CsvFile : public SignalSource {
   public:
-    CsvFile(InputFile& file, const ReadOptions& reading)
-        : SignalSource(file, reading), reader_(file, options().csv) {}
-
-  private:
-    std::unique_ptr<SampleStream> following() override {
-        if (!reader_.next_signal()) return nullptr;
-        return std::make_unique<CsvSignal>(reader_);
+    CsvFile(InputFile& file, const ReadOptions& reading, bool together)
+        : SignalSource(file, reading),
+          together_(together),
+          decoded_(in_utf8(file)),
+          reader_(decoded_ ? *decoded_ : file, options().csv) {
+        if (encoding_.encoding > Encoding::utf8_marked && !encoding_.marked) {
+            reader_.guess("the text is taken for UTF-16");
+        }
     }
 
+  private:
+    std::unique_ptr<InputFile> in_utf8(InputFile& file) {
+        encoding_ = encoding_of(file.head(4096));
+        if (encoding_.encoding > Encoding::utf8_marked) return decoded(file, encoding_.encoding);
+        if (encoding_.marked) std::fseek(file.stream(), 3, SEEK_SET);
+        return nullptr;
+    }
+
+    std::unique_ptr<SampleStream> following() override {
+        if (left_.empty()) {
+            if (!reader_.next_table()) return nullptr;
+            left_ = reader_.columns().values;
+        }
+        std::vector<std::size_t> columns = std::exchange(left_, {});
+        if (!together_ && !reader_.columns().complex) {
+            left_.assign(columns.begin() + 1, columns.end());
+            columns.resize(1);
+        }
+        return std::make_unique<CsvSignal>(reader_, columns);
+    }
+
+    bool together_;
+    EncodingGuess encoding_;
+    std::unique_ptr<InputFile> decoded_;  // where the file is in another encoding
     CsvReader reader_;
+    std::vector<std::size_t> left_;  // columns of the table that have not been asked for
 };
+
+/// Whether a line may begin a plain list of numbers.
+bool begins_with_number(std::string_view line) {
+    const std::string word(line.substr(0, line.find_first_of(" \t")));
+    char* end = nullptr;
+    std::strtod(word.c_str(), &end);
+    return end != word.c_str();
+}
 
 }  // namespace
 
-std::unique_ptr<SignalSource> open_csv(InputFile& input, const ReadOptions& options) {
-    return std::make_unique<CsvFile>(input, options);
+std::unique_ptr<SignalSource> open_csv(InputFile& input, const ReadOptions& options,
+                                       bool together) {
+    return std::make_unique<CsvFile>(input, options, together);
 }
 
 bool looks_like_csv(const std::string& head) {
+    bool told = false;
     std::size_t start = 0;
     while (start < head.size()) {
         const auto end = std::min(head.find('\n', start), head.size());
         const auto line = trimmed(std::string_view(head).substr(start, end - start));
-        if (!line.empty() && line.front() != '#') return line.find_first_of(",;") != line.npos;
         start = end + 1;
+        if (line.starts_with("#DSP")) return false;
+        if (line.starts_with("# delta =") || line.starts_with("# start =")) told = true;
+        if (line.empty() || line.starts_with('#')) continue;
+        // Of a text signal, a header may stand behind the first value as well.
+        if (line.find_first_of(",;:") != line.npos || !begins_with_number(line)) return true;
+        return told && head.find("\n#DSP") == head.npos;
     }
     return false;
 }

@@ -7,7 +7,6 @@
 #include <cstring>
 
 #include "base/error.hpp"
-#include "base/scratch.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -40,6 +39,13 @@ InputFile::InputFile(const std::string& path)
         fstat(fileno(stream_), &status);
     }
     size_ = long(status.st_size);
+}
+
+InputFile::InputFile(const std::string& name, Stream stream)
+    : name_(name), stream_(stream.release()) {
+    std::fseek(stream_, 0, SEEK_END);
+    size_ = std::ftell(stream_);
+    std::rewind(stream_);
 }
 
 InputFile::~InputFile() { std::fclose(stream_); }

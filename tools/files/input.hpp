@@ -4,6 +4,8 @@
 #include <cstdio>
 #include <string>
 
+#include "base/scratch.hpp"
+
 namespace wavkit::tool {
 
 /// A file opened for reading; "-" and other streams that cannot go back are taken in whole first,
@@ -11,6 +13,8 @@ namespace wavkit::tool {
 class InputFile {
   public:
     explicit InputFile(const std::string& path);
+    /// What a stream without a name of its own holds.
+    InputFile(const std::string& name, Stream stream);
     ~InputFile();
     InputFile(const InputFile&) = delete;
     InputFile& operator=(const InputFile&) = delete;

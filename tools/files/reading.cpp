@@ -1,6 +1,6 @@
 #include "files/reading.hpp"
 
-#include <algorithm>
+#include <cmath>
 
 #include "base/options.hpp"
 
@@ -21,18 +21,39 @@ void ReadOptions::declare(CLI::App& command, bool with_rate) {
             ->excludes(spacing)
             ->group(group);
     }
+    command.add_option("--start", start, "place of the first sample, whatever IN says")
+        ->check(numbers([](double x) { return std::isfinite(x); }, "number"))
+        ->type_name("T")
+        ->group(group);
     command.add_flag("--time", csv.time, "CSV: the first column is the time of each sample")
         ->group(group);
     command
         .add_option_function<std::string>(
             "--column",
             [this](const std::string& list) { csv.columns = CLI::detail::split(list, ','); },
-            "CSV: column to read, by number from 1 or name; two (2,3) are re,im")
-        ->check([](const std::string& list) {
-            const auto count = std::ranges::count(list, ',') + 1;
-            return count > 2 ? "one column or two, as in 2,3" : "";
-        })
-        ->type_name("COLUMN")
+            "CSV: columns to read, by name or by number from 1: voltage,3")
+        ->type_name("COLUMNS")
+        ->group(group);
+    command.add_flag("--complex-columns", csv.complex, "CSV: two columns are one complex signal")
+        ->group(group);
+    command.add_option("--skip", csv.skip, "CSV: pass over the first N lines")
+        ->check(CLI::NonNegativeNumber)
+        ->type_name("N")
+        ->group(group);
+    add_choice<bool>(command, "--decimal", csv.decimal_comma, {{"comma", true}, {"point", false}},
+                     "CSV: how decimals are written (default: by the contents)")
+        ->group(group);
+    command
+        .add_option_function<std::string>(
+            "--missing",
+            [this](const std::string& way) {
+                csv.missing = way == "hold"     ? Missing::hold
+                              : way == "linear" ? Missing::linear
+                                                : Missing::error;
+            },
+            "CSV: fill in values and rows that are not there (default: error)")
+        ->check(CLI::IsMember({"hold", "linear", "error"}))
+        ->type_name("hold|linear|error")
         ->group(group);
     command.add_option("--channel", channel, "sound: channel to read, from 1")
         ->check(CLI::PositiveNumber)

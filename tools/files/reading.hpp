@@ -10,16 +10,23 @@
 
 namespace wavkit::tool {
 
+/// What becomes of values that are not there.
+enum class Missing { error, hold, linear };
+
 struct CsvLayout {
     bool time = false;  // the first column holds the time of each sample
-    /// Value columns, by number from 1 or by name in the header: one real, two complex.
+    /// Value columns, by name in the header or by number from 1.
     std::vector<std::string> columns;
+    bool complex = false;               // two columns are the parts of one signal
+    int skip = 0;                       // lines at the start
+    std::optional<bool> decimal_comma;  // otherwise told from the contents
+    Missing missing = Missing::error;
 };
 
 /// How a source is to be read.
 struct ReadOptions {
     std::optional<Format> format;  // otherwise told from the contents
-    std::optional<double> delta, rate;
+    std::optional<double> delta, rate, start;
     CsvLayout csv;
     std::optional<int> channel;  // of a sound file, from 1
     std::optional<int> signal;   // the only one wanted, from 1

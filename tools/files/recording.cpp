@@ -15,8 +15,13 @@ constexpr std::size_t block_points = 1 << 14;
 /// Takes in what is left of a stream, each of its channels as a signal.
 void collect(SampleStream& stream, std::vector<Signal>& signals, Progress& progress) {
     const std::size_t first = signals.size(), channels = stream.channels;
-    for (std::size_t c = 0; c < channels; ++c) signals.emplace_back(stream.delta);
-    std::vector<double> block(block_points * channels), samples;
+    for (std::size_t c = 0; c < channels; ++c) {
+        signals.emplace_back(stream.delta);
+        signals.back().facts = stream.facts_of(c);
+        signals.back().facts.beside |= c > 0;
+    }
+    std::vector<double> block(std::max<std::size_t>(block_points / channels, 1) * channels),
+        samples;
     for (std::size_t count; (count = stream.read(block)) > 0; progress.done(stream.done())) {
         for (std::size_t c = 0; c < channels; ++c) {
             samples.clear();
@@ -28,21 +33,7 @@ void collect(SampleStream& stream, std::vector<Signal>& signals, Progress& progr
 }
 
 SignalShape shape_of(const Signal& x) {
-    return {x->delta, bool(x->complex), 1, std::size_t(x->points)};
-}
-
-/// One signal after the other.
-void write_in_turn(BlockWriter& writer, std::span<const Signal> signals) {
-    Progress progress("writing");
-    for (const auto& x : signals) {
-        writer.begin(shape_of(x));
-        const auto values = x.values();
-        for (std::size_t i = 0; i < values.size(); i += 2 * block_points) {
-            writer.write(values.subspan(i, std::min(2 * block_points, values.size() - i)));
-            progress.done(double(i) / double(values.size()));
-        }
-        writer.end();
-    }
+    return {x->delta, bool(x->complex), 1, std::size_t(x->points), {x.facts}};
 }
 
 /// Signals of one length and spacing side by side, the parts of a complex one too.
@@ -53,19 +44,23 @@ void write_as_channels(BlockWriter& writer, std::span<const Signal> signals) {
     };
     if (signals.empty()) throw Error("there is no signal to write");
     std::vector<Channel> channels;
+    std::vector<Facts> facts;
     for (const auto& x : signals) {
         if (x->points != signals[0]->points || x->delta != signals[0]->delta) {
             throw Error(
-                "signals of different lengths or spacings do not fit one sound file; choose "
+                "signals of different lengths or spacings do not fit one such file; choose "
                 "one with --signal");
         }
         const std::size_t width = x->complex ? 2 : 1;
-        for (std::size_t i = 0; i < width; ++i) channels.push_back({x->data + i, width});
+        for (std::size_t i = 0; i < width; ++i) {
+            channels.push_back({x->data + i, width});
+            facts.push_back(x.facts);
+        }
     }
 
     Progress progress("writing");
     const auto points = std::size_t(signals[0]->points);
-    writer.begin({signals[0]->delta, false, channels.size(), points});
+    writer.begin({signals[0]->delta, false, channels.size(), points, facts});
     std::vector<double> frames;
     for (std::size_t start = 0; start < points; start += block_points) {
         frames.clear();
@@ -76,6 +71,34 @@ void write_as_channels(BlockWriter& writer, std::span<const Signal> signals) {
         progress.done(double(start) / double(points));
     }
     writer.end();
+}
+
+bool side_by_side(const Signal& a, const Signal& b) {
+    return b.facts.beside && !a->complex && !b->complex && a->points == b->points &&
+           a->delta == b->delta && a.facts.start == b.facts.start;
+}
+
+/// One signal after the other, those that belong together beside each other where the format
+/// allows it.
+void write_in_turn(BlockWriter& writer, std::span<const Signal> signals, bool beside) {
+    Progress progress("writing");
+    for (std::size_t first = 0, count = 1; first < signals.size(); first += count) {
+        const auto rest = signals.subspan(first);
+        count = 1;
+        while (beside && count < rest.size() && side_by_side(rest[0], rest[count])) ++count;
+        if (count > 1) {
+            write_as_channels(writer, rest.first(count));
+            continue;
+        }
+        const auto& x = signals[first];
+        writer.begin(shape_of(x));
+        const auto values = x.values();
+        for (std::size_t i = 0; i < values.size(); i += 2 * block_points) {
+            writer.write(values.subspan(i, std::min(2 * block_points, values.size() - i)));
+            progress.done(double(i) / double(values.size()));
+        }
+        writer.end();
+    }
 }
 
 }  // namespace
@@ -109,10 +132,12 @@ void write_recording(const std::string& path, std::span<const Signal> signals,
     const auto format = options.format_for(path);
     OutputFile output(path);
     const auto writer = block_writer(output.stream(), format, options);
-    if (is_sound(format)) {
+    const bool only_side_by_side =
+        is_sound(format) || (format == Format::npy && signals.size() > 1);
+    if (only_side_by_side) {
         write_as_channels(*writer, signals);
     } else {
-        write_in_turn(*writer, signals);
+        write_in_turn(*writer, signals, takes_channels(format));
     }
     output.commit();
 }

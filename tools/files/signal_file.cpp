@@ -22,6 +22,8 @@ class SignalFile : public SignalSource {
 }  // namespace
 
 std::unique_ptr<SignalSource> open_signal_file(InputFile& input, const ReadOptions& options) {
+    // Some editors begin a text with a byte order mark.
+    if (input.head(3) == "\xEF\xBB\xBF") std::fseek(input.stream(), 3, SEEK_SET);
     return std::make_unique<SignalFile>(input, options);
 }
 

@@ -12,6 +12,8 @@
 
 #include "base/error.hpp"
 #include "base/number.hpp"
+#include "files/facts_text.hpp"
+#include "files/float_wav.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -44,31 +46,23 @@ std::string format_name(int format) {
                : "sound";
 }
 
-/// The sampling rate of a file for signals of this spacing.
-int whole_rate(double delta) {
-    const double exact = 1 / delta, rate = std::round(exact);
-    if (!(rate >= 1) || !(rate <= std::numeric_limits<int>::max()) ||
-        std::fabs(exact - rate) > 1e-3 * rate) {
-        throw Error("a sound file needs a whole number of samples a second, not " + number(exact) +
-                    "; give --rate or --delta");
-    }
-    if (std::fabs(exact - rate) > 1e-6 * rate) {
-        std::fprintf(stderr, "wavkit: the sampling rate %s is stored as %.0f\n",
-                     number(exact).c_str(), rate);
-    }
-    return int(rate);
-}
-
 int samples_of(SampleType type) {
     switch (type) {
         case SampleType::pcm16:
             return SF_FORMAT_PCM_16;
         case SampleType::pcm24:
             return SF_FORMAT_PCM_24;
+        case SampleType::pcm32:
+            return SF_FORMAT_PCM_32;
         case SampleType::float32:
+        case SampleType::float64:
             break;
     }
-    return SF_FORMAT_FLOAT;
+    return 0;  // written without libsndfile
+}
+
+bool is_float(SampleType type) {
+    return type == SampleType::float32 || type == SampleType::float64;
 }
 
 /// A plain WAV file ends at 4 GiB; RF64 is what takes over there, and where the length is not known
@@ -89,6 +83,9 @@ class SoundStream : public SampleStream {
         delta = 1.0 / info_.samplerate;
         if (info_.frames >= 0) length = std::size_t(info_.frames);
         if (!channel) channels = std::size_t(info_.channels);
+        Facts seconds;
+        seconds.axis_unit = "s";
+        facts.assign(channels, seconds);
     }
 
     const SF_INFO& info() const { return info_; }
@@ -172,8 +169,8 @@ class SoundWriter : public BlockWriter {
   public:
     SoundWriter(std::FILE* to, Format format, SampleType type)
         : to_(to), format_(format), type_(type) {
-        if (format == Format::flac && type == SampleType::float32) {
-            throw UsageError("FLAC holds whole numbers only: use --bits 16 or 24");
+        if (format == Format::flac && type != SampleType::pcm16 && type != SampleType::pcm24) {
+            throw UsageError("FLAC holds whole numbers of 16 or 24 bits: use --bits 16 or 24");
         }
     }
 
@@ -181,6 +178,7 @@ class SoundWriter : public BlockWriter {
         if (std::exchange(begun_, true)) {
             throw Error("one signal fits a sound file here; choose with --signal");
         }
+        tell_of_lost_start(shape.facts_of(0));
         SF_INFO info{};
         info.samplerate = whole_rate(shape.delta);
         info.channels = int(shape.channels) * (shape.complex ? 2 : 1);
@@ -192,13 +190,11 @@ class SoundWriter : public BlockWriter {
     }
 
     void write(std::span<const double> values) override {
-        if (type_ != SampleType::float32) {
-            const auto bad = std::ranges::find_if(values, [](double v) { return std::isnan(v); });
-            if (bad != values.end()) {
-                const auto sample = taken_ + std::size_t(bad - values.begin()) / channels_;
-                throw Error("sample " + std::to_string(sample) +
-                            " is not a number; only --bits float can hold it");
-            }
+        const auto bad = std::ranges::find_if(values, [](double v) { return std::isnan(v); });
+        if (bad != values.end()) {
+            const auto sample = taken_ + std::size_t(bad - values.begin()) / channels_;
+            throw Error("sample " + std::to_string(sample) +
+                        " is not a number; only --bits float can hold it");
         }
         clipped_ += std::ranges::count_if(values, [](double v) { return std::fabs(v) > 1; });
         taken_ += values.size() / channels_;
@@ -210,7 +206,7 @@ class SoundWriter : public BlockWriter {
 
     void end() override {
         if (sf_close(file_.release()) != 0) throw Error(cannot_write);
-        if (type_ != SampleType::float32 && clipped_ > 0) {
+        if (clipped_ > 0) {
             std::fprintf(stderr, "wavkit: %td sample%s beyond -1 to 1 clipped\n", clipped_,
                          clipped_ == 1 ? "" : "s");
         }
@@ -230,10 +226,38 @@ class SoundWriter : public BlockWriter {
 
 }  // namespace
 
-bool looks_like_sound(const std::string& head) {
-    static constexpr std::array magics{"RIFF", "RIFX", "RF64", "fLaC",
-                                       "OggS", "FORM", ".snd", "caff"};
-    return std::ranges::any_of(magics, [&](const char* magic) { return head.starts_with(magic); });
+bool looks_like_sound(InputFile& input, const std::string& head) {
+    static constexpr std::array magics{"RIFF", "RIFX", "RF64", "fLaC",    "OggS",           "FORM",
+                                       ".snd", "caff", "riff", "NIST_1A", "Creative Voice", "PVF1"};
+    if (std::ranges::any_of(magics, [&](const char* magic) { return head.starts_with(magic); })) {
+        return true;
+    }
+    // What is no text may be one of the rarer formats.
+    const bool text = std::ranges::none_of(head, [](char c) {
+        return static_cast<unsigned char>(c) < ' ' && !(c >= '\t' && c <= '\r');
+    });
+    if (text) return false;
+    const int file = fileno(input.stream());
+    const auto place = lseek(file, 0, SEEK_CUR);
+    lseek(file, 0, SEEK_SET);
+    SF_INFO info{};
+    const bool opens = Handle(sf_open_fd(file, SFM_READ, &info, SF_FALSE), sf_close) != nullptr;
+    lseek(file, place, SEEK_SET);
+    return opens;
+}
+
+int whole_rate(double delta) {
+    const double exact = 1 / delta, rate = std::round(exact);
+    if (!(rate >= 1) || !(rate <= std::numeric_limits<int>::max()) ||
+        std::fabs(exact - rate) > 1e-3 * rate) {
+        throw Error("a sound file needs a whole number of samples a second, not " + number(exact) +
+                    "; give --rate or --delta");
+    }
+    if (std::fabs(exact - rate) > 1e-6 * rate) {
+        std::fprintf(stderr, "wavkit: the sampling rate %s is stored as %.0f\n",
+                     number(exact).c_str(), rate);
+    }
+    return int(rate);
 }
 
 std::unique_ptr<SignalSource> open_sound_file(InputFile& input, const ReadOptions& options,
@@ -244,7 +268,11 @@ std::unique_ptr<SignalSource> open_sound_file(InputFile& input, const ReadOption
 std::unique_ptr<BlockWriter> sound_writer(std::FILE* to, Format format,
                                           std::optional<SampleType> type) {
     const auto usual = format == Format::flac ? SampleType::pcm24 : SampleType::float32;
-    return std::make_unique<SoundWriter>(to, format, type.value_or(usual));
+    const auto chosen = type.value_or(usual);
+    if (format == Format::wav && is_float(chosen)) {
+        return float_wav_writer(to, chosen == SampleType::float64);
+    }
+    return std::make_unique<SoundWriter>(to, format, chosen);
 }
 
 }  // namespace wavkit::tool

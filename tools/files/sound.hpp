@@ -12,8 +12,11 @@
 
 namespace wavkit::tool {
 
-/// Whether contents begin like one of the usual sound files.
-bool looks_like_sound(const std::string& head);
+/// Whether contents, of which `head` is the start, are sound that libsndfile opens.
+bool looks_like_sound(InputFile& input, const std::string& head);
+
+/// The sampling rate of a file for signals of this spacing; throws where it is no whole number.
+int whole_rate(double delta);
 
 /// Opens the channels of a file, together or one after the other, or the one that is chosen.
 std::unique_ptr<SignalSource> open_sound_file(InputFile& input, const ReadOptions& options,

@@ -5,17 +5,29 @@
 
 #include "base/error.hpp"
 #include "files/csv.hpp"
+#include "files/encoding.hpp"
 #include "files/format.hpp"
+#include "files/mat.hpp"
+#include "files/npy.hpp"
 #include "files/signal_file.hpp"
 #include "files/sound.hpp"
+#include "files/tdms.hpp"
+#include "files/uff.hpp"
 
 namespace wavkit::tool {
 namespace {
 
 Format format_of_contents(InputFile& input) {
-    const auto head = input.head(4096);
-    if (looks_like_sound(head)) return Format::wav;
-    if (!head.empty() && begins_binary(static_cast<unsigned char>(head[0]))) return Format::binary;
+    const auto bytes = input.head(4096);
+    const auto head = decoded(bytes, encoding_of(bytes).encoding);
+    if (!bytes.empty() && begins_binary(static_cast<unsigned char>(bytes[0])))
+        return Format::binary;
+    if (looks_like_npy(bytes)) return Format::npy;
+    if (looks_like_mat(bytes)) return Format::mat;
+    if (looks_like_tdms(bytes)) return Format::tdms;
+    if (looks_like_uff(head)) return Format::uff;
+    const bool text = encoding_of(bytes).encoding != Encoding::utf8;
+    if (!text && looks_like_sound(input, bytes)) return Format::wav;
     if (head.starts_with("#DSP")) return Format::text;
     if (format_of_name(input.name()) == Format::csv || looks_like_csv(head)) return Format::csv;
     return Format::text;
@@ -28,11 +40,28 @@ Format format_of_contents(InputFile& input) {
                 ", no signal " + std::to_string(wanted));
 }
 
+std::unique_ptr<SignalSource> open(InputFile& input, const ReadOptions& options, Format format,
+                                   bool together) {
+    switch (format) {
+        case Format::csv:
+            return open_csv(input, options, together);
+        case Format::npy:
+            return open_npy(input, options, together);
+        case Format::mat:
+            return open_mat(input, options);
+        case Format::uff:
+            return open_uff(input, options);
+        case Format::tdms:
+            return open_tdms(input, options);
+        default:
+            return open_signal_file(input, options);
+    }
+}
+
 std::unique_ptr<SignalSource> open(InputFile& input, const ReadOptions& options, bool together) {
     const auto format = options.format ? *options.format : format_of_contents(input);
     if (is_sound(format)) return open_sound_file(input, options, together);
-    auto source =
-        format == Format::csv ? open_csv(input, options) : open_signal_file(input, options);
+    auto source = open(input, options, format, together);
     source->description = description(format);
     return source;
 }
@@ -75,6 +104,11 @@ SampleStream* SignalSource::next() {
         ++held_;
     } while (wanted && held_ < *wanted);
     current_->delta = options_.spacing(current_->delta);
+    current_->facts.resize(current_->channels);
+    for (auto& facts : current_->facts) {
+        if (options_.start) facts.start = *options_.start;
+        if (options_.rate && facts.axis_unit.empty()) facts.axis_unit = "s";
+    }
     return current_.get();
 }
 

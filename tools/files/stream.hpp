@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "base/facts.hpp"
 #include "files/input.hpp"
 #include "files/reading.hpp"
 
@@ -31,7 +32,12 @@ class SampleStream {
     double delta = 1.0;
     bool complex = false;
     std::optional<std::size_t> length;  // in points, where it is known before the end
-    std::size_t channels = 1;           // side by side, of a sound file: a scalar of each in turn
+    std::size_t channels = 1;           // side by side: a scalar of each in turn
+    std::vector<Facts> facts;           // of each channel, as far as they are known
+
+    Facts facts_of(std::size_t channel) const {
+        return channel < facts.size() ? facts[channel] : Facts();
+    }
 };
 
 /// A stream that comes in blocks of its own size.
@@ -84,7 +90,8 @@ class SignalSource {
 /// Opens the signals that the options ask for, each channel of a sound file a signal of its own.
 std::unique_ptr<SignalSource> open_signals(InputFile& input, const ReadOptions& options);
 
-/// The same, but the channels of a sound file are one stream unless the options choose one.
+/// The same, but signals that lie side by side, as the channels of a sound file do, are one stream
+/// unless the options choose one.
 std::unique_ptr<SignalSource> open_channels(InputFile& input, const ReadOptions& options);
 
 /// Tells, on standard error, of a source whose first signal was used that there are others.

@@ -9,6 +9,7 @@
 
 #include "base/error.hpp"
 #include "base/signal.hpp"
+#include "files/facts_text.hpp"
 #include "files/signal_file.hpp"
 
 namespace wavkit::tool {
@@ -23,6 +24,7 @@ bool is_space(int c) { return c == ' ' || (c >= '\t' && c <= '\r'); }
 class TextSignal final : public BlockStream {
   public:
     TextSignal(InputFile& input, int number) : input_(input), number_(number) {
+        facts.resize(1);
         while (next_part() == Part::line) take_line();
         if (!line_among_values()) return;
         // A line among the values or behind them counts for all of them, so that they are read
@@ -72,6 +74,7 @@ class TextSignal final : public BlockStream {
         if (counted_) return;
         long long whole;
         double spacing;
+        if (take_fact(line, facts.front())) return;
         if (std::sscanf(line.c_str(), "#DSP points = %lld", &whole) == 1) {
             declared_ = std::clamp(whole, 0LL, most_points);
         } else if (std::sscanf(line.c_str(), "#DSP complex = %lld", &whole) == 1) {

@@ -15,12 +15,13 @@ struct WriteOptions {
     bool time = false;
     std::optional<bool> single;  // signal files in single precision
     std::optional<SampleType> samples;
+    bool compressed = false;  // MATLAB files
 
     /// Adds the options to a subcommand; the second for results that are no signal to be heard.
     void declare(CLI::App& command);
     void declare_without_sound(CLI::App& command);
 
-    bool any() const { return format || time || single || samples; }
+    bool any() const { return format || time || single || samples || compressed; }
 
     /// The format for this name; throws where neither name nor option tells.
     Format format_for(const std::string& path) const;

@@ -16,7 +16,7 @@ Outline::Step Outline::joined(const Step& a, const Step& b) {
 
 void Outline::add(std::span<const double> samples, std::size_t step) {
     for (std::size_t i = 0; i < samples.size(); i += step) {
-        const Mark mark{double(position_++) * delta_, samples[i]};
+        const Mark mark{start_ + double(position_++) * delta_, samples[i]};
         if (mark.x < from_ || mark.x > to_) continue;
         if (filled_ == 0) {
             steps_.push_back({mark, mark});

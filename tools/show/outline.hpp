@@ -15,9 +15,10 @@ namespace wavkit::tool {
 class Outline {
   public:
     /// Of the samples between two times.
-    explicit Outline(double delta, double from = 0,
+    explicit Outline(double delta, double start = 0,
+                     double from = -std::numeric_limits<double>::infinity(),
                      double to = std::numeric_limits<double>::infinity())
-        : delta_(delta), from_(from), to_(to) {}
+        : delta_(delta), start_(start), from_(from), to_(to) {}
 
     /// Takes every step-th sample.
     void add(std::span<const double> samples, std::size_t step = 1);
@@ -29,7 +30,7 @@ class Outline {
     using Step = std::pair<Mark, Mark>;
     static Step joined(const Step& a, const Step& b);
 
-    double delta_, from_, to_;
+    double delta_, start_, from_, to_;
     std::size_t position_ = 0;
     std::size_t length_ = 1, filled_ = 0;  // samples of a step, and of the one that is not complete
     std::vector<Step> steps_;

@@ -27,8 +27,8 @@ std::pair<double, double> colour_range(std::vector<double> cells) {
 
 }  // namespace
 
-Waterfall::Waterfall(const Band& band, bool density, double step)
-    : band_(band), density_(density), step_(step) {}
+Waterfall::Waterfall(const Band& band, bool density, double step, double start)
+    : band_(band), density_(density), step_(step), first_time_(start) {}
 
 /// Settles, with the first spectrum, which bins make which row.
 void Waterfall::lay_out(const Spectrum& spectrum) {
@@ -52,7 +52,7 @@ void Waterfall::lay_out(const Spectrum& spectrum) {
     row_height_ = bins_in_row_ * spectrum.bins->delta;
     low_frequency_ =
         spectrum.frequency(first_bin_) + 0.5 * (bins_in_row_ - 1) * spectrum.bins->delta;
-    first_time_ = 0.5 * spectrum.samples / (spectrum.length * spectrum.bins->delta);
+    first_time_ += 0.5 * spectrum.samples / (spectrum.length * spectrum.bins->delta);
 }
 
 void Waterfall::add(const Spectrum& spectrum) {

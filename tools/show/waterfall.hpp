@@ -14,7 +14,7 @@ namespace wavkit::tool {
 class Waterfall {
   public:
     /// `step` is the time from one spectrum to the next.
-    Waterfall(const Band& band, bool density, double step);
+    Waterfall(const Band& band, bool density, double step, double start = 0);
 
     void add(const Spectrum& spectrum);
 

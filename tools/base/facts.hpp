@@ -1,0 +1,23 @@
+// What is known of a signal besides its samples.
+#pragma once
+
+#include <string>
+
+namespace wavkit::tool {
+
+/// Where the samples lie and what they are, as far as the source tells; an empty text is unknown.
+struct Facts {
+    double start = 0;        // place of the first sample, in the unit of the spacing
+    std::string axis_unit;   // of start and spacing
+    std::string name, unit;  // of the values
+    std::string origin;      // date and time of place 0, as ISO 8601 has it
+    bool beside = false;     // taken together with the signal before, sample by sample
+
+    /// The unit of the axis; seconds where that is all that is known.
+    std::string axis(bool seconds) const {
+        return axis_unit.empty() && seconds ? std::string("s") : axis_unit;
+    }
+    bool placed() const { return start != 0 || !origin.empty(); }
+};
+
+}  // namespace wavkit::tool
