@@ -17,6 +17,10 @@ struct Facts {
     std::string axis(bool seconds) const {
         return axis_unit.empty() && seconds ? std::string("s") : axis_unit;
     }
+    /// What to write at the axis of the values: "acceleration (m/s^2)".
+    std::string value_label(const std::string& otherwise) const {
+        return (name.empty() ? otherwise : name) + (unit.empty() ? "" : " (" + unit + ")");
+    }
     bool placed() const { return start != 0 || !origin.empty(); }
 };
 

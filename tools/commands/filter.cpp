@@ -160,6 +160,7 @@ class Comparison {
     Comparison(const FilterOptions& options, const SampleStream& stream, bool sound)
         : options_(options),
           unit_(stream.facts_of(0).axis(sound || options.reading.rate)),
+          value_label_(stream.facts_of(0).value_label("value")),
           before_(outline(stream)),
           after_(before_),
           width_(stream.channels) {}
@@ -173,6 +174,7 @@ class Comparison {
         std::vector panels{before_.curve(), after_.curve()};
         panels[0].title = short_name(options_.in);
         panels[1].title = "filtered";
+        for (auto& panel : panels) panel.y_label = value_label_;
         for (auto& panel : panels) panel.x_label = with_unit("time", unit_);
         tool::draw(panels, options_.plot);
     }
@@ -186,7 +188,7 @@ class Comparison {
     }
 
     const FilterOptions& options_;
-    std::string unit_;
+    std::string unit_, value_label_;
     Outline before_, after_;
     std::size_t width_;
 };

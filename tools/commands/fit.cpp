@@ -43,6 +43,7 @@ Signal pairs_of(Signal x) {
     if (x->complex) return x;
     const double step = x->delta == 0 ? 1 : x->delta;
     Signal pairs;
+    pairs.facts = x.facts;
     pairs->points = x->points;
     pairs->complex = 1;
     check(dsp_alloc(pairs), "fitting a line");
@@ -98,8 +99,8 @@ void draw_line(const Signal& pairs, std::span<const double> table, const FitOpti
     std::ranges::stable_sort(points, {}, &Mark::x);
     Curve curve;
     curve.title = short_name(options.in);
-    curve.x_label = "x";
-    curve.y_label = "y";
+    curve.x_label = with_unit("x", pairs.facts.axis_unit);
+    curve.y_label = pairs.facts.value_label("y");
     curve.style = Style::dots;
     for (const auto& [x, y] : points) {
         curve.x.push_back(x);
@@ -119,7 +120,7 @@ void run(const FitOptions& options) {
         throw UsageError("standard output takes only one of --json and --plot -");
     }
     auto reading = options.reading;
-    reading.csv.complex |= reading.csv.columns.size() == 2;
+    reading.csv.pairs = true;
     auto x = first_signal(options.in, reading);
     if (x->points < 1) throw Error("the signal has no samples");
     check_finite(x.values(), x->complex);

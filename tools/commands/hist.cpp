@@ -109,11 +109,11 @@ void write(const Histogram& histogram, const HistOptions& options) {
     output.commit();
 }
 
-void draw(const Histogram& histogram, bool magnitudes, const std::string& in,
+void draw(const Histogram& histogram, const std::string& values, const std::string& in,
           const std::string& path) {
     Curve curve;
     curve.title = short_name(in);
-    curve.x_label = magnitudes ? "magnitude" : "value";
+    curve.x_label = values;
     curve.y_label = "count";
     curve.style = Style::boxes;
     curve.box_width = histogram.counts->delta;
@@ -127,13 +127,13 @@ void draw(const Histogram& histogram, bool magnitudes, const std::string& in,
 void run(const HistOptions& options) {
     check_usage(options);
     auto x = first_signal(options.in, options.reading);
-    const bool magnitudes = x->complex;
+    const auto values = x.facts.value_label(x->complex ? "magnitude" : "value");
     const auto histogram = [&] {
         Progress progress("counting");
         return count(std::move(x), options);
     }();
     if (!options.out.empty()) write(histogram, options);
-    if (!options.plot.empty()) draw(histogram, magnitudes, options.in, options.plot);
+    if (!options.plot.empty()) draw(histogram, values, options.in, options.plot);
     if (options.out.empty() && options.plot.empty()) return print_table(histogram);
     const double outside = histogram.below + histogram.above + histogram.nan;
     if (outside > 0) std::fprintf(stderr, "wavkit: %.0f values are in no bin\n", outside);

@@ -102,10 +102,10 @@ class MatFile : public SignalSource {
     }
 
   private:
-    /// Numbers that are no parameter of others.
-    static bool is_signal(const MatArray& array) {
-        return array.numeric() && array.kind != mat::class_sparse && array.dimensions.size() == 2 &&
-               array.count() > 1;
+    /// Numbers that are no parameter of others; a single one has parameters of its own.
+    bool is_signal(const MatArray& array) const {
+        return array.numeric() && array.dimensions.size() == 2 &&
+               (array.count() > 1 || find(array.name + "_delta"));
     }
 
     const MatArray* find(std::string_view name) const {
@@ -169,18 +169,19 @@ class MatFile : public SignalSource {
         while (signal_ < signals_.size()) {
             const auto& array = arrays_[signals_[signal_]];
             const auto rows = array.dimensions[0], columns = array.dimensions[1];
-            const bool wide = rows < columns;
+            const bool wide = rows > 0 && rows < columns;
+            const auto channels = std::max<std::uint64_t>(std::min(rows, columns), 1);
             if (channel_ == 0 && rows > 1 && columns > 1) {
                 note(array.name + " of " + std::to_string(rows) + " by " + std::to_string(columns) +
-                     " is taken for " + std::to_string(wide ? rows : columns) + " signals");
+                     " is taken for " + std::to_string(channels) + " signals");
             }
-            if (channel_ == std::min(rows, columns)) {
+            if (channel_ == channels) {
                 channel_ = 0;
                 ++signal_;
                 continue;
             }
             auto stream = std::make_unique<MatSignal>(input(), array, channel_, wide, big_);
-            describe(*stream, array, std::min(rows, columns) > 1);
+            describe(*stream, array, channels > 1);
             ++channel_;
             tell();
             return stream;

@@ -18,6 +18,7 @@ struct CsvLayout {
     /// Value columns, by name in the header or by number from 1.
     std::vector<std::string> columns;
     bool complex = false;               // two columns are the parts of one signal
+    bool pairs = false;                 // the same, where there is no axis and no third column
     int skip = 0;                       // lines at the start
     std::optional<bool> decimal_comma;  // otherwise told from the contents
     Missing missing = Missing::error;
