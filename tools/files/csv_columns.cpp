@@ -38,10 +38,10 @@ class Chooser {
         if (layout_.complex && values.size() != 2) {
             fail("a complex signal takes two columns, not " + std::to_string(values.size()));
         }
-        columns_.complex =
-            layout_.complex || (layout_.pairs && values.size() == 2 && !columns_.time) ||
-            (values.size() == 2 && part_of_name(table_.name(values[0])) == 0 &&
-                                part_of_name(table_.name(values[1])) == 1);
+        columns_.complex = layout_.complex ||
+                           (layout_.pairs && values.size() == 2 && !columns_.time) ||
+                           (values.size() == 2 && part_of_name(table_.name(values[0])) == 0 &&
+                            part_of_name(table_.name(values[1])) == 1);
         return columns_;
     }
 

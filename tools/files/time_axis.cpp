@@ -12,7 +12,8 @@ namespace wavkit::tool {
 namespace {
 
 constexpr double uneven_step = 0.05;  // of a step, that a time may be off
-const std::string not_even = "the time column is not equally spaced";
+constexpr std::int64_t most_steps = 1000000000000000000;
+constexpr const char* not_even = "the time column is not equally spaced";
 
 /// The decimal of fewest digits near a value, and how many it has.
 std::pair<double, int> shortest(double value, double tolerance) {
@@ -93,7 +94,7 @@ void TimeAxis::check(const RowTime& time) {
         found(time.line, "the time column is not equally spaced and increasing (" +
                              time_text(time.value) + " behind " + time_text(last_.value) + ")");
     } else if (step < 0.5 * step_ && step < step_ - 1.1 * digit_) {
-        found(time.line, not_even + " (" + time_text(time.value) + " behind " +
+        found(time.line, std::string(not_even) + " (" + time_text(time.value) + " behind " +
                              time_text(last_.value) + ", with steps of " + time_text(step_) + ")");
     }
     // Two rounded times may be off by a digit between them.
@@ -105,11 +106,11 @@ void TimeAxis::check(const RowTime& time) {
         const auto missing = std::to_string(count - 1) +
                              (count == 2 ? " sample is missing" : " samples are missing");
         if (!gap_) {
-            gap_ = {time.line, not_even + ": " + missing + " between " + time_text(last_.value) +
-                                   " and " + time_text(time.value)};
+            gap_ = {time.line, std::string(not_even) + ": " + missing + " between " +
+                                   time_text(last_.value) + " and " + time_text(time.value)};
         }
     }
-    steps_ += count;
+    steps_ = std::min(steps_ + count, most_steps);
     last_ = time;
 }
 

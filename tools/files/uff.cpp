@@ -47,7 +47,7 @@ struct Header {
 /// The lines of a file, set by set.
 class Sets {
   public:
-    explicit Sets(InputFile& input) : input_(input), lines_(input) {}
+    explicit Sets(InputFile& input) : lines_(input) {}
 
     /// Goes to the values of the next set 58; null at the end.
     std::optional<Header> next() {
@@ -150,7 +150,6 @@ class Sets {
         facts.unit = text_of(part(values, 47, 20));
     }
 
-    InputFile& input_;
     Lines lines_;
 };
 
