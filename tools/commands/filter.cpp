@@ -100,7 +100,7 @@ Signal designed_taps(const FilterOptions& options, double delta) {
         const auto& edges = options.edges[i];
         if (edges.empty()) continue;
         const auto problem = problem_with_edges(edges, 1 / delta);
-        if (!problem.empty()) throw Error(problem);
+        if (!problem.empty()) throw DataError(problem);
         std::vector<double> fractions;
         for (const double edge : edges) fractions.push_back(edge * delta);
         auto band = tapered_design(band_options[i].type, fractions, 0, tapering);
@@ -111,8 +111,10 @@ Signal designed_taps(const FilterOptions& options, double delta) {
 
 Signal given_taps(const FilterOptions& options) {
     auto taps = first_signal(options.taps, {});
-    if (taps->points < 1) throw Error("there are no taps in " + options.taps);
-    check_finite(taps.values(), taps->complex);
+    with_data_of(options.taps, [&] {
+        if (taps->points < 1) throw DataError("there are no taps");
+        check_finite(taps.values(), taps->complex);
+    });
     return taps;
 }
 
@@ -216,7 +218,7 @@ class FilterRun {
         const auto& filtering = filters_.at(stream.delta);
         ChannelFilter filter(filtering, stream);
         const bool draws = !options_.plot.empty() && !comparison_;
-        if (draws && filter.complex_output()) throw Error("--plot draws real signals only");
+        if (draws && filter.complex_output()) throw DataError("--plot draws real signals only");
         if (draws) comparison_.emplace(options_, stream, sound);
         if (writer_)
             writer_->begin({stream.delta, filter.complex_output(), stream.channels, stream.length});
@@ -303,7 +305,7 @@ void add_filter(CLI::App& program) {
     command->footer(about);
     command->callback([options] {
         check_usage(*options);
-        FilterRun(*options).run();
+        with_data_of(options->in, [&] { FilterRun(*options).run(); });
     });
 }
 

@@ -119,8 +119,10 @@ void run(const FitOptions& options) {
         throw UsageError("standard output takes only one of --json and --plot -");
     }
     auto x = first_signal(options.in, options.reading);
-    if (x->points < 1) throw Error("the signal has no samples");
-    check_finite(x.values(), x->complex);
+    with_data_of(options.in, [&] {
+        if (x->points < 1) throw DataError("the signal has no samples");
+        check_finite(x.values(), x->complex);
+    });
     Signal table;
     const auto pairs = [&] {
         Progress progress("fitting");

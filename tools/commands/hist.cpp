@@ -52,7 +52,7 @@ std::pair<double, double> range_of(const Signal& x) {
         low = std::min(low, value);
         high = std::max(high, value);
     }
-    if (low > high) throw Error("there are no finite values to count");
+    if (low > high) throw DataError("there are no finite values to count");
     if (low < high) return {low, high};
     const double margin = std::max(0.5, 1e-6 * std::fabs(low));
     return {low - margin, high + margin};
@@ -130,7 +130,7 @@ void run(const HistOptions& options) {
     const bool magnitudes = x->complex;
     const auto histogram = [&] {
         Progress progress("counting");
-        return count(std::move(x), options);
+        return with_data_of(options.in, [&] { return count(std::move(x), options); });
     }();
     if (!options.out.empty()) write(histogram, options);
     if (!options.plot.empty()) draw(histogram, magnitudes, options.in, options.plot);

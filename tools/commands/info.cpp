@@ -5,6 +5,7 @@
 
 #include "base/error.hpp"
 #include "base/number.hpp"
+#include "base/text.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
 
@@ -45,8 +46,8 @@ std::string point(int (*reduce)(const dsp*, dsp*), const Signal& x) {
 void describe(const Signal& x, bool seconds) {
     line("points", std::to_string(x->points));
     line("kind", x->complex ? "complex" : "real");
-    line("delta", number(x->delta) + (seconds ? " s (" + brief(1 / x->delta) + " Hz)" : ""));
-    line("duration", number(x->points * x->delta) + (seconds ? " s" : ""));
+    line("delta", rounded(x->delta) + (seconds ? " s (" + brief(1 / x->delta) + " Hz)" : ""));
+    line("duration", rounded(x->points * x->delta) + (seconds ? " s" : ""));
     if (x->points == 0) return;
     line("mean", point(dsps_mean, x));
     line("rms", point(dsps_rms, x));
@@ -58,7 +59,7 @@ void describe(const Signal& x, bool seconds) {
 void describe(const std::string& path, const ReadOptions& reading) {
     const auto recording = read_recording(path, reading);
     const auto count = recording.signals.size();
-    std::printf("%s: %s, %zu %s\n", path == "-" ? "standard input" : path.c_str(),
+    std::printf("%s: %s, %zu %s\n", path == "-" ? "standard input" : printable(path).c_str(),
                 recording.description.c_str(), count, count == 1 ? "signal" : "signals");
     for (std::size_t i = 0; i < count; ++i) {
         if (count > 1) line("signal", std::to_string(i + 1) + " of " + std::to_string(count));
@@ -74,7 +75,7 @@ void run(const InfoOptions& options) {
             describe(file, options.reading);
         } catch (const Error& error) {
             std::fflush(stdout);
-            std::fprintf(stderr, "wavkit: %s\n", error.what());
+            std::fprintf(stderr, "wavkit: %s\n", printable(error.what()).c_str());
             failed = true;
         }
     }

@@ -91,10 +91,9 @@ void write_y_range(std::FILE* script, const Curve& curve) {
 }
 
 std::string peak_label(const Curve& curve, const Mark& mark) {
-    std::array<char, 96> text;
-    std::snprintf(text.data(), text.size(), "%.4g (%.4g%s%s)", mark.x, 1 / std::fabs(mark.x),
-                  curve.unit.empty() ? "" : " ", curve.unit.c_str());
-    return text.data();
+    std::array<char, 64> numbers;
+    std::snprintf(numbers.data(), numbers.size(), "%.4g (%.4g", mark.x, 1 / std::fabs(mark.x));
+    return numbers.data() + (curve.unit.empty() ? "" : " " + curve.unit) + ")";
 }
 
 void write_labels(std::FILE* script, const Curve& curve, bool characters) {
