@@ -4,6 +4,7 @@
 #include <optional>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/options.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
@@ -93,6 +94,18 @@ SpectrumReport report_of(const SpectrumOptions& options, Spectrum spectrum, bool
             report.unit.empty() && seconds ? std::string("s") : report.unit};
 }
 
+/// Refuses a band without frequencies, which would look like one without peaks.
+void check_band(const SpectrumReport& report) {
+    const auto& spectrum = report.spectrum;
+    for (int i = 0; i < spectrum.bins->points; ++i) {
+        if (report.band.contains(spectrum.frequency(i))) return;
+    }
+    throw DataError("no frequency of the spectrum lies from " + rounded(report.band.low) + " to " +
+                    rounded(report.band.high) + "; it goes from " + rounded(spectrum.frequency(0)) +
+                    " to " + rounded(spectrum.frequency(spectrum.bins->points - 1)) +
+                    " in steps of " + rounded(spectrum.bins->delta));
+}
+
 SpectrumReport measured_whole(const SpectrumOptions& options) {
     InputFile input(options.report.in);
     const auto source = open_signals(input, options.reading);
@@ -101,7 +114,9 @@ SpectrumReport measured_whole(const SpectrumOptions& options) {
     if (options.segments.slope) take_slope(x);
     if (options.segments.detrend) remove_mean(x);
     check_finite(x.values(), x->complex);
-    return report_of(options, measure(x, options.settings), source->sound);
+    auto report = report_of(options, measure(x, options.settings), source->sound);
+    check_band(report);
+    return report;
 }
 
 SpectrumReport measured_in_segments(const SpectrumOptions& options) {
@@ -125,6 +140,7 @@ SpectrumReport measured_in_segments(const SpectrumOptions& options) {
     }
     tell_of_others(*source);
     report.spectrum = average.result();
+    check_band(report);
     if (waterfall) {
         waterfall->draw(
             options.waterfall,
@@ -142,9 +158,10 @@ void run(SpectrumOptions& options) {
     options.averaging.type = options.type.value_or(options.averaging.type);
     check_usage(options);
     options.settings.window = window_of_name(options.window);
-    const auto report =
-        options.segmented() ? measured_in_segments(options) : measured_whole(options);
     const auto& shown = options.report;
+    const auto report = with_data_of(shown.in, [&] {
+        return options.segmented() ? measured_in_segments(options) : measured_whole(options);
+    });
     if (!shown.out.empty()) write_output(report);
     if (shown.peaks > 0) print_peaks(report, shown.peaks);
     if (!shown.plot.empty()) draw_spectrum(report);

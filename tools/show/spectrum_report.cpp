@@ -9,6 +9,7 @@
 
 #include "base/number.hpp"
 #include "base/progress.hpp"
+#include "base/text.hpp"
 #include "files/output.hpp"
 #include "files/recording.hpp"
 #include "measure/windows.hpp"
@@ -91,8 +92,9 @@ void print_peaks(const SpectrumReport& report, std::size_t count) {
         std::puts("no peaks");
         return;
     }
-    std::printf("%18s %18s %18s\n", with_unit("frequency", report.frequency_unit()).c_str(),
-                with_unit("period", report.unit).c_str(), report.quantity().c_str());
+    std::printf("%18s %18s %18s\n",
+                printable(with_unit("frequency", report.frequency_unit())).c_str(),
+                printable(with_unit("period", report.unit)).c_str(), report.quantity().c_str());
     for (const auto& peak : peaks) {
         std::printf("%18.8g %18.8g %18.6g\n", peak.x, 1 / std::fabs(peak.x), peak.y);
     }
@@ -104,11 +106,11 @@ void print_summary(const SpectrumReport& report) {
     if (spectrum.averaged > 1) std::printf("%ld segments of ", spectrum.averaged);
     std::printf("%d samples through %s, transform of %d points, %s spectrum\n", spectrum.samples,
                 name.c_str(), spectrum.length, spectrum.two_sided ? "two-sided" : "one-sided");
-    const auto unit = report.frequency_unit();
+    const auto unit = printable(report.frequency_unit());
     std::printf("bins every %s%s, from %s to %s; strongest peaks:\n\n",
-                number(spectrum.bins->delta).c_str(), unit.empty() ? "" : (" " + unit).c_str(),
-                number(spectrum.frequency(0)).c_str(),
-                number(spectrum.frequency(spectrum.bins->points - 1)).c_str());
+                rounded(spectrum.bins->delta).c_str(), unit.empty() ? "" : (" " + unit).c_str(),
+                rounded(spectrum.frequency(0)).c_str(),
+                rounded(spectrum.frequency(spectrum.bins->points - 1)).c_str());
     print_peaks(report, peaks_in_summary);
 }
 

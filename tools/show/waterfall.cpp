@@ -40,7 +40,8 @@ void Waterfall::lay_out(const Spectrum& spectrum) {
         first_bin_ = std::min(first_bin_, i);
         end = i + 1;
     }
-    if (end - first_bin_ < 2) throw Error("there are too few frequencies to draw");
+    if (end - first_bin_ < 2)
+        throw DataError("the band holds fewer frequencies than a picture takes");
     const double interior = density_ ? amplitude_to_density(spectrum, first_bin_ + 1) : 1.0;
     for (int i = first_bin_; i < end; ++i) {
         const bool alone = density_ && spectrum.has_no_mirror(i);
