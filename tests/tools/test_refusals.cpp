@@ -31,11 +31,13 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {1, "convert x.txt o.csv --signal 2", "x.txt holds 1 signal, no signal 2"},
         {1, "filter x.txt --lowpass 0.1 -o nowhere/y.csv", "nowhere"},
         // Samples
-        {1, "spectrum nan.txt -o y.csv", "sample 2 is not a finite number"},
+        {1, "spectrum nan.txt -o y.csv", "nan.txt: sample 2 is not a finite number"},
         {1, "spectrum nan.txt --average 2 -o y.csv", "sample 2 is not a finite number"},
-        {1, "filter nan.txt --lowpass 0.1 -o y.csv", "sample 2 is not a finite number"},
+        {1, "filter nan.txt --lowpass 0.1 -o y.csv", "nan.txt: sample 2 is not a finite number"},
         {1, "spectrum none.txt", "no samples"},
-        {1, "filter x.txt --taps none.txt", "no taps"},
+        {1, "filter x.txt --taps none.txt", "none.txt: there are no taps"},
+        {1, "correlate x.txt nan.txt", "nan.txt: sample 2"},
+        {1, "spectrum x.txt --band 0.6 0.7", "goes from 0 to 0.5"},
         {1, "correlate x.txt slow.txt -o c.csv", "spacings differ, 1 and 0.5"},
         {1, "spectrum still.txt", "gives no frequencies"},
         {1, "spectrum x.txt --average 4 -o y.csv", "fewer than one segment of 4"},
@@ -48,6 +50,11 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {1, "filter x.txt --bandpass 0.3 0.2 -o y.csv", "lower to a higher"},
         {1, "interp x.txt --at x.txt --edges refuse", "3 lies outside"},
         {2, "generate cos 1 --duration 1e99 -o x.dsp", "1073741824"},
+        {2, "generate cos 1000 -o x.dsp", "say --rate"},
+        {2, "generate cexp 101 --rate 100 -o x.dsp", "beyond the sampling rate, 100"},
+        {2, "design sinh-over-root 1e300 -o x.dsp", "no finite taps"},
+        {2, "design delay 0.2 1e9 -o x.dsp", "more than half their number"},
+        {2, "design hilbert 0.3 --length 1 -o x.dsp", "all taps are 0"},
         {2, "filter x.txt --lowpass 0.1 --transition 1e-9", "--length"},
         {2, "filter x.txt --highpass 0.1 --length 10", "odd number"},
         // Words
@@ -56,7 +63,7 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {2, "window hanning", "Uniform, Bartlett, Hann"},
         {2, "filter x.txt --lowpass 0.1 --window hann", "Kaiser70"},
         {2, "generate sine 50 -o x.dsp", "none of cos, cexp, line, noise"},
-        {2, "generate cos 50 amp=x -o x.dsp", "is not a number"},
+        {2, "generate cos 0.1 amp=x -o x.dsp", "is not a number"},
         {2, "generate noise type=laplace --complex -o x.dsp", "real"},
         // Numbers out of range
         {2, "convert x.txt out.csv --delta nan", "positive number"},
@@ -74,6 +81,7 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {2, "filter x.txt --lowpass 0.1 --length 9 --transition 0.1 --attenuation 50", "no choice"},
         {2, "interp x.txt", "--at and --rate"},
         {2, "interp - --at -", "standard input"},
+        {2, "correlate - -", "standard input can be A or B"},
         {2, "spectrum x.txt -o - --peaks 1", "standard output"},
     };
     const auto before = files();

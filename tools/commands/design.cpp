@@ -124,6 +124,22 @@ Signal taps_of(const Request& request, const Tapering& tapering) {
     return taps;
 }
 
+/// Refuses taps that filter nothing.
+void check_taps(const Request& request, const DesignOptions& options, const Signal& taps) {
+    const auto values = taps.values();
+    if (!std::ranges::all_of(values, [](double tap) { return std::isfinite(tap); })) {
+        throw UsageError(options.name + " " + rounded(request.other) + " gives no finite taps");
+    }
+    if (request.design.type == DSP_FIR_DELAY && 2 * std::fabs(request.other) >= taps->points) {
+        throw UsageError("taps cannot delay by more than half their number, and there are " +
+                         std::to_string(taps->points) + "; a delay of " + rounded(request.other) +
+                         " takes a --length of about " + rounded(4 * std::fabs(request.other)));
+    }
+    if (std::ranges::all_of(values, [](double tap) { return tap == 0; })) {
+        throw UsageError("all taps are 0; give a longer --length");
+    }
+}
+
 /// Frequencies as the user gave them.
 class Report {
   public:
@@ -218,6 +234,7 @@ void run(DesignOptions& options) {
     const auto request = request_of(options);
     if (options.tapering.transition && options.rate) *options.tapering.transition /= *options.rate;
     auto taps = taps_of(request, options.tapering);
+    check_taps(request, options, taps);
     if (options.rate) taps->delta = 1 / *options.rate;
     if (!options.out.empty()) write_recording(options.out, {&taps, 1}, options.writing);
     if (!options.out.empty() && options.plot.empty()) return;
