@@ -47,6 +47,7 @@ struct FilterOptions {
     Tapering tapering;
     ReadOptions reading;
     WriteOptions writing;
+    PictureLook look;
 };
 
 void check_usage(FilterOptions& options) {
@@ -164,7 +165,13 @@ class Comparison {
           seconds_(sound || options.reading.rate),
           before_(outline(stream.delta)),
           after_(before_),
-          width_(stream.channels) {}
+          width_(stream.channels) {
+        const auto& reading = options.reading;
+        if (sound)
+            caption_ =
+                "channel " + std::to_string(reading.channel.value_or(reading.signal.value_or(1)));
+        if (!sound && reading.signal) caption_ = "signal " + std::to_string(*reading.signal);
+    }
 
     void add(std::span<const double> in, std::span<const double> out) {
         before_.add(in, width_);
@@ -175,8 +182,16 @@ class Comparison {
         std::vector panels{before_.curve(), after_.curve()};
         panels[0].title = short_name(options_.in);
         panels[1].title = "filtered";
-        for (auto& panel : panels) panel.x_label = with_unit("time", seconds_ ? "s" : "");
-        tool::draw(panels, options_.plot);
+        const auto [a, b] = std::pair(*panels[0].range, *panels[1].range);
+        for (auto& panel : panels) {
+            panel.x_label = "time";
+            panel.x_unit = seconds_ ? "s" : "";
+            panel.y_label = "value";
+            panel.y_unit = options_.look.value_unit;
+            panel.range = {std::min(a.first, b.first), std::max(a.second, b.second)};
+        }
+        panels[0].caption = caption_;
+        tool::draw(panels, options_.plot, options_.look);
     }
 
   private:
@@ -187,6 +202,7 @@ class Comparison {
 
     const FilterOptions& options_;
     bool seconds_;
+    std::string caption_;
     Outline before_, after_;
     std::size_t width_;
 };
@@ -287,7 +303,7 @@ void add_filter(CLI::App& program) {
         ->type_name("FILE");
     command
         ->add_option("--plot", options->plot,
-                     "draw before and after into a .png or .svg file, or - the terminal")
+                     "draw before and after into a .png, .svg or .pdf file, or - the terminal")
         ->type_name("FILE");
     command->add_option("--span", options->span, "times between which --plot draws")
         ->expected(2)
@@ -302,6 +318,7 @@ void add_filter(CLI::App& program) {
     options->tapering.declare(*command);
     options->reading.declare(*command);
     options->writing.declare(*command);
+    options->look.declare(*command);
     command->footer(about);
     command->callback([options] {
         check_usage(*options);

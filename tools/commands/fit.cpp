@@ -22,6 +22,7 @@ struct FitOptions {
     std::string in, plot;
     bool json = false;
     ReadOptions reading;
+    PictureLook look;
 };
 
 // The entries of dsps_lin_regres2(): seven for either line, then those of the data.
@@ -100,6 +101,7 @@ void draw_line(const Signal& pairs, std::span<const double> table, const FitOpti
     curve.title = short_name(options.in);
     curve.x_label = "x";
     curve.y_label = "y";
+    curve.y_unit = options.look.value_unit;
     curve.style = Style::dots;
     for (const auto& [x, y] : points) {
         curve.x.push_back(x);
@@ -110,7 +112,7 @@ void draw_line(const Signal& pairs, std::span<const double> table, const FitOpti
             curve.line.push_back({x, table[slope] * x + table[intercept]});
         }
     }
-    draw(curve, options.plot);
+    draw(curve, options.plot, options.look);
 }
 
 void run(const FitOptions& options) {
@@ -159,8 +161,9 @@ void add_fit(CLI::App& program) {
     command->add_flag("--json", options->json, "print JSON");
     command
         ->add_option("--plot", options->plot,
-                     "draw data and line into a .png or .svg file, or - the terminal")
+                     "draw data and line into a .png, .svg or .pdf file, or - the terminal")
         ->type_name("FILE");
+    options->look.declare(*command);
     options->reading.declare(*command);
     command->footer(about);
     command->callback([options] { run(*options); });

@@ -12,6 +12,7 @@
 #include "commands/commands.hpp"
 #include "files/output.hpp"
 #include "files/recording.hpp"
+#include "show/axis.hpp"
 #include "show/labels.hpp"
 #include "show/plot.hpp"
 
@@ -22,6 +23,7 @@ struct HistOptions {
     std::string in, out, plot;
     ReadOptions reading;
     WriteOptions writing;
+    PictureLook look;
     std::optional<int> bins;
     std::vector<double> range;
 };
@@ -109,19 +111,21 @@ void write(const Histogram& histogram, const HistOptions& options) {
     output.commit();
 }
 
-void draw(const Histogram& histogram, bool magnitudes, const std::string& in,
-          const std::string& path) {
+void draw(const Histogram& histogram, bool magnitudes, const HistOptions& options) {
     Curve curve;
-    curve.title = short_name(in);
+    curve.title = short_name(options.in);
     curve.x_label = magnitudes ? "magnitude" : "value";
+    curve.x_unit = options.look.value_unit;
     curve.y_label = "count";
+    curve.caption = std::to_string(histogram.counts->points) + " bins of " +
+                    with_prefix(histogram.counts->delta, options.look.value_unit, 4);
     curve.style = Style::boxes;
     curve.box_width = histogram.counts->delta;
     for (int i = 0; i < histogram.counts->points; ++i) {
         curve.x.push_back(histogram.edge(i) + curve.box_width / 2);
         curve.y.push_back(histogram.counts->data[i]);
     }
-    draw(curve, path);
+    draw(curve, options.plot, options.look);
 }
 
 void run(const HistOptions& options) {
@@ -133,7 +137,7 @@ void run(const HistOptions& options) {
         return with_data_of(options.in, [&] { return count(std::move(x), options); });
     }();
     if (!options.out.empty()) write(histogram, options);
-    if (!options.plot.empty()) draw(histogram, magnitudes, options.in, options.plot);
+    if (!options.plot.empty()) draw(histogram, magnitudes, options);
     if (options.out.empty() && options.plot.empty()) return print_table(histogram);
     const double outside = histogram.below + histogram.above + histogram.nan;
     if (outside > 0) std::fprintf(stderr, "wavkit: %.0f values are in no bin\n", outside);
@@ -170,8 +174,9 @@ void add_hist(CLI::App& program) {
     options->writing.declare_without_sound(*command);
     command
         ->add_option("--plot", options->plot,
-                     "draw the counts into a .png or .svg file, or - the terminal")
+                     "draw the counts into a .png, .svg or .pdf file, or - the terminal")
         ->type_name("FILE");
+    options->look.declare(*command);
     options->reading.declare(*command);
     command->footer(about);
     command->callback([options] { run(*options); });

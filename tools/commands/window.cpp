@@ -22,6 +22,7 @@ constexpr int bins_in_picture = 16;
 struct WindowOptions {
     std::string name, out, plot;
     WriteOptions writing;
+    PictureLook look;
     int points = 1024;
 };
 
@@ -92,21 +93,22 @@ void print_figures(int window, const Signal& w) {
     std::printf("scalloping loss   %.4f dB\n", scalloping_loss(response));
 }
 
-void draw_response(int window, int points, const std::string& path) {
+void draw_response(int window, int points, const std::string& path, const PictureLook& look) {
     const auto response = response_of(window, points);
     const int reach = std::min(response.magnitude->points - 1, bins_in_picture * response.per_bin);
     Curve curve;
     curve.title = window_names()[std::size_t(window)] + ", " + std::to_string(points) + " points";
     curve.x_label = "bins";
-    curve.y_label = "response (dB)";
+    curve.y_label = "response";
+    curve.y_unit = "dB re maximum";
     curve.decibels = true;
-    curve.depth = 180;
+    curve.depth = 150;
     for (int i = -reach; i <= reach; ++i) {
         curve.x.push_back(double(i) / response.per_bin);
         // A zero between two lobes would have no place on the axis.
         curve.y.push_back(decibels(std::max(response.magnitude->data[std::abs(i)], 1e-15)));
     }
-    draw(curve, path);
+    draw(curve, path, look);
 }
 
 void run(const WindowOptions& options) {
@@ -119,7 +121,7 @@ void run(const WindowOptions& options) {
     const int window = window_of_name(options.name);
     const auto w = samples_of(window, options.points);
     if (!options.out.empty()) write_recording(options.out, {&w, 1}, options.writing);
-    if (!options.plot.empty()) draw_response(window, w->points, options.plot);
+    if (!options.plot.empty()) draw_response(window, w->points, options.plot, options.look);
     if (options.out.empty() && options.plot.empty()) print_figures(window, w);
 }
 
@@ -138,9 +140,11 @@ void add_window(CLI::App& program) {
     add_choice(*command, "--to", options->writing.format, formats(),
                "format of the output (default: by its name)");
     command
-        ->add_option("--plot", options->plot,
-                     "draw main lobe and sidelobes into a .png or .svg file, or - the terminal")
+        ->add_option(
+            "--plot", options->plot,
+            "draw main lobe and sidelobes into a .png, .svg or .pdf file, or - the terminal")
         ->type_name("FILE");
+    options->look.declare(*command);
     command->footer(
         "The coherent gain is the mean of the samples, whose centre is 1; the noise bandwidth is "
         "that of\nthe rectangular filter that lets as much white noise through; the scalloping "

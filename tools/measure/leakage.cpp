@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstdint>
 
 namespace wavkit::tool {
 namespace {
@@ -67,8 +68,10 @@ double Leakage::response_near(double bins, double blur) const {
     if (bins <= blur) return 1;
     const double low = bins - blur, high = bins + blur;
     double highest = std::max(response(low), response(high));
-    for (double at = std::ceil(low * fineness); at < high * fineness; ++at) {
-        highest = std::max(highest, response(at / fineness));
+    const auto first = std::int64_t(std::ceil(low * fineness));
+    const auto end = std::int64_t(std::ceil(high * fineness));
+    for (auto i = first; i < end; ++i) {
+        highest = std::max(highest, response(double(i) / fineness));
     }
     return highest;
 }
