@@ -77,6 +77,13 @@ TEST_F(PicturesTest, AxesHaveUnitsPrefixesAndReferences) {
         script_of("spectrum x.dsp --plot p.png --title \"A & B\" --size 640x400", "p.png");
     EXPECT_EQ(first(named, "set title '"), "A & B'");
     EXPECT_NE(named.find("size 640,400"), named.npos);
+    // A title wider than the page loses its middle, and no half of a character.
+    std::string wide;
+    for (int i = 0; i < 200; ++i) wide += "ö";
+    const auto cut =
+        first(script_of("hist x.dsp --plot p.png --title " + wide, "p.png"), "set title 'ö");
+    EXPECT_NE(cut.find("öö…öö"), cut.npos) << cut;
+    EXPECT_LT(cut.size(), 2 * 130u);
 }
 
 TEST_F(PicturesTest, LabelsOfPeaksKeepApart) {

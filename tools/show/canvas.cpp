@@ -74,6 +74,7 @@ Canvas::Canvas(Picture picture, const PictureLook& look, int usual_width, int us
         characters ? terminal_size() : look.size.value_or(std::pair(usual_width, usual_height));
     width = size.first;
     height = size.second;
+    font_size_ = picture == Picture::png ? 11 : picture == Picture::svg ? 12 : 8;
     letter_width = characters ? 1 : 7.6;
     line_height = characters ? 1 : 17;
 }
@@ -131,10 +132,32 @@ std::string Canvas::at(double x, double y) const {
     return "screen " + number(x / width) + ",screen " + number(y / height);
 }
 
+void Canvas::write_title(std::FILE* script, const std::string& text) const {
+    auto shown = printable(text);
+    const auto begins_none = [&](std::size_t i) {
+        return i < shown.size() && (static_cast<unsigned char>(shown[i]) & 0xC0) == 0x80;
+    };
+    const double excess = (1.12 * width_of(shown) - width) / letter_width;
+    if (excess > -3) {
+        auto from = (shown.size() - std::min(shown.size(), std::size_t(excess + 4))) / 2;
+        while (begins_none(from)) ++from;
+        auto end = from;
+        for (double left = excess + 4; left > 0 && end < shown.size(); --left) {
+            do ++end;
+            while (begins_none(end));
+        }
+        shown.replace(from, end - from, "…");
+    }
+    std::fprintf(script, "set title %s\n", script_text(shown).c_str());
+}
+
 void Canvas::write_caption(std::FILE* script, const std::string& text) const {
     if (text.empty() || characters) return;
-    std::fprintf(script, "set label %s at %s right textcolor rgb '#777777'\n", quoted(text).c_str(),
-                 at(width - 3 * letter_width, 0.8 * line_height).c_str());
+    // Small pictures have it in small letters.
+    const double share = std::min(1.0, 0.92 * (width - 4 * letter_width) / width_of(text));
+    std::fprintf(script, "set label %s at %s right font ',%.3g' textcolor rgb '#777777'\n",
+                 script_text(text).c_str(), at(width - 3 * letter_width, 0.8 * line_height).c_str(),
+                 share * font_size_);
 }
 
 double Canvas::width_of(const std::string& text) const {

@@ -47,11 +47,15 @@ class Canvas {
     /// Says something under everything else.
     void write_caption(std::FILE* script, const std::string& text) const;
 
+    /// A title, without its middle where it is wider than the page.
+    void write_title(std::FILE* script, const std::string& text) const;
+
     /// How wide a text is, about.
     double width_of(const std::string& text) const;
 
   private:
     Picture picture_;
+    double font_size_;
 };
 
 }  // namespace wavkit::tool

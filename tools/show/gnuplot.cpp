@@ -34,7 +34,7 @@ std::string complaint(std::FILE* errors) {
 
 }  // namespace
 
-std::string quoted(const std::string& text) {
+std::string script_text(const std::string& text) {
     std::string result = "'";
     for (const char c : printable(text)) result.append(c == '\'' ? 2 : 1, c);
     return result + "'";

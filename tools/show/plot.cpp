@@ -92,8 +92,8 @@ class Panel {
     void write() const {
         std::fputs("unset label\nunset arrow\n", script_);
         canvas_.set_plot_box(script_, box_);
-        std::fprintf(script_, "set xlabel %s\nset ylabel %s\n", quoted(x_.label).c_str(),
-                     quoted(y_.label).c_str());
+        std::fprintf(script_, "set xlabel %s\nset ylabel %s\n", script_text(x_.label).c_str(),
+                     script_text(y_.label).c_str());
         write_range('x', across_, x_.factor);
         write_range('y', upwards_, y_.factor);
         const bool given = curve_.y_tics > 0;
@@ -220,7 +220,7 @@ class Panel {
         const double middle = (box->bottom + box->top) / 2;
         const bool before = box->right <= at.x;
         std::fprintf(script_, "set label %s at %s %s front textcolor rgb '#333333'\n",
-                     tool::quoted(text).c_str(),
+                     script_text(text).c_str(),
                      canvas_.at(before ? box->right : box->left, middle).c_str(),
                      before ? "right" : "left");
         const double aside = std::max({box->left - at.x, at.x - box->right, 0.0});
@@ -271,8 +271,7 @@ void draw(std::span<const Curve> panels, const std::string& path, const PictureL
         if (panels.size() > 1) std::fputs("set multiplot\n", to);
         for (std::size_t i = 0; i < panels.size(); ++i) {
             const bool named = i == 0 && !look.title.empty();
-            std::fprintf(to, "set title %s\n",
-                         quoted(named ? look.title : panels[i].title).c_str());
+            canvas.write_title(to, named ? look.title : panels[i].title);
             const Panel panel(to, panels[i], canvas,
                               canvas.plot_box(i, panels.size(), 0, !caption.empty()));
             panel.write();

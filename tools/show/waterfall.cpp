@@ -126,9 +126,10 @@ void Waterfall::write(std::FILE* to, const Canvas& canvas, const Labels& labels)
                  canvas.at(box.right + 2 * canvas.letter_width, box.bottom).c_str(),
                  number(2.5 * canvas.letter_width / canvas.width).c_str(),
                  number((box.top - box.bottom) / canvas.height).c_str());
-    std::fprintf(to, "set title %s\nset xlabel %s\nset ylabel %s\nset cblabel %s offset 1.5,0\n",
-                 quoted(labels.title).c_str(), quoted(x.label).c_str(), quoted(y.label).c_str(),
-                 quoted(labels.colour).c_str());
+    canvas.write_title(to, labels.title);
+    std::fprintf(to, "set xlabel %s\nset ylabel %s\nset cblabel %s offset 1.5,0\n",
+                 script_text(x.label).c_str(), script_text(y.label).c_str(),
+                 script_text(labels.colour).c_str());
     std::fprintf(to, "set xrange [%s:%s]\nset yrange [%s:%s]\nset cbrange [%s:%s]\n",
                  number(left * x.factor).c_str(), number(right * x.factor).c_str(),
                  number(bottom * y.factor).c_str(), number(top * y.factor).c_str(),
