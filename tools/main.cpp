@@ -1,21 +1,32 @@
 // wavkit: signals from the command line.
 #include <wavkit/dsp.h>
 
+#include <cerrno>
 #include <cstdio>
+#include <cstring>
 #include <exception>
 #include <string>
 
 #include "base/error.hpp"
+#include "base/text.hpp"
 #include "commands/commands.hpp"
 
 namespace {
 
 constexpr int bad_input = 1, bad_usage = 2;
 
-/// One line on standard error.
+/// One line on standard error, whatever a user's names are made of.
 int complain(const std::string& who, const std::string& what, int status) {
-    std::fprintf(stderr, "%s: %s\n", who.c_str(), what.c_str());
+    std::fprintf(stderr, "%s: %s\n", who.c_str(), wavkit::tool::printable(what).c_str());
     return status;
+}
+
+/// The status that stays when all that was printed has reached its place.
+int with_output(int status) {
+    const bool failed = std::ferror(stdout) != 0;
+    if (std::fflush(stdout) == 0 && !failed) return status;
+    const std::string reason = failed ? "" : std::string(": ") + std::strerror(errno);
+    return complain("wavkit", "cannot write standard output" + reason, bad_input);
 }
 
 /// The subcommand in use, as a user writes it.
@@ -80,7 +91,7 @@ int main(int argc, char** argv) {
     try {
         CLI::App program("Looks at sampled signals, converts them and measures their spectra.",
                          "wavkit");
-        return outcome(program, argc, argv);
+        return with_output(outcome(program, argc, argv));
     } catch (const std::bad_alloc&) {
         return complain("wavkit", "out of memory", bad_input);
     } catch (const std::exception& error) {

@@ -171,7 +171,7 @@ TEST_F(SegmentsTest, TheWaterfallShowsWhatWasWhen) {
     ASSERT_EQ(done.status, 0) << done.err;
     EXPECT_EQ(done.out, "");
     const auto script = contents("w.png");
-    EXPECT_NE(script.find("set xlabel \"time (s)\""), std::string::npos);
+    EXPECT_NE(script.find("set xlabel 'time (s)'"), std::string::npos);
     EXPECT_NE(script.find("set xrange [0:1500]"), std::string::npos) << script.substr(0, 900);
     EXPECT_NE(script.find("set yrange [-0.5:64.5]"), std::string::npos);
     const auto cells = rows(script.substr(script.find("$cells"), script.rfind("EOD")));

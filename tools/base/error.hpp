@@ -2,6 +2,7 @@
 #pragma once
 
 #include <stdexcept>
+#include <string>
 
 namespace wavkit::tool {
 
@@ -9,6 +10,21 @@ namespace wavkit::tool {
 struct Error : std::runtime_error {
     using std::runtime_error::runtime_error;
 };
+
+/// Data that cannot be used. What works on them does not know their file: with_data_of() says it.
+struct DataError : Error {
+    using Error::Error;
+};
+
+/// Does some work on the data of a file, whose name then stands before what is wrong with them.
+template <class Work>
+auto with_data_of(const std::string& file, Work work) {
+    try {
+        return work();
+    } catch (const DataError& error) {
+        throw Error((file == "-" ? "standard input" : file) + ": " + error.what());
+    }
+}
 
 /// A call that makes no sense, whatever the data: exit status 2.
 struct UsageError : std::runtime_error {

@@ -17,9 +17,9 @@ struct Facts {
     std::string axis(bool seconds) const {
         return axis_unit.empty() && seconds ? std::string("s") : axis_unit;
     }
-    /// What to write at the axis of the values: "acceleration (m/s^2)".
-    std::string value_label(const std::string& otherwise) const {
-        return (name.empty() ? otherwise : name) + (unit.empty() ? "" : " (" + unit + ")");
+    /// What to write at the axis of the values, beside their unit.
+    std::string label(const std::string& otherwise) const {
+        return name.empty() ? otherwise : name;
     }
     bool placed() const { return start != 0 || !origin.empty(); }
 };

@@ -2,6 +2,8 @@
 
 #include <array>
 #include <charconv>
+#include <cmath>
+#include <cstdio>
 #include <cstdlib>
 
 namespace wavkit::tool {
@@ -10,6 +12,23 @@ std::string number(double value) {
     std::array<char, 32> text;
     const auto [end, error] = std::to_chars(text.data(), text.data() + text.size(), value);
     return {text.data(), end};
+}
+
+std::string rounded(double value) {
+    if (std::isnan(value)) return "nan";  // without a sign
+    double short_value = value;
+    for (int digits = 1; digits <= 9; ++digits) {
+        std::array<char, 32> text{};
+        std::snprintf(text.data(), text.size(), "%.*g", digits, value);
+        short_value = std::strtod(text.data(), nullptr);
+        if (!(std::fabs(short_value - value) > 5e-9 * std::fabs(value))) break;
+    }
+    return number(short_value);
+}
+
+double time_of(double sample, double delta) {
+    const double rate = std::round(1 / delta);
+    return 1 / rate == delta ? sample / rate : sample * delta;
 }
 
 std::optional<double> take_number(std::string_view& text) {

@@ -4,13 +4,14 @@
 
 #include <chrono>
 #include <cstdio>
-#include <utility>
+
+#include "base/text.hpp"
 
 namespace wavkit::tool {
 
 using namespace std::chrono_literals;
 
-Progress::Progress(std::string what) : what_(std::move(what)) {
+Progress::Progress(const std::string& what) : what_(printable(what)) {
     if (isatty(STDERR_FILENO)) watcher_ = std::thread([this] { show(); });
 }
 

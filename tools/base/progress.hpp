@@ -13,7 +13,7 @@ namespace wavkit::tool {
 /// and wipes it at the end. Silent where standard error is no terminal.
 class Progress {
   public:
-    explicit Progress(std::string what);
+    explicit Progress(const std::string& what);
     ~Progress();
     Progress(const Progress&) = delete;
     Progress& operator=(const Progress&) = delete;

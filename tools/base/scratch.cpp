@@ -15,6 +15,10 @@ Stream scratch() {
     return file;
 }
 
+void fail_with_scratch() {
+    throw Error(std::string("cannot use a temporary file: ") + std::strerror(errno));
+}
+
 bool copy_rest(std::FILE* from, std::FILE* to) {
     std::vector<char> block(1 << 16);
     std::size_t count;

@@ -2,7 +2,7 @@
 #include <memory>
 
 #include "commands/commands.hpp"
-#include "files/recording.hpp"
+#include "files/transfer.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -14,9 +14,7 @@ struct ConvertOptions {
 };
 
 void run(const ConvertOptions& options) {
-    options.writing.checked_format_for(options.out);  // bad usage shows before reading
-    const auto recording = read_recording(options.in, options.reading);
-    write_recording(options.out, recording.signals, options.writing);
+    transfer(options.in, options.reading, options.out, options.writing);
 }
 
 constexpr const char* about_formats =

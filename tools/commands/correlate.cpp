@@ -36,6 +36,10 @@ struct Correlation {
 };
 
 void check_usage(const CorrelateOptions& options) {
+    if (options.a == "-" && options.b == "-") {
+        throw UsageError(
+            "standard input can be A or B, not both; two channels of it take a single -");
+    }
     options.writing.check_without_sound(options.out, "a correlation");
     if (options.out.empty()) return;
     if (!options.lags.empty() && is_signal_file(options.writing.format_for(options.out))) {
@@ -57,7 +61,7 @@ std::pair<Signal, Signal> read_pair(const CorrelateOptions& options) {
 }
 
 void prepare(Signal& x, const CorrelateOptions& options) {
-    if (x->points < 1) throw Error("a signal has no samples");
+    if (x->points < 1) throw DataError("a signal has no samples");
     check_finite(x.values(), x->complex);
     if (options.detrend) remove_mean(x);
 }
@@ -132,8 +136,9 @@ void run(const CorrelateOptions& options) {
     auto pair = read_pair(options);
     auto correlation = [&] {
         Progress progress("correlating");
-        prepare(pair.first, options);
-        prepare(pair.second, options);
+        with_data_of(options.a, [&] { prepare(pair.first, options); });
+        with_data_of(options.b.empty() ? options.a : options.b,
+                     [&] { prepare(pair.second, options); });
         return correlated(pair.first, std::move(pair.second));
     }();
     Band lags;

@@ -5,6 +5,7 @@
 #include <cstdio>
 #include <map>
 #include <memory>
+#include <utility>
 
 #include "base/error.hpp"
 #include "base/number.hpp"
@@ -54,6 +55,7 @@ struct DesignOptions {
     std::optional<double> rate;
     Tapering tapering;
     WriteOptions writing;
+    PictureLook look;
 };
 
 /// What was asked for, with frequencies in cycles a sample.
@@ -124,6 +126,22 @@ Signal taps_of(const Request& request, const Tapering& tapering) {
     return taps;
 }
 
+/// Refuses taps that filter nothing.
+void check_taps(const Request& request, const DesignOptions& options, const Signal& taps) {
+    const auto values = taps.values();
+    if (!std::ranges::all_of(values, [](double tap) { return std::isfinite(tap); })) {
+        throw UsageError(options.name + " " + rounded(request.other) + " gives no finite taps");
+    }
+    if (request.design.type == DSP_FIR_DELAY && 2 * std::fabs(request.other) >= taps->points) {
+        throw UsageError("taps cannot delay by more than half their number, and there are " +
+                         std::to_string(taps->points) + "; a delay of " + rounded(request.other) +
+                         " takes a --length of about " + rounded(4 * std::fabs(request.other)));
+    }
+    if (std::ranges::all_of(values, [](double tap) { return tap == 0; })) {
+        throw UsageError("all taps are 0; give a longer --length");
+    }
+}
+
 /// Frequencies as the user gave them.
 class Report {
   public:
@@ -158,26 +176,37 @@ class Report {
     void draw(const std::string& path) const {
         Curve gain, phase;
         gain.title = title();
-        gain.y_label = "gain (dB)";
+        gain.y_label = "gain";
+        gain.y_unit = "dB";
         gain.decibels = true;
-        phase.title = "phase, without the delay of " + number(middle()) + " samples";
-        phase.y_label = "phase (degrees)";
+        gain.depth = 120;
+        phase.title =
+            "phase where it passes, without the delay of " + number(middle()) + " samples";
+        phase.y_label = "phase";
+        phase.y_unit = "degrees";
         phase.filled = false;
         phase.range = {-200, 200};
         phase.y_tics = 90;
-        gain.x_label = phase.x_label =
-            options_.rate ? "frequency (Hz)" : "frequency (cycles a sample)";
+        gain.x_label = phase.x_label = "frequency";
+        gain.x_unit = phase.x_unit = options_.rate ? "Hz" : "cycles a sample";
+        gain.x_range = phase.x_range = {0, frequency(double(response_.magnitude.size() - 1))};
         const double highest = *std::ranges::max_element(response_.magnitude);
+        bool shown = false;
         for (std::size_t i = 0; i < response_.magnitude.size(); ++i) {
             // A zero would have no place on the axis, and has no phase.
             const double magnitude = response_.magnitude[i];
             gain.x.push_back(frequency(double(i)));
             gain.y.push_back(20 * std::log10(std::max(magnitude, 1e-15)));
-            if (magnitude < 1e-9 * highest) continue;
+            // What next to nothing passes of turns from lobe to lobe.
+            constexpr double silent = 0.01;
+            if (!std::exchange(shown, magnitude >= silent * highest) && shown && !phase.x.empty()) {
+                phase.gaps.push_back(phase.x.size());
+            }
+            if (!shown) continue;
             phase.x.push_back(frequency(double(i)));
             phase.y.push_back(response_.phase[i]);
         }
-        tool::draw(std::vector{gain, phase}, path);
+        tool::draw(std::vector{gain, phase}, path, options_.look);
     }
 
   private:
@@ -218,6 +247,7 @@ void run(DesignOptions& options) {
     const auto request = request_of(options);
     if (options.tapering.transition && options.rate) *options.tapering.transition /= *options.rate;
     auto taps = taps_of(request, options.tapering);
+    check_taps(request, options, taps);
     if (options.rate) taps->delta = 1 / *options.rate;
     if (!options.out.empty()) write_recording(options.out, {&taps, 1}, options.writing);
     if (!options.out.empty() && options.plot.empty()) return;
@@ -271,8 +301,9 @@ void add_design(CLI::App& program) {
         ->type_name("FILE");
     command
         ->add_option("--plot", options->plot,
-                     "draw gain and phase into a .png or .svg file, or - the terminal")
+                     "draw gain and phase into a .png, .svg or .pdf file, or - the terminal")
         ->type_name("FILE");
+    options->look.declare(*command);
     options->writing.declare(*command);
     options->tapering.declare(*command);
     command->footer(about);

@@ -58,7 +58,9 @@ void run(const EnvelopeOptions& options) {
     auto recording = read_recording(options.in, options.reading);
     {
         Progress progress("transforming");
-        for (auto& x : recording.signals) take_envelope(x, options.detrend);
+        with_data_of(options.in, [&] {
+            for (auto& x : recording.signals) take_envelope(x, options.detrend);
+        });
     }
     if (options.out.empty()) return print_summary(recording.signals);
     write_recording(options.out, recording.signals, options.writing);

@@ -47,6 +47,7 @@ struct FilterOptions {
     Tapering tapering;
     ReadOptions reading;
     WriteOptions writing;
+    PictureLook look;
 };
 
 void check_usage(FilterOptions& options) {
@@ -100,7 +101,7 @@ Signal designed_taps(const FilterOptions& options, double delta) {
         const auto& edges = options.edges[i];
         if (edges.empty()) continue;
         const auto problem = problem_with_edges(edges, 1 / delta);
-        if (!problem.empty()) throw Error(problem);
+        if (!problem.empty()) throw DataError(problem);
         std::vector<double> fractions;
         for (const double edge : edges) fractions.push_back(edge * delta);
         auto band = tapered_design(band_options[i].type, fractions, 0, tapering);
@@ -111,8 +112,10 @@ Signal designed_taps(const FilterOptions& options, double delta) {
 
 Signal given_taps(const FilterOptions& options) {
     auto taps = first_signal(options.taps, {});
-    if (taps->points < 1) throw Error("there are no taps in " + options.taps);
-    check_finite(taps.values(), taps->complex);
+    with_data_of(options.taps, [&] {
+        if (taps->points < 1) throw DataError("there are no taps");
+        check_finite(taps.values(), taps->complex);
+    });
     return taps;
 }
 
@@ -159,11 +162,17 @@ class Comparison {
   public:
     Comparison(const FilterOptions& options, const SampleStream& stream, bool sound)
         : options_(options),
-          unit_(stream.facts_of(0).axis(sound || options.reading.rate)),
-          value_label_(stream.facts_of(0).value_label("value")),
+          axis_unit_(stream.facts_of(0).axis(sound || options.reading.rate)),
+          values_(stream.facts_of(0)),
           before_(outline(stream)),
           after_(before_),
-          width_(stream.channels) {}
+          width_(stream.channels) {
+        const auto& reading = options.reading;
+        if (sound)
+            caption_ =
+                "channel " + std::to_string(reading.channel.value_or(reading.signal.value_or(1)));
+        if (!sound && reading.signal) caption_ = "signal " + std::to_string(*reading.signal);
+    }
 
     void add(std::span<const double> in, std::span<const double> out) {
         before_.add(in, width_);
@@ -174,9 +183,16 @@ class Comparison {
         std::vector panels{before_.curve(), after_.curve()};
         panels[0].title = short_name(options_.in);
         panels[1].title = "filtered";
-        for (auto& panel : panels) panel.y_label = value_label_;
-        for (auto& panel : panels) panel.x_label = with_unit("time", unit_);
-        tool::draw(panels, options_.plot);
+        const auto [a, b] = std::pair(*panels[0].range, *panels[1].range);
+        for (auto& panel : panels) {
+            panel.x_label = "time";
+            panel.x_unit = axis_unit_;
+            panel.y_label = values_.label("value");
+            panel.y_unit = options_.look.unit_of(values_);
+            panel.range = {std::min(a.first, b.first), std::max(a.second, b.second)};
+        }
+        panels[0].caption = caption_;
+        tool::draw(panels, options_.plot, options_.look);
     }
 
   private:
@@ -188,7 +204,8 @@ class Comparison {
     }
 
     const FilterOptions& options_;
-    std::string unit_, value_label_;
+    std::string axis_unit_, caption_;
+    Facts values_;
     Outline before_, after_;
     std::size_t width_;
 };
@@ -220,7 +237,7 @@ class FilterRun {
         const auto& filtering = filters_.at(stream.delta);
         ChannelFilter filter(filtering, stream);
         const bool draws = !options_.plot.empty() && !comparison_;
-        if (draws && filter.complex_output()) throw Error("--plot draws real signals only");
+        if (draws && filter.complex_output()) throw DataError("--plot draws real signals only");
         if (draws) comparison_.emplace(options_, stream, sound);
         if (writer_)
             writer_->begin({stream.delta, filter.complex_output(), stream.channels, stream.length,
@@ -290,7 +307,7 @@ void add_filter(CLI::App& program) {
         ->type_name("FILE");
     command
         ->add_option("--plot", options->plot,
-                     "draw before and after into a .png or .svg file, or - the terminal")
+                     "draw before and after into a .png, .svg or .pdf file, or - the terminal")
         ->type_name("FILE");
     command->add_option("--span", options->span, "times between which --plot draws")
         ->expected(2)
@@ -305,10 +322,11 @@ void add_filter(CLI::App& program) {
     options->tapering.declare(*command);
     options->reading.declare(*command);
     options->writing.declare(*command);
+    options->look.declare(*command);
     command->footer(about);
     command->callback([options] {
         check_usage(*options);
-        FilterRun(*options).run();
+        with_data_of(options->in, [&] { FilterRun(*options).run(); });
     });
 }
 

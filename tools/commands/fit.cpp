@@ -22,6 +22,7 @@ struct FitOptions {
     std::string in, plot;
     bool json = false;
     ReadOptions reading;
+    PictureLook look;
 };
 
 // The entries of dsps_lin_regres2(): seven for either line, then those of the data.
@@ -99,8 +100,10 @@ void draw_line(const Signal& pairs, std::span<const double> table, const FitOpti
     std::ranges::stable_sort(points, {}, &Mark::x);
     Curve curve;
     curve.title = short_name(options.in);
-    curve.x_label = with_unit("x", pairs.facts.axis_unit);
-    curve.y_label = pairs.facts.value_label("y");
+    curve.x_label = "x";
+    curve.x_unit = pairs.facts.axis_unit;
+    curve.y_label = pairs.facts.label("y");
+    curve.y_unit = options.look.unit_of(pairs.facts);
     curve.style = Style::dots;
     for (const auto& [x, y] : points) {
         curve.x.push_back(x);
@@ -111,7 +114,7 @@ void draw_line(const Signal& pairs, std::span<const double> table, const FitOpti
             curve.line.push_back({x, table[slope] * x + table[intercept]});
         }
     }
-    draw(curve, options.plot);
+    draw(curve, options.plot, options.look);
 }
 
 void run(const FitOptions& options) {
@@ -122,8 +125,10 @@ void run(const FitOptions& options) {
     auto reading = options.reading;
     reading.csv.pairs = true;
     auto x = first_signal(options.in, reading);
-    if (x->points < 1) throw Error("the signal has no samples");
-    check_finite(x.values(), x->complex);
+    with_data_of(options.in, [&] {
+        if (x->points < 1) throw DataError("the signal has no samples");
+        check_finite(x.values(), x->complex);
+    });
     Signal table;
     const auto pairs = [&] {
         Progress progress("fitting");
@@ -160,8 +165,9 @@ void add_fit(CLI::App& program) {
     command->add_flag("--json", options->json, "print JSON");
     command
         ->add_option("--plot", options->plot,
-                     "draw data and line into a .png or .svg file, or - the terminal")
+                     "draw data and line into a .png, .svg or .pdf file, or - the terminal")
         ->type_name("FILE");
+    options->look.declare(*command);
     options->reading.declare(*command);
     command->footer(about);
     command->callback([options] { run(*options); });

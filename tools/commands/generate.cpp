@@ -144,6 +144,19 @@ void add_term(Signal& x, const Term& term) {
     }
 }
 
+/// Samples cannot tell an oscillation beyond these frequencies from a slower one; without a rate a
+/// frequency in hertz is one, and a whole one a constant.
+void check_frequency(const Term& term, const GenerateOptions& options, double rate) {
+    const bool turns = term.kind == "cexp";
+    if (term.kind != "cos" && !turns) return;
+    const double highest = turns ? rate : rate / 2;
+    if (std::fabs(*term.number) <= highest * (1 + 1e-9)) return;
+    const bool told = options.rate || options.delta;
+    throw UsageError(term.kind + " " + rounded(*term.number) + " lies beyond " +
+                     (turns ? "" : "half ") + "the sampling rate, " + rounded(highest) +
+                     (told ? "" : "; say --rate"));
+}
+
 int points_of(const GenerateOptions& options, double delta) {
     if (!options.duration) return options.points.value_or(1024);
     const double points = std::round(*options.duration / delta);
@@ -158,6 +171,7 @@ void run(const GenerateOptions& options) {
     Signal x(options.rate ? 1 / *options.rate : options.delta.value_or(1));
     x->points = points_of(options, x->delta);
     x->complex = options.complex || turning;
+    for (const auto& term : terms) check_frequency(term, options, 1 / x->delta);
     {
         Progress progress("generating");
         check(dsp_alloc(x), "making room for the signal");

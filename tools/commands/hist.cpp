@@ -12,6 +12,7 @@
 #include "commands/commands.hpp"
 #include "files/output.hpp"
 #include "files/recording.hpp"
+#include "show/axis.hpp"
 #include "show/labels.hpp"
 #include "show/plot.hpp"
 
@@ -22,6 +23,7 @@ struct HistOptions {
     std::string in, out, plot;
     ReadOptions reading;
     WriteOptions writing;
+    PictureLook look;
     std::optional<int> bins;
     std::vector<double> range;
 };
@@ -52,7 +54,7 @@ std::pair<double, double> range_of(const Signal& x) {
         low = std::min(low, value);
         high = std::max(high, value);
     }
-    if (low > high) throw Error("there are no finite values to count");
+    if (low > high) throw DataError("there are no finite values to count");
     if (low < high) return {low, high};
     const double margin = std::max(0.5, 1e-6 * std::fabs(low));
     return {low - margin, high + margin};
@@ -109,31 +111,35 @@ void write(const Histogram& histogram, const HistOptions& options) {
     output.commit();
 }
 
-void draw(const Histogram& histogram, const std::string& values, const std::string& in,
-          const std::string& path) {
+void draw(const Histogram& histogram, const std::string& values, const std::string& unit,
+          const HistOptions& options) {
     Curve curve;
-    curve.title = short_name(in);
+    curve.title = short_name(options.in);
     curve.x_label = values;
+    curve.x_unit = unit;
     curve.y_label = "count";
+    curve.caption = std::to_string(histogram.counts->points) + " bins of " +
+                    with_prefix(histogram.counts->delta, unit, 4);
     curve.style = Style::boxes;
     curve.box_width = histogram.counts->delta;
     for (int i = 0; i < histogram.counts->points; ++i) {
         curve.x.push_back(histogram.edge(i) + curve.box_width / 2);
         curve.y.push_back(histogram.counts->data[i]);
     }
-    draw(curve, path);
+    draw(curve, options.plot, options.look);
 }
 
 void run(const HistOptions& options) {
     check_usage(options);
     auto x = first_signal(options.in, options.reading);
-    const auto values = x.facts.value_label(x->complex ? "magnitude" : "value");
+    const auto values = x.facts.label(x->complex ? "magnitude" : "value");
+    const auto unit = options.look.unit_of(x.facts);
     const auto histogram = [&] {
         Progress progress("counting");
-        return count(std::move(x), options);
+        return with_data_of(options.in, [&] { return count(std::move(x), options); });
     }();
     if (!options.out.empty()) write(histogram, options);
-    if (!options.plot.empty()) draw(histogram, values, options.in, options.plot);
+    if (!options.plot.empty()) draw(histogram, values, unit, options);
     if (options.out.empty() && options.plot.empty()) return print_table(histogram);
     const double outside = histogram.below + histogram.above + histogram.nan;
     if (outside > 0) std::fprintf(stderr, "wavkit: %.0f values are in no bin\n", outside);
@@ -170,8 +176,9 @@ void add_hist(CLI::App& program) {
     options->writing.declare_without_sound(*command);
     command
         ->add_option("--plot", options->plot,
-                     "draw the counts into a .png or .svg file, or - the terminal")
+                     "draw the counts into a .png, .svg or .pdf file, or - the terminal")
         ->type_name("FILE");
+    options->look.declare(*command);
     options->reading.declare(*command);
     command->footer(about);
     command->callback([options] { run(*options); });

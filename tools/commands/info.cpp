@@ -5,6 +5,7 @@
 
 #include "base/error.hpp"
 #include "base/number.hpp"
+#include "base/text.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
 
@@ -51,12 +52,12 @@ void describe(const Signal& x, bool sound) {
     line("points", std::to_string(x->points));
     line("kind", x->complex ? "complex" : "real");
     line("delta",
-         number(x->delta) + of_axis + (seconds ? " (" + brief(1 / x->delta) + " Hz)" : ""));
+         rounded(x->delta) + of_axis + (seconds ? " (" + brief(1 / x->delta) + " Hz)" : ""));
     if (x.facts.placed() || !x.facts.origin.empty()) {
-        line("start", number(x.facts.start) + of_axis +
+        line("start", rounded(x.facts.start) + of_axis +
                           (x.facts.origin.empty() ? "" : " after " + x.facts.origin));
     }
-    line("duration", number(x->points * x->delta) + of_axis);
+    line("duration", rounded(x->points * x->delta) + of_axis);
     if (x->points == 0) return;
     line("mean", point(dsps_mean, x));
     line("rms", point(dsps_rms, x));
@@ -68,7 +69,7 @@ void describe(const Signal& x, bool sound) {
 void describe(const std::string& path, const ReadOptions& reading) {
     const auto recording = read_recording(path, reading);
     const auto count = recording.signals.size();
-    std::printf("%s: %s, %zu %s\n", path == "-" ? "standard input" : path.c_str(),
+    std::printf("%s: %s, %zu %s\n", path == "-" ? "standard input" : printable(path).c_str(),
                 recording.description.c_str(), count, count == 1 ? "signal" : "signals");
     for (std::size_t i = 0; i < count; ++i) {
         if (count > 1) line("signal", std::to_string(i + 1) + " of " + std::to_string(count));
@@ -84,7 +85,7 @@ void run(const InfoOptions& options) {
             describe(file, options.reading);
         } catch (const Error& error) {
             std::fflush(stdout);
-            std::fprintf(stderr, "wavkit: %s\n", error.what());
+            std::fprintf(stderr, "wavkit: %s\n", printable(error.what()).c_str());
             failed = true;
         }
     }

@@ -69,8 +69,8 @@ Signal even_places(int points, double first, double step) {
 }
 
 Table table_of(const Signal& x, const InterpOptions& options) {
-    if (x->points < 1) throw Error("a signal has no samples");
-    if (options.table && !x->complex) throw Error("--table takes two columns, x and y");
+    if (x->points < 1) throw DataError("a signal has no samples");
+    if (options.table && !x->complex) throw DataError("--table takes two columns, x and y");
     Table table{
         options.table ? part_of(x, dspi_real) : even_places(x->points, x.facts.start, x->delta),
         {}};
@@ -81,11 +81,11 @@ Table table_of(const Signal& x, const InterpOptions& options) {
     const auto back =
         std::ranges::adjacent_find(knots, [](double a, double b) { return !(a < b); });
     if (back != knots.end()) {
-        throw Error("sample " + std::to_string(back - knots.begin() + 1) +
-                    " does not lie behind the one before");
+        throw DataError("sample " + std::to_string(back - knots.begin() + 1) +
+                        " does not lie behind the one before");
     }
     if (options.method == unsigned(DSP_INTERP_SPLINE)) {
-        if (x->points < 5) throw Error("a spline takes 5 points or more");
+        if (x->points < 5) throw DataError("a spline takes 5 points or more");
         check_finite(x.values(), x->complex);
     }
     return table;
@@ -114,7 +114,7 @@ void tell_of_aliases(double delta, double rate) {
 Signal read_places(const std::string& path) {
     auto places = first_signal(path, {});
     if (places->complex) throw Error("the places of --at are one column, real numbers");
-    check_finite(places.values(), false);
+    with_data_of(path, [&] { check_finite(places.values(), false); });
     return places;
 }
 
@@ -206,7 +206,7 @@ void run(InterpOptions options) {
     {
         Progress progress("interpolating");
         for (const auto& x : recording.signals) {
-            const auto table = table_of(x, options);
+            const auto table = with_data_of(options.in, [&] { return table_of(x, options); });
             Signal places;
             if (options.rate) {
                 if (!options.table) tell_of_aliases(x->delta, *options.rate);

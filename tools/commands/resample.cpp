@@ -80,7 +80,7 @@ struct Target {
 
 Target target_for(const ResampleOptions& options, double delta) {
     if (!(std::isnormal(delta) && delta > 0)) {
-        throw Error("a signal with a spacing of " + number(delta) + " has no sampling rate");
+        throw DataError("a signal with a spacing of " + number(delta) + " has no sampling rate");
     }
     Target target{{1, 1, 1}, delta};
     if (options.by) {
@@ -98,8 +98,8 @@ Target target_for(const ResampleOptions& options, double delta) {
     // A clock that was fast has taken more samples than it should.
     if (options.ppm) target.ratio = ratio_of(target.ratio.value / (1 + *options.ppm * 1e-6));
     if (!(target.ratio.value >= lowest_ratio && target.ratio.value <= highest_ratio)) {
-        throw Error("a rate of " + number(target.ratio.value) +
-                    " times that of the signal is out of reach");
+        throw DataError("a rate of " + number(target.ratio.value) +
+                        " times that of the signal is out of reach");
     }
     return target;
 }
@@ -128,7 +128,7 @@ class ResampleRun {
         times_ = first_signal(options_.times, {});
         if (times_->complex) throw Error("the times of --to-times are one column, real numbers");
         const auto values = times_.values();
-        check_finite(values, false);
+        with_data_of(options_.times, [&] { check_finite(values, false); });
         if (!std::ranges::is_sorted(values)) throw Error("the times of --to-times must ascend");
     }
 
@@ -195,7 +195,8 @@ class ResampleRun {
             const double last = times_.values().back(), start = stream.facts_of(0).start;
             const double end = start + double(taken - 1) * stream.delta;
             if (last > end + 1e-12 * std::max(std::fabs(start), std::fabs(end))) {
-                throw Error(number(last) + " lies behind the signal, which ends at " + number(end));
+                throw DataError(number(last) + " lies behind the signal, which ends at " +
+                                number(end));
             }
         }
         for (auto rest = changed.finish(); !rest.empty(); rest = changed.finish()) {
@@ -256,7 +257,7 @@ std::shared_ptr<ResampleOptions> declare_common(CLI::App& command, bool with_rat
     options.writing.declare(command);
     command.callback([shared] {
         check_usage(*shared);
-        ResampleRun(*shared).run();
+        with_data_of(shared->in, [&] { ResampleRun(*shared).run(); });
     });
     return shared;
 }

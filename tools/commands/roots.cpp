@@ -62,12 +62,15 @@ std::optional<Complex> parsed(std::string_view text) {
     return Complex(*first, *second);
 }
 
+/// Whether the one value is the name of a file.
+bool names_a_file(const std::vector<std::string>& values) {
+    return values.size() == 1 && !parsed(values[0]);
+}
+
 /// The numbers that the command line holds, or the signal of the file that it names.
 Signal read_values(const RootsOptions& options) {
     const auto& values = options.values;
-    if (values.size() == 1 && !parsed(values[0])) {
-        return first_signal(values[0], options.reading);
-    }
+    if (names_a_file(values)) return first_signal(values[0], options.reading);
     std::vector<Complex> points;
     for (const auto& value : values) {
         const auto number = parsed(value);
@@ -83,7 +86,7 @@ Signal read_values(const RootsOptions& options) {
 Signal roots_of(const Signal& polynomial) {
     const auto c = polynomial.values();
     const auto zero = [](double v) { return v == 0; };
-    if (std::ranges::all_of(c, zero)) throw Error("the polynomial is 0 everywhere");
+    if (std::ranges::all_of(c, zero)) throw DataError("the polynomial is 0 everywhere");
     const auto leading = std::ranges::find_if_not(c.rbegin(), c.rend(), zero) - c.rbegin();
     constexpr int closed_form_points = 6;
     const int points = polynomial->points - int(leading);
@@ -91,7 +94,7 @@ Signal roots_of(const Signal& polynomial) {
     check(dsp_copy_at_most(used, polynomial, points), "taking in coefficients");
     if (points <= closed_form_points && dsps_proots(used, roots) == 0) return roots;
     if (dspi_proots(used) != 0) {
-        throw Error("the roots cannot be found; many of them may lie close together");
+        throw DataError("the roots cannot be found; many of them may lie close together");
     }
     return used;
 }
@@ -182,7 +185,7 @@ void run(const RootsOptions& options) {
         if (!options.out.empty()) return write(polynomial);
         return print_coefficients(polynomial, options.descending);
     }
-    if (x->complex) throw Error("the coefficients must be real");
+    if (x->complex) throw DataError("the coefficients must be real");
     if (options.descending) check(dspi_rev(x), "reversing");
     const auto roots = [&] {
         Progress progress("finding roots");
@@ -228,7 +231,10 @@ void add_roots(CLI::App& program) {
     options->writing.declare_without_sound(*command);
     options->reading.declare(*command);
     command->footer(about);
-    command->callback([options] { run(*options); });
+    command->callback([options] {
+        if (!names_a_file(options->values)) return run(*options);
+        with_data_of(options->values[0], [&] { run(*options); });
+    });
 }
 
 }  // namespace wavkit::tool

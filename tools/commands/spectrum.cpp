@@ -1,9 +1,11 @@
 // wavkit spectrum: what frequencies a signal holds, and how much of each.
+#include <cmath>
 #include <cstdio>
 #include <memory>
 #include <optional>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 #include "base/options.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
@@ -62,9 +64,8 @@ void check_segments(const SpectrumOptions& options) {
 void check_usage(const SpectrumOptions& options) {
     const auto& report = options.report;
     if (!report.plot.empty()) picture_of_name(report.plot);
-    if (!options.waterfall.empty() &&
-        (options.waterfall == "-" || picture_of_name(options.waterfall) != Picture::png)) {
-        throw UsageError("the picture of --waterfall is a .png file");
+    if (!options.waterfall.empty() && picture_of_name(options.waterfall) == Picture::terminal) {
+        throw UsageError("the picture of --waterfall is a .png, .svg or .pdf file");
     }
     check_segments(options);
     if (!report.band.empty() && !(report.band[0] < report.band[1])) {
@@ -89,8 +90,48 @@ SpectrumReport report_of(const SpectrumOptions& options, Spectrum spectrum, cons
     const auto& report = options.report;
     Band band;
     if (!report.band.empty()) band = {report.band[0], report.band[1]};
-    return {report, std::move(spectrum), band,
-            report.unit.empty() ? facts.axis(sound || options.reading.rate) : report.unit};
+    return {report,
+            std::move(spectrum),
+            band,
+            report.unit.empty() ? facts.axis(sound || options.reading.rate) : report.unit,
+            report.look.unit_of(facts),
+            ""};
+}
+
+/// How a spectrum was measured, in a line.
+std::string caption_of(const SpectrumOptions& options, const Spectrum& spectrum, bool sound) {
+    const auto& reading = options.reading;
+    std::string text;
+    if (reading.signal && !sound) text = "signal " + std::to_string(*reading.signal) + ", ";
+    if (sound)
+        text = "channel " + std::to_string(reading.channel.value_or(reading.signal.value_or(1))) +
+               ", ";
+    text += window_names()[std::size_t(spectrum.window)] + " window, ";
+    const auto samples = std::to_string(spectrum.samples);
+    if (options.segmented()) {
+        const double overlap =
+            100 * (1 - double(options.segments.step()) / options.segments.length);
+        text += std::to_string(spectrum.averaged) + " segments of " + samples +
+                " samples, overlap " + rounded(std::round(10 * overlap) / 10) + " %";
+    } else {
+        text += samples + " samples";
+    }
+    if (spectrum.length != spectrum.samples) {
+        text += ", transforms of " + std::to_string(spectrum.length);
+    }
+    return text;
+}
+
+/// Refuses a band without frequencies, which would look like one without peaks.
+void check_band(const SpectrumReport& report) {
+    const auto& spectrum = report.spectrum;
+    for (int i = 0; i < spectrum.bins->points; ++i) {
+        if (report.band.contains(spectrum.frequency(i))) return;
+    }
+    throw DataError("no frequency of the spectrum lies from " + rounded(report.band.low) + " to " +
+                    rounded(report.band.high) + "; it goes from " + rounded(spectrum.frequency(0)) +
+                    " to " + rounded(spectrum.frequency(spectrum.bins->points - 1)) +
+                    " in steps of " + rounded(spectrum.bins->delta));
 }
 
 SpectrumReport measured_whole(const SpectrumOptions& options) {
@@ -101,7 +142,10 @@ SpectrumReport measured_whole(const SpectrumOptions& options) {
     if (options.segments.slope) take_slope(x);
     if (options.segments.detrend) remove_mean(x);
     check_finite(x.values(), x->complex);
-    return report_of(options, measure(x, options.settings), x.facts, source->sound);
+    auto report = report_of(options, measure(x, options.settings), x.facts, source->sound);
+    report.caption = caption_of(options, report.spectrum, source->sound);
+    check_band(report);
+    return report;
 }
 
 SpectrumReport measured_in_segments(const SpectrumOptions& options) {
@@ -125,13 +169,16 @@ SpectrumReport measured_in_segments(const SpectrumOptions& options) {
     }
     tell_of_others(*source);
     report.spectrum = average.result();
+    report.caption = caption_of(options, report.spectrum, source->sound);
+    check_band(report);
     if (waterfall) {
         waterfall->draw(
             options.waterfall,
-            {short_name(options.report.in) + ", " +
-                 window_names()[std::size_t(report.spectrum.window)],
-             with_unit("time", report.unit), with_unit("frequency", report.frequency_unit()),
-             quantity_name(options.report.density, true, report.unit)});
+            {short_name(options.report.in), report.unit, report.frequency_unit(),
+             with_unit(quantity_name(options.report.density),
+                       quantity_unit(options.report.density, true, report.value_unit, report.unit)),
+             report.caption},
+            options.report.look);
     }
     return report;
 }
@@ -142,9 +189,10 @@ void run(SpectrumOptions& options) {
     options.averaging.type = options.type.value_or(options.averaging.type);
     check_usage(options);
     options.settings.window = window_of_name(options.window);
-    const auto report =
-        options.segmented() ? measured_in_segments(options) : measured_whole(options);
     const auto& shown = options.report;
+    const auto report = with_data_of(shown.in, [&] {
+        return options.segmented() ? measured_in_segments(options) : measured_whole(options);
+    });
     if (!shown.out.empty()) write_output(report);
     if (shown.peaks > 0) print_peaks(report, shown.peaks);
     if (!shown.plot.empty()) draw_spectrum(report);
@@ -224,7 +272,7 @@ void declare_averaging(CLI::App& command, SpectrumOptions& options) {
     command
         .add_option("--waterfall", options.waterfall,
                     "draw the segments' spectra over time (--average, or else 1024)")
-        ->type_name("FILE.png")
+        ->type_name("FILE")
         ->group(group);
 }
 
@@ -245,7 +293,9 @@ void add_spectrum(CLI::App& program) {
     command->add_option("--peaks", report.peaks, "print the N strongest peaks")
         ->check(CLI::Range(1, 1000000))
         ->type_name("N");
-    command->add_option("--plot", report.plot, "draw into a .png or .svg file, or - the terminal")
+    command
+        ->add_option("--plot", report.plot,
+                     "draw into a .png, .svg or .pdf file, or - the terminal")
         ->type_name("FILE");
     command->add_option("--window", options->window, "window (default: Hann)")->type_name("NAME");
     command->add_option("--points", settings.points, "samples to transform, made a power of two")
@@ -278,6 +328,7 @@ void add_spectrum(CLI::App& program) {
     command->add_option("--unit", report.unit, "unit of the spacing, for labels: s gives Hz")
         ->type_name("UNIT");
     declare_averaging(*command, *options);
+    report.look.declare(*command);
     options->reading.declare(*command);
     command->footer(about_results + window_list() + about_averages + about_peaks);
     command->callback([options] { run(*options); });

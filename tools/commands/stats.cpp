@@ -6,7 +6,9 @@
 #include <cmath>
 #include <cstdio>
 #include <memory>
+#include <numbers>
 
+#include "base/number.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
 #include "show/json.hpp"
@@ -34,6 +36,32 @@ struct Statistic {
     bool real_only = false;
 };
 
+/// The N-th root of the product, the principal one of a complex signal, by its logarithm: the
+/// product of many values has no place among doubles. 0 where the product is negative.
+int geometric_mean(const dsp* x, dsp* result) {
+    const std::size_t width = x->complex ? 2 : 1, count = std::size_t(x->points);
+    long double logarithms = 0, angle = 0;
+    for (std::size_t i = 0; i < count; ++i) {
+        const double re = x->data[width * i], im = x->complex ? x->data[2 * i + 1] : 0;
+        logarithms += std::log(std::hypot(static_cast<long double>(re), im));
+        angle = std::remainder(angle + std::atan2(im, re), 2 * std::numbers::pi);
+    }
+    const auto points = static_cast<long double>(count);
+    const double modulus = double(std::exp(logarithms / points));
+    result->points = 1;
+    result->complex = x->complex;
+    if (dsp_alloc(result)) return -1;
+    if (x->complex) {
+        const double turn = double(angle / points);
+        result->data[0] = modulus * std::cos(turn);
+        result->data[1] = modulus * std::sin(turn);
+    } else {
+        const bool negative = std::fabs(angle) > 1;
+        result->data[0] = negative ? 0 : modulus;
+    }
+    return 0;
+}
+
 constexpr std::array<Statistic, 15> statistics{{{"sum", dsps_sum},
                                                 {"mean", dsps_mean},
                                                 {"median", dsps_median},
@@ -47,7 +75,7 @@ constexpr std::array<Statistic, 15> statistics{{{"sum", dsps_sum},
                                                 {"sample_deviation", dsps_samp_stddev, true},
                                                 {"skewness", dsps_skew, true, true},
                                                 {"excess_kurtosis", dsps_excess, false, true},
-                                                {"geometric_mean", dsps_gmean},
+                                                {"geometric_mean", geometric_mean},
                                                 {"harmonic_mean", dsps_hmean}}};
 
 std::vector<double> parts_of(const Statistic& wanted, const Signal& x) {
@@ -71,7 +99,7 @@ double count_nan(const Signal& x) {
 std::vector<Figure> figures(const Signal& x) {
     std::vector<Figure> list{{"points", {double(x->points)}, true},
                              {"delta", {x->delta}},
-                             {"duration", {x->points * x->delta}}};
+                             {"duration", {time_of(x->points, x->delta)}}};
     if (x->points == 0) return list;
     list.push_back({"nan", {count_nan(x)}, true});
     // Rounding takes the variance of a constant a little below 0, and its root to NaN.
@@ -99,6 +127,13 @@ JsonMembers members(const Signal& x) {
     return list;
 }
 
+std::string shown(const Figure& figure, double value) {
+    if (!figure.whole) return rounded(value);
+    std::array<char, 32> text;
+    std::snprintf(text.data(), text.size(), "%.0f", value);
+    return text.data();
+}
+
 void print(const Signal& x, bool sound) {
     const auto unit = x.facts.axis(sound);
     std::printf("%-22s %s\n", "kind", x->complex ? "complex" : "real");
@@ -107,9 +142,8 @@ void print(const Signal& x, bool sound) {
             figure.name == "delta" || figure.name == "duration" || figure.name.ends_with("_at");
         std::ranges::replace(figure.name, '_', ' ');
         std::printf("%-22s ", figure.name.c_str());
-        const char* const format = figure.whole ? "%.0f" : "%.9g";
-        std::printf(format, figure.parts[0]);
-        if (figure.parts.size() == 2) std::printf(",%.9g", figure.parts[1]);
+        std::fputs(shown(figure, figure.parts[0]).c_str(), stdout);
+        if (figure.parts.size() == 2) std::printf(",%s", shown(figure, figure.parts[1]).c_str());
         std::puts(time && !unit.empty() ? (" " + unit).c_str() : "");
     }
 }

@@ -22,6 +22,7 @@ constexpr int bins_in_picture = 16;
 struct WindowOptions {
     std::string name, out, plot;
     WriteOptions writing;
+    PictureLook look;
     int points = 1024;
 };
 
@@ -43,12 +44,14 @@ struct Response {
     int per_bin;
 };
 
-/// Zeros resolve the lobes: a lobe's top is then found to 0.01 dB.
-Response response_of(const Signal& w) {
-    constexpr int fineness = 32;
+/// Zeros resolve the lobes: a lobe's top is then found to 0.01 dB. Windows longer than some ten
+/// thousand samples all have the same lobes.
+Response response_of(int window, int points) {
+    constexpr int fineness = 32, longest = 1 << 15;
     Response response{{}, fineness};
     Signal& y = response.magnitude;
-    check(dsp_copy(y, w) || dspi_zpad(y, fineness * w->points) || dspi_rdft(y) || dspi_mag(y),
+    y = samples_of(window, std::min(points, longest));
+    check(dspi_zpad(y, fineness * y->points) || dspi_rdft(y) || dspi_mag(y),
           "measuring the window");
     const double top = y->data[0];
     for (double& value : y.values()) value /= top;
@@ -76,7 +79,7 @@ double scalloping_loss(const Response& response) {
 
 void print_figures(int window, const Signal& w) {
     const double gain = statistic(dsps_mean, w), rms = statistic(dsps_rms, w);
-    const auto response = response_of(w);
+    const auto response = response_of(window, w->points);
     const auto sidelobe = highest_sidelobe(response);
     std::printf("window            %s, %d points\n", window_names()[std::size_t(window)].c_str(),
                 w->points);
@@ -90,22 +93,22 @@ void print_figures(int window, const Signal& w) {
     std::printf("scalloping loss   %.4f dB\n", scalloping_loss(response));
 }
 
-void draw_response(int window, const Signal& w, const std::string& path) {
-    const auto response = response_of(w);
+void draw_response(int window, int points, const std::string& path, const PictureLook& look) {
+    const auto response = response_of(window, points);
     const int reach = std::min(response.magnitude->points - 1, bins_in_picture * response.per_bin);
     Curve curve;
-    curve.title =
-        window_names()[std::size_t(window)] + ", " + std::to_string(w->points) + " points";
+    curve.title = window_names()[std::size_t(window)] + ", " + std::to_string(points) + " points";
     curve.x_label = "bins";
-    curve.y_label = "response (dB)";
+    curve.y_label = "response";
+    curve.y_unit = "dB re maximum";
     curve.decibels = true;
-    curve.depth = 180;
+    curve.depth = 150;
     for (int i = -reach; i <= reach; ++i) {
         curve.x.push_back(double(i) / response.per_bin);
         // A zero between two lobes would have no place on the axis.
         curve.y.push_back(decibels(std::max(response.magnitude->data[std::abs(i)], 1e-15)));
     }
-    draw(curve, path);
+    draw(curve, path, look);
 }
 
 void run(const WindowOptions& options) {
@@ -118,7 +121,7 @@ void run(const WindowOptions& options) {
     const int window = window_of_name(options.name);
     const auto w = samples_of(window, options.points);
     if (!options.out.empty()) write_recording(options.out, {&w, 1}, options.writing);
-    if (!options.plot.empty()) draw_response(window, w, options.plot);
+    if (!options.plot.empty()) draw_response(window, w->points, options.plot, options.look);
     if (options.out.empty() && options.plot.empty()) print_figures(window, w);
 }
 
@@ -137,9 +140,11 @@ void add_window(CLI::App& program) {
     add_choice(*command, "--to", options->writing.format, written_formats(),
                "format of the output (default: by its name)");
     command
-        ->add_option("--plot", options->plot,
-                     "draw main lobe and sidelobes into a .png or .svg file, or - the terminal")
+        ->add_option(
+            "--plot", options->plot,
+            "draw main lobe and sidelobes into a .png, .svg or .pdf file, or - the terminal")
         ->type_name("FILE");
+    options->look.declare(*command);
     command->footer(
         "The coherent gain is the mean of the samples, whose centre is 1; the noise bandwidth is "
         "that of\nthe rectangular filter that lets as much white noise through; the scalloping "

@@ -42,11 +42,18 @@ mode_t permissions(const std::string& path) {
     return 0666 & ~mask;
 }
 
-/// The file itself where `path` is a link to one, so that a rename keeps the link.
+/// What a name stands for: behind a link the file that it leads to, whether or not that is there
+/// already, so that a rename keeps the link.
 std::string behind_links(const std::string& path) {
-    std::error_code missing;
-    const auto file = std::filesystem::canonical(path, missing);
-    return missing ? path : file.string();
+    constexpr int most_links = 40;
+    std::filesystem::path file = path;
+    for (int i = 0; i < most_links; ++i) {
+        std::error_code none;
+        const auto next = std::filesystem::read_symlink(file, none);
+        if (none) break;
+        file = file.parent_path() / next;
+    }
+    return file.string();
 }
 
 }  // namespace

@@ -12,13 +12,14 @@
 
 #include "base/error.hpp"
 #include "base/number.hpp"
+#include "base/scratch.hpp"
 #include "files/facts_text.hpp"
 #include "files/float_wav.hpp"
 
 namespace wavkit::tool {
 namespace {
 
-constexpr std::size_t block_frames = 1 << 14;
+constexpr std::size_t block_scalars = 1 << 16;
 
 using Handle = std::unique_ptr<SNDFILE, int (*)(SNDFILE*)>;
 
@@ -112,10 +113,11 @@ class SoundStream : public SampleStream {
 
     std::size_t read_channel(std::span<double> values) {
         const auto width = std::size_t(info_.channels);
-        frames_.resize(block_frames * width);
+        const auto most = std::max<std::size_t>(block_scalars / width, 1);
+        frames_.resize(most * width);
         std::size_t done = 0;
         while (done < values.size()) {
-            const auto wanted = std::min(values.size() - done, block_frames);
+            const auto wanted = std::min(values.size() - done, most);
             const auto got = sf_readf_double(file_.get(), frames_.data(), sf_count_t(wanted));
             if (got <= 0) break;
             for (std::size_t i = 0; i < std::size_t(got); ++i) {
@@ -133,12 +135,56 @@ class SoundStream : public SampleStream {
     sf_count_t taken_ = 0;
 };
 
+/// The channels of a file one behind the other, in a file without a name.
+class SeparateChannels {
+  public:
+    explicit SeparateChannels(InputFile& input) {
+        SoundStream all(input, std::nullopt);
+        stride_ = all.length.value_or(0);
+        constexpr std::size_t most_scalars = 1 << 20;
+        const auto most = std::max<std::size_t>(most_scalars / all.channels, 1);
+        std::vector<double> frames(most * all.channels), channel;
+        while (const auto count = all.read(frames) / all.channels) {
+            channel.resize(std::min(count, stride_ - frames_));
+            for (std::size_t c = 0; c < all.channels; ++c) {
+                for (std::size_t i = 0; i < channel.size(); ++i) {
+                    channel[i] = frames[i * all.channels + c];
+                }
+                go_to(c, frames_);
+                const auto written =
+                    std::fwrite(channel.data(), sizeof(double), channel.size(), file_.get());
+                if (written != channel.size()) fail_with_scratch();
+            }
+            frames_ += channel.size();
+        }
+    }
+
+    std::size_t read(std::size_t channel, std::size_t frame, std::span<double> values) {
+        const auto count = std::min(values.size(), frames_ - frame);
+        go_to(channel, frame);
+        if (std::fread(values.data(), sizeof(double), count, file_.get()) != count) {
+            fail_with_scratch();
+        }
+        return count;
+    }
+
+  private:
+    void go_to(std::size_t channel, std::size_t frame) {
+        const auto offset = long((channel * stride_ + frame) * sizeof(double));
+        if (std::fseek(file_.get(), offset, SEEK_SET) != 0) fail_with_scratch();
+    }
+
+    Stream file_ = scratch();
+    std::size_t stride_ = 0, frames_ = 0;  // promised, and read
+};
+
 /// The channels of a sound file one after the other, the chosen one alone, or all together.
 class SoundFile : public SignalSource {
   public:
     SoundFile(InputFile& file, const ReadOptions& reading, bool together)
         : SignalSource(file, reading) {
-        const auto info = SoundStream(file, std::nullopt).info();
+        info_ = SoundStream(file, std::nullopt).info();
+        const auto& info = info_;
         description = format_name(info.format & SF_FORMAT_TYPEMASK) + ", " +
                       format_name(info.format & SF_FORMAT_SUBMASK);
         sound = true;
@@ -158,9 +204,38 @@ class SoundFile : public SignalSource {
     std::unique_ptr<SampleStream> following() override {
         const auto index = std::size_t(number() - 1);
         if (index == streams_.size()) return nullptr;
-        return std::make_unique<SoundStream>(input(), streams_[index]);
+        // Few channels are read each by itself, the first of many as well: often no other is
+        // wanted.
+        constexpr std::size_t few = 4;
+        if (index == 0 || streams_.size() <= few) {
+            return std::make_unique<SoundStream>(input(), streams_[index]);
+        }
+        return std::make_unique<SeparateChannel>(*this, index);
     }
 
+    /// One of many channels; the file is taken apart when the first of them is read.
+    class SeparateChannel : public SampleStream {
+      public:
+        SeparateChannel(SoundFile& file, std::size_t channel) : file_(file), channel_(channel) {
+            delta = 1.0 / file.info_.samplerate;
+            if (file.info_.frames >= 0) length = std::size_t(file.info_.frames);
+        }
+        std::size_t read(std::span<double> values) override {
+            if (!file_.separate_) file_.separate_.emplace(file_.input());
+            const auto count = file_.separate_->read(channel_, taken_, values);
+            taken_ += count;
+            return count;
+        }
+        void skip() override {}
+        double done() const override { return double(taken_) / double(file_.info_.frames); }
+
+      private:
+        SoundFile& file_;
+        std::size_t channel_, taken_ = 0;
+    };
+
+    SF_INFO info_{};
+    std::optional<SeparateChannels> separate_;
     std::vector<std::optional<std::size_t>> streams_;  // the channels of each
 };
 

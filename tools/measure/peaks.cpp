@@ -5,6 +5,10 @@
 #include <algorithm>
 #include <array>
 #include <cmath>
+#include <span>
+#include <utility>
+
+#include "measure/leakage.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -50,8 +54,13 @@ constexpr std::array<Lobe, 24> lobes{{
     {2.0, Rule::log_parabola},  // Riemann
 }};
 
-/// Rounding noise of a transform; what lies below this share of the strongest bin is no component.
-constexpr double noise_floor = 1e-12;
+/// Rounding noise of samples and transform; what lies below this share of the strongest bin is no
+/// component.
+constexpr double noise_floor = 1e-11;
+
+/// A component stands out of what others leak by this factor; so many of the strongest count.
+constexpr double leakage_margin = 1.25;
+constexpr std::size_t most_leaking = 64;
 
 Rule rule_for(const Spectrum& spectrum) {
     const Rule rule = lobes[std::size_t(spectrum.window)].rule;
@@ -115,6 +124,33 @@ Refined refine(const Spectrum& spectrum, const Signal& magnitudes, int index) {
     return std::isfinite(peak.height) && std::isfinite(peak.bin) ? peak : plain;
 }
 
+/// Of all maxima the strongest in the band that are components: neither within the main lobe of a
+/// stronger one nor what stronger ones leak, wherever these are.
+std::vector<int> without_leakage(const Spectrum& spectrum, std::span<const double> m,
+                                 std::vector<int> maxima, std::size_t count, const Band& band) {
+    const auto height = [&](int i) { return m[std::size_t(i)]; };
+    std::ranges::stable_sort(maxima, std::greater(), height);
+    const double lobe = lobes[std::size_t(spectrum.window)].half_width * spectrum.padding();
+    const int reach = std::max(int(std::ceil(lobe)) - 1, 0);
+    std::vector<bool> in_lobe(m.size());
+    Leakage leakage(spectrum);
+    // The constant part is no component, but leaks; a flat lobe may be highest beside it.
+    if (!spectrum.two_sided && m.size() > 1 && m[0] > 0.95 * m[1]) leakage.add(m, 0);
+    std::vector<int> kept;
+    for (const int i : maxima) {
+        if (kept.size() == count || height(i) < noise_floor * height(maxima.front())) break;
+        if (in_lobe[std::size_t(i)]) continue;
+        const bool wanted = band.contains(spectrum.frequency(i));
+        const bool leaks = leakage.components() < most_leaking;
+        if ((wanted || leaks) && height(i) <= leakage_margin * leakage.at(i)) continue;
+        if (leaks) leakage.add(m, i);
+        const int end = std::min(i + reach + 1, int(m.size()));
+        for (int k = std::max(i - reach, 0); k < end; ++k) in_lobe[std::size_t(k)] = true;
+        if (wanted) kept.push_back(i);
+    }
+    return kept;
+}
+
 }  // namespace
 
 std::vector<Peak> find_peaks(const Spectrum& spectrum, std::size_t count, const Band& band) {
@@ -124,22 +160,11 @@ std::vector<Peak> find_peaks(const Spectrum& spectrum, std::size_t count, const 
     std::vector<int> maxima;
     for (int i = spectrum.two_sided ? 0 : 1; i <= last; ++i) {
         const auto k = std::size_t(i);
-        if ((i == 0 || m[k] > m[k - 1]) && (i == last || m[k] >= m[k + 1]) && m[k] > 0 &&
-            band.contains(spectrum.frequency(i))) {
+        if ((i == 0 || m[k] > m[k - 1]) && (i == last || m[k] >= m[k + 1]) && m[k] > 0) {
             maxima.push_back(i);
         }
     }
-    const auto height = [&](int i) { return m[std::size_t(i)]; };
-    std::ranges::stable_sort(maxima, std::greater(), height);
-
-    const double lobe = lobes[std::size_t(spectrum.window)].half_width * spectrum.padding();
-    std::vector<int> kept;
-    for (const int i : maxima) {
-        if (kept.size() == count || height(i) < noise_floor * height(maxima.front())) break;
-        if (std::ranges::none_of(kept, [&](int other) { return std::abs(other - i) < lobe; })) {
-            kept.push_back(i);
-        }
-    }
+    const auto kept = without_leakage(spectrum, m, std::move(maxima), count, band);
     std::vector<Peak> peaks;
     for (const int i : kept) {
         const auto peak = refine(spectrum, magnitudes, i);

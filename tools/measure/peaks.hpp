@@ -22,7 +22,7 @@ struct Band {
 
 /// The strongest local maxima in a band, strongest first, between bins by the rule that is the most
 /// exact for the window. The constant part of a one-sided spectrum is none, nor is a maximum within
-/// the main lobe of a stronger one.
+/// the main lobe of a stronger one or as low as what stronger ones leak there.
 std::vector<Peak> find_peaks(const Spectrum& spectrum, std::size_t count, const Band& band);
 
 }  // namespace wavkit::tool

@@ -13,7 +13,7 @@ void check_finite(std::span<const double> values, bool complex, long first) {
     const auto bad = std::ranges::find_if_not(values, [](double v) { return std::isfinite(v); });
     if (bad == values.end()) return;
     const auto sample = first + (bad - values.begin()) / (complex ? 2 : 1);
-    throw Error("sample " + std::to_string(sample) + " is not a finite number");
+    throw DataError("sample " + std::to_string(sample) + " is not a finite number");
 }
 
 void remove_mean(Signal& x) {

@@ -45,6 +45,28 @@ class SlopeStream : public SampleStream {
     std::vector<double> before_, samples_;
 };
 
+[[noreturn]] void fail_with_too_few(std::size_t samples, std::size_t length) {
+    throw DataError("the signal has " + std::to_string(samples) +
+                    " samples, fewer than one segment of " + std::to_string(length));
+}
+
+/// The first `length` scalars of a stream. Memory grows with what there is: a length that the
+/// signal does not have costs none.
+std::vector<double> first_segment(SampleStream& stream, std::size_t length) {
+    constexpr std::size_t block = 1 << 16;
+    std::vector<double> values;
+    std::size_t count = 0;
+    while (count == values.size() && count < length) {
+        values.resize(std::min(length, std::max(block, 2 * count)));
+        count += stream.read(std::span(values).subspan(count));
+    }
+    if (count < length) {
+        const std::size_t width = stream.complex ? 2 : 1;
+        fail_with_too_few(count / width, length / width);
+    }
+    return values;
+}
+
 }  // namespace
 
 int Segmentation::step() const {
@@ -55,6 +77,8 @@ void measure_segments(SampleStream& source, const Segmentation& segmentation,
                       const SpectrumSettings& settings,
                       const std::function<void(Spectrum&)>& take) {
     check_spacing(source.delta);
+    const auto wanted = std::size_t(segmentation.length);
+    if (source.length && *source.length < wanted) fail_with_too_few(*source.length, wanted);
     std::unique_ptr<SlopeStream> slopes;
     if (segmentation.slope) slopes = std::make_unique<SlopeStream>(source);
     SampleStream& stream = slopes ? *slopes : source;
@@ -62,16 +86,11 @@ void measure_segments(SampleStream& source, const Segmentation& segmentation,
     const std::size_t width = stream.complex ? 2 : 1;
     const auto length = std::size_t(segmentation.length) * width;
     const auto step = std::size_t(segmentation.step()) * width;
-    std::vector<double> window(length);
+    auto window = first_segment(stream, length);
+    check_finite(window, stream.complex);
     Signal x(stream.delta);
-    long position = 0;  // of the next sample to be read
-    for (std::size_t kept = 0;; kept = length - step) {
-        std::copy(window.end() - std::ptrdiff_t(kept), window.end(), window.begin());
-        const auto fresh = std::span(window).subspan(kept);
-        const auto count = stream.read(fresh);
-        check_finite(fresh.first(count), stream.complex, position);
-        position += long(count / width);
-        if (count < fresh.size()) break;
+    long position = segmentation.length;  // of the next sample to be read
+    for (;;) {
         x->complex = stream.complex;
         x->points = segmentation.length;
         check(dsp_alloc(x), "measuring segments");
@@ -79,10 +98,12 @@ void measure_segments(SampleStream& source, const Segmentation& segmentation,
         if (segmentation.detrend) remove_mean(x);
         auto spectrum = measure(x, settings);
         take(spectrum);
-    }
-    if (position < segmentation.length) {
-        throw Error("the signal has " + std::to_string(position) +
-                    " samples, fewer than one segment of " + std::to_string(segmentation.length));
+        std::copy(window.begin() + std::ptrdiff_t(step), window.end(), window.begin());
+        const auto fresh = std::span(window).last(step);
+        const auto count = stream.read(fresh);
+        check_finite(fresh.first(count), stream.complex, position);
+        position += long(count / width);
+        if (count < fresh.size()) break;
     }
 }
 

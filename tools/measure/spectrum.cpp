@@ -7,6 +7,7 @@
 #include <cmath>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -31,7 +32,7 @@ int transform_length(const Signal& x, const SpectrumSettings& settings) {
         return settings.points > 0 ? std::min(settings.points, x->points) : x->points;
     }
     const int wanted = settings.points > 0 ? settings.points : x->points;
-    if (wanted > longest_transform) throw Error("more than 1073741824 points to transform");
+    if (wanted > longest_transform) throw DataError("more than 1073741824 points to transform");
     return int(std::bit_ceil(unsigned(std::max(wanted, 1))));
 }
 
@@ -59,18 +60,19 @@ int transform(const Signal& x, Signal& bins, const SpectrumSettings& settings, i
 
 void check_spacing(double delta) {
     if (delta > 0) return;
-    throw Error("a sample spacing of " + std::to_string(delta) +
-                " gives no frequencies; set --delta or --rate");
+    throw DataError("a sample spacing of " + rounded(delta) +
+                    " gives no frequencies; set --delta or --rate");
 }
 
 Spectrum measure(const Signal& x, const SpectrumSettings& settings) {
-    if (x->points < 1) throw Error("the signal has no samples");
+    if (x->points < 1) throw DataError("the signal has no samples");
     check_spacing(x->delta);
     auto used = settings;
     used.two_sided = settings.two_sided || x->complex;
     const int length = transform_length(x, settings);
-    const double width = std::min(double(x->points), length * settings.fraction);
-    const int samples = std::min(x->points, int(std::ceil(width)));
+    const double wanted = std::min(double(x->points), length * settings.fraction);
+    const int samples = std::min(x->points, int(std::ceil(wanted)));
+    const double width = takes_width(settings.window) ? wanted : samples;
 
     Spectrum spectrum{{}, samples, length, width, settings.window, used.two_sided};
     check(transform(x, spectrum.bins, used, length, samples), "computing the spectrum");

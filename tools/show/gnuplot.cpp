@@ -10,6 +10,7 @@
 #include <cstring>
 
 #include "base/error.hpp"
+#include "base/text.hpp"
 
 extern char** environ;
 
@@ -33,13 +34,10 @@ std::string complaint(std::FILE* errors) {
 
 }  // namespace
 
-std::string quoted(const std::string& text) {
-    std::string result = "\"";
-    for (const char c : text) {
-        if (c == '"' || c == '\\') result += '\\';
-        result += c;
-    }
-    return result + "\"";
+std::string script_text(const std::string& text) {
+    std::string result = "'";
+    for (const char c : printable(text)) result.append(c == '\'' ? 2 : 1, c);
+    return result + "'";
 }
 
 void run_gnuplot(std::FILE* script, std::FILE* to) {

@@ -12,9 +12,15 @@ std::string inverse_unit(const std::string& unit) {
     return unit == "s" ? "Hz" : unit.empty() ? "" : "1/" + unit;
 }
 
-std::string quantity_name(bool density, bool decibels, const std::string& unit) {
-    const std::string detail = decibels ? "dB" : density && unit == "s" ? "/rtHz" : "";
-    return with_unit(density ? "density" : "amplitude", detail);
+std::string quantity_name(bool density) { return density ? "density" : "amplitude"; }
+
+std::string quantity_unit(bool density, bool decibels, const std::string& values,
+                          const std::string& time) {
+    std::string unit = values;
+    if (density && time == "s") unit = (values.empty() ? "1" : values) + "/√Hz";
+    if (density && !time.empty() && time != "s") unit += (unit.empty() ? "√" : " √") + time;
+    if (!decibels) return unit;
+    return "dB re " + (unit.starts_with('1') ? unit : unit.empty() ? "1" : "1 " + unit);
 }
 
 std::string short_name(const std::string& path) {

@@ -5,8 +5,11 @@
 
 namespace wavkit::tool {
 
-/// What heights are, with their unit.
-std::string quantity_name(bool density, bool decibels, const std::string& unit);
+/// What heights of a spectrum are, and their unit: that of the values, per root of the frequency
+/// where they are densities, and what decibels count from.
+std::string quantity_name(bool density);
+std::string quantity_unit(bool density, bool decibels, const std::string& values,
+                          const std::string& time);
 
 /// How titles call a source.
 std::string short_name(const std::string& path);

@@ -1,30 +1,21 @@
 #include "show/plot.hpp"
 
-#include <sys/ioctl.h>
-#include <unistd.h>
-
 #include <algorithm>
 #include <array>
 #include <cmath>
-#include <filesystem>
+#include <set>
 
 #include "base/error.hpp"
 #include "base/number.hpp"
 #include "base/progress.hpp"
+#include "base/text.hpp"
 #include "files/output.hpp"
+#include "show/axis.hpp"
 #include "show/gnuplot.hpp"
+#include "show/placement.hpp"
 
 namespace wavkit::tool {
 namespace {
-
-/// The terminal's width and height in characters.
-std::pair<int, int> terminal_size() {
-    winsize size{};
-    if (ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) != 0 || size.ws_col < 40 || size.ws_row < 12) {
-        return {100, 28};
-    }
-    return {size.ws_col, std::min<int>(size.ws_row - 1, 40)};
-}
 
 /// Samples that share a step of a picture with so many columns.
 std::size_t samples_a_step(const Curve& curve, std::size_t columns) {
@@ -52,148 +43,245 @@ std::vector<Mark> thinned(const Curve& curve, std::size_t columns) {
     return points;
 }
 
-void write_data(std::FILE* script, const char* name, const std::vector<Mark>& points) {
-    std::fprintf(script, "$%s << EOD\n", name);
-    for (const auto& [x, y] : points) {
-        std::fprintf(script, "%s %s\n", number(x).c_str(), number(y).c_str());
-    }
-    std::fputs("EOD\n", script);
-}
-
-void write_range(std::FILE* script, char axis, double low, double high) {
-    std::fprintf(script, "set %crange [%s:%s]\n", axis, number(low).c_str(), number(high).c_str());
-}
+/// An axis from end to end.
+struct Range {
+    double low, high;
+    double largest() const { return std::max(std::fabs(low), std::fabs(high)); }
+};
 
 /// Room for boxes and dots at the ends.
-void write_x_range(std::FILE* script, const Curve& curve) {
+Range x_range(const Curve& curve) {
+    if (curve.x_range) return {curve.x_range->first, curve.x_range->second};
     const double low = curve.x.front(), high = curve.x.back();
     double margin = 0.5 * curve.box_width;
     if (curve.style == Style::dots) margin = low < high ? 0.02 * (high - low) : 1;
-    write_range(script, 'x', low - margin, high + margin);
+    return {low - margin, high + margin};
 }
 
 /// The range of the height axis: what is far below the highest value is not worth paper.
-void write_y_range(std::FILE* script, const Curve& curve) {
-    const bool given = curve.y_tics > 0;
-    std::fprintf(script, "set ytics %s\n", given ? number(curve.y_tics).c_str() : "autofreq");
-    const double top = *std::ranges::max_element(curve.y);
-    if (curve.range) return write_range(script, 'y', curve.range->first, curve.range->second);
-    if (!curve.decibels) {
-        const double low = *std::ranges::min_element(curve.y);
-        if (curve.style == Style::dots) {
-            const double margin = low < top ? 0.08 * (top - low) : 1;
-            return write_range(script, 'y', low - margin, top + margin);
+Range y_range(const Curve& curve) {
+    if (curve.range) return {curve.range->first, curve.range->second};
+    double top = *std::ranges::max_element(curve.y);
+    for (const auto& mark : curve.marked) top = std::max(top, mark.y);
+    if (curve.decibels) {
+        const double low = std::max(*std::ranges::min_element(curve.y), top - curve.depth);
+        return {std::floor(low / 10) * 10, std::ceil((top + 5) / 10) * 10};
+    }
+    const double low = *std::ranges::min_element(curve.y);
+    if (curve.style == Style::dots) {
+        const double margin = low < top ? 0.08 * (top - low) : 1;
+        return {low - margin, top + margin};
+    }
+    return {low < 0 ? 1.15 * low : 0, top > 0 ? 1.15 * top : 1};
+}
+
+/// A curve on its part of the page.
+class Panel {
+  public:
+    Panel(std::FILE* script, const Curve& curve, const Canvas& canvas, const Box& box)
+        : script_(script),
+          curve_(curve),
+          canvas_(canvas),
+          box_(box),
+          across_(x_range(curve)),
+          upwards_(y_range(curve)),
+          x_(axis_scale(curve.x_label, curve.x_unit, across_.largest())),
+          y_(axis_scale(curve.y_label, curve.y_unit, upwards_.largest())),
+          points_(thinned(curve, canvas.characters ? 200 : 4000)) {}
+
+    void write() const {
+        std::fputs("unset label\nunset arrow\n", script_);
+        canvas_.set_plot_box(script_, box_);
+        std::fprintf(script_, "set xlabel %s\nset ylabel %s\n", script_text(x_.label).c_str(),
+                     script_text(y_.label).c_str());
+        write_range('x', across_, x_.factor);
+        write_range('y', upwards_, y_.factor);
+        const bool given = curve_.y_tics > 0;
+        std::fprintf(script_, "set ytics %s\n", given ? number(curve_.y_tics).c_str() : "autofreq");
+        write_labels();
+    }
+
+    void write_plot() const {
+        const bool characters = canvas_.characters;
+        if (curve_.style == Style::boxes) {
+            const double boxes = double(samples_a_step(curve_, 4000));
+            std::fprintf(script_, "set boxwidth %s\n",
+                         number(boxes * curve_.box_width * x_.factor).c_str());
         }
-        return write_range(script, 'y', low < 0 ? 1.15 * low : 0, top > 0 ? 1.15 * top : 1);
+        write_data("curve", points_);
+        if (!curve_.line.empty()) write_data("line", curve_.line);
+        std::fputs("plot ", script_);
+        if (curve_.style == Style::line && curve_.filled && !curve_.decibels && !characters) {
+            std::fputs("$curve with filledcurves y=0 fc rgb '#1f5fa8' fs transparent solid 0.15, ",
+                       script_);
+        }
+        if (characters) {
+            static constexpr std::array looks{"lines", "boxes", "points pt '+'"};
+            std::fprintf(script_, "$curve with %s", looks[std::size_t(curve_.style)]);
+        } else {
+            static constexpr std::array looks{"lines lw 1.4 lc",
+                                              "boxes fs solid 0.35 border rgb '#1f5fa8' fc",
+                                              "points pt 7 ps 0.5 lc"};
+            std::fprintf(script_, "$curve with %s rgb '#1f5fa8'", looks[std::size_t(curve_.style)]);
+        }
+        if (!curve_.line.empty()) std::fputs(", $line with lines lw 2 lc rgb '#c0392b'", script_);
+        std::fputc('\n', script_);
     }
-    const double low = std::max(*std::ranges::min_element(curve.y), top - curve.depth);
-    write_range(script, 'y', std::floor(low / 10) * 10, std::ceil((top + 5) / 10) * 10);
-}
 
-std::string peak_label(const Curve& curve, const Mark& mark) {
-    std::array<char, 96> text;
-    std::snprintf(text.data(), text.size(), "%.4g (%.4g%s%s)", mark.x, 1 / std::fabs(mark.x),
-                  curve.unit.empty() ? "" : " ", curve.unit.c_str());
-    return text.data();
-}
+  private:
+    void write_range(char axis, const Range& range, double factor) const {
+        std::fprintf(script_, "set %crange [%s:%s]\n", axis, number(range.low * factor).c_str(),
+                     number(range.high * factor).c_str());
+    }
 
-void write_labels(std::FILE* script, const Curve& curve, bool characters) {
-    const double right_part = curve.x.front() + 0.75 * (curve.x.back() - curve.x.front());
-    for (const auto& mark : curve.marked) {
-        const bool left = mark.x < right_part;
-        const std::string aside = characters ? "1,0" : "0.8,0.3";
-        std::fprintf(
-            script, "set label %s at %s,%s %s offset %s%s front%s\n",
-            quoted(peak_label(curve, mark)).c_str(), number(mark.x).c_str(), number(mark.y).c_str(),
-            left ? "left" : "right", left ? "" : "-", aside.c_str(),
-            characters ? "" : " point pt 7 ps 0.7 lc rgb '#c0392b' textcolor rgb '#333333'");
+    void write_data(const char* name, const std::vector<Mark>& points) const {
+        std::fprintf(script_, "$%s << EOD\n", name);
+        auto gap = curve_.gaps.begin();
+        for (const auto& [x, y] : points) {
+            // Where a line breaks off, another one begins.
+            while (gap != curve_.gaps.end() && x >= curve_.x[*gap]) {
+                std::fputc('\n', script_);
+                ++gap;
+            }
+            std::fprintf(script_, "%s %s\n", number(x * x_.factor).c_str(),
+                         number(y * y_.factor).c_str());
+        }
+        std::fputs("EOD\n", script_);
     }
-}
 
-void write_plot(std::FILE* script, const Curve& curve, std::size_t columns, bool characters) {
-    if (curve.style == Style::boxes) {
-        const double boxes = double(samples_a_step(curve, columns));
-        std::fprintf(script, "set boxwidth %s\n", number(boxes * curve.box_width).c_str());
+    Spot spot(const Mark& mark) const {
+        const auto along = [](double value, const Range& range, double low, double high) {
+            return low + (value - range.low) / (range.high - range.low) * (high - low);
+        };
+        return {along(mark.x, across_, box_.left, box_.right),
+                along(mark.y, upwards_, box_.bottom, box_.top)};
     }
-    write_data(script, "curve", thinned(curve, columns));
-    if (!curve.line.empty()) write_data(script, "line", curve.line);
-    std::fputs("plot ", script);
-    if (curve.style == Style::line && curve.filled && !curve.decibels && !characters) {
-        std::fputs("$curve with filledcurves y=0 fc rgb '#1f5fa8' fs transparent solid 0.15, ",
-                   script);
-    }
-    if (characters) {
-        static constexpr std::array looks{"lines", "boxes", "points pt '+'"};
-        std::fprintf(script, "$curve with %s", looks[std::size_t(curve.style)]);
-    } else {
-        static constexpr std::array looks{"lines lw 1.4 lc",
-                                          "boxes fs solid 0.35 border rgb '#1f5fa8' fc",
-                                          "points pt 7 ps 0.5 lc"};
-        std::fprintf(script, "$curve with %s rgb '#1f5fa8'", looks[std::size_t(curve.style)]);
-    }
-    if (!curve.line.empty()) std::fputs(", $line with lines lw 2 lc rgb '#c0392b'", script);
-    std::fputc('\n', script);
-}
 
-void write_terminal(std::FILE* script, Picture picture, std::size_t panels) {
-    std::fputs("set encoding utf8\nset key off\nset tics nomirror out\nset border 3\n", script);
-    if (picture == Picture::terminal) {
-        const auto [width, height] = terminal_size();
-        std::fprintf(script, "set terminal dumb noenhanced size %d,%d\n", width, height);
-    } else {
-        const bool png = picture == Picture::png;
-        std::fprintf(script, "set terminal %s noenhanced size 1000,%d font 'Sans,%d'%s\n",
-                     png ? "pngcairo" : "svg", panels > 1 ? 840 : 560, png ? 11 : 13,
-                     png ? "" : " background '#ffffff'");
-        std::fputs("set grid lc rgb '#e0e0e0' lt 1\nset border lc rgb '#555555'\n", script);
+    /// The frequencies of the peaks, with as many digits as tell them apart.
+    std::vector<std::string> names() const {
+        std::vector<std::string> result;
+        for (int digits = 4; digits <= 9; ++digits) {
+            result.clear();
+            for (const auto& mark : curve_.marked) {
+                result.push_back(with_prefix(mark.x, curve_.x_unit, digits));
+            }
+            if (std::set(result.begin(), result.end()).size() == result.size()) break;
+        }
+        return result;
     }
-    if (panels > 1) std::fprintf(script, "set multiplot layout %zu,1\n", panels);
-}
 
-void write_panel(std::FILE* script, const Curve& curve, bool characters) {
-    std::fprintf(script, "unset label\nset title %s\nset xlabel %s\nset ylabel %s\n",
-                 quoted(curve.title).c_str(), quoted(curve.x_label).c_str(),
-                 quoted(curve.y_label).c_str());
-    write_x_range(script, curve);
-    write_y_range(script, curve);
-    write_labels(script, curve, characters);
-    write_plot(script, curve, characters ? 200 : 4000, characters);
-}
+    /// Peaks are marked, and named where there is room.
+    void write_labels() const {
+        if (curve_.marked.empty()) return;
+        Placement free({box_.left, box_.bottom, canvas_.width, box_.top + canvas_.line_height / 2},
+                       canvas_.characters ? 2 : 9);
+        std::vector<Spot> line;
+        for (const auto& point : points_) line.push_back(spot(point));
+        free.avoid_curve(line);
+        const double radius = canvas_.characters ? 0 : 4;
+        for (const auto& mark : curve_.marked) {
+            const auto at = spot(mark);
+            free.avoid({at.x - radius, at.y - radius, at.x + radius, at.y + radius});
+            if (canvas_.characters) continue;
+            std::fprintf(script_, "set label '' at %s point pt 7 ps 0.7 lc rgb '#c0392b' front\n",
+                         canvas_.at(at.x, at.y).c_str());
+        }
+        const auto names = this->names();
+        for (std::size_t i = 0; i < names.size(); ++i) {
+            // The way up from the other marks stays free for their labels.
+            std::vector<Box> others;
+            for (const auto& mark : curve_.marked) {
+                const auto at = spot(mark);
+                if (&mark == &curve_.marked[i]) continue;
+                others.push_back(
+                    {at.x - radius, at.y, at.x + radius, at.y + 2 * canvas_.line_height});
+            }
+            write_label(free, curve_.marked[i], names[i], others);
+        }
+    }
+
+    /// Frequency and period, or where there is little room the frequency alone, rather than far
+    /// off.
+    void write_label(Placement& free, const Mark& mark, const std::string& name,
+                     std::span<const Box> others) const {
+        const auto at = spot(mark);
+        const double x = std::fabs(mark.x), near = 4 * canvas_.line_height;
+        const auto both = x > 0 ? name + " (" + with_prefix(1 / x, curve_.unit, 4) + ")" : name;
+        std::optional<Box> box;
+        std::string text;
+        for (const double reach : {near, canvas_.height}) {
+            for (const auto& wanted : {both, name}) {
+                if (box) continue;
+                text = wanted;
+                box = free.place(at, canvas_.width_of(text), canvas_.line_height, others, reach);
+            }
+        }
+        if (!box) return;
+        const double middle = (box->bottom + box->top) / 2;
+        const bool before = box->right <= at.x;
+        std::fprintf(script_, "set label %s at %s %s front textcolor rgb '#333333'\n",
+                     script_text(text).c_str(),
+                     canvas_.at(before ? box->right : box->left, middle).c_str(),
+                     before ? "right" : "left");
+        const double aside = std::max({box->left - at.x, at.x - box->right, 0.0});
+        const double apart = std::max(aside, std::max(box->bottom - at.y, 0.0));
+        if (canvas_.characters || apart < 14) return;
+        const bool above = at.x > box->left && at.x < box->right;
+        const double end_x = above ? at.x : at.x <= box->left ? box->left - 2 : box->right + 2;
+        std::fprintf(script_, "set arrow from %s to %s nohead lw 0.7 lc rgb '#999999' front\n",
+                     canvas_.at(at.x, at.y).c_str(),
+                     canvas_.at(end_x, above ? box->bottom : middle).c_str());
+    }
+
+    std::FILE* script_;
+    const Curve& curve_;
+    const Canvas& canvas_;
+    Box box_;
+    Range across_, upwards_;
+    AxisScale x_, y_;
+    std::vector<Mark> points_;
+};
 
 }  // namespace
-
-Picture picture_of_name(const std::string& path) {
-    if (path == "-") return Picture::terminal;
-    const auto extension = std::filesystem::path(path).extension();
-    if (extension == ".png") return Picture::png;
-    if (extension == ".svg") return Picture::svg;
-    throw UsageError("a picture's name ends in .png or .svg, or is - for the terminal, not '" +
-                     path + "'");
-}
 
 void check_apart(const std::string& out, const std::string& picture) {
     if (out != "-" || picture != "-") return;
     throw UsageError("standard output takes only one of -o - and --plot -");
 }
 
-void draw(const Curve& curve, const std::string& path) { draw({&curve, 1}, path); }
+void draw(const Curve& curve, const std::string& path, const PictureLook& look) {
+    draw({&curve, 1}, path, look);
+}
 
-void draw(std::span<const Curve> panels, const std::string& path) {
+void draw(std::span<const Curve> panels, const std::string& path, const PictureLook& look) {
     for (const auto& curve : panels) {
         if (curve.x.empty() || (curve.x.size() < 2 && curve.style == Style::line)) {
             throw Error("there are too few points to draw");
         }
     }
-    const auto format = picture_of_name(path);
+    const Canvas canvas(picture_of_name(path), look, 1000, panels.size() > 1 ? 880 : 560);
+    const auto& caption = panels.front().caption;
     OutputFile picture(path);
     {
         Progress progress("drawing");
         const auto script = scratch();
-        write_terminal(script.get(), format, panels.size());
-        for (const auto& curve : panels) {
-            write_panel(script.get(), curve, format == Picture::terminal);
+        std::FILE* const to = script.get();
+        canvas.begin(to);
+        if (!canvas.characters) std::fputs("set grid lc rgb '#e0e0e0' lt 1\n", to);
+        if (panels.size() > 1) std::fputs("set multiplot\n", to);
+        for (std::size_t i = 0; i < panels.size(); ++i) {
+            const bool named = i == 0 && !look.title.empty();
+            canvas.write_title(to, named ? look.title : panels[i].title);
+            const Panel panel(to, panels[i], canvas,
+                              canvas.plot_box(i, panels.size(), 0, !caption.empty()));
+            panel.write();
+            if (i == 0) canvas.write_caption(to, caption);
+            panel.write_plot();
         }
-        run_gnuplot(script.get(), picture.stream());
+        run_gnuplot(to, picture.stream());
+        if (canvas.characters && !caption.empty()) {
+            std::fprintf(picture.stream(), "%s\n", printable(caption).c_str());
+        }
     }
     picture.commit();
 }

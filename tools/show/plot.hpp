@@ -7,6 +7,8 @@
 #include <utility>
 #include <vector>
 
+#include "show/canvas.hpp"
+
 namespace wavkit::tool {
 
 struct Mark {
@@ -17,6 +19,8 @@ enum class Style { line, boxes, dots };
 
 struct Curve {
     std::string title, x_label, y_label;
+    std::string x_unit, y_unit;  // beside the labels; they may get a prefix
+    std::string caption;         // what there is to know about it, under the picture
     std::vector<double> x, y;
     Style style = Style::line;
     double box_width = 0;    // of boxes, which stand on their x
@@ -25,23 +29,20 @@ struct Curve {
     double depth = 150;  // decibels worth showing below the highest value
     bool filled = true;  // down to 0, unless in decibels
     double y_tics = 0;   // between the numbers at the height axis; 0: as it suits
-    std::optional<std::pair<double, double>> range;  // of the heights, where they do not choose it
-    std::string unit;                                // of the period, for the labels of the peaks
-    std::vector<Mark> marked;                        // peaks to label
+    // Of the axes, where the points do not choose them.
+    std::optional<std::pair<double, double>> range, x_range;
+    std::vector<std::size_t> gaps;  // points that begin a line of their own
+    std::string unit;               // of the period, for the labels of the peaks
+    std::vector<Mark> marked;       // peaks to label
 };
-
-/// The format of a picture by its name: "-" is a drawing in characters. Throws for others than
-/// .png and .svg.
-enum class Picture { png, svg, terminal };
-Picture picture_of_name(const std::string& path);
 
 /// Throws where an output and a picture would both go to standard output.
 void check_apart(const std::string& out, const std::string& picture);
 
 /// Draws a curve into a file, completely or not at all; "-" is standard output.
-void draw(const Curve& curve, const std::string& path);
+void draw(const Curve& curve, const std::string& path, const PictureLook& look = {});
 
 /// The same with several curves, each in a panel below the one before.
-void draw(std::span<const Curve> panels, const std::string& path);
+void draw(std::span<const Curve> panels, const std::string& path, const PictureLook& look = {});
 
 }  // namespace wavkit::tool

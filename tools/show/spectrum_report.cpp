@@ -9,6 +9,7 @@
 
 #include "base/number.hpp"
 #include "base/progress.hpp"
+#include "base/text.hpp"
 #include "files/output.hpp"
 #include "files/recording.hpp"
 #include "measure/windows.hpp"
@@ -49,6 +50,14 @@ void write_table(std::FILE* to, const SpectrumReport& report) {
     }
 }
 
+/// The head of a column of 18 characters.
+std::string column_head(const std::string& name, const std::string& unit) {
+    const auto text = printable(with_unit(name, unit));
+    const auto letters = std::size_t(std::ranges::count_if(
+        text, [](char c) { return (static_cast<unsigned char>(c) & 0xC0) != 0x80; }));
+    return std::string(18 - std::min<std::size_t>(letters, 18), ' ') + text;
+}
+
 /// The strongest peaks, as high as they are drawn.
 std::vector<Mark> shown_peaks(const SpectrumReport& report, std::size_t count) {
     const auto& spectrum = report.spectrum;
@@ -66,8 +75,8 @@ std::vector<Mark> shown_peaks(const SpectrumReport& report, std::size_t count) {
 
 std::string SpectrumReport::frequency_unit() const { return inverse_unit(unit); }
 
-std::string SpectrumReport::quantity() const {
-    return quantity_name(options.density, options.decibels, unit);
+std::string SpectrumReport::quantity_unit() const {
+    return tool::quantity_unit(options.density, options.decibels, value_unit, unit);
 }
 
 void write_output(const SpectrumReport& report) {
@@ -91,8 +100,9 @@ void print_peaks(const SpectrumReport& report, std::size_t count) {
         std::puts("no peaks");
         return;
     }
-    std::printf("%18s %18s %18s\n", with_unit("frequency", report.frequency_unit()).c_str(),
-                with_unit("period", report.unit).c_str(), report.quantity().c_str());
+    std::printf("%s %s %s\n", column_head("frequency", report.frequency_unit()).c_str(),
+                column_head("period", report.unit).c_str(),
+                column_head(quantity_name(report.options.density), report.quantity_unit()).c_str());
     for (const auto& peak : peaks) {
         std::printf("%18.8g %18.8g %18.6g\n", peak.x, 1 / std::fabs(peak.x), peak.y);
     }
@@ -104,11 +114,11 @@ void print_summary(const SpectrumReport& report) {
     if (spectrum.averaged > 1) std::printf("%ld segments of ", spectrum.averaged);
     std::printf("%d samples through %s, transform of %d points, %s spectrum\n", spectrum.samples,
                 name.c_str(), spectrum.length, spectrum.two_sided ? "two-sided" : "one-sided");
-    const auto unit = report.frequency_unit();
+    const auto unit = printable(report.frequency_unit());
     std::printf("bins every %s%s, from %s to %s; strongest peaks:\n\n",
-                number(spectrum.bins->delta).c_str(), unit.empty() ? "" : (" " + unit).c_str(),
-                number(spectrum.frequency(0)).c_str(),
-                number(spectrum.frequency(spectrum.bins->points - 1)).c_str());
+                rounded(spectrum.bins->delta).c_str(), unit.empty() ? "" : (" " + unit).c_str(),
+                rounded(spectrum.frequency(0)).c_str(),
+                rounded(spectrum.frequency(spectrum.bins->points - 1)).c_str());
     print_peaks(report, peaks_in_summary);
 }
 
@@ -116,10 +126,12 @@ void draw_spectrum(const SpectrumReport& report) {
     const auto& options = report.options;
     const auto y = shown(report);
     Curve curve;
-    curve.title =
-        short_name(options.in) + ", " + window_names()[std::size_t(report.spectrum.window)];
-    curve.x_label = with_unit("frequency", report.frequency_unit());
-    curve.y_label = report.quantity();
+    curve.title = short_name(options.in);
+    curve.caption = report.caption;
+    curve.x_label = "frequency";
+    curve.x_unit = report.frequency_unit();
+    curve.y_label = quantity_name(options.density);
+    curve.y_unit = report.quantity_unit();
     curve.decibels = options.decibels;
     curve.unit = report.unit;
     for (int i = 0; i < y->points; ++i) {
@@ -129,7 +141,7 @@ void draw_spectrum(const SpectrumReport& report) {
     }
     const auto count = std::min(options.peaks, peaks_in_picture);
     if (count > 0) curve.marked = shown_peaks(report, count);
-    draw(curve, options.plot);
+    draw(curve, options.plot, options.look);
 }
 
 }  // namespace wavkit::tool

@@ -6,6 +6,7 @@
 #include "files/writing.hpp"
 #include "measure/peaks.hpp"
 #include "measure/spectrum.hpp"
+#include "show/canvas.hpp"
 
 namespace wavkit::tool {
 
@@ -15,6 +16,7 @@ struct ReportOptions {
     bool decibels = false, complex = false, density = false;
     std::size_t peaks = 0;
     std::vector<double> band;
+    PictureLook look;
 };
 
 /// A spectrum and the words that go with it.
@@ -22,11 +24,13 @@ struct SpectrumReport {
     const ReportOptions& options;
     Spectrum spectrum;
     Band band;
-    std::string unit;  // of time; empty: unknown
+    std::string unit;        // of time; empty: unknown
+    std::string value_unit;  // of the samples; empty: unknown
+    std::string caption;     // how it was measured
 
     std::string frequency_unit() const;
-    /// What the heights are: "amplitude", "density (/rtHz)".
-    std::string quantity() const;
+    /// What the heights are counted in: "V", "1/√Hz", "dB re 1 V".
+    std::string quantity_unit() const;
 };
 
 /// Writes the file that the options name.

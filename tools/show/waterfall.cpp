@@ -7,6 +7,7 @@
 #include "base/number.hpp"
 #include "base/progress.hpp"
 #include "files/output.hpp"
+#include "show/axis.hpp"
 #include "show/gnuplot.hpp"
 
 namespace wavkit::tool {
@@ -40,7 +41,8 @@ void Waterfall::lay_out(const Spectrum& spectrum) {
         first_bin_ = std::min(first_bin_, i);
         end = i + 1;
     }
-    if (end - first_bin_ < 2) throw Error("there are too few frequencies to draw");
+    if (end - first_bin_ < 2)
+        throw DataError("the band holds fewer frequencies than a picture takes");
     const double interior = density_ ? amplitude_to_density(spectrum, first_bin_ + 1) : 1.0;
     for (int i = first_bin_; i < end; ++i) {
         const bool alone = density_ && spectrum.has_no_mirror(i);
@@ -95,47 +97,65 @@ std::vector<double> Waterfall::decibels(const Column& column) const {
     return result;
 }
 
-void Waterfall::draw(const std::string& path, const Labels& labels) const {
-    if (columns_.size() < 2) throw Error("there are too few segments to draw over time");
+/// Times along, frequencies up, and a bar with what the colours mean beside them.
+void Waterfall::write(std::FILE* to, const Canvas& canvas, const Labels& labels) const {
+    std::vector<double> cells;
+    for (const auto& column : columns_) {
+        const auto levels = decibels(column);
+        cells.insert(cells.end(), levels.begin(), levels.end());
+    }
+    const auto [low, high] = colour_range(cells);
+    const double width = step_ * double(spectra_in_column_),
+                 bottom = low_frequency_ - 0.5 * row_height_;
+    const double left = first_time_ - 0.5 * step_;  // where the first column begins
+    const double right = left + width * double(columns_.size());
+    const double top = bottom + row_height_ * double(rows_);
+    const auto x = axis_scale("time", labels.time_unit, right);
+    const auto y = axis_scale("frequency", labels.frequency_unit, std::max(top, -bottom));
+
+    const auto box = canvas.plot_box(0, 1, 13 * canvas.letter_width, !labels.caption.empty());
+    canvas.begin(to);
+    canvas.set_plot_box(to, box);
+    canvas.write_caption(to, labels.caption);
+    std::fputs(
+        "set border 15\n"
+        "set palette defined (0 '#000004', 1 '#1b0c41', 2 '#4a0c6b', 3 '#781c6d', "
+        "4 '#a52c60', 5 '#cf4446', 6 '#ed6925', 7 '#fb9b06', 8 '#f7d13d', 9 '#fcffa4')\n",
+        to);
+    std::fprintf(to, "set colorbox user origin %s size %s,%s\n",
+                 canvas.at(box.right + 2 * canvas.letter_width, box.bottom).c_str(),
+                 number(2.5 * canvas.letter_width / canvas.width).c_str(),
+                 number((box.top - box.bottom) / canvas.height).c_str());
+    canvas.write_title(to, labels.title);
+    std::fprintf(to, "set xlabel %s\nset ylabel %s\nset cblabel %s offset 1.5,0\n",
+                 script_text(x.label).c_str(), script_text(y.label).c_str(),
+                 script_text(labels.colour).c_str());
+    std::fprintf(to, "set xrange [%s:%s]\nset yrange [%s:%s]\nset cbrange [%s:%s]\n",
+                 number(left * x.factor).c_str(), number(right * x.factor).c_str(),
+                 number(bottom * y.factor).c_str(), number(top * y.factor).c_str(),
+                 number(low).c_str(), number(high).c_str());
+    std::fputs("$cells << EOD\n", to);
+    for (std::size_t row = 0; row < rows_; ++row) {
+        for (std::size_t c = 0; c < columns_.size(); ++c) {
+            std::fprintf(to, c ? " %.5g" : "%.5g", cells[c * rows_ + row]);
+        }
+        std::fputc('\n', to);
+    }
+    std::fprintf(to, "EOD\nplot $cells matrix using (%s+%s*$1):(%s+%s*$2):3 with image\n",
+                 number((left + 0.5 * width) * x.factor).c_str(), number(width * x.factor).c_str(),
+                 number(low_frequency_ * y.factor).c_str(), number(row_height_ * y.factor).c_str());
+}
+
+void Waterfall::draw(const std::string& path, const Labels& labels, const PictureLook& look) const {
+    if (columns_.size() < 2) throw DataError("there are too few segments to draw over time");
     OutputFile picture(path);
     {
         Progress progress("drawing");
-        std::vector<double> cells;
-        for (const auto& column : columns_) {
-            const auto levels = decibels(column);
-            cells.insert(cells.end(), levels.begin(), levels.end());
-        }
-        const auto [low, high] = colour_range(cells);
-        const double width = step_ * double(spectra_in_column_);
-        const double left = first_time_ - 0.5 * step_;  // where the first column begins
-        const double bottom = low_frequency_ - 0.5 * row_height_;
-
         const auto script = scratch();
-        std::FILE* const to = script.get();
-        std::fputs(
-            "set encoding utf8\nset key off\nset tics out nomirror\n"
-            "set terminal pngcairo noenhanced size 1000,560 font 'Sans,11'\n"
-            "set palette defined (0 '#000004', 1 '#1b0c41', 2 '#4a0c6b', 3 '#781c6d', "
-            "4 '#a52c60', 5 '#cf4446', 6 '#ed6925', 7 '#fb9b06', 8 '#f7d13d', 9 '#fcffa4')\n",
-            to);
-        std::fprintf(to, "set title %s\nset xlabel %s\nset ylabel %s\nset cblabel %s\n",
-                     quoted(labels.title).c_str(), quoted(labels.x).c_str(),
-                     quoted(labels.y).c_str(), quoted(labels.colour).c_str());
-        std::fprintf(to, "set xrange [%s:%s]\nset yrange [%s:%s]\nset cbrange [%s:%s]\n",
-                     number(left).c_str(), number(left + width * double(columns_.size())).c_str(),
-                     number(bottom).c_str(), number(bottom + row_height_ * double(rows_)).c_str(),
-                     number(low).c_str(), number(high).c_str());
-        std::fputs("$cells << EOD\n", to);
-        for (std::size_t row = 0; row < rows_; ++row) {
-            for (std::size_t c = 0; c < columns_.size(); ++c) {
-                std::fprintf(to, c ? " %.5g" : "%.5g", cells[c * rows_ + row]);
-            }
-            std::fputc('\n', to);
-        }
-        std::fprintf(to, "EOD\nplot $cells matrix using (%s+%s*$1):(%s+%s*$2):3 with image\n",
-                     number(left + 0.5 * width).c_str(), number(width).c_str(),
-                     number(low_frequency_).c_str(), number(row_height_).c_str());
-        run_gnuplot(to, picture.stream());
+        auto shown = labels;
+        if (!look.title.empty()) shown.title = look.title;
+        write(script.get(), Canvas(picture_of_name(path), look, 1000, 560), shown);
+        run_gnuplot(script.get(), picture.stream());
     }
     picture.commit();
 }

@@ -6,6 +6,7 @@
 
 #include "measure/peaks.hpp"
 #include "measure/spectrum.hpp"
+#include "show/canvas.hpp"
 
 namespace wavkit::tool {
 
@@ -19,10 +20,10 @@ class Waterfall {
     void add(const Spectrum& spectrum);
 
     struct Labels {
-        std::string title, x, y, colour;
+        std::string title, time_unit, frequency_unit, colour, caption;
     };
-    /// Draws into a .png file, completely or not at all.
-    void draw(const std::string& path, const Labels& labels) const;
+    /// Draws into a file, completely or not at all.
+    void draw(const std::string& path, const Labels& labels, const PictureLook& look) const;
 
   private:
     struct Column {
@@ -32,6 +33,7 @@ class Waterfall {
 
     void lay_out(const Spectrum& spectrum);
     void merge_neighbours();
+    void write(std::FILE* to, const Canvas& canvas, const Labels& labels) const;
     std::vector<double> decibels(const Column& column) const;
 
     Band band_;
