@@ -16,87 +16,139 @@ namespace {
 
 constexpr std::size_t block_scalars = 1 << 16;
 
+std::size_t frames_at_once(std::size_t width) {
+    return std::max<std::size_t>(block_scalars / width, 1);
+}
+
 /// Passes what a stream holds on, whole points at a time.
 template <class Take>
 void pass(SampleStream& stream, Progress& progress, Take take) {
     const std::size_t width = stream.channels * (stream.complex ? 2 : 1);
-    std::vector<double> block(std::max<std::size_t>(block_scalars / width, 1) * width);
+    std::vector<double> block(frames_at_once(width) * width);
     for (std::size_t count; (count = stream.read(block)) > 0; progress.done(stream.done())) {
         take(std::span<const double>(block).first(count));
     }
 }
 
 void copy(SampleStream& stream, BlockWriter& writer, Progress& progress) {
-    writer.begin({stream.delta, stream.complex, stream.channels, stream.length});
+    writer.begin({stream.delta, stream.complex, stream.channels, stream.length, stream.facts});
     pass(stream, progress, [&](auto values) { writer.write(values); });
     writer.end();
 }
 
-/// Signals that come one after the other and are wanted side by side: they wait in a file.
-class SideBySide {
+/// Signals of which some may be wanted side by side, which shows when all are there: they wait in a
+/// file, block by block, and in a block one run of scalars behind the other.
+class Waiting {
   public:
     void add(SampleStream& stream, Progress& progress) {
-        const std::size_t width = stream.complex ? 2 : 1;
-        std::size_t scalars = 0;
+        const std::size_t width = stream.channels * (stream.complex ? 2 : 1);
+        Run run{end_, 0, width, frames_at_once(width), 0};
+        std::vector<double> scalars;
         pass(stream, progress, [&](std::span<const double> values) {
-            if (std::fwrite(values.data(), sizeof(double), values.size(), file_.get()) !=
-                values.size()) {
-                fail_with_scratch();
+            scalars.clear();
+            for (std::size_t first = 0; first < width; ++first) {
+                for (auto i = first; i < values.size(); i += width) scalars.push_back(values[i]);
             }
-            scalars += values.size();
+            const auto count = std::fwrite(scalars.data(), sizeof(double), values.size(), file());
+            if (count != values.size()) fail_with_scratch();
+            end_ += count;
         });
-        const auto points = scalars / width;
-        if (channels_.empty()) {
-            points_ = points;
-            delta_ = stream.delta;
-        } else if (points != points_ || stream.delta != delta_) {
-            throw Error(
-                "signals of different lengths or spacings do not fit one sound file; choose "
-                "one with --signal");
+        run.points = (end_ - run.first) / width;
+        for (std::size_t c = 0; c < stream.channels; ++c) {
+            auto facts = stream.facts_of(c);
+            facts.beside |= c > 0;
+            signals_.push_back({stream.delta, stream.complex, facts, {}});
+            for (std::size_t part = 0; part < width / stream.channels; ++part, ++run.index) {
+                signals_.back().runs.push_back(run);
+            }
         }
-        for (std::size_t part = 0; part < width; ++part) channels_.push_back({end_ + part, width});
-        end_ += scalars;
     }
 
-    void write(BlockWriter& writer, Progress& progress) {
-        writer.begin({delta_, false, channels_.size(), points_});
-        const auto most = std::max<std::size_t>(block_scalars / channels_.size(), 256);
+    /// Writes what belongs together side by side, or everything.
+    void write(BlockWriter& writer, bool everything, Progress& progress) {
+        if (signals_.empty()) throw Error("there is no signal to write");
+        for (std::size_t first = 0, count = 1; first < signals_.size(); first += count) {
+            const auto rest = std::span(signals_).subspan(first);
+            count = everything ? rest.size() : 1;
+            while (count < rest.size() && side_by_side(rest[0], rest[count])) ++count;
+            write_together(writer, rest.first(count), everything || count > 1, progress);
+        }
+    }
+
+    std::size_t size() const { return signals_.size(); }
+
+  private:
+    struct Run {
+        std::size_t first, index, width, block, points;
+    };
+    struct Held {
+        double delta;
+        bool complex;
+        Facts facts;
+        std::vector<Run> runs;  // one, or two of a complex signal
+        std::size_t points() const { return runs[0].points; }
+    };
+
+    static bool side_by_side(const Held& a, const Held& b) {
+        return b.facts.beside && !a.complex && !b.complex && a.points() == b.points() &&
+               a.delta == b.delta && a.facts.start == b.facts.start;
+    }
+
+    void write_together(BlockWriter& writer, std::span<const Held> held, bool as_channels,
+                        Progress& progress) {
+        const auto points = held[0].points();
+        std::vector<Run> runs;
+        std::vector<Facts> facts;
+        for (const auto& signal : held) {
+            if (signal.points() != points || signal.delta != held[0].delta) {
+                throw Error(
+                    "signals of different lengths or spacings do not fit one such file; choose "
+                    "one with --signal");
+            }
+            for (const auto& run : signal.runs) {
+                runs.push_back(run);
+                facts.push_back(signal.facts);
+            }
+        }
+        const bool complex = !as_channels && held[0].complex;
+        writer.begin({held[0].delta, complex, as_channels ? runs.size() : 1, points, facts});
+        const auto most = frames_at_once(runs.size());
         std::vector<double> values, frames;
-        for (std::size_t start = 0; start < points_; start += most) {
-            const auto count = std::min(most, points_ - start);
-            frames.resize(count * channels_.size());
-            for (std::size_t c = 0; c < channels_.size(); ++c) {
-                const auto [first, step] = channels_[c];
-                values.resize((count - 1) * step + 1);
-                read_at(first + start * step, values);
-                for (std::size_t i = 0; i < count; ++i) {
-                    frames[i * channels_.size() + c] = values[i * step];
+        for (std::size_t start = 0; start < points; start += most) {
+            values.resize(std::min(most, points - start));
+            frames.resize(values.size() * runs.size());
+            for (std::size_t c = 0; c < runs.size(); ++c) {
+                read(runs[c], start, values);
+                for (std::size_t i = 0; i < values.size(); ++i) {
+                    frames[i * runs.size() + c] = values[i];
                 }
             }
             writer.write(frames);
-            progress.done(double(start) / double(points_));
+            progress.done(double(start) / double(points));
         }
         writer.end();
     }
 
-  private:
-    void read_at(std::size_t scalar, std::span<double> values) {
-        const auto offset = long(scalar * sizeof(double));
-        if (std::fseek(file_.get(), offset, SEEK_SET) != 0 ||
-            std::fread(values.data(), sizeof(double), values.size(), file_.get()) !=
-                values.size()) {
-            fail_with_scratch();
+    void read(const Run& run, std::size_t point, std::span<double> values) {
+        while (!values.empty()) {
+            const auto begin = point / run.block * run.block, within = point - begin;
+            const auto length = std::min(run.block, run.points - begin);
+            const auto count = std::min(values.size(), length - within);
+            const auto at = run.first + begin * run.width + run.index * length + within;
+            if (std::fseek(file(), long(at * sizeof(double)), SEEK_SET) != 0 ||
+                std::fread(values.data(), sizeof(double), count, file()) != count) {
+                fail_with_scratch();
+            }
+            values = values.subspan(count);
+            point += count;
         }
     }
 
-    struct Channel {
-        std::size_t first, step;  // scalars of the file
-    };
+    std::FILE* file() const { return file_.get(); }
 
     Stream file_ = scratch();
-    std::vector<Channel> channels_;
-    std::size_t points_ = 0, end_ = 0;
-    double delta_ = 1;
+    std::size_t end_ = 0;
+    std::vector<Held> signals_;
 };
 
 }  // namespace
@@ -109,14 +161,15 @@ void transfer(const std::string& in, const ReadOptions& reading, const std::stri
     {
         Progress progress("converting " + input.name());
         const auto writer = block_writer(output.stream(), format, writing);
-        const auto source =
-            is_sound(format) ? open_channels(input, reading) : open_signals(input, reading);
-        if (is_sound(format) && !source->sound) {
-            SideBySide signals;
-            while (auto* const stream = source->next()) signals.add(*stream, progress);
-            signals.write(*writer, progress);
-        } else {
+        const bool beside = takes_channels(format);
+        const auto source = beside ? open_channels(input, reading) : open_signals(input, reading);
+        if (!beside || source->sound) {
             while (auto* const stream = source->next()) copy(*stream, *writer, progress);
+        } else {
+            Waiting signals;
+            while (auto* const stream = source->next()) signals.add(*stream, progress);
+            const bool one_table = format == Format::npy && signals.size() > 1;
+            signals.write(*writer, is_sound(format) || one_table, progress);
         }
     }
     output.commit();
