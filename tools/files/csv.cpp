@@ -137,6 +137,11 @@ class CsvReader {
                     "; --missing hold or linear fills it in");
     }
 
+    /// A time of the column on the axis.
+    double scaled(double time) const {
+        return scale_ < 1 ? time / std::round(1 / scale_) : time * scale_;
+    }
+
     void settle_facts() {
         auto& facts = table_.facts;
         scale_ = 1;
@@ -167,7 +172,7 @@ class CsvReader {
     /// The step of the time column is known only at its end: it is read once for the step, and
     /// again, with the values, to see that it keeps to it.
     void measure_times() {
-        times_.emplace(table_.dialect, scale_);
+        times_.emplace(table_.dialect);
         axis_ = {};
         start_rows();
         while (next_row()) {
@@ -177,8 +182,8 @@ class CsvReader {
         if (const auto fault = axis_.fault(layout_.missing == Missing::error)) {
             lines_.fail_at(fault->line, fault->what);
         }
-        delta_ = axis_.delta();
-        table_.facts.start = axis_.start();
+        delta_ = scaled(axis_.delta());
+        table_.facts.start = scaled(axis_.start());
         if (const auto& origin = times_->origin()) {
             table_.facts.origin = iso_text(*origin);
             table_.facts.axis_unit = "s";
@@ -194,7 +199,7 @@ class CsvReader {
         const bool fits =
             position && (missing == 0 || (missing > 0 && layout_.missing != Missing::error));
         if (!fits) {
-            const double expected = axis_.start() + double(position_ + 1) * delta_;
+            const double expected = axis_.start() + double(position_ + 1) * axis_.delta();
             lines_.fail("the time column is not equally spaced and increasing (" +
                         number(time->value) + " where " + number(expected) + " was expected)");
         }

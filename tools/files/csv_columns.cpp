@@ -138,7 +138,7 @@ class Chooser {
             columns_.time = 0;
             guess("column 1 is in " + table_.headings[0].unit + " and is taken for the time");
         } else if (table_.headings.empty() && layout_.columns.empty() && !layout_.complex &&
-                   ascends_evenly(0)) {
+                   ascends_evenly(0, 3)) {
             columns_.time = 0;
             guess(
                 "column 1 ascends in equal steps and is taken for the time (otherwise --column "
@@ -146,7 +146,7 @@ class Chooser {
         }
     }
 
-    bool ascends_evenly(std::size_t column) const {
+    bool ascends_evenly(std::size_t column, std::size_t rows) const {
         std::vector<double> values;
         double digit = 0;
         for (const auto& row : table_.sample) {
@@ -155,7 +155,7 @@ class Chooser {
             digit = std::max(digit, last_digit(row[column]));
             values.push_back(*value);
         }
-        if (values.size() < 3) return false;
+        if (values.size() < rows) return false;
         const double step = (values.back() - values.front()) / double(values.size() - 1);
         for (std::size_t i = 1; i < values.size(); ++i) {
             const double off = std::fabs(values[i] - values[i - 1] - step);
@@ -180,7 +180,7 @@ class Chooser {
     bool counts() const {
         if (table_.headings.empty()) return false;
         const auto& name = table_.name(0);
-        return (name.empty() || names_a_count(name)) && (columns_.time || ascends_evenly(0));
+        return (name.empty() || names_a_count(name)) && (columns_.time || ascends_evenly(0, 2));
     }
 
     bool holds_no_number(std::size_t column) const {
@@ -200,11 +200,14 @@ class Chooser {
         if (kept.empty() || kept.size() == columns.size()) return;
         for (const auto column : columns) {
             if (std::ranges::count(kept, column) > 0) continue;
-            const auto name = table_.name(column);
-            guess("column " + (name.empty() ? std::to_string(column + 1) : "'" + name + "'") + " " +
-                  why + " and is left out");
+            guess(shown(column) + " " + why + " and is left out");
         }
         columns = kept;
+    }
+
+    std::string shown(std::size_t column) const {
+        const auto name = table_.name(column);
+        return "column " + (name.empty() ? std::to_string(column + 1) : "'" + name + "'");
     }
 
     void guess(std::string what) { table_.guesses.push_back(std::move(what)); }

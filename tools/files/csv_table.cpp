@@ -245,13 +245,29 @@ class HeadingFinder {
 
     std::vector<std::string> fitting(std::string_view line) const {
         Fields fields;
-        split(line, table_.dialect.separator, fields);
+        const char separator = table_.dialect.separator;
+        split(line, separator, fields);
+        // Between blanks a name may have some of its own, as the name of a single column and
+        // units do.
+        if (separator == blanks && table_.width == 1) fields = {trimmed(line)};
+        if (separator == blanks) join_units(fields);
         while (fields.size() > table_.width && fields.back().empty()) fields.pop_back();
         if (fields.size() + 1 == table_.width && trimmed(line).ends_with(','))
             fields.emplace_back();
         const bool any = std::ranges::any_of(fields, [](auto f) { return !f.empty(); });
         if (fields.size() != table_.width || !any) return {};
         return {fields.begin(), fields.end()};
+    }
+
+    static void join_units(Fields& fields) {
+        for (std::size_t i = 1; i < fields.size(); ++i) {
+            if (!fields[i].starts_with('(') && !fields[i].starts_with('[')) continue;
+            const char* const first = fields[i - 1].data();
+            const char* const last = fields[i].data() + fields[i].size();
+            fields[i - 1] = {first, std::size_t(last - first)};
+            fields.erase(fields.begin() + std::ptrdiff_t(i));
+            --i;
+        }
     }
 
     void take(const std::vector<std::string>& names, const std::vector<std::string>& units) {

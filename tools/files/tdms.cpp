@@ -42,10 +42,10 @@ Type type_of(std::uint32_t number) {
                                                      {0x1A, {8, Scalar::f64}},
                                                      {0x08000C, {8, Scalar::f32, true}},
                                                      {0x10000D, {16, Scalar::f64, true}},
-                                                     {11, {16}},
-                                                     {0x1B, {16}},
+                                                     {11, {16, std::nullopt}},
+                                                     {0x1B, {16, std::nullopt}},
                                                      {0x21, {1, Scalar::u8}},
-                                                     {type_timestamp, {16}}};
+                                                     {type_timestamp, {16, std::nullopt}}};
     const auto found = types.find(number);
     return found == types.end() ? Type() : found->second;
 }

@@ -35,8 +35,12 @@ std::string time_text(double value) {
 
 }  // namespace
 
-double simplest(double value, double tolerance) {
+double simplest(double value, double digit, std::int64_t steps) {
     if (!std::isnormal(value)) return value;
+    // A step that the digits hold is itself; another one shows that times are rounded.
+    const double held = std::round(value / digit) * digit, noise = 1e-6 * digit;
+    if (held > 0 && std::fabs(value - held) <= noise) return shortest(value, noise).first;
+    const double tolerance = digit / double(steps);
     const auto [decimal, digits] = shortest(value, tolerance);
     const auto [rate, rate_digits] = shortest(1 / value, tolerance / (value * value));
     return rate_digits < digits ? 1 / rate : decimal;
@@ -46,7 +50,7 @@ std::optional<RowTime> TimeReader::operator()(std::string_view field,
                                               std::string_view time_of_day) {
     if (plain_) {
         if (const auto value = value_of(field, dialect_)) {
-            return RowTime{*value * scale_, last_digit(field) * scale_};
+            return RowTime{*value, last_digit(field)};
         }
     }
     auto moment = moment_of(field);
@@ -122,7 +126,7 @@ void TimeAxis::end() {
     if (!waiting_.empty()) settle();
     if (steps_ == 0) return;
     const double step = (last_.value - first_.value) / double(steps_);
-    delta_ = simplest(step, digit_ / double(steps_));
+    delta_ = simplest(step, digit_, steps_);
     tolerance_ = std::max(uneven_step * delta_, std::min(0.6 * digit_, 0.45 * delta_));
 }
 

@@ -23,7 +23,7 @@ struct RowTime {
 /// Reads the fields of an axis: one, or a date and a time of the day beside it.
 class TimeReader {
   public:
-    TimeReader(const Dialect& dialect, double scale) : dialect_(dialect), scale_(scale) {}
+    explicit TimeReader(const Dialect& dialect) : dialect_(dialect) {}
 
     /// Null where a field is no time.
     std::optional<RowTime> operator()(std::string_view field, std::string_view time_of_day);
@@ -33,7 +33,6 @@ class TimeReader {
 
   private:
     Dialect dialect_;
-    double scale_;  // to the unit of the axis
     bool plain_ = true;
     std::optional<Moment> origin_;
 };
@@ -75,8 +74,8 @@ class TimeAxis {
     std::size_t other_gaps_ = 0;
 };
 
-/// The simplest number that lies within a tolerance: the decimal with the fewest digits, or the
-/// reciprocal of one.
-double simplest(double value, double tolerance);
+/// The step that so many steps of rounded times stand for, of which `digit` is that of the last
+/// digit: the decimal with the fewest digits that fits, or the reciprocal of one.
+double simplest(double value, double digit, std::int64_t steps);
 
 }  // namespace wavkit::tool
