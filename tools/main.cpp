@@ -65,6 +65,13 @@ void run(CLI::App& program, int argc, char** argv) {
     wavkit::tool::add_generate(program);
     wavkit::tool::add_resample(program);
     wavkit::tool::add_decimate(program);
+    wavkit::tool::add_cut(program);
+    wavkit::tool::add_join(program);
+    wavkit::tool::add_mix(program);
+    wavkit::tool::add_scale(program);
+    wavkit::tool::add_derive(program);
+    wavkit::tool::add_integrate(program);
+    wavkit::tool::add_edges(program);
     program.parse(argc, argv);
 }
 

@@ -9,8 +9,9 @@
 
 namespace wavkit::tool {
 
-/// While it lives, and from its first second on, shows what is being done on a line of the terminal
-/// and wipes it at the end. Silent where standard error is no terminal.
+/// While it lives, and from its first second on, shows on a line of the terminal what is being
+/// done, how far it is and what time remains, and wipes the line at the end. Silent where standard
+/// error is no terminal, and while another one lives.
 class Progress {
   public:
     explicit Progress(const std::string& what);
@@ -24,6 +25,7 @@ class Progress {
   private:
     void show();
 
+    static std::atomic<bool> shown_;  // whether the line is taken
     std::string what_;
     std::atomic<double> fraction_{0.0};
     std::mutex mutex_;

@@ -21,5 +21,12 @@ void add_filter(CLI::App& program);
 void add_generate(CLI::App& program);
 void add_resample(CLI::App& program);
 void add_decimate(CLI::App& program);
+void add_cut(CLI::App& program);
+void add_join(CLI::App& program);
+void add_mix(CLI::App& program);
+void add_scale(CLI::App& program);
+void add_derive(CLI::App& program);
+void add_integrate(CLI::App& program);
+void add_edges(CLI::App& program);
 
 }  // namespace wavkit::tool

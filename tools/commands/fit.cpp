@@ -1,8 +1,9 @@
-// wavkit fit: a straight line through a signal.
+// wavkit fit: lines and polynomials through a signal.
 #include <wavkit/dsp.h>
 
 #include <algorithm>
 #include <array>
+#include <cmath>
 #include <cstdio>
 #include <memory>
 
@@ -10,17 +11,21 @@
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
+#include "measure/polynomial_fit.hpp"
 #include "measure/prepare.hpp"
 #include "show/json.hpp"
 #include "show/labels.hpp"
 #include "show/plot.hpp"
+#include "show/report.hpp"
 
 namespace wavkit::tool {
 namespace {
 
 struct FitOptions {
-    std::string in, plot;
-    bool json = false;
+    ReportFiles files;
+    std::string plot;
+    std::optional<int> degree;
+    bool centred = false;
     ReadOptions reading;
     PictureLook look;
 };
@@ -36,7 +41,8 @@ constexpr std::array line_names{"slope",
 constexpr std::array data_names{"mean_x",     "mean_y",        "variance_x",
                                 "variance_y", "covariance_xy", "correlation"};
 constexpr std::size_t x_on_y = line_names.size(), data_entries = 2 * line_names.size();
-enum : std::size_t { slope = 0, intercept = 1, mean_x = 14, variance_x = 16, covariance = 18 };
+enum : std::size_t { slope = 0, intercept = 1, slope_variance = 3, intercept_variance = 4 };
+enum : std::size_t { mean_x = 14, variance_x = 16, covariance = 18 };
 
 /// The pairs to fit, (x, y) = (re, im). A real signal goes over its axis; as pairs, its abscissae
 /// do not begin anew within.
@@ -60,46 +66,94 @@ std::string words(std::string name) {
     return name;
 }
 
-void print_row(const std::string& name, double a, double b) {
-    std::printf("%-28s %16.9g %16.9g\n", words(name).c_str(), a, b);
+/// The share of the variance that the line explains, where there is any.
+double r_squared(std::span<const double> table) {
+    const double r = table[covariance + 1];
+    return table[variance_x] > 0 && table[variance_x + 1] > 0 ? r * r : std::nan("");
 }
 
-void print_table(std::span<const double> table, int points) {
-    std::printf("%-28s %16d\n\n%-28s %16s %16s\n", "points", points, "", "y on x", "x on y");
+void print_row(std::FILE* to, const std::string& name, double a, double b) {
+    std::fprintf(to, "%-28s %16.9g %16.9g\n", words(name).c_str(), a, b);
+}
+
+void print_line(std::FILE* to, std::span<const double> table, int points) {
+    std::fprintf(to, "%-28s %16d\n\n%-28s %16s %16s\n", "points", points, "", "y on x", "x on y");
+    const auto error = [&](std::size_t entry) { return std::sqrt(table[entry]); };
     for (std::size_t i = 0; i < line_names.size(); ++i) {
-        print_row(line_names[i], table[i], table[x_on_y + i]);
+        print_row(to, line_names[i], table[i], table[x_on_y + i]);
+        if (i != intercept) continue;
+        print_row(to, "slope_error", error(slope_variance), error(x_on_y + slope_variance));
+        print_row(to, "intercept_error", error(intercept_variance),
+                  error(x_on_y + intercept_variance));
     }
-    std::printf("\n%-28s %16s %16s\n", "", "x", "y");
-    print_row("mean", table[mean_x], table[mean_x + 1]);
-    print_row("sample variance", table[variance_x], table[variance_x + 1]);
-    std::printf("\n%-28s %16.9g\n", "sample covariance", table[covariance]);
-    std::printf("%-28s %16.9g\n", "correlation coefficient", table[covariance + 1]);
+    std::fprintf(to, "\n%-28s %16s %16s\n", "", "x", "y");
+    print_row(to, "mean", table[mean_x], table[mean_x + 1]);
+    print_row(to, "sample variance", table[variance_x], table[variance_x + 1]);
+    std::fprintf(to, "\n%-28s %16.9g\n", "sample covariance", table[covariance]);
+    std::fprintf(to, "%-28s %16.9g\n", "correlation coefficient", table[covariance + 1]);
+    std::fprintf(to, "%-28s %16.9g\n", "R squared", r_squared(table));
 }
 
-void print_json(std::span<const double> table, int points) {
-    JsonMembers whole{{"points", std::to_string(points)}};
+void add_line(JsonMembers& members, std::span<const double> table) {
     for (const std::size_t first : {std::size_t(0), x_on_y}) {
         JsonMembers line;
         for (std::size_t i = 0; i < line_names.size(); ++i) {
             line.emplace_back(line_names[i], json_number(table[first + i]));
+            if (i != intercept) continue;
+            line.emplace_back("slope_error", json_number(std::sqrt(table[first + slope_variance])));
+            line.emplace_back("intercept_error",
+                              json_number(std::sqrt(table[first + intercept_variance])));
         }
-        whole.emplace_back(first == 0 ? "y_on_x" : "x_on_y", json_object(line, "  "));
+        members.emplace_back(first == 0 ? "y_on_x" : "x_on_y", json_object(line));
     }
     for (std::size_t i = 0; i < data_names.size(); ++i) {
-        whole.emplace_back(data_names[i], json_number(table[data_entries + i]));
+        members.emplace_back(data_names[i], json_number(table[data_entries + i]));
     }
-    std::puts(json_object(whole).c_str());
+    members.emplace_back("r_squared", json_number(r_squared(table)));
 }
 
-void draw_line(const Signal& pairs, std::span<const double> table, const FitOptions& options) {
+void print_polynomial(std::FILE* to, const PolynomialFit& fit, double about, int points) {
+    std::fprintf(to, "%-22s %16d\n", "points", points);
+    if (about != 0) std::fprintf(to, "%-22s %16.9g\n", "powers of x less", about);
+    std::fprintf(to, "\n%5s %24s %16s\n", "power", "coefficient", "standard error");
+    const auto coefficients = fit.coefficients(about);
+    for (std::size_t i = 0; i < coefficients.size(); ++i) {
+        std::fprintf(to, "%5zu %24.15g %16.6g\n", i, coefficients[i].value, coefficients[i].error);
+    }
+    std::fprintf(to, "\n%-22s %16.9g\n", "residual deviation", std::sqrt(fit.residual_variance()));
+    std::fprintf(to, "%-22s %16.9g\n", "R squared", fit.r_squared());
+}
+
+void add_polynomial(JsonMembers& members, const PolynomialFit& fit, double about) {
+    std::vector<double> values, errors;
+    for (const auto& [value, error] : fit.coefficients(about)) {
+        values.push_back(value);
+        errors.push_back(error);
+    }
+    members.emplace_back("degree", std::to_string(fit.degree()));
+    members.emplace_back("about", json_number(about));
+    members.emplace_back("coefficients", json_numbers(values));
+    members.emplace_back("coefficient_errors", json_numbers(errors));
+    members.emplace_back("residual_variance", json_number(fit.residual_variance()));
+    members.emplace_back("r_squared", json_number(fit.r_squared()));
+}
+
+std::vector<Mark> marks_of(const Signal& pairs) {
     std::vector<Mark> points;
     points.reserve(std::size_t(pairs->points));
     for (int i = 0; i < pairs->points; ++i) {
         points.push_back({pairs->data[2 * i], pairs->data[2 * i + 1]});
     }
+    return points;
+}
+
+/// Draws the points, and a line through these places of it.
+void draw_fit(const Signal& pairs, std::vector<Mark> line, const std::string& file,
+              const FitOptions& options) {
+    auto points = marks_of(pairs);
     std::ranges::stable_sort(points, {}, &Mark::x);
     Curve curve;
-    curve.title = short_name(options.in);
+    curve.title = short_name(file);
     curve.x_label = "x";
     curve.x_unit = pairs.facts.axis_unit;
     curve.y_label = pairs.facts.label("y");
@@ -109,36 +163,74 @@ void draw_line(const Signal& pairs, std::span<const double> table, const FitOpti
         curve.x.push_back(x);
         curve.y.push_back(y);
     }
-    if (table[variance_x] > 0) {
-        for (const double x : {points.front().x, points.back().x}) {
-            curve.line.push_back({x, table[slope] * x + table[intercept]});
-        }
-    }
+    curve.line = std::move(line);
     draw(curve, options.plot, options.look);
 }
 
-void run(const FitOptions& options) {
-    if (!options.plot.empty()) picture_of_name(options.plot);
-    if (options.json && options.plot == "-") {
-        throw UsageError("standard output takes only one of --json and --plot -");
+/// Places of a function, close enough for a smooth curve.
+std::vector<Mark> places_of(const std::function<double(double)>& function, const Signal& pairs,
+                            int steps) {
+    const auto points = marks_of(pairs);
+    const auto [first, last] = std::ranges::minmax(points, {}, &Mark::x);
+    std::vector<Mark> places;
+    for (int i = 0; i <= steps; ++i) {
+        const double x = first.x + (last.x - first.x) * i / steps;
+        places.push_back({x, function(x)});
     }
+    return places;
+}
+
+void fit_line(const Signal& pairs, const std::string& file, const FitOptions& options, Page& page) {
+    Signal result;
+    {
+        Progress progress("fitting");
+        check(dsps_lin_regres2(pairs, result), "fitting a line");
+    }
+    const auto table = std::as_const(result).values();
+    if (!options.plot.empty()) {
+        const auto line = [&](double x) { return table[slope] * x + table[intercept]; };
+        const bool upright = table[variance_x] == 0;
+        draw_fit(pairs, upright ? std::vector<Mark>() : places_of(line, pairs, 1), file, options);
+    }
+    if (options.files.json) return add_line(page.signals.back(), table);
+    if (options.plot.empty()) print_line(page.text(), table, pairs->points);
+}
+
+void fit_polynomial(const Signal& pairs, const std::string& file, const FitOptions& options,
+                    Page& page) {
+    const auto fit = [&] {
+        Progress progress("fitting");
+        return PolynomialFit(marks_of(pairs), *options.degree);
+    }();
+    const double about = options.centred ? fit.mean_x() : 0;
+    if (!options.plot.empty()) {
+        draw_fit(pairs, places_of([&](double x) { return fit(x); }, pairs, 1000), file, options);
+    }
+    if (options.files.json) return add_polynomial(page.signals.back(), fit, about);
+    if (options.plot.empty()) print_polynomial(page.text(), fit, about, pairs->points);
+}
+
+void tell(const std::string& file, const FitOptions& options, Page& page) {
     auto reading = options.reading;
     reading.csv.pairs = true;
-    auto x = first_signal(options.in, reading);
-    with_data_of(options.in, [&] {
-        if (x->points < 1) throw DataError("the signal has no samples");
-        check_finite(x.values(), x->complex);
-    });
-    Signal table;
-    const auto pairs = [&] {
-        Progress progress("fitting");
-        auto result = pairs_of(std::move(x));
-        check(dsps_lin_regres2(result, table), "fitting a line");
-        return result;
-    }();
-    if (!options.plot.empty()) draw_line(pairs, table.values(), options);
-    if (options.json) return print_json(table.values(), pairs->points);
-    if (options.plot.empty()) print_table(table.values(), pairs->points);
+    auto x = first_signal(file, reading);
+    if (x->points < 1) throw DataError("the signal has no samples");
+    check_finite(x.values(), x->complex);
+    page.add_signal(x);
+    const auto pairs = pairs_of(std::move(x));
+    if (options.degree.value_or(1) == 1 && !options.centred) {
+        fit_line(pairs, file, options, page);
+    } else {
+        fit_polynomial(pairs, file, options, page);
+    }
+}
+
+void run(FitOptions& options) {
+    if (!options.plot.empty()) picture_of_name(options.plot);
+    options.files.check_single("", options.plot);
+    if (options.centred && !options.degree) throw UsageError("--centre goes with --degree");
+    report_files("fit", options.files,
+                 [&](const std::string& file, Page& page) { tell(file, options, page); });
 }
 
 constexpr const char* about =
@@ -147,22 +239,30 @@ of a real signal are y, over x = 0, delta, 2 delta ...; the points of a complex 
 that --column 2,3 fits the third column of a CSV file over the second.
 
 Variances and covariances of slope and intercept tell how far other samples of the same line would
-scatter them; their roots are the standard errors. 1e100 stands for the slope of a line over equal
-abscissae. --json prints an object; --plot draws the data and the line of y on x.
+scatter them; their roots are the standard errors. R squared is the share of the variance of y that
+the line explains. 1e100 stands for the slope of a line over equal abscissae.
+
+--degree N fits a polynomial instead and prints its coefficients in ascending powers of x, with
+--centre of x less its mean, each with its standard error. --plot draws the data and the line of y
+on x, or the polynomial.
 
 Examples:
   wavkit fit examples/data/sunspots-yearly.txt
-  wavkit fit calibration.csv --column force,voltage --plot line.png)";
+  wavkit fit calibration.csv --column force,voltage --plot line.png
+  wavkit fit thermistor.csv --column 1,2 --degree 3 --json)";
 
 }  // namespace
 
 void add_fit(CLI::App& program) {
-    auto* const command = program.add_subcommand("fit", "Fits a straight line to a signal.");
+    auto* const command =
+        program.add_subcommand("fit", "Fits a straight line or a polynomial to a signal.");
     const auto options = std::make_shared<FitOptions>();
-    command->add_option("IN", options->in, "file to read; - is standard input")
-        ->required()
-        ->type_name("");
-    command->add_flag("--json", options->json, "print JSON");
+    options->files.declare(*command);
+    command->add_option("--degree", options->degree, "fit a polynomial of this degree")
+        ->check(CLI::Range(0, 100))
+        ->type_name("N");
+    command->add_flag("--centre,--center", options->centred,
+                      "powers of x less its mean, for abscissae far from 0");
     command
         ->add_option("--plot", options->plot,
                      "draw data and line into a .png, .svg or .pdf file, or - the terminal")

@@ -15,12 +15,14 @@
 #include "show/axis.hpp"
 #include "show/labels.hpp"
 #include "show/plot.hpp"
+#include "show/report.hpp"
 
 namespace wavkit::tool {
 namespace {
 
 struct HistOptions {
-    std::string in, out, plot;
+    ReportFiles files;
+    std::string out, plot;
     ReadOptions reading;
     WriteOptions writing;
     PictureLook look;
@@ -41,6 +43,7 @@ void check_usage(const HistOptions& options) {
     if (!options.range.empty() && !(options.range[0] < options.range[1])) {
         throw UsageError("--range takes the lower end first");
     }
+    options.files.check_single(options.out, options.plot);
     options.writing.check_without_sound(options.out, "a histogram");
     check_apart(options.out, options.plot);
 }
@@ -91,15 +94,24 @@ void write_table(std::FILE* to, const Histogram& histogram) {
     }
 }
 
-void print_table(const Histogram& histogram) {
-    std::printf("%14s %14s %10s\n", "from", "to", "count");
+void print_table(std::FILE* to, const Histogram& histogram) {
+    std::fprintf(to, "%14s %14s %10s\n", "from", "to", "count");
     for (int i = 0; i < histogram.counts->points; ++i) {
-        std::printf("%14.6g %14.6g %10.0f\n", histogram.edge(i), histogram.edge(i + 1),
-                    histogram.counts->data[i]);
+        std::fprintf(to, "%14.6g %14.6g %10.0f\n", histogram.edge(i), histogram.edge(i + 1),
+                     histogram.counts->data[i]);
     }
-    if (histogram.below > 0) std::printf("%29s %10.0f\n", "below", histogram.below);
-    if (histogram.above > 0) std::printf("%29s %10.0f\n", "above", histogram.above);
-    if (histogram.nan > 0) std::printf("%29s %10.0f\n", "not a number", histogram.nan);
+    if (histogram.below > 0) std::fprintf(to, "%29s %10.0f\n", "below", histogram.below);
+    if (histogram.above > 0) std::fprintf(to, "%29s %10.0f\n", "above", histogram.above);
+    if (histogram.nan > 0) std::fprintf(to, "%29s %10.0f\n", "not a number", histogram.nan);
+}
+
+void add_members(JsonMembers& members, const Histogram& histogram) {
+    members.emplace_back("from", json_number(histogram.low));
+    members.emplace_back("width", json_number(histogram.counts->delta));
+    members.emplace_back("counts", json_numbers(histogram.counts.values()));
+    members.emplace_back("below", json_number(histogram.below));
+    members.emplace_back("above", json_number(histogram.above));
+    members.emplace_back("nan", json_number(histogram.nan));
 }
 
 void write(const Histogram& histogram, const HistOptions& options) {
@@ -112,9 +124,9 @@ void write(const Histogram& histogram, const HistOptions& options) {
 }
 
 void draw(const Histogram& histogram, const std::string& values, const std::string& unit,
-          const HistOptions& options) {
+          const std::string& file, const HistOptions& options) {
     Curve curve;
-    curve.title = short_name(options.in);
+    curve.title = short_name(file);
     curve.x_label = values;
     curve.x_unit = unit;
     curve.y_label = "count";
@@ -129,20 +141,27 @@ void draw(const Histogram& histogram, const std::string& values, const std::stri
     draw(curve, options.plot, options.look);
 }
 
-void run(const HistOptions& options) {
-    check_usage(options);
-    auto x = first_signal(options.in, options.reading);
+void tell(const std::string& file, const HistOptions& options, Page& page) {
+    auto x = first_signal(file, options.reading);
     const auto values = x.facts.label(x->complex ? "magnitude" : "value");
     const auto unit = options.look.unit_of(x.facts);
+    auto& members = page.add_signal(x);
     const auto histogram = [&] {
         Progress progress("counting");
-        return with_data_of(options.in, [&] { return count(std::move(x), options); });
+        return count(std::move(x), options);
     }();
+    add_members(members, histogram);
     if (!options.out.empty()) write(histogram, options);
-    if (!options.plot.empty()) draw(histogram, values, unit, options);
-    if (options.out.empty() && options.plot.empty()) return print_table(histogram);
+    if (!options.plot.empty()) draw(histogram, values, unit, file, options);
+    if (options.out.empty() && options.plot.empty()) return print_table(page.text(), histogram);
     const double outside = histogram.below + histogram.above + histogram.nan;
     if (outside > 0) std::fprintf(stderr, "wavkit: %.0f values are in no bin\n", outside);
+}
+
+void run(const HistOptions& options) {
+    check_usage(options);
+    report_files("hist", options.files,
+                 [&](const std::string& file, Page& page) { tell(file, options, page); });
 }
 
 constexpr const char* about =
@@ -162,9 +181,7 @@ Examples:
 void add_hist(CLI::App& program) {
     auto* const command = program.add_subcommand("hist", "Counts how often which values occur.");
     const auto options = std::make_shared<HistOptions>();
-    command->add_option("IN", options->in, "file to read; - is standard input")
-        ->required()
-        ->type_name("");
+    options->files.declare(*command);
     command->add_option("--bins", options->bins, "number of bins")
         ->check(CLI::Range(1, 1 << 24))
         ->type_name("N");

@@ -8,17 +8,18 @@
 #include "base/text.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
+#include "show/report.hpp"
 
 namespace wavkit::tool {
 namespace {
 
 struct InfoOptions {
-    std::vector<std::string> files;
+    ReportFiles files;
     ReadOptions reading;
 };
 
-void line(const char* what, const std::string& value) {
-    std::printf("  %-9s %s\n", what, value.c_str());
+void line(std::FILE* to, const char* what, const std::string& value) {
+    std::fprintf(to, "  %-9s %s\n", what, value.c_str());
 }
 
 /// Six significant digits, enough to look at.
@@ -43,53 +44,64 @@ std::string point(int (*reduce)(const dsp*, dsp*), const Signal& x) {
     return text;
 }
 
-void describe(const Signal& x, bool sound) {
-    if (!x.facts.name.empty()) line("name", x.facts.name);
-    if (!x.facts.unit.empty()) line("unit", x.facts.unit);
+void describe(std::FILE* to, const Signal& x, bool sound) {
+    if (!x.facts.name.empty()) line(to, "name", printable(x.facts.name));
+    if (!x.facts.unit.empty()) line(to, "unit", printable(x.facts.unit));
     const auto axis = x.facts.axis(sound);
     const bool seconds = axis == "s";
-    const std::string of_axis = axis.empty() ? "" : " " + axis;
-    line("points", std::to_string(x->points));
-    line("kind", x->complex ? "complex" : "real");
-    line("delta",
+    const std::string of_axis = axis.empty() ? "" : " " + printable(axis);
+    line(to, "points", std::to_string(x->points));
+    line(to, "kind", x->complex ? "complex" : "real");
+    line(to, "delta",
          rounded(x->delta) + of_axis + (seconds ? " (" + brief(1 / x->delta) + " Hz)" : ""));
     if (x.facts.placed() || !x.facts.origin.empty()) {
-        line("start", rounded(x.facts.start) + of_axis +
+        line(to, "start", rounded(x.facts.start) + of_axis +
                           (x.facts.origin.empty() ? "" : " after " + x.facts.origin));
     }
-    line("duration", rounded(x->points * x->delta) + of_axis);
+    line(to, "duration", rounded(x->points * x->delta) + of_axis);
     if (x->points == 0) return;
-    line("mean", point(dsps_mean, x));
-    line("rms", point(dsps_rms, x));
-    line("min", point(dsps_min, x) + (x->complex ? " (least magnitude)" : ""));
-    line("max", point(dsps_max, x) + (x->complex ? " (greatest magnitude)" : ""));
-    if (const auto missing = count_nan(x)) line("nan", std::to_string(missing) + " values");
+    line(to, "mean", point(dsps_mean, x));
+    line(to, "rms", point(dsps_rms, x));
+    line(to, "min", point(dsps_min, x) + (x->complex ? " (least magnitude)" : ""));
+    line(to, "max", point(dsps_max, x) + (x->complex ? " (greatest magnitude)" : ""));
+    if (const auto missing = count_nan(x)) line(to, "nan", std::to_string(missing) + " values");
 }
 
-void describe(const std::string& path, const ReadOptions& reading) {
-    const auto recording = read_recording(path, reading);
+/// The same figures by the names that `stats` has for them.
+void add_members(JsonMembers& members, const Signal& x) {
+    members.emplace_back("duration", json_number(x->points * x->delta));
+    if (x->points == 0) return;
+    members.emplace_back("nan", std::to_string(count_nan(x)));
+    const std::pair<const char*, int (*)(const dsp*, dsp*)> statistics[] = {
+        {"mean", dsps_mean}, {"rms", dsps_rms}, {"min", dsps_min}, {"max", dsps_max}};
+    for (const auto& [name, reduce] : statistics) {
+        Signal result;
+        check(reduce(x, result), "computing a statistic");
+        members.emplace_back(name, json_value({result.values().begin(), result.values().end()}));
+    }
+}
+
+void describe(const std::string& path, const InfoOptions& options, Page& page) {
+    const auto recording = read_recording(path, options.reading);
     const auto count = recording.signals.size();
-    std::printf("%s: %s, %zu %s\n", path == "-" ? "standard input" : printable(path).c_str(),
-                recording.description.c_str(), count, count == 1 ? "signal" : "signals");
+    if (options.files.json) {
+        page.members.emplace_back("format", json_text(recording.description));
+        for (const auto& x : recording.signals) add_members(page.add_signal(x), x);
+        return;
+    }
+    auto* const to = page.text();
+    std::fprintf(to, "%s: %s, %zu %s\n", path == "-" ? "standard input" : printable(path).c_str(),
+                 recording.description.c_str(), count, count == 1 ? "signal" : "signals");
     for (std::size_t i = 0; i < count; ++i) {
-        if (count > 1) line("signal", std::to_string(i + 1) + " of " + std::to_string(count));
-        describe(recording.signals[i], recording.sound);
+        if (count > 1) line(to, "signal", std::to_string(i + 1) + " of " + std::to_string(count));
+        describe(to, recording.signals[i], recording.sound);
     }
 }
 
-/// A file that cannot be read does not keep the others from being shown.
-void run(const InfoOptions& options) {
-    bool failed = false;
-    for (const auto& file : options.files) {
-        try {
-            describe(file, options.reading);
-        } catch (const Error& error) {
-            std::fflush(stdout);
-            std::fprintf(stderr, "wavkit: %s\n", printable(error.what()).c_str());
-            failed = true;
-        }
-    }
-    if (failed) throw CLI::RuntimeError(1);
+void run(InfoOptions& options) {
+    options.files.headings = false;
+    report_files("info", options.files,
+                 [&](const std::string& file, Page& page) { describe(file, options, page); });
 }
 
 }  // namespace
@@ -98,8 +110,7 @@ void add_info(CLI::App& program) {
     auto* const command = program.add_subcommand(
         "info", "Shows format, length, spacing and statistics of every signal in the files.");
     const auto options = std::make_shared<InfoOptions>();
-    command->add_option("FILE", options->files, "files to look at; - is standard input")
-        ->required();
+    options->files.declare(*command);
     options->reading.declare(*command);
     command->footer("Example:\n  wavkit info tone.wav examples/data/sunspots-yearly.txt");
     command->callback([options] { run(*options); });

@@ -9,16 +9,17 @@
 #include <numbers>
 
 #include "base/number.hpp"
+#include "base/text.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
 #include "show/json.hpp"
+#include "show/report.hpp"
 
 namespace wavkit::tool {
 namespace {
 
 struct StatsOptions {
-    std::string in;
-    bool json = false;
+    ReportFiles files;
     ReadOptions reading;
 };
 
@@ -97,9 +98,7 @@ double count_nan(const Signal& x) {
 }
 
 std::vector<Figure> figures(const Signal& x) {
-    std::vector<Figure> list{{"points", {double(x->points)}, true},
-                             {"delta", {x->delta}},
-                             {"duration", {time_of(x->points, x->delta)}}};
+    std::vector<Figure> list{{"duration", {time_of(x->points, x->delta)}}};
     if (x->points == 0) return list;
     list.push_back({"nan", {count_nan(x)}, true});
     // Rounding takes the variance of a constant a little below 0, and its root to NaN.
@@ -119,14 +118,6 @@ std::vector<Figure> figures(const Signal& x) {
     return list;
 }
 
-JsonMembers members(const Signal& x) {
-    JsonMembers list{{"complex", x->complex ? "true" : "false"}};
-    for (const auto& figure : figures(x)) {
-        list.emplace_back(figure.name, json_value(figure.parts));
-    }
-    return list;
-}
-
 std::string shown(const Figure& figure, double value) {
     if (!figure.whole) return rounded(value);
     std::array<char, 32> text;
@@ -134,36 +125,45 @@ std::string shown(const Figure& figure, double value) {
     return text.data();
 }
 
-void print(const Signal& x, bool sound) {
-    const auto unit = x.facts.axis(sound);
-    std::printf("%-22s %s\n", "kind", x->complex ? "complex" : "real");
+void print(std::FILE* to, const Signal& x, bool sound) {
+    const auto axis = x.facts.axis(sound);
+    const auto unit = axis.empty() ? "" : " " + printable(axis);
+    std::fprintf(to, "%-22s %s\n", "kind", x->complex ? "complex" : "real");
+    std::fprintf(to, "%-22s %d\n%-22s %s%s\n", "points", x->points, "delta",
+                 rounded(x->delta).c_str(), unit.c_str());
     for (auto figure : figures(x)) {
-        const bool time =
-            figure.name == "delta" || figure.name == "duration" || figure.name.ends_with("_at");
+        const bool time = figure.name == "duration" || figure.name.ends_with("_at");
         std::ranges::replace(figure.name, '_', ' ');
-        std::printf("%-22s ", figure.name.c_str());
-        std::fputs(shown(figure, figure.parts[0]).c_str(), stdout);
-        if (figure.parts.size() == 2) std::printf(",%s", shown(figure, figure.parts[1]).c_str());
-        std::puts(time && !unit.empty() ? (" " + unit).c_str() : "");
+        std::fprintf(to, "%-22s ", figure.name.c_str());
+        std::fputs(shown(figure, figure.parts[0]).c_str(), to);
+        if (figure.parts.size() == 2)
+            std::fprintf(to, ",%s", shown(figure, figure.parts[1]).c_str());
+        std::fprintf(to, "%s\n", time ? unit.c_str() : "");
+    }
+}
+
+void tell(const Recording& recording, bool json, Page& page) {
+    const auto& signals = recording.signals;
+    for (std::size_t i = 0; i < signals.size(); ++i) {
+        if (json) {
+            auto& members = page.add_signal(signals[i]);
+            for (const auto& figure : figures(signals[i])) {
+                members.emplace_back(figure.name, json_value(figure.parts));
+            }
+            continue;
+        }
+        if (signals.size() > 1) {
+            std::fprintf(page.text(), "%s%-22s %zu of %zu\n", i > 0 ? "\n" : "", "signal", i + 1,
+                         signals.size());
+        }
+        print(page.text(), signals[i], recording.sound);
     }
 }
 
 void run(const StatsOptions& options) {
-    const auto recording = read_recording(options.in, options.reading);
-    const auto& signals = recording.signals;
-    if (options.json) {
-        std::vector<JsonMembers> objects;
-        objects.reserve(signals.size());
-        for (const auto& x : signals) objects.push_back(members(x));
-        std::puts(json_list(objects).c_str());
-        return;
-    }
-    for (std::size_t i = 0; i < signals.size(); ++i) {
-        if (signals.size() > 1) {
-            std::printf("%s%-22s %zu of %zu\n", i > 0 ? "\n" : "", "signal", i + 1, signals.size());
-        }
-        print(signals[i], recording.sound);
-    }
+    report_files("stats", options.files, [&](const std::string& file, Page& page) {
+        tell(read_recording(file, options.reading), options.files.json, page);
+    });
 }
 
 constexpr const char* about =
@@ -173,23 +173,21 @@ divide by the number of samples, sample values by one less. Energy is the sum of
 of more than 1e100 count as 1e100 where powers are summed, and 1e100 stands for a ratio to nothing.
 A signal without samples has no statistics.
 
---json prints a list with an object for every signal; complex values are [re,im], and null stands for
-what is not a finite number.
+--json prints an object for every file; complex values are [re,im], and null stands for what is not a
+finite number.
 
 Examples:
   wavkit stats examples/data/sunspots-yearly.txt
-  wavkit stats stereo.wav --json)";
+  wavkit stats stereo.wav --json
+  wavkit stats run*.wav --json --jobs 4)";
 
 }  // namespace
 
 void add_stats(CLI::App& program) {
     auto* const command =
-        program.add_subcommand("stats", "Prints the statistics of every signal in a file.");
+        program.add_subcommand("stats", "Prints the statistics of every signal in the files.");
     const auto options = std::make_shared<StatsOptions>();
-    command->add_option("IN", options->in, "file to read; - is standard input")
-        ->required()
-        ->type_name("");
-    command->add_flag("--json", options->json, "print JSON");
+    options->files.declare(*command);
     options->reading.declare(*command);
     command->footer(about);
     command->callback([options] { run(*options); });

@@ -1,6 +1,7 @@
 // Results as JSON: values are put together from texts that are JSON already.
 #pragma once
 
+#include <span>
 #include <string>
 #include <utility>
 #include <vector>
@@ -15,10 +16,13 @@ std::string json_number(double value);
 /// A number, or [re,im] of a complex value.
 std::string json_value(const std::vector<double>& parts);
 
-/// An object with a member a line.
-std::string json_object(const JsonMembers& members, const std::string& indent = "");
+/// Text in quotes. Bytes that are no UTF-8 become U+FFFD.
+std::string json_text(const std::string& text);
 
-/// Objects in a list.
-std::string json_list(const std::vector<JsonMembers>& objects);
+std::string json_object(const JsonMembers& members);
+
+/// Values in a list.
+std::string json_list(std::span<const std::string> values);
+std::string json_numbers(std::span<const double> values);
 
 }  // namespace wavkit::tool

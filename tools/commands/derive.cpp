@@ -1,0 +1,113 @@
+// wavkit derive and integrate: slopes of a signal, and the area below it.
+#include <algorithm>
+#include <memory>
+#include <vector>
+
+#include "base/error.hpp"
+#include "base/number.hpp"
+#include "base/progress.hpp"
+#include "commands/commands.hpp"
+#include "measure/calculus.hpp"
+#include "measure/prepare.hpp"
+
+namespace wavkit::tool {
+namespace {
+
+std::size_t width_of(const SampleStream& stream) {
+    return stream.channels * (stream.complex ? 2 : 1);
+}
+
+/// The mean of every part of a stream.
+std::vector<double> means_of(SampleStream& stream, Progress& progress) {
+    const auto width = std::max<std::size_t>(width_of(stream), 1);
+    std::vector<double> block((1 << 15) * width), sums(width);
+    std::size_t points = 0;
+    for (auto count = block.size(); count == block.size(); progress.done(stream.done())) {
+        count = stream.read(block);
+        check_finite(std::span(block).first(count), stream.complex, long(points));
+        std::vector<double> fresh(width);  // a sum of sums keeps its digits
+        for (std::size_t i = 0; i < count; ++i) fresh[i % width] += block[i];
+        for (std::size_t p = 0; p < width; ++p) sums[p] += fresh[p];
+        points += count / width;
+    }
+    if (points > 0) {
+        for (double& sum : sums) sum /= double(points);
+    }
+    return sums;
+}
+
+struct DeriveOptions {
+    PassOptions files;
+    bool from_zero = false;
+};
+
+void derive(const DeriveOptions& options) {
+    pass_through(options.files, "differentiating", [&](const SampleStream& stream, SignalShape&) {
+        if (!(stream.delta > 0))
+            throw DataError("a spacing of " + number(stream.delta) + " has no slopes");
+        return std::make_unique<Derivative>(stream.delta, width_of(stream), options.from_zero);
+    });
+}
+
+struct IntegrateOptions {
+    PassOptions files;
+    bool detrend = false;
+};
+
+void integrate(const IntegrateOptions& options) {
+    std::vector<std::vector<double>> means;
+    const auto look = [&](SignalSource& source) {
+        Progress progress("reading " + source.name());
+        while (auto* const stream = source.next()) means.push_back(means_of(*stream, progress));
+    };
+    std::size_t signal = 0;
+    const auto make = [&](const SampleStream& stream, SignalShape&) {
+        auto offsets = options.detrend ? means.at(signal++) : std::vector<double>(width_of(stream));
+        return std::make_unique<Integral>(stream.delta, std::move(offsets));
+    };
+    if (options.detrend) return pass_through(options.files, "integrating", make, look);
+    pass_through(options.files, "integrating", make);
+}
+
+constexpr const char* about_derive =
+    R"(Every sample becomes its difference to the one before, over the spacing: the slope half a sample
+ago. The first sample, before which there is none, takes the slope of the second; with --from-zero
+that of a step from 0, which 'wavkit integrate' undoes. Every signal of a file is taken, and all
+channels. The recording may be longer than memory.
+
+Examples:
+  wavkit derive position.csv --time -o speed.csv --with-time
+  wavkit derive position.dsp | wavkit derive - -o acceleration.dsp)";
+
+constexpr const char* about_integrate =
+    R"(Every sample becomes the sum of all up to it, times the spacing. An offset in the signal makes a
+slope in the integral: --detrend takes the mean of the whole signal out first. Every signal of a file
+is taken, and all channels. The recording may be longer than memory.
+
+Examples:
+  wavkit integrate acceleration.wav --detrend -o speed.wav
+  wavkit integrate flow.csv --time -o volume.csv --with-time)";
+
+}  // namespace
+
+void add_derive(CLI::App& program) {
+    auto* const command =
+        program.add_subcommand("derive", "Writes the derivative of every signal.");
+    const auto options = std::make_shared<DeriveOptions>();
+    options->files.declare(*command);
+    command->add_flag("--from-zero", options->from_zero, "before the signal there is 0");
+    command->footer(about_derive);
+    command->callback([options] { derive(*options); });
+}
+
+void add_integrate(CLI::App& program) {
+    auto* const command =
+        program.add_subcommand("integrate", "Writes the integral of every signal.");
+    const auto options = std::make_shared<IntegrateOptions>();
+    options->files.declare(*command);
+    command->add_flag("--detrend", options->detrend, "remove the mean first");
+    command->footer(about_integrate);
+    command->callback([options] { integrate(*options); });
+}
+
+}  // namespace wavkit::tool
