@@ -35,20 +35,21 @@ TEST_F(NumbersTest, StatisticsOfEverySignal) {
                            real<dsp>({})});
     expect_json(
         shell("wavkit stats - --json <x.dsp").out,
-        R"([{"complex":false,"points":5,"delta":0.5,"duration":2.5,"nan":0,"sum":20,"mean":4,)"
+        R"({"command":"stats","file":"-","signals":[{"signal":1,"complex":false,"points":5,)"
+        R"("delta":0.5,"duration":2.5,"nan":0,"sum":20,"mean":4,)"
         R"("median":3,"rms":5.0990195135927845,"energy":130,"min":1,"max":10,)"
         R"("population_variance":10,"sample_variance":12.5,)"
         R"("population_deviation":3.1622776601683795,"sample_deviation":3.5355339059327378,)"
         R"("skewness":1.1384199576606167,"excess_kurtosis":-0.212,)"
         R"("geometric_mean":2.9925557394776896,"harmonic_mean":2.2900763358778624,"min_sample":0,)"
-        R"("min_at":0,"max_sample":4,"max_at":2,"range":9},{"complex":true,"points":2,"delta":1,)"
+        R"("min_at":0,"max_sample":4,"max_at":2,"range":9},{"signal":2,"complex":true,"points":2,"delta":1,)"
         R"("duration":2,"nan":0,"sum":[3,3],"mean":[1.5,1.5],"median":[1.5,1.5],)"
         R"("rms":3.605551275463989,"energy":26,"min":[0,-1],"max":[3,4],"population_variance":8.5,)"
         R"("sample_variance":17,"population_deviation":2.9154759474226504,)"
         R"("sample_deviation":4.123105625617661,"geometric_mean":[2.1213203435596424,)"
         R"(-0.7071067811865476],"harmonic_mean":[0.3333333333333333,-2.3333333333333335],)"
-        R"("min_sample":1,"min_at":1,"max_sample":0,"max_at":0},{"complex":false,"points":0,)"
-        R"("delta":1,"duration":0}])");
+        R"("min_sample":1,"min_at":1,"max_sample":0,"max_at":0},{"signal":3,"complex":false,"points":0,)"
+        R"("delta":1,"duration":0}]})");
     // The text holds the same figures by the same names; JSON has no number for some values.
     const auto text = printed("stats x.dsp --signal 1");
     EXPECT_EQ(std::count(text.begin(), text.end(), '\n'), 25);
@@ -91,17 +92,21 @@ TEST_F(NumbersTest, HistogramsCountWhatIsThere) {
 
 TEST_F(NumbersTest, LinesByTheNamesOfTheirFigures) {
     write("x.csv", "time,volt,mm\n0,9,1\n1,9,2\n2,9,2\n");
-    expect_json(printed("fit x.csv --column time,mm --json"),
-                R"({"points":3,"y_on_x":{"slope":0.5,"intercept":1.1666666666666667,)"
-                R"("residual_variance":0.16666666666666666,"slope_variance":0.08333333333333333,)"
-                R"("intercept_variance":0.1388888888888889,)"
-                R"("slope_intercept_covariance":-0.08333333333333333,)"
-                R"("slope_intercept_correlation":-0.7745966692414834},"x_on_y":{"slope":1.5,)"
-                R"("intercept":-1.5,"residual_variance":0.5,"slope_variance":0.75,)"
-                R"("intercept_variance":2.25,"slope_intercept_covariance":-1.25,)"
-                R"("slope_intercept_correlation":-0.9622504486493763},"mean_x":1,)"
-                R"("mean_y":1.6666666666666667,"variance_x":1,"variance_y":0.3333333333333333,)"
-                R"("covariance_xy":0.5,"correlation":0.8660254037844386})");
+    expect_json(
+        printed("fit x.csv --column time,mm --json"),
+        R"({"command":"fit","file":"x.csv","signals":[{"signal":1,"complex":true,"points":3,)"
+        R"("delta":1,"y_on_x":{"slope":0.5,"intercept":1.1666666666666667,)"
+        R"("slope_error":0.28867513459481287,"intercept_error":0.37267799624996506,)"
+        R"("residual_variance":0.16666666666666666,"slope_variance":0.08333333333333333,)"
+        R"("intercept_variance":0.1388888888888889,)"
+        R"("slope_intercept_covariance":-0.08333333333333333,)"
+        R"("slope_intercept_correlation":-0.7745966692414834},"x_on_y":{"slope":1.5,)"
+        R"("intercept":-1.5,"slope_error":0.8660254037844386,"intercept_error":1.5,)"
+        R"("residual_variance":0.5,"slope_variance":0.75,)"
+        R"("intercept_variance":2.25,"slope_intercept_covariance":-1.25,)"
+        R"("slope_intercept_correlation":-0.9622504486493763},"mean_x":1,)"
+        R"("mean_y":1.6666666666666667,"variance_x":1,"variance_y":0.3333333333333333,)"
+        R"("covariance_xy":0.5,"correlation":0.8660254037844386,"r_squared":0.75}]})");
     const auto text = printed("fit x.csv --column 1,3");
     EXPECT_NE(text.find("slope                                     0.5              1.5\n"),
               std::string::npos)

@@ -17,6 +17,7 @@ TEST_F(RefusalsTest, OneOfAKind) {
     write("z.csv", "re,im\n1,2\n3,4\n");
     write("cut.dsp", "\xBE\x30\x03\xEB\x08\x04");
     write("word.txt", "1 2 3 four");
+    write("many.csv", "1\n2\n\n3\n");
     write("many.txt", "#DSP points = 9223372036854775807\n#DSP complex = 1\n1 2 3 4");
     const struct {
         int status;
@@ -45,6 +46,10 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {1, "interp back.csv --table --rate 1", "sample 2 does not lie behind"},
         {1, "interp x.txt --rate 2 --method spline", "5 points"},
         {1, "roots 0 0", "0 everywhere"},
+        {1, "cut x.txt --begin 3 -o y.csv", "ends at 3"},
+        {1, "mix x.txt slow.txt -o y.csv", "differ, 1 in x.txt and 0.5 in slow.txt"},
+        {1, "join x.txt many.csv -o y.csv", "many.csv holds more signals than x.txt"},
+        {1, "fit x.txt --degree 3", "4 points with different x"},
         // Places and sizes
         {1, "filter x.txt --lowpass nan -o y.csv", "half the sampling rate"},
         {1, "filter x.txt --bandpass 0.3 0.2 -o y.csv", "lower to a higher"},
@@ -62,8 +67,10 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {2, "convert x.txt out", "--to"},
         {2, "window hanning", "Uniform, Bartlett, Hann"},
         {2, "filter x.txt --lowpass 0.1 --window hann", "Kaiser70"},
-        {2, "generate sine 50 -o x.dsp", "none of cos, cexp, line, noise"},
+        {2, "generate sinus 50 -o x.dsp", "'sinus' is none of brown, cexp, cos, line"},
         {2, "generate cos 0.1 amp=x -o x.dsp", "is not a number"},
+        {2, "generate sweep 0 0.1 type=log -o x.dsp", "from one positive frequency"},
+        {2, "generate pink low=0.6 -o x.dsp", "half the sampling rate"},
         {2, "generate noise type=laplace --complex -o x.dsp", "real"},
         // Numbers out of range
         {2, "convert x.txt out.csv --delta nan", "positive number"},
@@ -78,6 +85,11 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {2, "spectrum x.txt --waterfall -", ".png, .svg or .pdf"},
         {2, "spectrum x.txt --plot x.gif", ".png, .svg or .pdf"},
         {2, "spectrum x.txt --plot x.png --size 10x9x8", "no size"},
+        {2, "cut x.txt --samples --length 0.5 -o y.csv", "whole numbers"},
+        {2, "scale x.txt -o y.csv", "how to scale"},
+        {2, "scale x.txt --calibrate 1=2 1=3 -o y.csv", "close together"},
+        {2, "mix x.txt x.txt --gains 1 -o y.csv", "a number for every file: 2, not 1"},
+        {2, "hist x.txt x.txt -o y.csv", "one file"},
         {2, "filter x.txt -o y.csv", "what to filter by"},
         {2, "filter x.txt --taps x.txt --length 9", "not for --taps"},
         {2, "filter x.txt --lowpass 0.1 --length 9 --transition 0.1 --attenuation 50", "no choice"},
@@ -99,8 +111,10 @@ TEST_F(RefusalsTest, OneOfAKind) {
 
 TEST_F(RefusalsTest, EveryCommandExplainsItself) {
     for (const std::string command :
-         {"info", "convert", "spectrum", "correlate", "envelope", "window", "filter", "design",
-          "generate", "stats", "hist", "fit", "roots", "interp"}) {
+         {"info",   "convert", "spectrum", "correlate", "envelope", "window",
+          "filter", "design",  "generate", "stats",     "hist",     "fit",
+          "roots",  "interp",  "resample", "decimate",  "cut",      "join",
+          "mix",    "scale",   "derive",   "integrate", "edges"}) {
         EXPECT_NE(printed(command + " --help").find("Example"), std::string::npos) << command;
     }
 }
