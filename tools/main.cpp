@@ -47,7 +47,7 @@ void run(CLI::App& program, int argc, char** argv) {
         "A file named - is standard input or output, so commands pipe:\n"
         "  wavkit convert tone.wav - | wavkit spectrum - --peaks 3\n\n"
         "Exit status: 0 done, 1 bad input or output, 2 bad usage.\n"
-        "wavkit COMMAND --help explains a command.");
+        "wavkit help COMMAND explains a command.");
     program.get_formatter()->column_width(36);
     wavkit::tool::add_info(program);
     wavkit::tool::add_convert(program);
@@ -72,6 +72,9 @@ void run(CLI::App& program, int argc, char** argv) {
     wavkit::tool::add_derive(program);
     wavkit::tool::add_integrate(program);
     wavkit::tool::add_edges(program);
+    wavkit::tool::add_help(program);
+    wavkit::tool::offer_skipping(program);
+    if (argc > 1 && argv[1][0] != '-') wavkit::tool::check_command(program, argv[1]);
     program.parse(argc, argv);
 }
 

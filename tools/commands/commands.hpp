@@ -29,4 +29,12 @@ void add_derive(CLI::App& program);
 void add_integrate(CLI::App& program);
 void add_edges(CLI::App& program);
 
+void add_help(CLI::App& program);
+
+/// Gives every command that writes a file --skip-existing.
+void offer_skipping(CLI::App& program);
+
+/// Throws where there is no command of that name, and says which one may be meant.
+void check_command(const CLI::App& program, const std::string& name);
+
 }  // namespace wavkit::tool

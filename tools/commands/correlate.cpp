@@ -14,6 +14,7 @@
 #include "files/recording.hpp"
 #include "measure/peaks.hpp"
 #include "measure/prepare.hpp"
+#include "show/report.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -22,7 +23,7 @@ struct CorrelateOptions {
     std::string a, b, out;
     ReadOptions reading;
     WriteOptions writing;
-    bool detrend = false, coefficient = false;
+    bool detrend = false, coefficient = false, json = false;
     std::vector<double> lags;
 };
 
@@ -39,6 +40,9 @@ void check_usage(const CorrelateOptions& options) {
     if (options.a == "-" && options.b == "-") {
         throw UsageError(
             "standard input can be A or B, not both; two channels of it take a single -");
+    }
+    if (options.json && options.out == "-") {
+        throw UsageError("standard output takes only one of --json and -o -");
     }
     options.writing.check_without_sound(options.out, "a correlation");
     if (options.out.empty()) return;
@@ -117,7 +121,12 @@ void write_table(std::FILE* to, const Correlation& correlation, const Band& lags
     }
 }
 
-void print_strongest(const Correlation& correlation, const Band& lags) {
+/// Where the signals match best.
+struct Match {
+    double lag, samples, correlation, coefficient;
+};
+
+Match strongest(const Correlation& correlation, const Band& lags) {
     const auto& x = correlation.values;
     int best = -1;
     for (int i = 0; i < x->points; ++i) {
@@ -126,9 +135,23 @@ void print_strongest(const Correlation& correlation, const Band& lags) {
     }
     if (best < 0) throw Error("there is no lag in that range");
     const double height = x->complex ? magnitude(x, best) : x->data[best];
-    std::printf("lag          %.9g\nsamples      %d\ncorrelation  %.6g\ncoefficient  %.6g\n",
-                correlation.lag(best), best - correlation.first, height,
-                height * correlation.to_coefficient);
+    return {correlation.lag(best), double(best - correlation.first), height,
+            height * correlation.to_coefficient};
+}
+
+void tell(const Match& match, const CorrelateOptions& options) {
+    report("correlate", options.json, [&](Page& page) {
+        const std::string b = options.b.empty() ? options.a : options.b;
+        page.members = {{"files", json_list(std::vector{json_text(options.a), json_text(b)})},
+                        {"lag", json_number(match.lag)},
+                        {"samples", json_number(match.samples)},
+                        {"correlation", json_number(match.correlation)},
+                        {"coefficient", json_number(match.coefficient)}};
+        std::fprintf(page.text(),
+                     "lag          %.9g\nsamples      %.0f\ncorrelation  %.6g\n"
+                     "coefficient  %.6g\n",
+                     match.lag, match.samples, match.correlation, match.coefficient);
+    });
 }
 
 void run(const CorrelateOptions& options) {
@@ -143,7 +166,7 @@ void run(const CorrelateOptions& options) {
     }();
     Band lags;
     if (!options.lags.empty()) lags = {options.lags[0], options.lags[1]};
-    if (options.out != "-") print_strongest(correlation, lags);
+    if (options.out != "-") tell(strongest(correlation, lags), options);
     if (options.out.empty()) return;
     if (options.coefficient) {
         for (double& value : correlation.values.values()) value *= correlation.to_coefficient;
@@ -186,6 +209,7 @@ void add_correlate(CLI::App& program) {
     command->add_option("--lags", options->lags, "lags to look at")
         ->expected(2)
         ->type_name("LOW HIGH");
+    command->add_flag("--json", options->json, "print JSON");
     command->add_flag("--detrend", options->detrend, "remove the means first");
     command->add_flag("--coefficient", options->coefficient, "write coefficients, -1 to 1");
     options->reading.declare(*command);

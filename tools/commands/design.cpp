@@ -15,6 +15,7 @@
 #include "measure/response.hpp"
 #include "measure/taps.hpp"
 #include "show/plot.hpp"
+#include "show/report.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -53,6 +54,7 @@ struct DesignOptions {
     std::string name, out, plot;
     std::vector<double> parameters;
     std::optional<double> rate;
+    bool json = false;
     Tapering tapering;
     WriteOptions writing;
     PictureLook look;
@@ -148,29 +150,51 @@ class Report {
     Report(const DesignOptions& options, const Request& request, const Signal& taps)
         : options_(options), request_(request), taps_(taps), response_(response_of(taps)) {}
 
-    void print() const {
+    void print(std::FILE* to) const {
         static const std::map<Symmetry, const char*> symmetries{
             {Symmetry::even, "even"},
             {Symmetry::odd, "odd: turns phases by 90 degrees"},
             {Symmetry::none, "none"}};
-        const double delay =
-            middle() + (request_.design.type == DSP_FIR_DELAY ? request_.other : 0);
-        std::printf("design       %s\n", title().c_str());
-        std::printf("symmetry     %s\n", symmetries.at(symmetry_of(taps_)));
-        std::printf("delay        %s samples", number(delay).c_str());
-        if (options_.rate) std::printf(", %.6g s", delay / *options_.rate);
-        std::puts("");
+        std::fprintf(to, "design       %s\n", title().c_str());
+        std::fprintf(to, "symmetry     %s\n", symmetries.at(symmetry_of(taps_)));
+        std::fprintf(to, "delay        %s samples", number(delay()).c_str());
+        if (options_.rate) std::fprintf(to, ", %.6g s", delay() / *options_.rate);
+        std::fputs("\n", to);
         const auto gain = relative_gain(response_, request_.design.ideal);
-        print_crossings("-3 dB at", crossings(gain, std::sqrt(0.5)));
-        print_crossings("-6 dB at", crossings(gain, 0.5));
-        for (const auto& band : bands_of(gain)) {
-            // A ramp's kink at 0 is beyond any filter, as a part of next to nothing.
-            if (band.passes && request_.design.ideal == Ideal::ramp) continue;
-            std::printf("%-12s %.6g to %.6g%s, ", band.passes ? "passes" : "stops",
-                        frequency(double(band.first)), frequency(double(band.last)), unit());
-            std::printf(band.passes ? "within %.3g dB\n" : "by %.4g dB\n",
-                        std::fabs(band.decibels));
+        print_crossings(to, "-3 dB at", crossings(gain, std::sqrt(0.5)));
+        print_crossings(to, "-6 dB at", crossings(gain, 0.5));
+        for (const auto& band : shown_bands(gain)) {
+            std::fprintf(to, "%-12s %.6g to %.6g%s, ", band.passes ? "passes" : "stops",
+                         frequency(double(band.first)), frequency(double(band.last)), unit());
+            std::fprintf(to, band.passes ? "within %.3g dB\n" : "by %.4g dB\n",
+                         std::fabs(band.decibels));
         }
+    }
+
+    JsonMembers members() const {
+        static const std::map<Symmetry, const char*> symmetries{
+            {Symmetry::even, "even"}, {Symmetry::odd, "odd"}, {Symmetry::none, "none"}};
+        const auto gain = relative_gain(response_, request_.design.ideal);
+        const auto places = [&](double height) {
+            std::vector<double> frequencies;
+            for (const double at : crossings(gain, height)) frequencies.push_back(frequency(at));
+            return json_numbers(frequencies);
+        };
+        std::vector<std::string> bands;
+        for (const auto& band : shown_bands(gain)) {
+            bands.push_back(json_object({{"passes", band.passes ? "true" : "false"},
+                                         {"from", json_number(frequency(double(band.first)))},
+                                         {"to", json_number(frequency(double(band.last)))},
+                                         {"db", json_number(std::fabs(band.decibels))}}));
+        }
+        return {{"design", json_text(options_.name)},
+                {"parameters", json_numbers(options_.parameters)},
+                {"taps", std::to_string(taps_->points)},
+                {"symmetry", json_text(symmetries.at(symmetry_of(taps_)))},
+                {"delay", json_number(delay())},
+                {"at_3db", places(std::sqrt(0.5))},
+                {"at_6db", places(0.5)},
+                {"bands", json_list(bands)}};
     }
 
     void draw(const std::string& path) const {
@@ -215,6 +239,18 @@ class Report {
     }
     const char* unit() const { return options_.rate ? " Hz" : ""; }
     double middle() const { return (taps_->points - 1) / 2.0; }
+    double delay() const {
+        return middle() + (request_.design.type == DSP_FIR_DELAY ? request_.other : 0);
+    }
+
+    std::vector<ResponseBand> shown_bands(const std::vector<double>& gain) const {
+        auto bands = bands_of(gain);
+        // A ramp's kink at 0 is beyond any filter, as a part of next to nothing.
+        if (request_.design.ideal == Ideal::ramp) {
+            std::erase_if(bands, [](const auto& band) { return band.passes; });
+        }
+        return bands;
+    }
 
     std::string title() const {
         std::string text = options_.name;
@@ -222,13 +258,14 @@ class Report {
         return text + ", " + std::to_string(taps_->points) + " taps";
     }
 
-    void print_crossings(const char* label, const std::vector<double>& positions) const {
+    void print_crossings(std::FILE* to, const char* label,
+                         const std::vector<double>& positions) const {
         if (positions.empty()) return;
-        std::printf("%-12s", label);
+        std::fprintf(to, "%-12s", label);
         for (std::size_t i = 0; i < positions.size(); ++i) {
-            std::printf("%s %.6g", i ? "," : "", frequency(positions[i]));
+            std::fprintf(to, "%s %.6g", i ? "," : "", frequency(positions[i]));
         }
-        std::printf("%s\n", unit());
+        std::fprintf(to, "%s\n", unit());
     }
 
     const DesignOptions& options_;
@@ -244,16 +281,23 @@ void run(DesignOptions& options) {
     }
     if (!options.out.empty()) options.writing.checked_format_for(options.out);
     check_apart(options.out, options.plot);
+    if (options.json && (options.out == "-" || options.plot == "-")) {
+        throw UsageError("standard output takes only one of --json, -o - and --plot -");
+    }
     const auto request = request_of(options);
     if (options.tapering.transition && options.rate) *options.tapering.transition /= *options.rate;
     auto taps = taps_of(request, options.tapering);
     check_taps(request, options, taps);
     if (options.rate) taps->delta = 1 / *options.rate;
     if (!options.out.empty()) write_recording(options.out, {&taps, 1}, options.writing);
-    if (!options.out.empty() && options.plot.empty()) return;
-    const Report report(options, request, taps);
-    if (options.plot.empty()) return report.print();
-    report.draw(options.plot);
+    if (!options.out.empty() && options.plot.empty() && !options.json) return;
+    const Report design(options, request, taps);
+    if (!options.plot.empty()) design.draw(options.plot);
+    if (!options.plot.empty() && !options.json) return;
+    report("design", options.json, [&](Page& page) {
+        page.members = design.members();
+        design.print(page.text());
+    });
 }
 
 constexpr const char* about =
@@ -297,6 +341,7 @@ void add_design(CLI::App& program) {
     command->add_option("--rate", options->rate, "sampling rate: frequencies are in hertz")
         ->check(positive_number())
         ->type_name("RATE");
+    command->add_flag("--json", options->json, "print JSON");
     command->add_option("-o,--output", options->out, "write the taps; - is standard output")
         ->type_name("FILE");
     command

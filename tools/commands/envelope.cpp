@@ -11,12 +11,14 @@
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
 #include "measure/prepare.hpp"
+#include "show/report.hpp"
 
 namespace wavkit::tool {
 namespace {
 
 struct EnvelopeOptions {
-    std::string in, out;
+    ReportFiles files;
+    std::string out;
     ReadOptions reading;
     WriteOptions writing;
     bool detrend = false;
@@ -31,21 +33,48 @@ void take_envelope(Signal& x, bool detrend) {
           "computing the envelope");
 }
 
-void print_summary(const std::vector<Signal>& envelopes) {
-    std::printf("%12s %12s %12s %12s\n", "mean", "min", "max", "max at");
+/// The sample at which an envelope is highest.
+double highest(const Signal& y) {
+    const auto values = y.values();
+    return double(std::ranges::max_element(values) - values.begin());
+}
+
+void print_summary(std::FILE* to, const std::vector<Signal>& envelopes) {
+    std::fprintf(to, "%12s %12s %12s %12s\n", "mean", "min", "max", "max at");
     for (const auto& y : envelopes) {
         if (y->points == 0) {
-            std::puts("no samples");
+            std::fputs("no samples\n", to);
             continue;
         }
-        const auto values = y.values();
-        const auto highest = std::ranges::max_element(values) - values.begin();
-        std::printf("%12.6g %12.6g %12.6g %12.6g\n", statistic(dsps_mean, y),
-                    statistic(dsps_min, y), values[std::size_t(highest)], y.place(double(highest)));
+        std::fprintf(to, "%12.6g %12.6g %12.6g %12.6g\n", statistic(dsps_mean, y),
+                     statistic(dsps_min, y), statistic(dsps_max, y), y.place(highest(y)));
     }
 }
 
+void add_summary(JsonMembers& members, const Signal& y) {
+    if (y->points == 0) return;
+    members.emplace_back("mean", json_number(statistic(dsps_mean, y)));
+    members.emplace_back("min", json_number(statistic(dsps_min, y)));
+    members.emplace_back("max", json_number(statistic(dsps_max, y)));
+    members.emplace_back("max_at", json_number(y.place(highest(y))));
+}
+
+void tell(const std::string& file, const EnvelopeOptions& options, Page& page) {
+    auto recording = read_recording(file, options.reading);
+    {
+        Progress progress("transforming");
+        for (auto& x : recording.signals) {
+            auto& members = page.add_signal(x);
+            take_envelope(x, options.detrend);
+            add_summary(members, x);
+        }
+    }
+    if (options.out.empty()) return print_summary(page.text(), recording.signals);
+    write_recording(options.out, recording.signals, options.writing);
+}
+
 void run(const EnvelopeOptions& options) {
+    options.files.check_single(options.out, "");
     if (options.out.empty() && (options.writing.format || options.writing.time)) {
         throw UsageError("--to and --with-time are for the output that -o names");
     }
@@ -55,15 +84,8 @@ void run(const EnvelopeOptions& options) {
             throw UsageError("--with-time is for CSV");
         }
     }
-    auto recording = read_recording(options.in, options.reading);
-    {
-        Progress progress("transforming");
-        with_data_of(options.in, [&] {
-            for (auto& x : recording.signals) take_envelope(x, options.detrend);
-        });
-    }
-    if (options.out.empty()) return print_summary(recording.signals);
-    write_recording(options.out, recording.signals, options.writing);
+    report_files("envelope", options.files,
+                 [&](const std::string& file, Page& page) { tell(file, options, page); });
 }
 
 constexpr const char* about =
@@ -83,9 +105,7 @@ void add_envelope(CLI::App& program) {
     auto* const command =
         program.add_subcommand("envelope", "Writes the envelope of every signal in a file.");
     const auto options = std::make_shared<EnvelopeOptions>();
-    command->add_option("IN", options->in, "file to read; - is standard input")
-        ->required()
-        ->type_name("");
+    options->files.declare(*command);
     command->add_option("-o,--output", options->out, "file to write; - is standard output")
         ->type_name("FILE");
     add_choice(*command, "--to", options->writing.format, written_formats(),

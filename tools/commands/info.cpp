@@ -55,8 +55,9 @@ void describe(std::FILE* to, const Signal& x, bool sound) {
     line(to, "delta",
          rounded(x->delta) + of_axis + (seconds ? " (" + brief(1 / x->delta) + " Hz)" : ""));
     if (x.facts.placed() || !x.facts.origin.empty()) {
-        line(to, "start", rounded(x.facts.start) + of_axis +
-                          (x.facts.origin.empty() ? "" : " after " + x.facts.origin));
+        line(to, "start",
+             rounded(x.facts.start) + of_axis +
+                 (x.facts.origin.empty() ? "" : " after " + x.facts.origin));
     }
     line(to, "duration", rounded(x->points * x->delta) + of_axis);
     if (x->points == 0) return;

@@ -13,6 +13,7 @@
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
 #include "measure/prepare.hpp"
+#include "show/report.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -22,6 +23,7 @@ using Complex = std::complex<double>;
 struct RootsOptions {
     std::vector<std::string> values;
     std::string out;
+    ReportFiles files;  // those that the values name
     bool from_roots = false, descending = false;
     ReadOptions reading;
     WriteOptions writing;
@@ -62,17 +64,13 @@ std::optional<Complex> parsed(std::string_view text) {
     return Complex(*first, *second);
 }
 
-/// Whether the one value is the name of a file.
-bool names_a_file(const std::vector<std::string>& values) {
-    return values.size() == 1 && !parsed(values[0]);
-}
+/// Whether the values are names of files, for the first one is no number.
+bool names_files(const RootsOptions& options) { return !parsed(options.values[0]); }
 
-/// The numbers that the command line holds, or the signal of the file that it names.
+/// The numbers that the command line holds.
 Signal read_values(const RootsOptions& options) {
-    const auto& values = options.values;
-    if (names_a_file(values)) return first_signal(values[0], options.reading);
     std::vector<Complex> points;
-    for (const auto& value : values) {
+    for (const auto& value : options.values) {
         const auto number = parsed(value);
         if (!number) throw UsageError("'" + value + "' is not a number");
         points.push_back(*number);
@@ -116,23 +114,41 @@ double residual(const Signal& polynomial, Complex z) {
     return terms > 0 ? double(std::abs(value) / terms) : 0;
 }
 
-void print_roots(const Signal& polynomial, const Signal& roots) {
+void print_roots(std::FILE* to, const Signal& polynomial, const Signal& roots) {
     if (roots->points == 0) {
-        std::puts("no roots");
+        std::fputs("no roots\n", to);
         return;
     }
-    std::printf("%24s %24s %16s %10s\n", "real part", "imaginary part", "modulus", "residual");
+    std::fprintf(to, "%24s %24s %16s %10s\n", "real part", "imaginary part", "modulus", "residual");
     for (int i = 0; i < roots->points; ++i) {
         const auto z = point(roots, i);
         const double re = z.real() + 0.0;  // no -0
-        std::printf("%24.15g ", re);
+        std::fprintf(to, "%24.15g ", re);
         if (z.imag() == 0) {
-            std::printf("%24s", "");
+            std::fprintf(to, "%24s", "");
         } else {
-            std::printf("%23.15gi", z.imag());
+            std::fprintf(to, "%23.15gi", z.imag());
         }
-        std::printf(" %16.9g %10.1e\n", std::abs(z), residual(polynomial, z));
+        std::fprintf(to, " %16.9g %10.1e\n", std::abs(z), residual(polynomial, z));
     }
+}
+
+std::string json_points(const Signal& x) {
+    std::vector<std::string> points;
+    for (int i = 0; i < x->points; ++i) {
+        const auto z = point(x, i);
+        points.push_back(x->complex ? json_value({z.real(), z.imag()}) : json_number(z.real()));
+    }
+    return json_list(points);
+}
+
+void add_roots(JsonMembers& members, const Signal& polynomial, const Signal& roots) {
+    std::vector<double> residuals;
+    for (int i = 0; i < roots->points; ++i) {
+        residuals.push_back(residual(polynomial, point(roots, i)));
+    }
+    members.emplace_back("roots", json_points(roots));
+    members.emplace_back("residuals", json_numbers(residuals));
 }
 
 // ---- roots to coefficients ----
@@ -159,40 +175,60 @@ Signal polynomial_of(Signal roots) {
     return roots;
 }
 
-void print_coefficients(const Signal& polynomial, bool descending) {
-    std::printf("%6s %24s%s\n", "power", "coefficient", polynomial->complex ? "  re,im" : "");
+void print_coefficients(std::FILE* to, const Signal& polynomial, bool descending) {
+    std::fprintf(to, "%6s %24s%s\n", "power", "coefficient", polynomial->complex ? "  re,im" : "");
     const int degree = polynomial->points - 1;
     for (int i = 0; i <= degree; ++i) {
         const auto c = point(polynomial, i);
-        std::printf("%6d %24.17g", descending ? degree - i : i, c.real());
-        if (polynomial->complex) std::printf(",%.17g", c.imag());
-        std::putchar('\n');
+        std::fprintf(to, "%6d %24.17g", descending ? degree - i : i, c.real());
+        if (polynomial->complex) std::fprintf(to, ",%.17g", c.imag());
+        std::fputc('\n', to);
     }
 }
 
 // ---- the command ----
 
-void run(const RootsOptions& options) {
-    options.writing.check_without_sound(options.out, "roots and coefficients");
-    auto x = read_values(options);
-    check_finite(x.values(), x->complex);
-    const auto write = [&](const Signal& result) {
-        write_recording(options.out, {&result, 1}, options.writing);
-    };
-    if (options.from_roots) {
-        auto polynomial = polynomial_of(std::move(x));
-        if (options.descending) check(dspi_rev(polynomial), "reversing");
-        if (!options.out.empty()) return write(polynomial);
-        return print_coefficients(polynomial, options.descending);
-    }
+void multiply_out(Signal roots, const RootsOptions& options, JsonMembers& members, Page& page) {
+    auto polynomial = polynomial_of(std::move(roots));
+    if (options.descending) check(dspi_rev(polynomial), "reversing");
+    if (!options.out.empty())
+        return write_recording(options.out, {&polynomial, 1}, options.writing);
+    if (!options.files.json) return print_coefficients(page.text(), polynomial, options.descending);
+    members.emplace_back("coefficients", json_points(polynomial));
+}
+
+void find_roots(Signal x, const RootsOptions& options, JsonMembers& members, Page& page) {
     if (x->complex) throw DataError("the coefficients must be real");
     if (options.descending) check(dspi_rev(x), "reversing");
     const auto roots = [&] {
         Progress progress("finding roots");
         return roots_of(x);
     }();
-    if (!options.out.empty()) return write(roots);
-    print_roots(x, roots);
+    if (!options.out.empty()) return write_recording(options.out, {&roots, 1}, options.writing);
+    if (!options.files.json) return print_roots(page.text(), x, roots);
+    add_roots(members, x, roots);
+}
+
+void tell(Signal x, const RootsOptions& options, JsonMembers& members, Page& page) {
+    check_finite(x.values(), x->complex);
+    const auto work = options.from_roots ? multiply_out : find_roots;
+    work(std::move(x), options, members, page);
+}
+
+void run(RootsOptions& options) {
+    options.writing.check_without_sound(options.out, "roots and coefficients");
+    if (!names_files(options)) {
+        if (options.files.json) options.files.check_single(options.out, "");
+        return report("roots", options.files.json,
+                      [&](Page& page) { tell(read_values(options), options, page.members, page); });
+    }
+    options.files.names = options.values;
+    options.files.check_single(options.out, "");
+    report_files("roots", options.files, [&](const std::string& file, Page& page) {
+        auto x = first_signal(file, options.reading);
+        auto& members = page.add_signal(x);
+        tell(std::move(x), options, members, page);
+    });
 }
 
 constexpr const char* about =
@@ -205,7 +241,7 @@ keeps one m-th of its 15 digits.
 --from-roots multiplies (x - r) for all roots, written like 2, -1.5, 1+2i, 3i; the highest
 coefficient is 1. Where each root comes with its conjugate the coefficients are real.
 
-A single value that is no number names a file; - is standard input.
+A first value that is no number names a file, and so do all behind it; - is standard input.
 
 Examples:
   wavkit roots 6 -5 1
@@ -221,20 +257,19 @@ void add_roots(CLI::App& program) {
     const auto options = std::make_shared<RootsOptions>();
     command
         ->add_option("VALUE", options->values,
-                     "coefficients (with --from-roots roots), or a file of them")
+                     "coefficients (with --from-roots roots), or files of them")
         ->required()
         ->type_name("");
     command->add_flag("--from-roots", options->from_roots, "give the coefficients of these roots");
     command->add_flag("--descending", options->descending, "highest power first");
+    options->files.declare_json(*command);
+    options->files.declare_jobs(*command);
     command->add_option("-o,--output", options->out, "write the result; - is standard output")
         ->type_name("FILE");
     options->writing.declare_without_sound(*command);
     options->reading.declare(*command);
     command->footer(about);
-    command->callback([options] {
-        if (!names_a_file(options->values)) return run(*options);
-        with_data_of(options->values[0], [&] { run(*options); });
-    });
+    command->callback([options] { run(*options); });
 }
 
 }  // namespace wavkit::tool

@@ -16,6 +16,7 @@
 #include "measure/windows.hpp"
 #include "show/labels.hpp"
 #include "show/plot.hpp"
+#include "show/report.hpp"
 #include "show/spectrum_report.hpp"
 #include "show/waterfall.hpp"
 
@@ -23,6 +24,7 @@ namespace wavkit::tool {
 namespace {
 
 struct SpectrumOptions {
+    ReportFiles files;
     std::string window = "Hann", waterfall;
     ReadOptions reading;
     SpectrumSettings settings;
@@ -64,6 +66,7 @@ void check_segments(const SpectrumOptions& options) {
 void check_usage(const SpectrumOptions& options) {
     const auto& report = options.report;
     if (!report.plot.empty()) picture_of_name(report.plot);
+    options.files.check_single(report.out, report.plot + options.waterfall);
     if (!options.waterfall.empty() && picture_of_name(options.waterfall) == Picture::terminal) {
         throw UsageError("the picture of --waterfall is a .png, .svg or .pdf file");
     }
@@ -86,7 +89,7 @@ void check_usage(const SpectrumOptions& options) {
 
 /// The band and the unit that a report shows.
 SpectrumReport report_of(const SpectrumOptions& options, Spectrum spectrum, const Facts& facts,
-                         bool sound) {
+                         bool sound, bool complex, double delta) {
     const auto& report = options.report;
     Band band;
     if (!report.band.empty()) band = {report.band[0], report.band[1]};
@@ -95,7 +98,9 @@ SpectrumReport report_of(const SpectrumOptions& options, Spectrum spectrum, cons
             band,
             report.unit.empty() ? facts.axis(sound || options.reading.rate) : report.unit,
             report.look.unit_of(facts),
-            ""};
+            "",
+            complex,
+            delta};
 }
 
 /// How a spectrum was measured, in a line.
@@ -142,7 +147,8 @@ SpectrumReport measured_whole(const SpectrumOptions& options) {
     if (options.segments.slope) take_slope(x);
     if (options.segments.detrend) remove_mean(x);
     check_finite(x.values(), x->complex);
-    auto report = report_of(options, measure(x, options.settings), x.facts, source->sound);
+    auto report = report_of(options, measure(x, options.settings), x.facts, source->sound,
+                            x->complex, x->delta);
     report.caption = caption_of(options, report.spectrum, source->sound);
     check_band(report);
     return report;
@@ -153,7 +159,8 @@ SpectrumReport measured_in_segments(const SpectrumOptions& options) {
     const auto source = open_signals(input, options.reading);
     auto* const stream = source->next();
     SpectrumAverage average(options.averaging);
-    auto report = report_of(options, {}, stream->facts_of(0), source->sound);
+    auto report =
+        report_of(options, {}, stream->facts_of(0), source->sound, stream->complex, stream->delta);
     std::optional<Waterfall> waterfall;
     if (!options.waterfall.empty()) {
         waterfall.emplace(report.band, options.report.density,
@@ -183,22 +190,31 @@ SpectrumReport measured_in_segments(const SpectrumOptions& options) {
     return report;
 }
 
+void tell(const SpectrumOptions& options, Page& page) {
+    const auto report =
+        options.segmented() ? measured_in_segments(options) : measured_whole(options);
+    const auto& shown = options.report;
+    if (!shown.out.empty()) write_output(report);
+    if (!shown.plot.empty()) draw_spectrum(report);
+    if (options.files.json) return add_peaks(page, report);
+    if (shown.peaks > 0) {
+        print_peaks(page.text(), report, shown.peaks);
+    } else if (shown.out.empty() && shown.plot.empty() && options.waterfall.empty()) {
+        print_summary(page.text(), report);
+    }
+}
+
 void run(SpectrumOptions& options) {
     if (!options.waterfall.empty() && !options.segmented()) options.segments.length = usual_segment;
     options.segments.overlap = options.overlap.value_or(options.segments.overlap);
     options.averaging.type = options.type.value_or(options.averaging.type);
     check_usage(options);
     options.settings.window = window_of_name(options.window);
-    const auto& shown = options.report;
-    const auto report = with_data_of(shown.in, [&] {
-        return options.segmented() ? measured_in_segments(options) : measured_whole(options);
+    report_files("spectrum", options.files, [&](const std::string& file, Page& page) {
+        auto of_file = options;
+        of_file.report.in = file;
+        tell(of_file, page);
     });
-    if (!shown.out.empty()) write_output(report);
-    if (shown.peaks > 0) print_peaks(report, shown.peaks);
-    if (!shown.plot.empty()) draw_spectrum(report);
-    if (shown.out.empty() && shown.peaks == 0 && shown.plot.empty() && options.waterfall.empty()) {
-        print_summary(report);
-    }
 }
 
 constexpr const char* about_results =
@@ -235,6 +251,7 @@ docs/program.md has the figures for all.
 Examples:
   wavkit spectrum tone.wav --peaks 5
   wavkit spectrum log.csv --time --detrend --db --plot log.png
+  wavkit spectrum run*.wav --peaks 3 --json --jobs 4
   wavkit spectrum hour.wav --average 8192 --density --db --plot noise.png --waterfall hour.png
   wavkit spectrum readings.txt --rate 360 --window Flattop -o spectrum.csv
   wavkit convert tone.wav - --channel 2 | wavkit spectrum - --plot -)";
@@ -284,9 +301,7 @@ void add_spectrum(CLI::App& program) {
     const auto options = std::make_shared<SpectrumOptions>();
     auto& settings = options->settings;
     auto& report = options->report;
-    command->add_option("IN", report.in, "file to read; - is standard input")
-        ->required()
-        ->type_name("");
+    options->files.declare(*command);
     command->add_option("-o,--output", report.out, "write the spectrum; - is standard output")
         ->type_name("FILE");
     report.writing.declare_without_sound(*command);

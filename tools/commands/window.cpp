@@ -13,6 +13,7 @@
 #include "files/recording.hpp"
 #include "measure/windows.hpp"
 #include "show/plot.hpp"
+#include "show/report.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -24,6 +25,7 @@ struct WindowOptions {
     WriteOptions writing;
     PictureLook look;
     int points = 1024;
+    bool json = false;
 };
 
 double decibels(double ratio) { return 20 * std::log10(ratio); }
@@ -77,20 +79,28 @@ double scalloping_loss(const Response& response) {
     return worst;
 }
 
-void print_figures(int window, const Signal& w) {
+void tell(int window, const Signal& w, Page& page) {
     const double gain = statistic(dsps_mean, w), rms = statistic(dsps_rms, w);
     const auto response = response_of(window, w->points);
     const auto sidelobe = highest_sidelobe(response);
-    std::printf("window            %s, %d points\n", window_names()[std::size_t(window)].c_str(),
-                w->points);
-    std::printf("coherent gain     %.6f\n", gain);
-    std::printf("noise bandwidth   %.4f bins\n", rms * rms / (gain * gain));
+    const double noise_bandwidth = rms * rms / (gain * gain), loss = scalloping_loss(response);
+    const auto& name = window_names()[std::size_t(window)];
+    page.members = {{"window", json_text(name)},
+                    {"points", std::to_string(w->points)},
+                    {"coherent_gain", json_number(gain)},
+                    {"noise_bandwidth", json_number(noise_bandwidth)},
+                    {"highest_sidelobe_db", sidelobe ? json_number(decibels(*sidelobe)) : "null"},
+                    {"scalloping_loss_db", json_number(loss)}};
+    auto* const to = page.text();
+    std::fprintf(to, "window            %s, %d points\n", name.c_str(), w->points);
+    std::fprintf(to, "coherent gain     %.6f\n", gain);
+    std::fprintf(to, "noise bandwidth   %.4f bins\n", noise_bandwidth);
     if (sidelobe) {
-        std::printf("highest sidelobe  %.2f dB\n", decibels(*sidelobe));
+        std::fprintf(to, "highest sidelobe  %.2f dB\n", decibels(*sidelobe));
     } else {
-        std::puts("highest sidelobe  none");
+        std::fputs("highest sidelobe  none\n", to);
     }
-    std::printf("scalloping loss   %.4f dB\n", scalloping_loss(response));
+    std::fprintf(to, "scalloping loss   %.4f dB\n", loss);
 }
 
 void draw_response(int window, int points, const std::string& path, const PictureLook& look) {
@@ -118,11 +128,15 @@ void run(const WindowOptions& options) {
     }
     if (!options.out.empty()) options.writing.format_for(options.out);
     check_apart(options.out, options.plot);
+    if (options.json && (options.out == "-" || options.plot == "-")) {
+        throw UsageError("standard output takes only one of --json, -o - and --plot -");
+    }
     const int window = window_of_name(options.name);
     const auto w = samples_of(window, options.points);
     if (!options.out.empty()) write_recording(options.out, {&w, 1}, options.writing);
     if (!options.plot.empty()) draw_response(window, w->points, options.plot, options.look);
-    if (options.out.empty() && options.plot.empty()) print_figures(window, w);
+    if (!options.json && !(options.out.empty() && options.plot.empty())) return;
+    report("window", options.json, [&](Page& page) { tell(window, w, page); });
 }
 
 }  // namespace
@@ -135,6 +149,7 @@ void add_window(CLI::App& program) {
     command->add_option("--points", options->points, "length of the window (default: 1024)")
         ->check(CLI::Range(1, 1 << 24))
         ->type_name("N");
+    command->add_flag("--json", options->json, "print JSON");
     command->add_option("-o,--output", options->out, "write the samples; - is standard output")
         ->type_name("FILE");
     add_choice(*command, "--to", options->writing.format, written_formats(),

@@ -94,32 +94,53 @@ void write_output(const SpectrumReport& report) {
     write_recording(options.out, {&y, 1}, options.writing);
 }
 
-void print_peaks(const SpectrumReport& report, std::size_t count) {
+void print_peaks(std::FILE* to, const SpectrumReport& report, std::size_t count) {
     const auto peaks = shown_peaks(report, count);
     if (peaks.empty()) {
-        std::puts("no peaks");
+        std::fputs("no peaks\n", to);
         return;
     }
-    std::printf("%s %s %s\n", column_head("frequency", report.frequency_unit()).c_str(),
-                column_head("period", report.unit).c_str(),
-                column_head(quantity_name(report.options.density), report.quantity_unit()).c_str());
+    std::fprintf(
+        to, "%s %s %s\n", column_head("frequency", report.frequency_unit()).c_str(),
+        column_head("period", report.unit).c_str(),
+        column_head(quantity_name(report.options.density), report.quantity_unit()).c_str());
     for (const auto& peak : peaks) {
-        std::printf("%18.8g %18.8g %18.6g\n", peak.x, 1 / std::fabs(peak.x), peak.y);
+        std::fprintf(to, "%18.8g %18.8g %18.6g\n", peak.x, 1 / std::fabs(peak.x), peak.y);
     }
 }
 
-void print_summary(const SpectrumReport& report) {
+void print_summary(std::FILE* to, const SpectrumReport& report) {
     const auto& spectrum = report.spectrum;
     const auto name = window_names()[std::size_t(spectrum.window)];
-    if (spectrum.averaged > 1) std::printf("%ld segments of ", spectrum.averaged);
-    std::printf("%d samples through %s, transform of %d points, %s spectrum\n", spectrum.samples,
-                name.c_str(), spectrum.length, spectrum.two_sided ? "two-sided" : "one-sided");
+    if (spectrum.averaged > 1) std::fprintf(to, "%ld segments of ", spectrum.averaged);
+    std::fprintf(to, "%d samples through %s, transform of %d points, %s spectrum\n",
+                 spectrum.samples, name.c_str(), spectrum.length,
+                 spectrum.two_sided ? "two-sided" : "one-sided");
     const auto unit = printable(report.frequency_unit());
-    std::printf("bins every %s%s, from %s to %s; strongest peaks:\n\n",
-                rounded(spectrum.bins->delta).c_str(), unit.empty() ? "" : (" " + unit).c_str(),
-                rounded(spectrum.frequency(0)).c_str(),
-                rounded(spectrum.frequency(spectrum.bins->points - 1)).c_str());
-    print_peaks(report, peaks_in_summary);
+    std::fprintf(to, "bins every %s%s, from %s to %s; strongest peaks:\n\n",
+                 rounded(spectrum.bins->delta).c_str(), unit.empty() ? "" : (" " + unit).c_str(),
+                 rounded(spectrum.frequency(0)).c_str(),
+                 rounded(spectrum.frequency(spectrum.bins->points - 1)).c_str());
+    print_peaks(to, report, peaks_in_summary);
+}
+
+void add_peaks(Page& page, const SpectrumReport& report) {
+    const auto& spectrum = report.spectrum;
+    const auto& options = report.options;
+    auto& members = page.add_signal(report.complex, spectrum.samples, report.delta);
+    members.emplace_back("window", json_text(window_names()[std::size_t(spectrum.window)]));
+    members.emplace_back("length", std::to_string(spectrum.length));
+    members.emplace_back("segments", std::to_string(spectrum.averaged));
+    members.emplace_back("bin_width", json_number(spectrum.bins->delta));
+    const std::string quantity = options.density ? "density" : "amplitude";
+    std::vector<std::string> peaks;
+    for (const auto& peak :
+         shown_peaks(report, options.peaks > 0 ? options.peaks : peaks_in_summary)) {
+        peaks.push_back(
+            json_object({{"frequency", json_number(peak.x)},
+                         {quantity + (options.decibels ? "_db" : ""), json_number(peak.y)}}));
+    }
+    members.emplace_back("peaks", json_list(peaks));
 }
 
 void draw_spectrum(const SpectrumReport& report) {

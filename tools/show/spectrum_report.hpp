@@ -7,6 +7,7 @@
 #include "measure/peaks.hpp"
 #include "measure/spectrum.hpp"
 #include "show/canvas.hpp"
+#include "show/report.hpp"
 
 namespace wavkit::tool {
 
@@ -27,6 +28,8 @@ struct SpectrumReport {
     std::string unit;        // of time; empty: unknown
     std::string value_unit;  // of the samples; empty: unknown
     std::string caption;     // how it was measured
+    bool complex = false;    // the signal
+    double delta = 1;        // its spacing
 
     std::string frequency_unit() const;
     /// What the heights are counted in: "V", "1/√Hz", "dB re 1 V".
@@ -35,8 +38,11 @@ struct SpectrumReport {
 
 /// Writes the file that the options name.
 void write_output(const SpectrumReport& report);
-void print_peaks(const SpectrumReport& report, std::size_t count);
-void print_summary(const SpectrumReport& report);
+void print_peaks(std::FILE* to, const SpectrumReport& report, std::size_t count);
+void print_summary(std::FILE* to, const SpectrumReport& report);
+/// Adds how the spectrum was measured, and its peaks: as many as were asked for, or the five of
+/// the summary.
+void add_peaks(Page& page, const SpectrumReport& report);
 void draw_spectrum(const SpectrumReport& report);
 
 }  // namespace wavkit::tool
