@@ -42,8 +42,10 @@ void add_help(CLI::App& program) {
     command->footer("Example:\n  wavkit help spectrum");
     command->callback([&program, name] {
         if (!name->empty()) check_command(program, *name);
-        const auto text = name->empty() ? program.help("", CLI::AppFormatMode::Normal)
-                                        : program.get_subcommand(*name)->help(program.get_name());
+        const auto text = name->empty()
+                              ? program.get_formatter()->make_help(&program, program.get_name(),
+                                                                   CLI::AppFormatMode::Normal)
+                              : program.get_subcommand(*name)->help(program.get_name());
         std::fputs(text.c_str(), stdout);
     });
 }

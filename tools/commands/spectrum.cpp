@@ -37,7 +37,11 @@ struct SpectrumOptions {
     bool segmented() const { return segments.length > 0; }
 };
 
-constexpr int usual_segment = 1024;
+constexpr int usual_segment = 1024, suggested_segment = 8192;
+
+/// From here on a transform of the whole signal takes a second and more, and a gigabyte.
+constexpr int long_signal = 1 << 24;
+constexpr double bytes_a_sample = 40;
 
 void check_segments(const SpectrumOptions& options) {
     const auto type = options.averaging.type;
@@ -139,10 +143,20 @@ void check_band(const SpectrumReport& report) {
                     " in steps of " + rounded(spectrum.bins->delta));
 }
 
+/// Tells of a transform that hardly anybody wants.
+void suggest_average(const Signal& x, const SpectrumOptions& options) {
+    if (x->points < long_signal || options.settings.points > 0) return;
+    std::fprintf(stderr,
+                 "wavkit: a spectrum of %d samples at once takes %.1f GB of memory; --average %d "
+                 "takes next to none\n",
+                 x->points, bytes_a_sample * x->points / 1e9, suggested_segment);
+}
+
 SpectrumReport measured_whole(const SpectrumOptions& options) {
     InputFile input(options.report.in);
     const auto source = open_signals(input, options.reading);
     auto x = first_signal(*source);
+    suggest_average(x, options);
     Progress progress("transforming");
     if (options.segments.slope) take_slope(x);
     if (options.segments.detrend) remove_mean(x);

@@ -84,7 +84,7 @@ void tell(int window, const Signal& w, Page& page) {
     const auto response = response_of(window, w->points);
     const auto sidelobe = highest_sidelobe(response);
     const double noise_bandwidth = rms * rms / (gain * gain), loss = scalloping_loss(response);
-    const auto& name = window_names()[std::size_t(window)];
+    const auto name = window_names()[std::size_t(window)];
     page.members = {{"window", json_text(name)},
                     {"points", std::to_string(w->points)},
                     {"coherent_gain", json_number(gain)},
