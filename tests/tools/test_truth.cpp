@@ -100,7 +100,7 @@ TEST_F(TruthTest, FiguresAreThoseOfAPerson) {
         EXPECT_NE(text.find(line), text.npos) << line << text;
     EXPECT_EQ(text.find("-nan"), text.npos);
     write("short.dsp", Signals{real<dsp>({1, 2, 3}, 0.1), real<dsp>({1}, 0.0010000000004L)});
-    EXPECT_NE(printed("stats short.dsp --json").find("\"duration\": 0.3,"), text.npos);
+    EXPECT_NE(printed("stats short.dsp --json").find("\"duration\":0.3,"), text.npos);
     const auto shown = printed("info short.dsp");
     EXPECT_NE(shown.find("duration  0.3\n"), shown.npos) << shown;
     EXPECT_NE(shown.find("delta     0.001\n"), shown.npos) << shown;
