@@ -32,7 +32,7 @@ void check_usage(const CutOptions& options) {
             throw UsageError("with --samples places are whole numbers, not " + number(*place));
         }
     }
-    if (options.to && !(options.from.value_or(0) < *options.to)) {
+    if (options.to && !(options.from.value_or(-INFINITY) < *options.to)) {
         throw UsageError("--end lies behind --begin");
     }
 }
@@ -41,7 +41,7 @@ void check_usage(const CutOptions& options) {
 std::int64_t sample_from(double place) {
     const double nearest = std::round(place);
     const double sample = std::fabs(place - nearest) < 1e-6 ? nearest : std::ceil(place);
-    return sample < 9e18 ? std::int64_t(sample) : endless;
+    return sample < 9e18 ? std::int64_t(std::max(sample, 0.0)) : endless;
 }
 
 /// The samples to keep, up to but not including the last.
@@ -49,13 +49,14 @@ struct Extent {
     std::int64_t first, last;
 };
 
-Extent extent_of(const CutOptions& options, double delta) {
+Extent extent_of(const CutOptions& options, double delta, double start) {
     if (!options.samples && !(delta > 0)) {
         throw DataError("a spacing of " + number(delta) + " gives no times; cut by --samples");
     }
-    const double step = options.samples ? 1 : delta, from = options.from.value_or(0);
+    const double step = options.samples ? 1 : delta, origin = options.samples ? 0 : start;
+    const double from = options.from ? *options.from - origin : 0;
     Extent extent{sample_from(from / step), endless};
-    if (options.to) extent.last = sample_from(*options.to / step);
+    if (options.to) extent.last = sample_from((*options.to - origin) / step);
     if (options.length) extent.last = sample_from((from + *options.length) / step);
     return extent;
 }
@@ -63,8 +64,8 @@ Extent extent_of(const CutOptions& options, double delta) {
 /// Keeps the samples of an extent.
 class Cut : public BlockChange {
   public:
-    Cut(const Extent& extent, double step, std::size_t width)
-        : extent_(extent), step_(step), width_(width) {}
+    Cut(const Extent& extent, double start, double step, std::size_t width)
+        : extent_(extent), start_(start), step_(step), width_(width) {}
 
     std::span<const double> pass(std::span<double> values) override {
         const auto count = std::int64_t(values.size() / width_);
@@ -77,7 +78,7 @@ class Cut : public BlockChange {
     bool complete() const override { return position_ >= extent_.last; }
 
     void finish() override {
-        const auto end = number(double(position_) * step_);
+        const auto end = rounded(start_ + double(position_) * step_);
         if (position_ <= extent_.first) {
             throw DataError("there is nothing to keep: the signal ends at " + end);
         }
@@ -88,7 +89,7 @@ class Cut : public BlockChange {
 
   private:
     Extent extent_;
-    double step_;  // of the places that the user counts in
+    double start_, step_;  // of the places that the user counts in
     std::size_t width_;
     std::int64_t position_ = 0;
 };
@@ -96,13 +97,17 @@ class Cut : public BlockChange {
 void run(const CutOptions& options) {
     check_usage(options);
     pass_through(options.files, "cutting", [&](const SampleStream& stream, SignalShape& shape) {
-        const auto extent = extent_of(options, stream.delta);
+        const double start = stream.facts_of(0).start;
+        const auto extent = extent_of(options, stream.delta, start);
         if (shape.points) {
             const auto points = std::int64_t(*shape.points);
             const auto first = std::min(extent.first, points);
-            shape.points = std::size_t(std::min(extent.last, points) - first);
+            shape.points = std::size_t(std::clamp(extent.last, first, points) - first);
         }
-        return std::make_unique<Cut>(extent, options.samples ? 1 : stream.delta,
+        shape.facts.resize(stream.channels);
+        for (auto& facts : shape.facts) facts.start += double(extent.first) * stream.delta;
+        return std::make_unique<Cut>(extent, options.samples ? 0 : start,
+                                     options.samples ? 1 : stream.delta,
                                      stream.channels * (stream.complex ? 2 : 1));
     });
 }
@@ -124,11 +129,11 @@ void add_cut(CLI::App& program) {
     auto* const command = program.add_subcommand("cut", "Keeps part of every signal in a file.");
     const auto options = std::make_shared<CutOptions>();
     options->files.declare(*command);
-    command->add_option("--begin", options->from, "the first time (or sample) to keep (default: 0)")
-        ->check(number_between(0, 1e300))
+    command->add_option("--begin", options->from, "the first time (or sample) to keep")
+        ->check(number_between(-1e300, 1e300))
         ->type_name("T");
     auto* const to = command->add_option("--end", options->to, "the first one behind what is kept")
-                         ->check(number_between(0, 1e300))
+                         ->check(number_between(-1e300, 1e300))
                          ->type_name("T");
     command->add_option("--length", options->length, "how much to keep, in place of --end")
         ->check(number_between(0, 1e300))

@@ -36,17 +36,27 @@ std::vector<double> means_of(SampleStream& stream, Progress& progress) {
     return sums;
 }
 
+/// The unit of a slope or of an area, where that of the values is known.
+void change_unit(SignalShape& shape, const char* between) {
+    for (auto& facts : shape.facts) {
+        const auto axis = facts.axis_unit;
+        facts.unit = facts.unit.empty() || axis.empty() ? "" : facts.unit + between + axis;
+    }
+}
+
 struct DeriveOptions {
     PassOptions files;
     bool from_zero = false;
 };
 
 void derive(const DeriveOptions& options) {
-    pass_through(options.files, "differentiating", [&](const SampleStream& stream, SignalShape&) {
-        if (!(stream.delta > 0))
-            throw DataError("a spacing of " + number(stream.delta) + " has no slopes");
-        return std::make_unique<Derivative>(stream.delta, width_of(stream), options.from_zero);
-    });
+    pass_through(
+        options.files, "differentiating", [&](const SampleStream& stream, SignalShape& shape) {
+            if (!(stream.delta > 0))
+                throw DataError("a spacing of " + number(stream.delta) + " has no slopes");
+            change_unit(shape, "/");
+            return std::make_unique<Derivative>(stream.delta, width_of(stream), options.from_zero);
+        });
 }
 
 struct IntegrateOptions {
@@ -61,7 +71,8 @@ void integrate(const IntegrateOptions& options) {
         while (auto* const stream = source.next()) means.push_back(means_of(*stream, progress));
     };
     std::size_t signal = 0;
-    const auto make = [&](const SampleStream& stream, SignalShape&) {
+    const auto make = [&](const SampleStream& stream, SignalShape& shape) {
+        change_unit(shape, " ");
         auto offsets = options.detrend ? means.at(signal++) : std::vector<double>(width_of(stream));
         return std::make_unique<Integral>(stream.delta, std::move(offsets));
     };

@@ -9,6 +9,7 @@
 #include "base/number.hpp"
 #include "base/options.hpp"
 #include "base/progress.hpp"
+#include "base/text.hpp"
 #include "commands/commands.hpp"
 #include "files/block_writer.hpp"
 #include "files/output.hpp"
@@ -17,6 +18,7 @@
 #include "files/writing.hpp"
 #include "measure/edges.hpp"
 #include "measure/prepare.hpp"
+#include "show/labels.hpp"
 #include "show/report.hpp"
 
 namespace wavkit::tool {
@@ -43,6 +45,7 @@ struct Range {
 /// One channel in the making.
 struct Channel {
     double level, hysteresis;
+    Facts facts;
     EdgeFinder finder;
     EdgeSummary summary;
     std::vector<Edge> edges;  // where they are wanted
@@ -133,19 +136,21 @@ class EdgesOfFile {
         }
     }
 
-    Channel channel(std::size_t signal) const {
+    Channel channel(std::size_t signal, const Facts& facts) const {
         const auto range = ranges_.empty() ? Range{0, 0} : ranges_[signal];
         const bool empty = range.low > range.high;
         const double level = options_.level.value_or(empty ? 0 : (range.low + range.high) / 2);
         const double width = empty ? 0 : usual_hysteresis * (range.high - range.low);
         const double hysteresis = options_.hysteresis.value_or(options_.level ? 0 : width);
-        return {level, hysteresis, {level, hysteresis}, {}, {}};
+        return {level, hysteresis, facts, {level, hysteresis}, {}, {}};
     }
 
     void find_edges(SampleStream& stream, Progress& progress) {
         const bool kept = options_.times;
         std::vector<Channel> channels;
-        for (std::size_t c = 0; c < stream.channels; ++c) channels.push_back(channel(signal_ + c));
+        for (std::size_t c = 0; c < stream.channels; ++c) {
+            channels.push_back(channel(signal_ + c, stream.facts_of(c)));
+        }
         if (list_) list_->begin();
         const auto points = each_block(stream, progress, [&](std::span<const double> values) {
             for (std::size_t i = 0; i < values.size(); ++i) {
@@ -154,7 +159,7 @@ class EdgesOfFile {
                 if (!edge) continue;
                 c.summary.add(*edge);
                 if (kept) c.edges.push_back(*edge);
-                if (list_) list_->add(edge->place * stream.delta, edge->rising);
+                if (list_) list_->add(c.facts.start + edge->place * stream.delta, edge->rising);
             }
         });
         if (list_) list_->end();
@@ -176,8 +181,8 @@ class EdgesOfFile {
                                                          {"hysteresis", c.hysteresis},
                                                          {"rising", s.rising()},
                                                          {"falling", s.falling()}};
-        if (s.first()) list.emplace_back("first_at", *s.first() * delta);
-        if (s.last()) list.emplace_back("last_at", *s.last() * delta);
+        if (s.first()) list.emplace_back("first_at", c.facts.start + *s.first() * delta);
+        if (s.last()) list.emplace_back("last_at", c.facts.start + *s.last() * delta);
         if (s.periods().count() > 0) {
             list.emplace_back("frequency", 1 / (s.periods().mean() * delta));
             list.emplace_back("period", s.periods().mean() * delta);
@@ -192,7 +197,7 @@ class EdgesOfFile {
     }
 
     void add_json(const Channel& c, std::size_t points, double delta) {
-        auto& members = page_.add_signal(false, double(points), delta);
+        auto& members = page_.add_signal(false, double(points), delta, c.facts);
         for (const auto& [name, value] : figures(c, delta)) {
             members.emplace_back(name, json_number(value));
         }
@@ -200,7 +205,7 @@ class EdgesOfFile {
         for (const bool rising : {true, false}) {
             std::vector<double> times;
             for (const auto& edge : c.edges) {
-                if (edge.rising == rising) times.push_back(edge.place * delta);
+                if (edge.rising == rising) times.push_back(c.facts.start + edge.place * delta);
             }
             members.emplace_back(rising ? "rising_at" : "falling_at", json_numbers(times));
         }
@@ -212,17 +217,19 @@ class EdgesOfFile {
         for (auto [name, value] : figures(c, delta)) {
             const bool time =
                 name.starts_with("period") || name.ends_with("time") || name.ends_with("at");
-            const char* const unit = !seconds_             ? ""
-                                     : name == "frequency" ? " Hz"
-                                     : time                ? " s"
-                                                           : "";
+            const auto axis = c.facts.axis(seconds_);
+            const auto unit = printable(name == "frequency" ? inverse_unit(axis)
+                                        : time              ? axis
+                                                            : "");
             std::ranges::replace(name, '_', ' ');
-            std::fprintf(to, "%-18s %.9g%s\n", name.c_str(), value, unit);
+            std::fprintf(to, "%-18s %s%s%s\n", name.c_str(), rounded(value).c_str(),
+                         unit.empty() ? "" : " ", unit.c_str());
         }
         if (!options_.times) return;
         std::fprintf(to, "\n%18s  edge\n", "time");
         for (const auto& edge : c.edges) {
-            std::fprintf(to, "%18.9g  %s\n", edge.place * delta, edge.rising ? "rises" : "falls");
+            std::fprintf(to, "%18.9g  %s\n", c.facts.start + edge.place * delta,
+                         edge.rising ? "rises" : "falls");
         }
     }
 

@@ -27,7 +27,7 @@ struct MixOptions {
 
 /// The layout that holds every one of some streams.
 SignalShape common_shape(std::span<SampleStream* const> streams, const SeveralInputs& inputs) {
-    SignalShape shape{streams[0]->delta, false, 1, std::nullopt};
+    SignalShape shape{streams[0]->delta, false, 1, std::nullopt, streams[0]->facts};
     for (const auto* stream : streams) {
         shape.complex = shape.complex || stream->complex;
         shape.channels = std::max(shape.channels, stream->channels);
@@ -38,6 +38,8 @@ SignalShape common_shape(std::span<SampleStream* const> streams, const SeveralIn
         throw Error(inputs.name(i) + " has " + std::to_string(channels) + " channels, others " +
                     std::to_string(shape.channels));
     }
+    // What a file of one channel tells holds for all.
+    shape.facts.resize(shape.channels, shape.facts_of(0));
     return shape;
 }
 
@@ -151,10 +153,13 @@ class MixRun {
     }
 
     void set_side_by_side(std::span<SampleStream* const> streams) {
-        SignalShape shape{streams[0]->delta, false, 0, longest(streams)};
+        SignalShape shape{streams[0]->delta, false, 0, longest(streams), {}};
         for (const auto* stream : streams) {
             shape.complex = shape.complex || stream->complex;
             shape.channels += stream->channels;
+            for (std::size_t c = 0; c < stream->channels; ++c) {
+                shape.facts.push_back(stream->facts_of(c));
+            }
         }
         Blocks blocks(inputs_);
         for (auto* const stream : streams) blocks.add(*stream, shape.complex, stream->channels);

@@ -16,6 +16,7 @@ struct ScaleOptions {
     PassOptions files;
     std::optional<double> gain, decibels, offset;
     std::vector<std::string> points;  // of a calibration
+    std::string unit;
 };
 
 /// value = gain (x - from) + to, which is exact at the first point of a calibration.
@@ -74,7 +75,11 @@ class Scale : public BlockChange {
 void run(const ScaleOptions& options) {
     check_usage(options);
     const auto line = line_of(options);
-    pass_through(options.files, "scaling", [&](const SampleStream& stream, SignalShape&) {
+    pass_through(options.files, "scaling", [&](const SampleStream& stream, SignalShape& shape) {
+        shape.facts.resize(stream.channels);
+        if (!options.unit.empty()) {
+            for (auto& facts : shape.facts) facts.unit = options.unit;
+        }
         return std::make_unique<Scale>(line, stream.complex);
     });
 }
@@ -83,11 +88,12 @@ constexpr const char* about =
     R"(Every value becomes GAIN times itself plus OFFSET. --calibrate takes both from two points of a
 straight line, each the value in the file and the one that it stands for: 4=0 20=100 makes percent
 of a current loop's milliamperes. Of a complex signal the offset is that of the real parts. Every
-signal of a file is scaled, and all channels. The recording may be longer than memory.
+signal of a file is scaled, and all channels. --unit names the unit of the new values, where the
+file has a place for it. The recording may be longer than memory.
 
 Examples:
   wavkit scale quiet.wav --db 12 -o louder.wav
-  wavkit scale adc.csv --calibrate 0=-10 4095=10 -o volts.csv
+  wavkit scale adc.csv --calibrate 0=-10 4095=10 --unit V -o volts.csv
   wavkit scale thermometer.dsp --gain 1.8 --offset 32 -o fahrenheit.dsp)";
 
 }  // namespace
@@ -110,6 +116,7 @@ void add_scale(CLI::App& program) {
     command->add_option("--calibrate", options->points, "two values and what they stand for")
         ->expected(2)
         ->type_name("X1=Y1 X2=Y2");
+    command->add_option("--unit", options->unit, "unit of the new values")->type_name("UNIT");
     command->footer(about);
     command->callback([options] { run(*options); });
 }

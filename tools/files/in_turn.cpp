@@ -43,6 +43,7 @@ class InTurnWriter : public BlockWriter {
         alone.points = 0;
         for (const auto scalars : runs_) *alone.points += scalars / width();
         for (std::size_t c = 0; c < shape_.channels; ++c) {
+            alone.facts = {shape_.facts_of(c)};
             writer_->begin(alone);
             hand_on(c);
             writer_->end();

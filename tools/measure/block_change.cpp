@@ -13,7 +13,7 @@ constexpr std::size_t block_points = 1 << 15;
 
 std::unique_ptr<BlockWriter> writer_of(std::FILE* to, Format format, const WriteOptions& options) {
     auto writer = block_writer(to, format, options);
-    return is_sound(format) ? std::move(writer) : in_turn(std::move(writer));
+    return takes_channels(format) ? std::move(writer) : in_turn(std::move(writer));
 }
 
 void change_all(InputFile& input, const PassOptions& options, const std::string& doing,
@@ -27,7 +27,8 @@ void change_all(InputFile& input, const PassOptions& options, const std::string&
     Progress progress(doing + " " + input.name());
     std::vector<double> block;
     while (auto* const stream = source->next()) {
-        SignalShape shape{stream->delta, stream->complex, stream->channels, stream->length};
+        SignalShape shape{stream->delta, stream->complex, stream->channels, stream->length,
+                          stream->facts};
         const auto change = make(*stream, shape);
         output.writer().begin(shape);
         block.resize(block_points * stream->channels * (stream->complex ? 2 : 1));

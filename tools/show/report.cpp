@@ -138,15 +138,23 @@ std::string Page::written() {
 }
 
 JsonMembers& Page::add_signal(const Signal& x) {
-    return add_signal(x->complex, x->points, x->delta);
+    return add_signal(x->complex, x->points, x->delta, x.facts);
 }
 
-JsonMembers& Page::add_signal(bool complex, double points, double delta) {
+JsonMembers& Page::add_signal(bool complex, double points, double delta, const Facts& facts) {
     signals.push_back({{"signal", std::to_string(signals.size() + 1)},
                        {"complex", complex ? "true" : "false"},
                        {"points", json_number(points)},
                        {"delta", json_number(delta)}});
-    return signals.back();
+    auto& members = signals.back();
+    if (facts.start != 0) members.emplace_back("start", json_number(facts.start));
+    for (const auto& [name, text] : {std::pair("origin", facts.origin),
+                                     {"axis_unit", facts.axis_unit},
+                                     {"name", facts.name},
+                                     {"unit", facts.unit}}) {
+        if (!text.empty()) members.emplace_back(name, json_text(text));
+    }
+    return members;
 }
 
 void ReportFiles::declare(CLI::App& command) {

@@ -31,7 +31,7 @@ class Page {
 
     /// Members that describe a signal, the next one of `signals`, to which a command adds its own.
     JsonMembers& add_signal(const Signal& x);
-    JsonMembers& add_signal(bool complex, double points, double delta);
+    JsonMembers& add_signal(bool complex, double points, double delta, const Facts& facts = {});
 
   private:
     char* bytes_ = nullptr;
