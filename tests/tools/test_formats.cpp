@@ -106,6 +106,12 @@ TEST_F(FormatsTest, TheStartTravels) {
     const std::pair<std::string, std::string> lines[] = {
         {"convert x.csv - --to text | wavkit convert - - --to csv --with-time", "\n10.5,4\n"},
         {"filter x.csv --taps one.txt --to csv --with-time", "\n10.5,4\n"},
+        {"cut x.csv --begin 10.4 --to csv --with-time", "u\n10.5,4\n"},
+        {"join x.csv x.csv --channels --to csv --with-time", "\n10.5,4,4\n"},
+        {"mix x.csv x.csv --to csv --with-time", "\n10.5,8\n"},
+        {"scale x.csv --gain 2 --unit m --to csv", "# start = 10\n# axis = s\nu (m)\n2\n"},
+        {"derive x.csv --to csv", "# start = 10\n"},
+        {"edges x.csv --level 2.5 --json", "\"first_at\":10.25"},
         {"decimate x.csv --by 2 --to csv", "# start = 10\n"},
         {"resample x.csv --to-times at.txt --to csv", "u\n3.0"},
         {"envelope x.csv --to csv -o - --with-time", "time (s),u\n10,"},
@@ -114,7 +120,7 @@ TEST_F(FormatsTest, TheStartTravels) {
         {"interp x.csv --rate 4", "\n10.25,2.5\n"},
         {"stats x.csv", "max at                 10.5 s\n"},
         {"info x.csv", "start     10 s\n"},
-        {"fit x.csv --json", "\"mean_x\": 11"},
+        {"fit x.csv --json", "\"mean_x\":11"},
         {"correlate one.txt x.csv --delta 0.5", "lag          10.5\n"},
         {"convert one.txt - --start -3 --to csv --with-time", "\n-3,1\n"},
     };

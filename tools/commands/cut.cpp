@@ -99,6 +99,9 @@ void run(const CutOptions& options) {
     pass_through(options.files, "cutting", [&](const SampleStream& stream, SignalShape& shape) {
         const double start = stream.facts_of(0).start;
         const auto extent = extent_of(options, stream.delta, start);
+        if (extent.last <= extent.first) {
+            throw DataError("there is nothing to keep: the signal begins at " + rounded(start));
+        }
         if (shape.points) {
             const auto points = std::int64_t(*shape.points);
             const auto first = std::min(extent.first, points);

@@ -135,6 +135,7 @@ void print_roots(std::FILE* to, const Signal& polynomial, const Signal& roots) {
 
 std::string json_points(const Signal& x) {
     std::vector<std::string> points;
+    points.reserve(std::size_t(x->points));
     for (int i = 0; i < x->points; ++i) {
         const auto z = point(x, i);
         points.push_back(x->complex ? json_value({z.real(), z.imag()}) : json_number(z.real()));
@@ -144,6 +145,7 @@ std::string json_points(const Signal& x) {
 
 void add_roots(JsonMembers& members, const Signal& polynomial, const Signal& roots) {
     std::vector<double> residuals;
+    residuals.reserve(std::size_t(roots->points));
     for (int i = 0; i < roots->points; ++i) {
         residuals.push_back(residual(polynomial, point(roots, i)));
     }
