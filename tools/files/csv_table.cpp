@@ -151,7 +151,7 @@ std::optional<Found> find_rows(const std::vector<PeekedLine>& lines, const Diale
             };
             while (!fits(kinds[found.first])) ++found.first;
             // Rows whose values are missing are rows where a heading or another table ends above.
-            while (found.first > start && kinds[found.first - 1].is_gap() &&
+            while (found.first > 0 && kinds[found.first - 1].is_gap() &&
                    kinds[found.first - 1].has_width(found.width)) {
                 --found.first;
             }
@@ -219,6 +219,9 @@ class HeadingFinder {
                 take(names, above);
                 table_.guesses.push_back("line " + std::to_string(line_above(0)) +
                                          " is taken for the units of the columns");
+            } else if (std::ranges::all_of(above, in_brackets)) {
+                used = 1;
+                take(std::vector<std::string>(above.size()), above);
             } else {
                 used = 1;
                 take(above, {});
@@ -257,6 +260,11 @@ class HeadingFinder {
         const bool any = std::ranges::any_of(fields, [](auto f) { return !f.empty(); });
         if (fields.size() != table_.width || !any) return {};
         return {fields.begin(), fields.end()};
+    }
+
+    static bool in_brackets(std::string_view field) {
+        return field.size() > 2 && ((field.front() == '(' && field.back() == ')') ||
+                                    (field.front() == '[' && field.back() == ']'));
     }
 
     static void join_units(Fields& fields) {
