@@ -146,15 +146,15 @@ JsonMembers& Page::add_signal(bool complex, double points, double delta, const F
                        {"complex", complex ? "true" : "false"},
                        {"points", json_number(points)},
                        {"delta", json_number(delta)}});
-    auto& members = signals.back();
-    if (facts.start != 0) members.emplace_back("start", json_number(facts.start));
+    auto& added = signals.back();
+    if (facts.start != 0) added.emplace_back("start", json_number(facts.start));
     for (const auto& [name, text] : {std::pair("origin", facts.origin),
                                      {"axis_unit", facts.axis_unit},
                                      {"name", facts.name},
                                      {"unit", facts.unit}}) {
-        if (!text.empty()) members.emplace_back(name, json_text(text));
+        if (!text.empty()) added.emplace_back(name, json_text(text));
     }
-    return members;
+    return added;
 }
 
 void ReportFiles::declare(CLI::App& command) {
