@@ -14,7 +14,8 @@ constexpr std::size_t block_points = 1 << 14;
 
 /// Takes in what is left of a stream, each of its channels as a signal.
 void collect(SampleStream& stream, std::vector<Signal>& signals, Progress& progress) {
-    const std::size_t first = signals.size(), channels = stream.channels;
+    const std::size_t first = signals.size();
+    const auto channels = std::max<std::size_t>(stream.channels, 1);
     for (std::size_t c = 0; c < channels; ++c) {
         signals.emplace_back(stream.delta);
         signals.back().facts = stream.facts_of(c);
