@@ -87,7 +87,7 @@ class Panel {
           upwards_(y_range(curve)),
           x_(axis_scale(curve.x_label, curve.x_unit, across_.largest())),
           y_(axis_scale(curve.y_label, curve.y_unit, upwards_.largest())),
-          points_(thinned(curve, canvas.characters ? 200 : 4000)) {}
+          points_(thinned(curve, columns())) {}
 
     void write() const {
         std::fputs("unset label\nunset arrow\n", script_);
@@ -104,7 +104,7 @@ class Panel {
     void write_plot() const {
         const bool characters = canvas_.characters;
         if (curve_.style == Style::boxes) {
-            const double boxes = double(samples_a_step(curve_, 4000));
+            const double boxes = double(samples_a_step(curve_, columns()));
             std::fprintf(script_, "set boxwidth %s\n",
                          number(boxes * curve_.box_width * x_.factor).c_str());
         }
@@ -129,6 +129,9 @@ class Panel {
     }
 
   private:
+    /// As many points as the picture can tell apart.
+    std::size_t columns() const { return canvas_.characters ? 200 : 4000; }
+
     void write_range(char axis, const Range& range, double factor) const {
         std::fprintf(script_, "set %crange [%s:%s]\n", axis, number(range.low * factor).c_str(),
                      number(range.high * factor).c_str());
