@@ -1,5 +1,6 @@
 #include "base/text.hpp"
 
+#include <algorithm>
 #include <array>
 #include <cstdint>
 #include <cstdio>
@@ -14,6 +15,7 @@ struct Character {
 };
 
 Character first_character(std::string_view text) {
+    if (text.empty()) return {};
     const auto byte = [&](std::size_t i) { return static_cast<unsigned char>(text[i]); };
     const auto lead = byte(0);
     if (lead < 0x80) return {lead, 1};
@@ -21,7 +23,7 @@ Character first_character(std::string_view text) {
     if (lead < 0xC2 || lead > 0xF4 || text.size() < bytes) return {};
     std::uint32_t code = lead & (0xFFu >> (bytes + 1));
     for (std::size_t i = 1; i < bytes; ++i) {
-        if ((byte(i) & 0xC0) != 0x80) return {};
+        if (!continues_character(text[i])) return {};
         code = code << 6 | (byte(i) & 0x3Fu);
     }
     // Codes have one form, the shortest, and halves of pairs are none.
@@ -49,6 +51,12 @@ std::string escape(char c) {
 }
 
 }  // namespace
+
+std::size_t character_length(std::string_view text) { return first_character(text).bytes; }
+
+std::size_t letters_in(std::string_view text) {
+    return text.size() - std::size_t(std::ranges::count_if(text, continues_character));
+}
 
 std::string printable(std::string_view text) {
     std::string result;

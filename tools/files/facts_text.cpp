@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "base/number.hpp"
+#include "base/text.hpp"
 #include "files/csv_row.hpp"
 
 namespace wavkit::tool {
@@ -55,28 +56,9 @@ bool is_known_unit(std::string_view text) {
     return std::ranges::count(units, text) > 0 || seconds_of(text) > 0;
 }
 
-/// The length of the UTF-8 character at the start of a text, 0 where there is none.
-std::size_t utf8_length(std::string_view text) {
-    const auto lead = static_cast<unsigned char>(text[0]);
-    const std::size_t length = lead < 0x80       ? 1
-                               : lead >> 5 == 6  ? 2
-                               : lead >> 4 == 14 ? 3
-                               : lead >> 3 == 30 ? 4
-                                                 : 0;
-    if (length == 0 || length > text.size() || lead == 0xC0 || lead == 0xC1) return 0;
-    std::uint32_t code = length == 1 ? lead : lead & (0x7Fu >> length);
-    for (std::size_t i = 1; i < length; ++i) {
-        const auto next = static_cast<unsigned char>(text[i]);
-        if (next >> 6 != 2) return 0;
-        code = code << 6 | (next & 0x3Fu);
-    }
-    const bool overlong = (length == 3 && code < 0x800) || (length == 4 && code < 0x10000);
-    return overlong || code >> 11 == 27 || code > 0x10FFFF ? 0 : length;
-}
-
 bool is_utf8(std::string_view text) {
     while (!text.empty()) {
-        const auto length = utf8_length(text);
+        const auto length = character_length(text);
         if (length == 0) return false;
         text.remove_prefix(length);
     }

@@ -11,6 +11,7 @@
 
 #include "base/error.hpp"
 #include "base/number.hpp"
+#include "base/text.hpp"
 #include "files/csv_row.hpp"
 #include "files/facts_text.hpp"
 #include "files/mat_format.hpp"
@@ -391,8 +392,7 @@ class MatWriter : public BlockWriter {
     void put_text(const std::string& what, const std::string& text) {
         if (text.empty()) return;
         Element element;
-        const auto length = std::ranges::count_if(text, [](char c) { return (c & 0xC0) != 0x80; });
-        element.head(mat::class_char, 1, std::uint64_t(length), name_ + "_" + what);
+        element.head(mat::class_char, 1, letters_in(text), name_ + "_" + what);
         element.text(mat::utf8, text);
         put_variable(element.bytes());
     }

@@ -135,7 +135,7 @@ std::string Canvas::at(double x, double y) const {
 void Canvas::write_title(std::FILE* script, const std::string& text) const {
     auto shown = printable(text);
     const auto begins_none = [&](std::size_t i) {
-        return i < shown.size() && (static_cast<unsigned char>(shown[i]) & 0xC0) == 0x80;
+        return i < shown.size() && continues_character(shown[i]);
     };
     const double excess = (1.12 * width_of(shown) - width) / letter_width;
     if (excess > -3) {
@@ -161,10 +161,7 @@ void Canvas::write_caption(std::FILE* script, const std::string& text) const {
 }
 
 double Canvas::width_of(const std::string& text) const {
-    // A character for every byte that does not continue one.
-    const auto letters = std::ranges::count_if(
-        printable(text), [](char c) { return (static_cast<unsigned char>(c) & 0xC0) != 0x80; });
-    return double(letters) * letter_width;
+    return double(letters_in(printable(text))) * letter_width;
 }
 
 }  // namespace wavkit::tool

@@ -1,35 +1,14 @@
 #include "show/json.hpp"
 
+#include <algorithm>
 #include <array>
 #include <cmath>
 #include <cstdio>
 
 #include "base/number.hpp"
+#include "base/text.hpp"
 
 namespace wavkit::tool {
-namespace {
-
-unsigned char byte_at(const std::string& text, std::size_t i) {
-    return i < text.size() ? static_cast<unsigned char>(text[i]) : 0;
-}
-
-/// The bytes of the UTF-8 character that begins at `i`, 0 where none does (RFC 3629).
-std::size_t character_at(const std::string& text, std::size_t i) {
-    const auto first = byte_at(text, i), second = byte_at(text, i + 1);
-    const std::size_t length = first < 0x80                    ? 1
-                               : first >= 0xC2 && first < 0xE0 ? 2
-                               : first >= 0xE0 && first < 0xF0 ? 3
-                               : first >= 0xF0 && first < 0xF5 ? 4
-                                                               : 0;
-    for (std::size_t k = 1; k < length; ++k) {
-        if ((byte_at(text, i + k) & 0xC0) != 0x80) return 0;
-    }
-    const bool overlong = (first == 0xE0 && second < 0xA0) || (first == 0xF0 && second < 0x90);
-    const bool beyond = (first == 0xED && second >= 0xA0) || (first == 0xF4 && second >= 0x90);
-    return overlong || beyond ? 0 : length;
-}
-
-}  // namespace
 
 std::string json_number(double value) { return std::isfinite(value) ? number(value) : "null"; }
 
@@ -37,11 +16,11 @@ std::string json_value(const std::vector<double>& parts) {
     return parts.size() == 1 ? json_number(parts[0]) : json_numbers(parts);
 }
 
-std::string json_text(const std::string& text) {
+std::string json_text(std::string_view text) {
     std::string result = "\"";
-    for (std::size_t i = 0; i < text.size();) {
-        const auto length = character_at(text, i);
-        const auto c = byte_at(text, i);
+    while (!text.empty()) {
+        const auto length = character_length(text);
+        const auto c = static_cast<unsigned char>(text[0]);
         if (length == 0) {
             result += "\xEF\xBF\xBD";
         } else if (c < 0x20 || c == 0x7F) {
@@ -50,9 +29,9 @@ std::string json_text(const std::string& text) {
             result += code.data();
         } else {
             if (c == '"' || c == '\\') result += '\\';
-            result.append(text, i, length);
+            result += text.substr(0, length);
         }
-        i += length == 0 ? 1 : length;
+        text.remove_prefix(std::max<std::size_t>(length, 1));
     }
     return result += '"';
 }

@@ -3,6 +3,7 @@
 
 #include <span>
 #include <string>
+#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -17,7 +18,7 @@ std::string json_number(double value);
 std::string json_value(const std::vector<double>& parts);
 
 /// Text in quotes. Bytes that are no UTF-8 become U+FFFD.
-std::string json_text(const std::string& text);
+std::string json_text(std::string_view text);
 
 std::string json_object(const JsonMembers& members);
 

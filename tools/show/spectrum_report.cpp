@@ -53,9 +53,7 @@ void write_table(std::FILE* to, const SpectrumReport& report) {
 /// The head of a column of 18 characters.
 std::string column_head(const std::string& name, const std::string& unit) {
     const auto text = printable(with_unit(name, unit));
-    const auto letters = std::size_t(std::ranges::count_if(
-        text, [](char c) { return (static_cast<unsigned char>(c) & 0xC0) != 0x80; }));
-    return std::string(18 - std::min<std::size_t>(letters, 18), ' ') + text;
+    return std::string(18 - std::min<std::size_t>(letters_in(text), 18), ' ') + text;
 }
 
 /// The strongest peaks, as high as they are drawn.
