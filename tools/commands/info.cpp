@@ -59,7 +59,7 @@ void describe(std::FILE* to, const Signal& x, bool sound) {
              rounded(x.facts.start) + of_axis +
                  (x.facts.origin.empty() ? "" : " after " + x.facts.origin));
     }
-    line(to, "duration", rounded(x->points * x->delta) + of_axis);
+    line(to, "duration", rounded(time_of(x->points, x->delta)) + of_axis);
     if (x->points == 0) return;
     line(to, "mean", point(dsps_mean, x));
     line(to, "rms", point(dsps_rms, x));
@@ -70,7 +70,7 @@ void describe(std::FILE* to, const Signal& x, bool sound) {
 
 /// The same figures by the names that `stats` has for them.
 void add_members(JsonMembers& members, const Signal& x) {
-    members.emplace_back("duration", json_number(x->points * x->delta));
+    members.emplace_back("duration", json_number(time_of(x->points, x->delta)));
     if (x->points == 0) return;
     members.emplace_back("nan", std::to_string(count_nan(x)));
     const std::pair<const char*, int (*)(const dsp*, dsp*)> statistics[] = {

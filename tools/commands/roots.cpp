@@ -193,10 +193,12 @@ void print_coefficients(std::FILE* to, const Signal& polynomial, bool descending
 void multiply_out(Signal roots, const RootsOptions& options, JsonMembers& members, Page& page) {
     auto polynomial = polynomial_of(std::move(roots));
     if (options.descending) check(dspi_rev(polynomial), "reversing");
-    if (!options.out.empty())
-        return write_recording(options.out, {&polynomial, 1}, options.writing);
-    if (!options.files.json) return print_coefficients(page.text(), polynomial, options.descending);
-    members.emplace_back("coefficients", json_points(polynomial));
+    if (!options.out.empty()) write_recording(options.out, {&polynomial, 1}, options.writing);
+    if (options.files.json) {
+        members.emplace_back("coefficients", json_points(polynomial));
+    } else if (options.out.empty()) {
+        print_coefficients(page.text(), polynomial, options.descending);
+    }
 }
 
 void find_roots(Signal x, const RootsOptions& options, JsonMembers& members, Page& page) {
@@ -206,9 +208,12 @@ void find_roots(Signal x, const RootsOptions& options, JsonMembers& members, Pag
         Progress progress("finding roots");
         return roots_of(x);
     }();
-    if (!options.out.empty()) return write_recording(options.out, {&roots, 1}, options.writing);
-    if (!options.files.json) return print_roots(page.text(), x, roots);
-    add_roots(members, x, roots);
+    if (!options.out.empty()) write_recording(options.out, {&roots, 1}, options.writing);
+    if (options.files.json) {
+        add_roots(members, x, roots);
+    } else if (options.out.empty()) {
+        print_roots(page.text(), x, roots);
+    }
 }
 
 void tell(Signal x, const RootsOptions& options, JsonMembers& members, Page& page) {
@@ -220,7 +225,7 @@ void tell(Signal x, const RootsOptions& options, JsonMembers& members, Page& pag
 void run(RootsOptions& options) {
     options.writing.check_without_sound(options.out, "roots and coefficients");
     if (!names_files(options)) {
-        if (options.files.json) options.files.check_single(options.out, "");
+        options.files.check_single(options.out, "");
         return report("roots", options.files.json,
                       [&](Page& page) { tell(read_values(options), options, page.members, page); });
     }

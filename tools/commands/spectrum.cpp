@@ -70,7 +70,9 @@ void check_segments(const SpectrumOptions& options) {
 void check_usage(const SpectrumOptions& options) {
     const auto& report = options.report;
     if (!report.plot.empty()) picture_of_name(report.plot);
-    options.files.check_single(report.out, report.plot + options.waterfall);
+    for (const auto& picture : {report.plot, options.waterfall}) {
+        options.files.check_single(report.out, picture);
+    }
     if (!options.waterfall.empty() && picture_of_name(options.waterfall) == Picture::terminal) {
         throw UsageError("the picture of --waterfall is a .png, .svg or .pdf file");
     }
