@@ -9,7 +9,7 @@
 namespace wavkit::tool {
 
 void check(int status, const std::string& what) {
-    if (status != 0) throw Error("out of memory while " + what);
+    if (status != 0) throw DataError("out of memory while " + what);
 }
 
 Signal::Signal() { dsp_init(&record_); }
@@ -34,7 +34,7 @@ std::span<const double> Signal::values() const {
 void Signal::append(std::span<const double> samples) {
     constexpr std::size_t most = std::numeric_limits<int>::max();
     const auto held = std::size_t(record_.points), needed = held + samples.size();
-    if (needed > most) throw Error("more than 2147483647 samples in one signal");
+    if (needed > most) throw DataError("more than 2147483647 samples in one signal");
     if (needed > std::size_t(record_.alloc)) {
         record_.points = int(std::min(most, std::max(needed, 2 * held)));
         check(dsp_realloc(&record_, int(held), 0), "reading samples");

@@ -75,7 +75,7 @@ Histogram count(Signal x, const HistOptions& options) {
         options.range.empty() ? range_of(x) : std::pair(options.range[0], options.range[1]);
     const int bins = options.bins.value_or(usual_bins(x));
     const double width = (high - low) / bins;
-    if (!std::isfinite(width) || width == 0) throw Error("the range is too wide or too narrow");
+    if (!std::isfinite(width) || width == 0) throw DataError("the range is too wide or too narrow");
     Histogram result{{}, low};
     check(dsps_hist(x, result.counts, low, width, bins), "counting");
     for (const double value : x.values()) {

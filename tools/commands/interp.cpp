@@ -121,8 +121,8 @@ Signal read_places(const std::string& path) {
 void check_inside(const Table& table, const Signal& places) {
     for (const double t : places.values()) {
         if (t >= table.first() && t <= table.last()) continue;
-        throw Error(number(t) + " lies outside the signal, which goes from " +
-                    number(table.first()) + " to " + number(table.last()));
+        throw DataError(number(t) + " lies outside the signal, which goes from " +
+                        number(table.first()) + " to " + number(table.last()));
     }
 }
 

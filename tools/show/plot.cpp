@@ -259,7 +259,7 @@ void draw(const Curve& curve, const std::string& path, const PictureLook& look) 
 void draw(std::span<const Curve> panels, const std::string& path, const PictureLook& look) {
     for (const auto& curve : panels) {
         if (curve.x.empty() || (curve.x.size() < 2 && curve.style == Style::line)) {
-            throw Error("there are too few points to draw");
+            throw DataError("there are too few points to draw");
         }
     }
     const Canvas canvas(picture_of_name(path), look, 1000, panels.size() > 1 ? 880 : 560);

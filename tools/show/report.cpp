@@ -83,9 +83,7 @@ class SeveralFiles {
         } catch (const std::bad_alloc&) {
             return {{}, file + ": out of memory", nullptr};
         } catch (const std::exception& error) {
-            const std::string what = error.what();
-            const bool named = what.find(file) != what.npos || file == "-";
-            return {{}, named ? what : file + ": " + what, nullptr};
+            return {{}, error.what(), nullptr};
         }
     }
 
