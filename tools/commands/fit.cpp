@@ -5,9 +5,13 @@
 #include <array>
 #include <cmath>
 #include <cstdio>
+#include <functional>
 #include <memory>
+#include <span>
+#include <vector>
 
 #include "base/error.hpp"
+#include "base/mark.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
@@ -148,9 +152,8 @@ std::vector<Mark> marks_of(const Signal& pairs) {
 }
 
 /// Draws the points, and a line through these places of it.
-void draw_fit(const Signal& pairs, std::vector<Mark> line, const std::string& file,
-              const FitOptions& options) {
-    auto points = marks_of(pairs);
+void draw_fit(const Signal& pairs, std::vector<Mark> points, std::vector<Mark> line,
+              const std::string& file, const FitOptions& options) {
     std::ranges::stable_sort(points, {}, &Mark::x);
     Curve curve;
     curve.title = short_name(file);
@@ -168,9 +171,8 @@ void draw_fit(const Signal& pairs, std::vector<Mark> line, const std::string& fi
 }
 
 /// Places of a function, close enough for a smooth curve.
-std::vector<Mark> places_of(const std::function<double(double)>& function, const Signal& pairs,
-                            int steps) {
-    const auto points = marks_of(pairs);
+std::vector<Mark> places_of(const std::function<double(double)>& function,
+                            std::span<const Mark> points, int steps) {
     const auto [first, last] = std::ranges::minmax(points, {}, &Mark::x);
     std::vector<Mark> places;
     for (int i = 0; i <= steps; ++i) {
@@ -190,7 +192,9 @@ void fit_line(const Signal& pairs, const std::string& file, const FitOptions& op
     if (!options.plot.empty()) {
         const auto line = [&](double x) { return table[slope] * x + table[intercept]; };
         const bool upright = table[variance_x] == 0;
-        draw_fit(pairs, upright ? std::vector<Mark>() : places_of(line, pairs, 1), file, options);
+        auto points = marks_of(pairs);
+        auto ends = upright ? std::vector<Mark>() : places_of(line, points, 1);
+        draw_fit(pairs, std::move(points), std::move(ends), file, options);
     }
     if (options.files.json) return add_line(page.signals.back(), table);
     if (options.plot.empty()) print_line(page.text(), table, pairs->points);
@@ -198,13 +202,15 @@ void fit_line(const Signal& pairs, const std::string& file, const FitOptions& op
 
 void fit_polynomial(const Signal& pairs, const std::string& file, const FitOptions& options,
                     Page& page) {
+    auto points = marks_of(pairs);
     const auto fit = [&] {
         Progress progress("fitting");
-        return PolynomialFit(marks_of(pairs), *options.degree);
+        return PolynomialFit(points, *options.degree);
     }();
     const double about = options.centred ? fit.mean_x() : 0;
     if (!options.plot.empty()) {
-        draw_fit(pairs, places_of([&](double x) { return fit(x); }, pairs, 1000), file, options);
+        auto curve = places_of([&](double x) { return fit(x); }, points, 1000);
+        draw_fit(pairs, std::move(points), std::move(curve), file, options);
     }
     if (options.files.json) return add_polynomial(page.signals.back(), fit, about);
     if (options.plot.empty()) print_polynomial(page.text(), fit, about, pairs->points);

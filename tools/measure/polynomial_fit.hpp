@@ -4,7 +4,7 @@
 #include <span>
 #include <vector>
 
-#include "show/plot.hpp"
+#include "base/mark.hpp"
 
 namespace wavkit::tool {
 

@@ -1,7 +1,6 @@
 // The signals of function generators, added to the real parts of a record.
 #pragma once
 
-#include <functional>
 #include <optional>
 
 #include "base/signal.hpp"

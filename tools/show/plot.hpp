@@ -7,13 +7,10 @@
 #include <utility>
 #include <vector>
 
+#include "base/mark.hpp"
 #include "show/canvas.hpp"
 
 namespace wavkit::tool {
-
-struct Mark {
-    double x, y;
-};
 
 enum class Style { line, boxes, dots };
 
