@@ -280,10 +280,7 @@ void run(DesignOptions& options) {
         throw UsageError("--to, --type, --bits and --with-time are for the output that -o names");
     }
     if (!options.out.empty()) options.writing.checked_format_for(options.out);
-    check_apart(options.out, options.plot);
-    if (options.json && (options.out == "-" || options.plot == "-")) {
-        throw UsageError("standard output takes only one of --json, -o - and --plot -");
-    }
+    check_apart(options.out, options.plot, options.json);
     const auto request = request_of(options);
     if (options.tapering.transition && options.rate) *options.tapering.transition /= *options.rate;
     auto taps = taps_of(request, options.tapering);
@@ -344,10 +341,7 @@ void add_design(CLI::App& program) {
     command->add_flag("--json", options->json, "print JSON");
     command->add_option("-o,--output", options->out, "write the taps; - is standard output")
         ->type_name("FILE");
-    command
-        ->add_option("--plot", options->plot,
-                     "draw gain and phase into a .png, .svg or .pdf file, or - the terminal")
-        ->type_name("FILE");
+    declare_plot(*command, options->plot, "gain and phase");
     options->look.declare(*command);
     options->writing.declare(*command);
     options->tapering.declare(*command);

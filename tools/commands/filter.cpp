@@ -163,6 +163,7 @@ class Comparison {
     Comparison(const FilterOptions& options, const SampleStream& stream, bool sound)
         : options_(options),
           axis_unit_(stream.facts_of(0).axis(sound || options.reading.rate)),
+          caption_(options.reading.chosen(sound)),
           values_(stream.facts_of(0)),
           before_(outline(stream)),
           after_(before_),
@@ -305,10 +306,7 @@ void add_filter(CLI::App& program) {
     command
         ->add_option("-o,--output", options->out, "file to write; - is standard output (default)")
         ->type_name("FILE");
-    command
-        ->add_option("--plot", options->plot,
-                     "draw before and after into a .png, .svg or .pdf file, or - the terminal")
-        ->type_name("FILE");
+    declare_plot(*command, options->plot, "before and after");
     command->add_option("--span", options->span, "times between which --plot draws")
         ->expected(2)
         ->type_name("FROM TO");

@@ -269,10 +269,7 @@ void add_fit(CLI::App& program) {
         ->type_name("N");
     command->add_flag("--centre,--center", options->centred,
                       "powers of x less its mean, for abscissae far from 0");
-    command
-        ->add_option("--plot", options->plot,
-                     "draw data and line into a .png, .svg or .pdf file, or - the terminal")
-        ->type_name("FILE");
+    declare_plot(*command, options->plot, "data and line");
     options->look.declare(*command);
     options->reading.declare(*command);
     command->footer(about);

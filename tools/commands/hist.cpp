@@ -45,7 +45,6 @@ void check_usage(const HistOptions& options) {
     }
     options.files.check_single(options.out, options.plot);
     options.writing.check_without_sound(options.out, "a histogram");
-    check_apart(options.out, options.plot);
 }
 
 /// From the least to the greatest finite value, or around the only one.
@@ -191,10 +190,7 @@ void add_hist(CLI::App& program) {
     command->add_option("-o,--output", options->out, "write the counts; - is standard output")
         ->type_name("FILE");
     options->writing.declare_without_sound(*command);
-    command
-        ->add_option("--plot", options->plot,
-                     "draw the counts into a .png, .svg or .pdf file, or - the terminal")
-        ->type_name("FILE");
+    declare_plot(*command, options->plot, "the counts");
     options->look.declare(*command);
     options->reading.declare(*command);
     command->footer(about);

@@ -111,12 +111,8 @@ SpectrumReport report_of(const SpectrumOptions& options, Spectrum spectrum, cons
 
 /// How a spectrum was measured, in a line.
 std::string caption_of(const SpectrumOptions& options, const Spectrum& spectrum, bool sound) {
-    const auto& reading = options.reading;
-    std::string text;
-    if (reading.signal && !sound) text = "signal " + std::to_string(*reading.signal) + ", ";
-    if (sound)
-        text = "channel " + std::to_string(reading.channel.value_or(reading.signal.value_or(1))) +
-               ", ";
+    auto text = options.reading.chosen(sound);
+    if (!text.empty()) text += ", ";
     text += window_names()[std::size_t(spectrum.window)] + " window, ";
     const auto samples = std::to_string(spectrum.samples);
     if (options.segmented()) {
@@ -324,10 +320,7 @@ void add_spectrum(CLI::App& program) {
     command->add_option("--peaks", report.peaks, "print the N strongest peaks")
         ->check(CLI::Range(1, 1000000))
         ->type_name("N");
-    command
-        ->add_option("--plot", report.plot,
-                     "draw into a .png, .svg or .pdf file, or - the terminal")
-        ->type_name("FILE");
+    declare_plot(*command, report.plot, "the spectrum");
     command->add_option("--window", options->window, "window (default: Hann)")->type_name("NAME");
     command->add_option("--points", settings.points, "samples to transform, made a power of two")
         ->check(CLI::Range(1, 1 << 30))

@@ -127,10 +127,7 @@ void run(const WindowOptions& options) {
         throw UsageError("--to is for the output that -o names");
     }
     if (!options.out.empty()) options.writing.format_for(options.out);
-    check_apart(options.out, options.plot);
-    if (options.json && (options.out == "-" || options.plot == "-")) {
-        throw UsageError("standard output takes only one of --json, -o - and --plot -");
-    }
+    check_apart(options.out, options.plot, options.json);
     const int window = window_of_name(options.name);
     const auto w = samples_of(window, options.points);
     if (!options.out.empty()) write_recording(options.out, {&w, 1}, options.writing);
@@ -154,11 +151,7 @@ void add_window(CLI::App& program) {
         ->type_name("FILE");
     add_choice(*command, "--to", options->writing.format, written_formats(),
                "format of the output (default: by its name)");
-    command
-        ->add_option(
-            "--plot", options->plot,
-            "draw main lobe and sidelobes into a .png, .svg or .pdf file, or - the terminal")
-        ->type_name("FILE");
+    declare_plot(*command, options->plot, "main lobe and sidelobes");
     options->look.declare(*command);
     command->footer(
         "The coherent gain is the mean of the samples, whose centre is 1; the noise bandwidth is "

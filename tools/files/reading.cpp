@@ -65,6 +65,11 @@ void ReadOptions::declare(CLI::App& command, bool with_rate) {
         ->group(group);
 }
 
+std::string ReadOptions::chosen(bool sound) const {
+    if (sound) return "channel " + std::to_string(channel.value_or(signal.value_or(1)));
+    return signal ? "signal " + std::to_string(*signal) : "";
+}
+
 double ReadOptions::spacing(double told) const { return rate ? 1 / *rate : delta.value_or(told); }
 
 }  // namespace wavkit::tool

@@ -35,6 +35,10 @@ struct ReadOptions {
     /// Adds the options to a subcommand; without --rate where that means another one's rate.
     void declare(CLI::App& command, bool with_rate = true);
 
+    /// The one signal that is taken, in words: "channel 2" of a sound file, "signal 3" where one
+    /// was asked for elsewhere.
+    std::string chosen(bool sound) const;
+
     /// The spacing of a signal, whatever its source told.
     double spacing(double told) const;
 };

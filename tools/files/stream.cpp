@@ -120,6 +120,12 @@ std::unique_ptr<SignalSource> open_channels(InputFile& input, const ReadOptions&
     return open(input, options, !options.channel && !options.signal);
 }
 
+void check_standard_input(std::span<const std::string> files) {
+    if (std::ranges::count(files, "-") > 1) {
+        throw UsageError("standard input is one file only");
+    }
+}
+
 void tell_of_others(SignalSource& source) {
     bool others = true;
     try {

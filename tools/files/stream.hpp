@@ -87,6 +87,9 @@ class SignalSource {
     int held_ = 0;  // signals so far
 };
 
+/// Throws where standard input is named more than once.
+void check_standard_input(std::span<const std::string> files);
+
 /// Opens the signals that the options ask for, each channel of a sound file a signal of its own.
 std::unique_ptr<SignalSource> open_signals(InputFile& input, const ReadOptions& options);
 

@@ -9,9 +9,7 @@
 namespace wavkit::tool {
 
 SeveralInputs::SeveralInputs(const std::vector<std::string>& files, const ReadOptions& options) {
-    if (std::ranges::count(files, "-") > 1) {
-        throw UsageError("standard input is one file only");
-    }
+    check_standard_input(files);
     for (const auto& file : files) {
         inputs_.push_back(std::make_unique<InputFile>(file));
         sources_.push_back(open_channels(*inputs_.back(), options));

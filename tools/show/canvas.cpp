@@ -44,6 +44,13 @@ Picture picture_of_name(const std::string& path) {
         "'");
 }
 
+void declare_plot(CLI::App& command, std::string& path, const std::string& what) {
+    command
+        .add_option("--plot", path,
+                    "draw " + what + " into a .png, .svg or .pdf file, or - the terminal")
+        ->type_name("FILE");
+}
+
 void PictureLook::declare(CLI::App& command) {
     const char* const group = "Picture";
     command.add_option("--title", title, "title of the picture (default: what it shows)")

@@ -30,6 +30,9 @@ struct PictureLook {
     void declare(CLI::App& command);
 };
 
+/// Adds the option --plot, which draws something into a file that it names.
+void declare_plot(CLI::App& command, std::string& path, const std::string& what);
+
 /// A page, measured in pixels or characters from its lower left.
 class Canvas {
   public:

@@ -247,9 +247,9 @@ class Panel {
 
 }  // namespace
 
-void check_apart(const std::string& out, const std::string& picture) {
-    if (out != "-" || picture != "-") return;
-    throw UsageError("standard output takes only one of -o - and --plot -");
+void check_apart(const std::string& out, const std::string& picture, bool json) {
+    if (int(json) + int(out == "-") + int(picture == "-") < 2) return;
+    throw UsageError("standard output takes only one of --json, -o - and --plot -");
 }
 
 void draw(const Curve& curve, const std::string& path, const PictureLook& look) {

@@ -33,8 +33,8 @@ struct Curve {
     std::vector<Mark> marked;       // peaks to label
 };
 
-/// Throws where an output and a picture would both go to standard output.
-void check_apart(const std::string& out, const std::string& picture);
+/// Throws where two of JSON, an output and a picture would go to standard output.
+void check_apart(const std::string& out, const std::string& picture, bool json = false);
 
 /// Draws a curve into a file, completely or not at all; "-" is standard output.
 void draw(const Curve& curve, const std::string& path, const PictureLook& look = {});

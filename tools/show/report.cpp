@@ -172,9 +172,7 @@ void ReportFiles::declare_jobs(CLI::App& command) {
 }
 
 void ReportFiles::check_single(const std::string& out, const std::string& picture) const {
-    if (json && (out == "-" || picture == "-")) {
-        throw UsageError("standard output takes only one of --json, -o - and --plot -");
-    }
+    check_apart(out, picture, json);
     if (names.size() < 2) return;
     if (!out.empty()) throw UsageError("-o is for the result of one file");
     if (!picture.empty()) throw UsageError("a picture is for one file");
@@ -188,8 +186,7 @@ void report(const std::string& command, bool json, const std::function<void(Page
 
 void report_files(const std::string& command, const ReportFiles& files,
                   const std::function<void(const std::string&, Page&)>& tell) {
-    if (std::ranges::count(files.names, "-") > 1)
-        throw UsageError("standard input is one file only");
+    check_standard_input(files.names);
     const auto told = [&](const std::string& file) {
         Page page;
         with_data_of(file, [&] { tell(file, page); });

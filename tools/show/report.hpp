@@ -50,7 +50,8 @@ struct ReportFiles {
     void declare_json(CLI::App& command);
     void declare_jobs(CLI::App& command);
 
-    /// Throws where an output or a picture is asked for and there are several files to fill it.
+    /// Throws where two things would go to standard output, or an output or a picture is asked for
+    /// and there are several files to fill it.
     void check_single(const std::string& out, const std::string& picture) const;
 };
 
