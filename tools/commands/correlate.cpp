@@ -66,7 +66,7 @@ std::pair<Signal, Signal> read_pair(const CorrelateOptions& options) {
 
 void prepare(Signal& x, const CorrelateOptions& options) {
     if (x->points < 1) throw DataError("a signal has no samples");
-    check_finite(x.values(), x->complex);
+    check_finite(x);
     if (options.detrend) remove_mean(x);
 }
 

@@ -110,8 +110,7 @@ void run(const CutOptions& options) {
         shape.facts.resize(stream.channels);
         for (auto& facts : shape.facts) facts.start += double(extent.first) * stream.delta;
         return std::make_unique<Cut>(extent, options.samples ? 0 : start,
-                                     options.samples ? 1 : stream.delta,
-                                     stream.channels * (stream.complex ? 2 : 1));
+                                     options.samples ? 1 : stream.delta, stream.width());
     });
 }
 

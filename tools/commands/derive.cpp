@@ -13,23 +13,15 @@
 namespace wavkit::tool {
 namespace {
 
-std::size_t width_of(const SampleStream& stream) {
-    return stream.channels * (stream.complex ? 2 : 1);
-}
-
 /// The mean of every part of a stream.
 std::vector<double> means_of(SampleStream& stream, Progress& progress) {
-    const auto width = std::max<std::size_t>(width_of(stream), 1);
-    std::vector<double> block((1 << 15) * width), sums(width);
-    std::size_t points = 0;
-    for (auto count = block.size(); count == block.size(); progress.done(stream.done())) {
-        count = stream.read(block);
-        check_finite(std::span(block).first(count), stream.complex, long(points));
+    const auto width = stream.width();
+    std::vector<double> sums(width);
+    const auto points = each_finite_block(stream, progress, [&](std::span<const double> values) {
         std::vector<double> fresh(width);  // a sum of sums keeps its digits
-        for (std::size_t i = 0; i < count; ++i) fresh[i % width] += block[i];
+        for (std::size_t i = 0; i < values.size(); ++i) fresh[i % width] += values[i];
         for (std::size_t p = 0; p < width; ++p) sums[p] += fresh[p];
-        points += count / width;
-    }
+    });
     if (points > 0) {
         for (double& sum : sums) sum /= double(points);
     }
@@ -55,7 +47,7 @@ void derive(const DeriveOptions& options) {
             if (!(stream.delta > 0))
                 throw DataError("a spacing of " + number(stream.delta) + " has no slopes");
             change_unit(shape, "/");
-            return std::make_unique<Derivative>(stream.delta, width_of(stream), options.from_zero);
+            return std::make_unique<Derivative>(stream.delta, stream.width(), options.from_zero);
         });
 }
 
@@ -73,11 +65,11 @@ void integrate(const IntegrateOptions& options) {
     std::size_t signal = 0;
     const auto make = [&](const SampleStream& stream, SignalShape& shape) {
         change_unit(shape, " ");
-        auto offsets = options.detrend ? means.at(signal++) : std::vector<double>(width_of(stream));
+        auto offsets = options.detrend ? means.at(signal++) : std::vector<double>(stream.width());
         return std::make_unique<Integral>(stream.delta, std::move(offsets));
     };
-    if (options.detrend) return pass_through(options.files, "integrating", make, look);
-    pass_through(options.files, "integrating", make);
+    pass_through(options.files, "integrating", make,
+                 options.detrend ? look : std::function<void(SignalSource&)>());
 }
 
 constexpr const char* about_derive =

@@ -292,8 +292,11 @@ void run(DesignOptions& options) {
     if (!options.plot.empty()) design.draw(options.plot);
     if (!options.plot.empty() && !options.json) return;
     report("design", options.json, [&](Page& page) {
-        page.members = design.members();
-        design.print(page.text());
+        if (options.json) {
+            page.members = design.members();
+        } else {
+            design.print(page.text());
+        }
     });
 }
 

@@ -24,8 +24,6 @@
 namespace wavkit::tool {
 namespace {
 
-constexpr std::size_t block_points = 1 << 15;
-
 /// What a scope takes for noise, of the range between the extremes.
 constexpr double usual_hysteresis = 0.1;
 
@@ -51,28 +49,12 @@ struct Channel {
     std::vector<Edge> edges;  // where they are wanted
 };
 
-/// Hands every block of a stream of real signals on.
-template <class Take>
-std::size_t each_block(SampleStream& stream, Progress& progress, Take take) {
-    if (stream.complex) throw DataError("a complex signal has no edges");
-    std::vector<double> block(block_points * stream.channels);
-    std::size_t points = 0;
-    for (auto count = block.size(); count == block.size(); progress.done(stream.done())) {
-        count = stream.read(block);
-        const auto values = std::span(block).first(count);
-        check_finite(values, false, long(points));
-        take(values);
-        points += count / stream.channels;
-    }
-    return points;
-}
-
 /// Where edges go that are written.
 class EdgeList {
   public:
-    EdgeList(const std::string& path, const WriteOptions& options)
-        : csv_(options.format_for(path) == Format::csv), output_(path) {
-        if (!csv_) writer_ = block_writer(output_.stream(), options.format_for(path), options);
+    EdgeList(const std::string& path, const WriteOptions& options) : output_(path) {
+        const auto format = options.format_for(path);
+        if (format != Format::csv) writer_ = block_writer(output_.stream(), format, options);
     }
 
     void begin() {
@@ -90,9 +72,9 @@ class EdgeList {
     void commit() { output_.commit(); }
 
   private:
-    bool csv_, begun_ = false;
     OutputFile output_;
-    std::unique_ptr<BlockWriter> writer_;
+    std::unique_ptr<BlockWriter> writer_;  // none into CSV, whose header is another
+    bool begun_ = false;
 };
 
 /// The edges of the signals of one file.
@@ -108,11 +90,18 @@ class EdgesOfFile {
         Progress progress("looking for edges in " + input_.name());
         const auto source = open();
         seconds_ = source->sound || options_.reading.rate;
-        while (auto* const stream = source->next()) find_edges(*stream, progress);
+        while (auto* const stream = next_of(*source)) find_edges(*stream, progress);
         if (list_) list_->commit();
     }
 
   private:
+    /// The next signal, or channels side by side.
+    static SampleStream* next_of(SignalSource& source) {
+        auto* const stream = source.next();
+        if (stream && stream->complex) throw DataError("a complex signal has no edges");
+        return stream;
+    }
+
     /// Channels one after the other where their edges are written as they come.
     std::unique_ptr<SignalSource> open() {
         std::rewind(input_.stream());
@@ -123,10 +112,10 @@ class EdgesOfFile {
     void find_ranges() {
         Progress progress("reading " + input_.name());
         const auto source = open();
-        while (auto* const stream = source->next()) {
+        while (auto* const stream = next_of(*source)) {
             const auto first = ranges_.size();
             ranges_.resize(first + stream->channels);
-            each_block(*stream, progress, [&](std::span<const double> values) {
+            each_finite_block(*stream, progress, [&](std::span<const double> values) {
                 for (std::size_t i = 0; i < values.size(); ++i) {
                     auto& range = ranges_[first + i % stream->channels];
                     range.low = std::min(range.low, values[i]);
@@ -146,22 +135,22 @@ class EdgesOfFile {
     }
 
     void find_edges(SampleStream& stream, Progress& progress) {
-        const bool kept = options_.times;
         std::vector<Channel> channels;
         for (std::size_t c = 0; c < stream.channels; ++c) {
             channels.push_back(channel(signal_ + c, stream.facts_of(c)));
         }
         if (list_) list_->begin();
-        const auto points = each_block(stream, progress, [&](std::span<const double> values) {
-            for (std::size_t i = 0; i < values.size(); ++i) {
-                auto& c = channels[i % channels.size()];
-                const auto edge = c.finder.take(values[i]);
-                if (!edge) continue;
-                c.summary.add(*edge);
-                if (kept) c.edges.push_back(*edge);
-                if (list_) list_->add(c.facts.start + edge->place * stream.delta, edge->rising);
-            }
-        });
+        const auto points =
+            each_finite_block(stream, progress, [&](std::span<const double> values) {
+                for (std::size_t i = 0; i < values.size(); ++i) {
+                    auto& c = channels[i % channels.size()];
+                    const auto edge = c.finder.take(values[i]);
+                    if (!edge) continue;
+                    c.summary.add(*edge);
+                    if (options_.times) c.edges.push_back(*edge);
+                    if (list_) list_->add(c.facts.start + edge->place * stream.delta, edge->rising);
+                }
+            });
         if (list_) list_->end();
         for (const auto& c : channels) {
             ++signal_;

@@ -26,7 +26,7 @@ struct EnvelopeOptions {
 
 /// The magnitude of the analytic signal, or of a signal that is complex already.
 void take_envelope(Signal& x, bool detrend) {
-    check_finite(x.values(), x->complex);
+    check_finite(x);
     if (detrend && x->points > 0) remove_mean(x);
     const bool analytic = x->complex;
     check((!analytic && dspi_analytic(x)) || (x->complex ? dspi_mag(x) : dspi_abs(x)),

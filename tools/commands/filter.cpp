@@ -6,14 +6,14 @@
 #include <cmath>
 #include <cstdio>
 #include <memory>
+#include <optional>
 
 #include "base/error.hpp"
 #include "base/number.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
-#include "files/block_writer.hpp"
-#include "files/output.hpp"
 #include "files/recording.hpp"
+#include "measure/block_change.hpp"
 #include "measure/channel_filter.hpp"
 #include "measure/prepare.hpp"
 #include "measure/spectrum.hpp"
@@ -114,7 +114,7 @@ Signal given_taps(const FilterOptions& options) {
     auto taps = first_signal(options.taps, {});
     with_data_of(options.taps, [&] {
         if (taps->points < 1) throw DataError("there are no taps");
-        check_finite(taps.values(), taps->complex);
+        check_finite(taps);
     });
     return taps;
 }
@@ -167,13 +167,7 @@ class Comparison {
           values_(stream.facts_of(0)),
           before_(outline(stream)),
           after_(before_),
-          width_(stream.channels) {
-        const auto& reading = options.reading;
-        if (sound)
-            caption_ =
-                "channel " + std::to_string(reading.channel.value_or(reading.signal.value_or(1)));
-        if (!sound && reading.signal) caption_ = "signal " + std::to_string(*reading.signal);
-    }
+          width_(stream.channels) {}
 
     void add(std::span<const double> in, std::span<const double> out) {
         before_.add(in, width_);
@@ -218,16 +212,8 @@ class FilterRun {
         : options_(options), input_(options.in), filters_(options) {}
 
     void run() {
-        if (!options_.out.empty()) {
-            format_ = options_.writing.format_for(options_.out);
-            output_.emplace(options_.out);
-            writer_ = block_writer(output_->stream(), *format_, options_.writing);
-        }
-        // Channels stay together where the format allows it, and become signals one after the other
-        // elsewhere.
-        const bool together = format_ && takes_channels(*format_);
-        const auto source = together ? open_channels(input_, options_.reading)
-                                     : open_signals(input_, options_.reading);
+        if (!options_.out.empty()) output_.emplace(options_.out, options_.writing);
+        const auto source = open_channels(input_, options_.reading);
         while (auto* const stream = source->next()) filter(*stream, source->sound);
         if (comparison_) comparison_->draw();
         if (output_) output_->commit();
@@ -240,26 +226,25 @@ class FilterRun {
         const bool draws = !options_.plot.empty() && !comparison_;
         if (draws && filter.complex_output()) throw DataError("--plot draws real signals only");
         if (draws) comparison_.emplace(options_, stream, sound);
-        if (writer_)
-            writer_->begin({stream.delta, filter.complex_output(), stream.channels, stream.length,
-                            stream.facts});
+        auto* const writer = output_ ? &output_->writer() : nullptr;
+        if (writer)
+            writer->begin({stream.delta, filter.complex_output(), stream.channels, stream.length,
+                           stream.facts});
         {
             Progress progress("filtering " + input_.name());
             filter.run([&](std::span<const double> in, std::span<const double> out) {
-                if (writer_) writer_->write(out);
+                if (writer) writer->write(out);
                 if (draws) comparison_->add(in, out);
                 progress.done(stream.done());
             });
         }
-        if (writer_) writer_->end();
+        if (writer) writer->end();
     }
 
     const FilterOptions& options_;
     InputFile input_;
     Filters filters_;
-    std::optional<Format> format_;
-    std::optional<OutputFile> output_;
-    std::unique_ptr<BlockWriter> writer_;
+    std::optional<SignalOutput> output_;
     std::optional<Comparison> comparison_;
 };
 

@@ -221,7 +221,7 @@ void tell(const std::string& file, const FitOptions& options, Page& page) {
     reading.csv.pairs = true;
     auto x = first_signal(file, reading);
     if (x->points < 1) throw DataError("the signal has no samples");
-    check_finite(x.values(), x->complex);
+    check_finite(x);
     page.add_signal(x);
     const auto pairs = pairs_of(std::move(x));
     if (options.degree.value_or(1) == 1 && !options.centred) {

@@ -86,7 +86,7 @@ Table table_of(const Signal& x, const InterpOptions& options) {
     }
     if (options.method == unsigned(DSP_INTERP_SPLINE)) {
         if (x->points < 5) throw DataError("a spline takes 5 points or more");
-        check_finite(x.values(), x->complex);
+        check_finite(x);
     }
     return table;
 }
@@ -114,7 +114,7 @@ void tell_of_aliases(double delta, double rate) {
 Signal read_places(const std::string& path) {
     auto places = first_signal(path, {});
     if (places->complex) throw Error("the places of --at are one column, real numbers");
-    with_data_of(path, [&] { check_finite(places.values(), false); });
+    with_data_of(path, [&] { check_finite(places); });
     return places;
 }
 

@@ -186,7 +186,7 @@ class MixRun {
             for (const auto* stream : streams) *shape.points += *stream->length;
         }
         output_.writer().begin(shape);
-        std::vector<double> block(block_points * shape.channels * (shape.complex ? 2 : 1));
+        std::vector<double> block(block_points * shape.width());
         for (auto* const stream : streams) {
             FittedStream fitted(*stream, shape.complex, shape.channels);
             for (auto count = block.size(); count == block.size();) {

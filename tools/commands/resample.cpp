@@ -11,9 +11,8 @@
 #include "base/options.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
-#include "files/block_writer.hpp"
-#include "files/output.hpp"
 #include "files/recording.hpp"
+#include "measure/block_change.hpp"
 #include "measure/prepare.hpp"
 #include "measure/rate_change.hpp"
 
@@ -108,17 +107,12 @@ Target target_for(const ResampleOptions& options, double delta) {
 class ResampleRun {
   public:
     explicit ResampleRun(const ResampleOptions& options)
-        : options_(options),
-          input_(options.in),
-          format_(options.writing.checked_format_for(options.out)),
-          output_(options.out),
-          writer_(block_writer(output_.stream(), format_, options.writing)) {
+        : options_(options), input_(options.in), output_(options.out, options.writing) {
         if (!options.times.empty()) read_times();
     }
 
     void run() {
-        const auto source = takes_channels(format_) ? open_channels(input_, options_.reading)
-                                                    : open_signals(input_, options_.reading);
+        const auto source = open_channels(input_, options_.reading);
         while (auto* const stream = source->next()) change(*stream);
         output_.commit();
     }
@@ -128,7 +122,7 @@ class ResampleRun {
         times_ = first_signal(options_.times, {});
         if (times_->complex) throw Error("the times of --to-times are one column, real numbers");
         const auto values = times_.values();
-        with_data_of(options_.times, [&] { check_finite(values, false); });
+        with_data_of(options_.times, [&] { check_finite(times_); });
         if (!std::ranges::is_sorted(values)) throw Error("the times of --to-times must ascend");
     }
 
@@ -138,7 +132,7 @@ class ResampleRun {
             throw Error(number(times_->data[0]) + " lies before the signal, which begins at " +
                         number(start));
         }
-        const std::size_t width = stream.channels * (stream.complex ? 2 : 1);
+        const auto width = stream.width();
         const auto quality = options_.quality.value_or(normal_rates);
         Target target{{1, 1, 1}, stream.delta};
         std::optional<RateChange> changed;
@@ -158,14 +152,14 @@ class ResampleRun {
         }
         if (stream.length || !options_.times.empty()) {
             const auto points = changed->outputs(std::int64_t(stream.length.value_or(0)));
-            if (points > std::numeric_limits<int>::max() && !is_sound(format_)) {
+            if (points > std::numeric_limits<int>::max() && !is_sound(output_.format())) {
                 throw Error("that would be more than 2147483647 samples");
             }
             shape.points = std::size_t(points);
         }
-        writer_->begin(shape);
-        pass(stream, *changed, width, target.ratio.value);
-        writer_->end();
+        output_.writer().begin(shape);
+        pass(stream, *changed, target.ratio.value);
+        output_.writer().end();
     }
 
     /// Times in samples.
@@ -177,7 +171,8 @@ class ResampleRun {
         };
     }
 
-    void pass(SampleStream& stream, RateChange& changed, std::size_t width, double ratio) {
+    void pass(SampleStream& stream, RateChange& changed, double ratio) {
+        const auto width = stream.width();
         Progress progress("changing the rate of " + input_.name());
         // What comes of a block shall not be much larger than one.
         const auto grown = std::size_t(std::max(ratio, 1.0)) * width;
@@ -186,9 +181,9 @@ class ResampleRun {
         for (std::size_t count = block.size(); count == block.size();) {
             count = stream.read(block);
             const auto values = std::span(block).first(count);
-            check_finite(values, stream.complex, taken);
+            check_finite(values, width, taken);
             taken += long(count / width);
-            writer_->write(changed.pass(values));
+            output_.writer().write(changed.pass(values));
             progress.done(stream.done());
         }
         if (times_->points > 0) {
@@ -200,15 +195,13 @@ class ResampleRun {
             }
         }
         for (auto rest = changed.finish(); !rest.empty(); rest = changed.finish()) {
-            writer_->write(rest);
+            output_.writer().write(rest);
         }
     }
 
     const ResampleOptions& options_;
     InputFile input_;
-    Format format_;
-    OutputFile output_;
-    std::unique_ptr<BlockWriter> writer_;
+    SignalOutput output_;
     Signal times_;
 };
 

@@ -217,7 +217,7 @@ void find_roots(Signal x, const RootsOptions& options, JsonMembers& members, Pag
 }
 
 void tell(Signal x, const RootsOptions& options, JsonMembers& members, Page& page) {
-    check_finite(x.values(), x->complex);
+    check_finite(x);
     const auto work = options.from_roots ? multiply_out : find_roots;
     work(std::move(x), options, members, page);
 }

@@ -158,7 +158,7 @@ SpectrumReport measured_whole(const SpectrumOptions& options) {
     Progress progress("transforming");
     if (options.segments.slope) take_slope(x);
     if (options.segments.detrend) remove_mean(x);
-    check_finite(x.values(), x->complex);
+    check_finite(x);
     auto report = report_of(options, measure(x, options.settings), x.facts, source->sound,
                             x->complex, x->delta);
     report.caption = caption_of(options, report.spectrum, source->sound);

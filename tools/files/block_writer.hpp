@@ -22,6 +22,9 @@ struct SignalShape {
     std::optional<std::size_t> points;
     std::vector<Facts> facts = {};  // of each channel, as far as they are known
 
+    /// The scalars of a point.
+    std::size_t width() const { return channels * (complex ? 2 : 1); }
+
     Facts facts_of(std::size_t channel) const {
         return channel < facts.size() ? facts[channel] : Facts();
     }

@@ -27,7 +27,7 @@ class FloatWavWriter : public BlockWriter {
         }
         tell_of_lost_start(shape.facts_of(0));
         rate_ = std::uint64_t(whole_rate(shape.delta));
-        channels_ = shape.channels * (shape.complex ? 2 : 1);
+        channels_ = shape.width();
         if (channels_ > 1024) throw Error("a sound file holds 1024 channels at most");
         put_header();
     }

@@ -1,13 +1,9 @@
 #include "files/in_turn.hpp"
 
 #include <algorithm>
-#include <cerrno>
-#include <cstring>
-#include <string>
 #include <utility>
 #include <vector>
 
-#include "base/error.hpp"
 #include "base/scratch.hpp"
 
 namespace wavkit::tool {
@@ -54,10 +50,6 @@ class InTurnWriter : public BlockWriter {
   private:
     std::size_t width() const { return shape_.complex ? 2 : 1; }
 
-    [[noreturn]] static void fail() {
-        throw Error(std::string("cannot use a temporary file: ") + std::strerror(errno));
-    }
-
     /// Writes what is buffered, channel by channel.
     void keep() {
         const auto frame = width() * shape_.channels, frames = buffer_.size() / frame;
@@ -69,7 +61,7 @@ class InTurnWriter : public BlockWriter {
             }
             if (std::fwrite(run_.data(), sizeof(double), run_.size(), waiting_.get()) !=
                 run_.size()) {
-                fail();
+                fail_with_scratch();
             }
         }
         runs_.push_back(run_.size());
@@ -83,7 +75,7 @@ class InTurnWriter : public BlockWriter {
             const auto at = (block + channel * scalars) * sizeof(double);
             if (std::fseek(waiting_.get(), long(at), SEEK_SET) != 0 ||
                 std::fread(run_.data(), sizeof(double), scalars, waiting_.get()) != scalars) {
-                fail();
+                fail_with_scratch();
             }
             writer_->write(run_);
             block += scalars * shape_.channels;

@@ -32,17 +32,16 @@ class RawStream : public SampleStream {
     }
 
     std::size_t read(std::span<double> values) override {
-        const std::size_t width = channels * (complex ? 2 : 1);
         const auto left = std::size_t(layout_.points - taken_);
-        const auto wanted = std::min(values.size() / width, left);
+        const auto wanted = std::min(values.size() / width(), left);
         std::size_t done = 0;
         while (done < wanted) {
             const auto count = std::min(wanted - done, points_in_block());
-            read_block(values.subspan(done * width, count * width), count);
+            read_block(values.subspan(done * width(), count * width()), count);
             done += count;
             taken_ += count;
         }
-        return done * width;
+        return done * width();
     }
 
     void skip() override {}  // each signal knows its place

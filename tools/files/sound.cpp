@@ -256,7 +256,7 @@ class SoundWriter : public BlockWriter {
         tell_of_lost_start(shape.facts_of(0));
         SF_INFO info{};
         info.samplerate = whole_rate(shape.delta);
-        info.channels = int(shape.channels) * (shape.complex ? 2 : 1);
+        info.channels = int(shape.width());
         info.format = container_of(format_, shape, info.channels) | samples_of(type_);
         file_ = open_sound(to_, SFM_WRITE, info, cannot_write);
         sf_command(file_.get(), SFC_SET_CLIPPING, nullptr, SF_TRUE);

@@ -23,7 +23,7 @@ std::size_t frames_at_once(std::size_t width) {
 /// Passes what a stream holds on, whole points at a time.
 template <class Take>
 void pass(SampleStream& stream, Progress& progress, Take take) {
-    const std::size_t width = stream.channels * (stream.complex ? 2 : 1);
+    const std::size_t width = stream.width();
     std::vector<double> block(frames_at_once(width) * width);
     for (std::size_t count; (count = stream.read(block)) > 0; progress.done(stream.done())) {
         take(std::span<const double>(block).first(count));
@@ -41,7 +41,7 @@ void copy(SampleStream& stream, BlockWriter& writer, Progress& progress) {
 class Waiting {
   public:
     void add(SampleStream& stream, Progress& progress) {
-        const std::size_t width = stream.channels * (stream.complex ? 2 : 1);
+        const std::size_t width = stream.width();
         Run run{end_, 0, width, frames_at_once(width), 0};
         std::vector<double> scalars;
         pass(stream, progress, [&](std::span<const double> values) {

@@ -31,7 +31,7 @@ void change_all(InputFile& input, const PassOptions& options, const std::string&
                           stream->facts};
         const auto change = make(*stream, shape);
         output.writer().begin(shape);
-        block.resize(block_points * stream->channels * (stream->complex ? 2 : 1));
+        block.resize(block_points * stream->width());
         for (auto count = block.size(); count == block.size() && !change->complete();) {
             count = stream->read(block);
             output.writer().write(change->pass(std::span(block).first(count)));

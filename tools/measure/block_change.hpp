@@ -45,6 +45,7 @@ class SignalOutput {
   public:
     SignalOutput(const std::string& path, const WriteOptions& options);
 
+    Format format() const { return format_; }
     BlockWriter& writer() { return *writer_; }
     void commit() { output_.commit(); }
 

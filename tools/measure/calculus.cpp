@@ -42,7 +42,7 @@ std::span<const double> Integral::pass(std::span<double> values) {
         for (std::size_t i = 0; i < points; ++i) {
             part_->data[i] = values[i * width + p] - offsets_[p];
         }
-        check_finite(part_.values(), false, position_);
+        check_finite(part_.values(), 1, position_);
         check(dspi_integ(part_) || dspi_offset(part_, sums_[p]), "integrating");
         sums_[p] = part_->data[points - 1];
         for (std::size_t i = 0; i < points; ++i) values[i * width + p] = part_->data[i];

@@ -92,7 +92,7 @@ void ChannelFilter::filter_block() {
         channel_->complex = complex_;
         check(dsp_alloc(channel_), "filtering");
         copy_groups(in_.data() + c * width, width_in(), channel_->data, width, width, points);
-        check_finite(channel_.values(), complex_, position_);
+        check_finite(channel_.values(), width, position_);
         check(dspd_fir(channel_, filtered_, filtering_.taps, states_[c]), "filtering");
         copy_groups(filtered_->data, out_width, out_.data() + c * out_width, width_out(), out_width,
                     points);

@@ -4,16 +4,33 @@
 
 #include <algorithm>
 #include <cmath>
+#include <vector>
 
 #include "base/error.hpp"
 
 namespace wavkit::tool {
 
-void check_finite(std::span<const double> values, bool complex, long first) {
+void check_finite(std::span<const double> values, std::size_t width, long first) {
     const auto bad = std::ranges::find_if_not(values, [](double v) { return std::isfinite(v); });
     if (bad == values.end()) return;
-    const auto sample = first + (bad - values.begin()) / (complex ? 2 : 1);
+    const auto sample = first + (bad - values.begin()) / std::ptrdiff_t(width);
     throw DataError("sample " + std::to_string(sample) + " is not a finite number");
+}
+
+void check_finite(const Signal& x) { check_finite(x.values(), x->complex ? 2 : 1); }
+
+std::size_t each_finite_block(SampleStream& stream, Progress& progress,
+                              const std::function<void(std::span<const double>)>& take) {
+    std::vector<double> block((1 << 15) * stream.width());
+    std::size_t points = 0;
+    for (auto count = block.size(); count == block.size(); progress.done(stream.done())) {
+        count = stream.read(block);
+        const auto values = std::span<const double>(block).first(count);
+        check_finite(values, stream.width(), long(points));
+        take(values);
+        points += count / stream.width();
+    }
+    return points;
 }
 
 void remove_mean(Signal& x) {

@@ -1,14 +1,24 @@
 // What happens to a signal before it is measured.
 #pragma once
 
+#include <functional>
 #include <span>
 
+#include "base/progress.hpp"
 #include "base/signal.hpp"
+#include "files/stream.hpp"
 
 namespace wavkit::tool {
 
-/// Refuses values that are not finite; `first` is the sample that the first one belongs to.
-void check_finite(std::span<const double> values, bool complex, long first = 0);
+/// Refuses values that are not finite, of which `width` make a point; `first` is the point that the
+/// first one belongs to.
+void check_finite(std::span<const double> values, std::size_t width, long first = 0);
+void check_finite(const Signal& x);
+
+/// Hands a stream on in blocks of whole points, whose values are finite, or it throws; how many
+/// points there were.
+std::size_t each_finite_block(SampleStream& stream, Progress& progress,
+                              const std::function<void(std::span<const double>)>& take);
 
 /// The signal without its mean.
 void remove_mean(Signal& x);

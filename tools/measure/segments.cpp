@@ -87,7 +87,7 @@ void measure_segments(SampleStream& source, const Segmentation& segmentation,
     const auto length = std::size_t(segmentation.length) * width;
     const auto step = std::size_t(segmentation.step()) * width;
     auto window = first_segment(stream, length);
-    check_finite(window, stream.complex);
+    check_finite(window, width);
     Signal x(stream.delta);
     long position = segmentation.length;  // of the next sample to be read
     for (;;) {
@@ -101,7 +101,7 @@ void measure_segments(SampleStream& source, const Segmentation& segmentation,
         std::copy(window.begin() + std::ptrdiff_t(step), window.end(), window.begin());
         const auto fresh = std::span(window).last(step);
         const auto count = stream.read(fresh);
-        check_finite(fresh.first(count), stream.complex, position);
+        check_finite(fresh.first(count), width, position);
         position += long(count / width);
         if (count < fresh.size()) break;
     }

@@ -13,6 +13,8 @@
 #include "base/error.hpp"
 #include "base/progress.hpp"
 #include "base/text.hpp"
+#include "files/stream.hpp"
+#include "show/plot.hpp"
 
 namespace wavkit::tool {
 namespace {
