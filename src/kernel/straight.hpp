@@ -137,10 +137,22 @@ inline bool run_straight_real(int n, T* data, T scale) {
     switch (n) {
         case 4:
             return run(std::integral_constant<int, 4>());
+        case 6:
+            return run(std::integral_constant<int, 6>());
         case 8:
             return run(std::integral_constant<int, 8>());
+        case 10:
+            return run(std::integral_constant<int, 10>());
+        case 12:
+            return run(std::integral_constant<int, 12>());
+        case 14:
+            return run(std::integral_constant<int, 14>());
         case 16:
             return run(std::integral_constant<int, 16>());
+        case 20:
+            return run(std::integral_constant<int, 20>());
+        case 24:
+            return run(std::integral_constant<int, 24>());
         default:
             return false;
     }
@@ -168,15 +180,15 @@ inline bool run_straight(int n, T* data, T scale) {
         case 7:
             return run_tiny<7, Outside>(data, scale), true;
         case 8:
-            return run_tiny<8, Outside>(data, scale), true;
+            return run_straight<8, 4, P, Outside>(data, scale), true;
         case 9:
             return run_straight<9, 3, 1, Outside>(data, scale), true;
         case 10:
-            return run_tiny<10, Outside>(data, scale), true;
+            return run_straight<10, 5, 1, Outside>(data, scale), true;
         case 11:
             return run_prime<11, Outside>(data, scale), true;
         case 12:
-            return run_tiny<12, Outside>(data, scale), true;
+            return run_straight<12, 6, P, Outside>(data, scale), true;
         case 13:
             return run_prime<13, Outside>(data, scale), true;
         case 14:
@@ -184,7 +196,7 @@ inline bool run_straight(int n, T* data, T scale) {
         case 15:
             return run_straight<15, 3, 1, Outside>(data, scale), true;
         case 16:
-            return run_straight<16, 4, V, Outside>(data, scale), true;
+            return run_straight<16, 4, P, Outside>(data, scale), true;
         case 17:
             return run_prime<17, Outside>(data, scale), true;
         case 18:
@@ -192,7 +204,7 @@ inline bool run_straight(int n, T* data, T scale) {
         case 19:
             return run_prime<19, Outside>(data, scale), true;
         case 20:
-            return run_straight<20, 4, 1, Outside>(data, scale), true;
+            return run_straight<20, 10, P, Outside>(data, scale), true;
         case 21:
             return run_straight<21, 3, 1, Outside>(data, scale), true;
         case 23:
