@@ -213,6 +213,8 @@ inline bool run_straight(int n, T* data, T scale) {
             return run_straight<24, 4, P, Outside>(data, scale), true;
         case 25:
             return run_straight<25, 5, 1, Outside>(data, scale), true;
+        case 27:
+            return run_straight<27, 9, 1, Outside>(data, scale), true;
         case 29:
             return run_prime<29, Outside>(data, scale), true;
         case 30:
@@ -225,16 +227,26 @@ inline bool run_straight(int n, T* data, T scale) {
             return run_straight<36, 6, P, Outside>(data, scale), true;
         case 40:
             return run_straight<40, 4, P, Outside>(data, scale), true;
+        case 45:
+            return run_straight<45, 9, 1, Outside>(data, scale), true;
         case 48:
             return run_straight<48, 8, P, Outside>(data, scale), true;
+        case 54:
+            return run_straight<54, 9, 1, Outside>(data, scale), true;
         case 60:
             return run_straight<60, 6, P, Outside>(data, scale), true;
         case 72:
             return run_straight<72, 6, P, Outside>(data, scale), true;
         case 80:
             return run_straight<80, 8, P, Outside>(data, scale), true;
+        case 81:
+            return run_straight<81, 9, 1, Outside>(data, scale), true;
         case 96:
             return run_straight<96, 8, V, Outside>(data, scale), true;
+        case 100:
+            return run_straight<100, 10, P, Outside>(data, scale), true;
+        case 120:
+            return run_straight<120, 12, P, Outside>(data, scale), true;
         case 144:
             return run_straight<144, 12, V, Outside>(data, scale), true;
         default:
