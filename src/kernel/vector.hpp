@@ -23,7 +23,9 @@ inline constexpr int lanes = register_bytes / int(sizeof(T));
 /// Calls f(0), f(1), ... f(N - 1) with constants.
 template <int N, class F>
 [[gnu::always_inline]] inline void unrolled(F f) {
-    [&]<int... I>(std::integer_sequence<int, I...>) { (f(std::integral_constant<int, I>{}), ...); }
+    [&]<int... I>(std::integer_sequence<int, I...>) __attribute__((always_inline)) {
+        (f(std::integral_constant<int, I>{}), ...);
+    }
     (std::make_integer_sequence<int, N>{});
 }
 
