@@ -12,9 +12,9 @@ namespace wavkit::test {
 template <Record R>
 class FailingAllocator {
   public:
-    explicit FailingAllocator(int fail_at = -1) {
-        countdown_ = fail_at;
-        growths_ = blocks_ = 0;
+    explicit FailingAllocator(int k = -1) {
+        blocks_ = 0;
+        fail_at(k);
         dsp_lib_alloc(&allocate, &alloc_);
         dsp_lib_realloc(&reallocate, &realloc_);
         dsp_lib_free(&release, &free_);
@@ -27,7 +27,12 @@ class FailingAllocator {
     FailingAllocator(const FailingAllocator&) = delete;
     FailingAllocator& operator=(const FailingAllocator&) = delete;
 
-    /// Growths asked for so far.
+    /// Fails the k-th growth from now on.
+    static void fail_at(int k) {
+        countdown_ = k;
+        growths_ = 0;
+    }
+    /// Growths asked for since then.
     static int growths() { return growths_; }
     /// Blocks that it gave and that have not come back.
     static int blocks() { return blocks_; }
@@ -56,20 +61,5 @@ class FailingAllocator {
     void (*realloc_)(R*, int, int) = nullptr;
     void (*free_)(R*) = nullptr;
 };
-
-/// Runs `call` again and again, failing its first growth, then its second, and so on until it has
-/// none left to fail; every failing run must report -1. Returns how many growths there were.
-template <Record R, class Call>
-int fail_each_growth(Call call) {
-    for (int k = 0;; ++k) {
-        FailingAllocator<R> memory(k);
-        const int result = call();
-        if (memory.growths() <= k) {
-            EXPECT_EQ(result, 0);
-            return k;
-        }
-        EXPECT_EQ(result, -1) << "growth " << k << " failed";
-    }
-}
 
 }  // namespace wavkit::test

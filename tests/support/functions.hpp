@@ -9,15 +9,59 @@
 #include <list>
 #include <map>
 #include <memory>
+#include <span>
+#include <string_view>
 
 #include "signals.hpp"
 
 namespace wavkit::test {
 
-/// The numbers that functions are given, in the order of their parameters: a case a list. Integers
-/// that are not there are 1, scalars 1/4.
-inline const std::map<std::string, std::vector<std::vector<double>>> numbers = {
+/// Functions that take records alone, or for whose numbers 1 and 1/4 do: with those that follow,
+/// all that there are.
+inline constexpr std::string_view plain =
+    "dsp_alloc dsp_append dsp_cmp dsp_copy dsp_copy_at_most dsp_cspline dsp_destroy "
+    "dsp_free_internal dsp_init dsp_lib_alloc dsp_lib_free dsp_lib_init dsp_lib_realloc "
+    "dsp_version dsp_window_from_str dsp_window_to_str dspb_add dspb_avg_add dspb_conj_mul "
+    "dspb_div dspb_inter dspb_max dspb_min dspb_mul dspb_pmul dspb_ritoc dspb_sub dspbs_dot "
+    "dspc_cexp dspc_cos dspc_line dspc_rsmp_cos dspc_seed dspd_fir dspf_fclose dspf_fopen "
+    "dspf_fwrite dspf_fwrite_ascii dspi_abs dspi_acos dspi_addcos dspi_analytic dspi_asin "
+    "dspi_atan dspi_besi0 dspi_besj0 dspi_besj1 dspi_besy0 dspi_besy1 dspi_bitrev "
+    "dspi_bitrev_scale dspi_conj dspi_cos dspi_cosh dspi_cscale dspi_db dspi_differ dspi_erf "
+    "dspi_erfc dspi_exp dspi_exp10 dspi_gamma dspi_hilbert dspi_hwfilt dspi_imag dspi_integ "
+    "dspi_irfft dspi_lgamma dspi_log dspi_log10 dspi_mag dspi_magsq dspi_neg dspi_offset "
+    "dspi_pdiffer dspi_phase dspi_proots dspi_ptor dspi_pztoc dspi_rdft dspi_real dspi_recip "
+    "dspi_recon dspi_rev dspi_rfft dspi_rtoc dspi_rtop dspi_scale dspi_shift dspi_shuffle dspi_sin "
+    "dspi_sinc dspi_sinh dspi_sort dspi_sqrt dspi_square dspi_swap_halves dspi_swap_halves2 "
+    "dspi_tan dspi_tanh dspi_timesi dspi_unwrap dspi_window_cos dspi_window_gauss dspi_window_sinc "
+    "dspi_zero dspi_zinter dsps_excess dsps_gmean dsps_hmean dsps_lin_regres dsps_lin_regres2 "
+    "dsps_magsq_sum dsps_max dsps_mean dsps_median dsps_min dsps_pcsolve dsps_peval "
+    "dsps_pop_stddev dsps_pop_var dsps_proots dsps_psolve dsps_rms dsps_samp_stddev dsps_samp_var "
+    "dsps_skew dsps_sum dspu_mag dspu_magsq dspu_sqrt";
+
+using Cases = std::vector<std::vector<double>>;
+
+/// Every window of the catalogue, in one scale mode or another.
+inline Cases each_window() {
+    Cases cases{{3, 0}, {14, 4}};
+    for (int id = 0; id < 24; ++id) cases.push_back({double(id), double(id % 3)});
+    return cases;
+}
+
+/// Every average, with a share of the caller's and with one that forgets, of powers.
+inline Cases each_average() {
+    Cases cases{{1, 1}, {1, 2, 1, -1}};
+    for (int type = 1; type < 7; ++type) {
+        cases.push_back({double(type), 2});
+        cases.push_back({double(type | 0x30), 4, 3, -1, 3});
+    }
+    return cases;
+}
+
+/// The numbers that other functions are given, in the order of their parameters: a case a list.
+/// Integers that are not there are 1, scalars 1/4; a number stands for a stream, too.
+inline const std::map<std::string, Cases> numbers = {
     {"dsp_interp", {{1}, {3}, {5}}},
+    {"dsp_realloc", {{0}, {1}, {300}}},
     {"dsp_window2_enbw", {{6, 100, 17.5}}},
     {"dsp_window2_scale", {{6, 8, 100, 17.5}, {14, 5, 33}}},
     {"dsp_window_enbw", {{14, 10}}},
@@ -34,8 +78,9 @@ inline const std::map<std::string, std::vector<std::vector<double>>> numbers = {
     {"dspd_rsmp", {{3, 2}}},
     {"dspd_rsmp2", {{1}, {3}}},
     {"dspd_sfir", {{0, 1}, {1, 0}}},
-    {"dspf_fwrite2", {{0}, {1}}},
-    {"dsph_avg", {{1, 1}, {1, 2, 1, -1}, {3, 2}, {4, 2}, {5, 2}, {0x21, 2}, {0x25, 2}}},
+    {"dspf_fread", {{0}, {1}, {2}, {3}, {4}}},
+    {"dspf_fwrite2", {{0, 0}, {0, 1}}},
+    {"dsph_avg", each_average()},
     {"dsph_corr", {{1, 0}, {3, 1}}},
     {"dsph_dft", {{20, 0}, {2, 1}, {0, 4}, {0, 0x80}}},
     {"dsph_fft", {{0, 1, 2, 0}, {0, 1, 0, 1}, {0, 1, 0, 4}, {0, 1, 0, 0x80}, {700, 0.5, 6, 2}}},
@@ -47,7 +92,7 @@ inline const std::map<std::string, std::vector<std::vector<double>>> numbers = {
     {"dspi_limit", {{2, 3}}},
     {"dspi_orecon", {{0}, {1}}},
     {"dspi_unzpad", {{3, 0x200}}},
-    {"dspi_window", {{3, 0}, {14, 4}}},
+    {"dspi_window", each_window()},
     {"dspi_window2", {{2, 8, 3}, {9, 9, 3.5}}},
     {"dspi_window_fir", {{16}, {100}, {101}, {103}}},
     {"dspi_window_kaiser", {{3, 1}}},
@@ -67,6 +112,31 @@ inline const std::map<std::string, std::size_t> optional_records = {
 /// Functions that read a whole number behind the history of a stream, where there is one.
 inline bool keeps_place(const std::string& name) {
     return name == "dspd_deci" || name == "dspd_rsmp" || name.ends_with("_hwfilt");
+}
+
+/// Writes a signal whose header is followed by zeros.
+template <class T>
+void fill_stream(std::uint32_t magic, std::int32_t n, FILE* stream) {
+    const T delta = 1, last = 0;
+    const std::int32_t head[] = {n, 0};
+    std::fwrite(&magic, sizeof magic, 1, stream);
+    std::fwrite(head, sizeof head, 1, stream);
+    std::fwrite(&delta, sizeof delta, 1, stream);
+    std::fseek(stream, long(sizeof(T)) * (n - 1), SEEK_CUR);
+    std::fwrite(&last, sizeof last, 1, stream);
+}
+
+/// What streams begin with: a short text and a long one, a signal of either precision, and one that
+/// readers take in several steps.
+inline void fill_stream(int which, FILE* stream) {
+    if (which < 2) {
+        for (int i = 0; i < (which ? 2048 : 3); ++i) std::fputs("1 2 ", stream);
+    } else if (which == 2) {
+        fill_stream<double>(0xEB0110BE, 3, stream);
+    } else {
+        fill_stream<float>(0xEB0220BE, which == 3 ? 3 : (1 << 20) + 1, stream);
+    }
+    std::rewind(stream);
 }
 
 /// What a call is given, and what it leaves beside its result.
@@ -92,8 +162,7 @@ struct Arguments {
             return &number;
         } else if constexpr (std::same_as<P, FILE*>) {
             stream.reset(std::tmpfile());
-            std::fputs("1 2 3", stream.get());
-            std::rewind(stream.get());
+            fill_stream(next<int>(), stream.get());
             return stream.get();
         } else if constexpr (std::same_as<P, const dsp*> && !std::same_as<R, dsp>) {
             return &positions;
@@ -114,11 +183,81 @@ struct Case {
     bool leaves_out;       // whether it is
 
     bool random() const { return name == "dspc_rand" || name == "dspi_shuffle"; }
+    /// Whether no other thread may be inside the library.
+    bool alone() const { return name == "dsp_free_internal" || name.starts_with("dsp_lib_"); }
+    /// Whether its input is a long stream, whatever its records are.
+    bool reads_long() const { return name == "dspf_fread" && numbers[0] == 4; }
     friend std::ostream& operator<<(std::ostream& stream, const Case& c) {
         return stream << c.name << listed(c.numbers)
                       << (c.leaves_out ? " without its optional record" : "");
     }
 };
+
+/// One of two functions of the same signature, as the precision asks.
+template <Record R, class Function>
+constexpr Function* pick(Function* of_double, Function* of_single) {
+    return std::same_as<R, dsp> ? of_double : of_single;
+}
+
+/// Gives `add` what has no record among its parameters, or is to be called in a way of its own.
+template <Record R, class Add>
+void add_own_calls(Add add) {
+    add("dsp_init", [](R* x) {
+        R fresh;
+        return status(dsp_init(&fresh) || dsp_copy(x, &fresh));
+    });
+    add("dsp_alloc", [](R* x) { return status(dsp_alloc(x) || dspi_zero(x)); });
+    add("dsp_realloc", [](R* x, int more) {
+        const std::size_t had = used(x);
+        const int points = x->points;
+        x->points += more;
+        if (dsp_realloc(x, points, x->complex)) return -1;
+        std::ranges::fill(values(x).subspan(had), scalar<R>(0));
+        return 0;
+    });
+    add("dsp_destroy", [](R* x) { return dsp_destroy(x); });
+    add("dsp_free_internal", [](R* x) {
+        return status(dspi_window(x, DSP_WINDOW_HANN, 0) || dspi_dft(x, 0) || free_internal<R>());
+    });
+    add("dsp_lib_init", [](R*) { return pick<R>(::dsp_lib_init, ::dspf_lib_init)(); });
+    add("dsp_version", [](R*) { return pick<R>(::dsp_version, ::dspf_version)(); });
+    add("dsp_lib_alloc", [](R*) {
+        void (*hook)(R*);
+        return status(dsp_lib_alloc(nullptr, &hook) || dsp_lib_alloc(hook, nullptr));
+    });
+    add("dsp_lib_realloc", [](R*) {
+        void (*hook)(R*, int, int);
+        return status(dsp_lib_realloc(nullptr, &hook) || dsp_lib_realloc(hook, nullptr));
+    });
+    add("dsp_lib_free", [](R*) {
+        void (*hook)(R*);
+        return status(dsp_lib_free(nullptr, &hook) || dsp_lib_free(hook, nullptr));
+    });
+    add("dsp_window_to_str", [](int* first, int window) {
+        char name[8];
+        const int result = pick<R>(::dsp_window_to_str, ::dspf_window_to_str)(window, name, 8);
+        *first = name[0];
+        return result;
+    });
+    add("dsp_window_from_str", [](int* window) {
+        return pick<R>(::dsp_window_from_str, ::dspf_window_from_str)("Hann", window);
+    });
+    constexpr auto open_and_close = [](R*) {
+        FILE* const file = pick<R>(::dspf_fopen, ::dspff_fopen)("/dev/null", "rb");
+        return file ? pick<R>(::dspf_fclose, ::dspff_fclose)(file) : -1;
+    };
+    add("dspf_fopen", open_and_close);
+    add("dspf_fclose", open_and_close);
+    add("dspc_seed", [](R* x) { return status(seed_random<R>(5) || dspc_rand(x, 0)); });
+}
+
+/// The cases that the tables have for a function.
+inline Cases cases_of(const std::string& name) {
+    const auto listed = numbers.find(name);
+    if (listed != numbers.end()) return listed->second;
+    const bool known = (" " + std::string(plain) + " ").find(" " + name + " ") != name.npos;
+    return known ? Cases{{}} : Cases{};
+}
 
 /// All cases of all functions.
 template <Record R>
@@ -133,14 +272,12 @@ std::vector<Case<R>> every_case() {
             if (std::same_as<std::remove_const_t<Q>, R>) is_const.push_back(std::is_const_v<Q>);
         };
         (note(std::type_identity<std::remove_pointer_t<P>>()), ...);
-        const auto listed = numbers.find(name);
         const auto optional = optional_records.find(name);
-        for (const auto& given :
-             listed == numbers.end() ? decltype(listed->second){{}} : listed->second) {
-            const bool has_optional = optional != optional_records.end();
-            // (In single precision the positions of dspd_rsmp2 are none of the records.)
-            const auto place =
-                has_optional ? std::min(optional->second, is_const.size() - 1) : is_const.size();
+        const bool has_optional = optional != optional_records.end();
+        // (In single precision the positions of dspd_rsmp2 are none of the records.)
+        const auto place =
+            has_optional ? std::min(optional->second, is_const.size() - 1) : is_const.size();
+        for (const auto& given : cases_of(name)) {
             cases.push_back({name, is_const, call, given, place, false});
             if (has_optional) cases.push_back({name, is_const, call, given, place, true});
         }
@@ -153,6 +290,7 @@ std::vector<Case<R>> every_case() {
         }
     };
     std::apply([&](const auto&... twins) { (add_twin(twins), ...); }, every_function);
+    add_own_calls<R>([&](const char* name, auto call) { add(name, +call); });
     return cases;
 }
 
@@ -184,11 +322,27 @@ struct Run {
         if (to != from) records[to] = records[from];
     }
 
+    /// Lets the operands end at half of their points, or have them all again.
+    void halve(bool half) {
+        for (std::size_t place = 0; place < records.size(); ++place) {
+            R* const x = records[place];
+            if (!of.is_const[place] || !x) continue;
+            const int all = int(before[place].size()) / width(x);
+            x->points = half ? (all + 1) / 2 : all;
+        }
+    }
+
     /// Calls; returns the result and all that the function may have written but for scratch.
     std::vector<scalar<R>> operator()() {
-        Arguments<R> arguments{records, of.numbers};
-        result = of.call(arguments);
-        std::vector left{scalar<R>(result), scalar<R>(arguments.integer), arguments.number};
+        prepare();
+        call();
+        return outcome();
+    }
+
+    void prepare() { arguments.reset(new Arguments<R>{records, of.numbers}); }
+    void call() { result = of.call(*arguments); }
+    std::vector<scalar<R>> outcome() const {
+        std::vector left{scalar<R>(result), scalar<R>(arguments->integer), arguments->number};
         for (std::size_t place = 0; place < records.size(); ++place) {
             const R* x = records[place];
             const bool is_scratch = place == of.optional && of.name.find("corr") != of.name.npos;
@@ -219,8 +373,22 @@ struct Run {
     std::list<Borrowed<R>> hosts;
     std::vector<std::vector<scalar<R>>> before;
     std::vector<R*> records;
+    std::unique_ptr<Arguments<R>> arguments;
     int result = 0;
 };
+
+/// Runs `share(to, from)` for every place of an output with every place of an operand that it may
+/// share a buffer with.
+template <Record R, class Share>
+void each_sharing(const Case<R>& c, Share share) {
+    if (c.name == "dsp_append") return;  // shares in ways of its own
+    for (std::size_t to = 0; to < c.is_const.size(); ++to) {
+        for (std::size_t from = 0; from < c.is_const.size(); ++from) {
+            const bool left_out = c.leaves_out && (from == c.optional || to == c.optional);
+            if (!c.is_const[to] && c.is_const[from] && !left_out) share(to, from);
+        }
+    }
+}
 
 /// Whether two lists are the same bit for bit.
 template <class T>

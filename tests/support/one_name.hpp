@@ -60,4 +60,9 @@ int free_internal() {
     return std::same_as<R, dsp> ? dsp_free_internal() : dspf_free_internal();
 }
 
+template <Record R>
+int seed_random(std::uint64_t seed) {
+    return std::same_as<R, dsp> ? dspc_seed(seed) : dspfc_seed(seed);
+}
+
 }  // namespace wavkit::one_name

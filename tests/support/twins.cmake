@@ -1,7 +1,11 @@
 # Writes a header that gives the twins of both precisions, as the public headers declare them, one
 # name in the tests. Functions that take no record and no scalar are the same in both.
 set(twins)
+set(declared)
 foreach(header IN LISTS WAVKIT_HEADERS)
+  file(STRINGS ${header} prototypes REGEX "^WAVKIT_API .*[ *]dsp[a-z0-9_]+\\(")
+  list(TRANSFORM prototypes REPLACE "^.*[ *](dsp[a-z0-9_]+)\\(.*" "\"\\1\"")
+  list(APPEND declared ${prototypes})
   file(STRINGS ${header} singles REGEX "^WAVKIT_API int dspf.*\\(.*(dspf|float)")
   list(TRANSFORM singles REPLACE "^WAVKIT_API int dspf([a-z0-9_]+)\\(.*" "\\1")
   list(APPEND twins ${singles})
@@ -12,10 +16,12 @@ list(FILTER twins EXCLUDE REGEX "_(init|alloc|realloc|destroy|lib_.*)$")
 list(TRANSFORM twins PREPEND "dsp" OUTPUT_VARIABLE names)
 list(JOIN definitions "\n" definitions)
 list(JOIN names ", " names)
+list(JOIN declared ", " declared)
 file(CONFIGURE OUTPUT ${CMAKE_CURRENT_BINARY_DIR}/support/twins.hpp CONTENT
 "#define TWINS(of_double, of_single) \\
     inline constexpr Twins of_double{#of_double, ::of_double, ::of_single};
 ${definitions}
 inline constexpr std::tuple every_function{${names}};
+inline constexpr const char* declared[] = {${declared}};
 ")
 set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${WAVKIT_HEADERS})
