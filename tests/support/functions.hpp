@@ -38,6 +38,7 @@ inline const std::map<std::string, std::vector<std::vector<double>>> numbers = {
     {"dsph_avg", {{1, 1}, {1, 2, 1, -1}, {3, 2}, {4, 2}, {5, 2}, {0x21, 2}, {0x25, 2}}},
     {"dsph_corr", {{1, 0}, {3, 1}}},
     {"dsph_dft", {{20, 0}, {2, 1}, {0, 4}, {0, 0x80}}},
+    {"dsph_distortion", {{0.25, 3, 0}, {0.2, 2, 2}}},
     {"dsph_fft", {{0, 1, 2, 0}, {0, 1, 0, 1}, {0, 1, 0, 4}, {0, 1, 0, 0x80}, {700, 0.5, 6, 2}}},
     {"dspi_dct", {{0}, {3}}},
     {"dspi_dft", {{0}, {1}}},
