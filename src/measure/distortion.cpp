@@ -179,7 +179,7 @@ int distortion(const R* x, R* out, R* harmonics, scalar<R> frequency, int count,
 
     const auto first = lines.place(cycles);
     if (!(first.bin >= 2 * tone.half_lobe && first.bin <= 0.5 * n - tone.half_lobe)) return -1;
-    const double phase = tone.sine->data[2], offset = 0.5 * double(bins(tone.spectrum.get())[0].re);
+    const double phase = tone.sine->data[2], offset = tone.sine->data[3];
     const double turn = lines.phase(first) - phase;  // from the first sample to the centre
     const double power = lines.power(first.bin);
     lines.take_out(0);

@@ -8,6 +8,8 @@
 #include <array>
 #include <cmath>
 #include <limits>
+#include <tuple>
+#include <utility>
 
 #include "kernel/lanes.hpp"
 #include "record_view.hpp"
@@ -51,15 +53,32 @@ struct Circle {
     double cosine[block_points], sine[block_points];
 };
 
-/// sum e^(i w j), sum j e^(i w j) and sum j^2 e^(i w j) of the first `count` samples of a block.
+/// sum e^(i w j), sum j e^(i w j) and sum j^2 e^(i w j) of the first `count` samples of a block, or
+/// the same with twice the w.
 struct Moments {
-    explicit Moments(const Circle& circle, int count, bool twice) {
-        for (int j = 0; j < count; ++j) {
-            const double c = circle.cosine[j], s = circle.sine[j];
-            const Phasor z = twice ? Phasor{c * c - s * s, 2 * c * s} : Phasor{c, s};
-            for (auto& sum : sums) {
-                const double power = &sum == &sums[0] ? 1 : &sum == &sums[1] ? j : double(j) * j;
-                sum = sum + z * power;
+    Moments(const Circle& circle, int count, bool twice) {
+        constexpr int V = kernel::lanes<double>;
+        kernel::Lanes<double> re[3] = {}, im[3] = {}, j{};
+        for (int k = 0; k < V; ++k) j[k] = k;
+        int i = 0;
+        for (; i + V <= count; i += V, j += double(V)) {
+            auto c = kernel::load<double, V>(circle.cosine + i);
+            auto s = kernel::load<double, V>(circle.sine + i);
+            if (twice) std::tie(c, s) = std::pair(c * c - s * s, 2 * c * s);
+            kernel::unrolled<3>([&](auto power) {
+                re[power] += c;
+                im[power] += s;
+                c *= j, s *= j;
+            });
+        }
+        for (std::size_t power = 0; power < 3; ++power) {
+            for (int k = 0; k < V; ++k) sums[power] += {re[power][k], im[power][k]};
+        }
+        for (; i < count; ++i) {
+            const Phasor once{circle.cosine[i], circle.sine[i]};
+            const Phasor z = twice ? once * once : once;
+            for (int power = 0; power < 3; ++power) {
+                sums[std::size_t(power)] += z * std::pow(double(i), power);
             }
         }
     }
