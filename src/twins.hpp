@@ -70,6 +70,9 @@ inline int dspi_window2(dspf* x, int window, int scale_type, float win_length) {
 inline int dspi_window(dspf* x, int window, int scale_type) {
     return dspfi_window(x, window, scale_type);
 }
+inline int dsp_window_enbw(float* enbw, int window, int n) {
+    return dspf_window_enbw(enbw, window, n);
+}
 inline int dspi_window_gauss(dspf* x, float sigma, int scale_type) {
     return dspfi_window_gauss(x, sigma, scale_type);
 }
@@ -80,6 +83,10 @@ inline int dspi_window_sinc(dspf* x, float x0, float p, int scale_type) {
     return dspfi_window_sinc(x, x0, p, scale_type);
 }
 
+inline int dsph_dft(const dspf* in, dspf* out, int window, int flags) {
+    return dspfh_dft(in, out, window, flags);
+}
+
 inline int dspc_line(dspf* x, float slope, float offset) { return dspfc_line(x, slope, offset); }
 
 inline int dsps_sum(const dspf* x, dspf* out) { return dspfs_sum(x, out); }
@@ -87,6 +94,9 @@ inline int dsps_mean(const dspf* x, dspf* out) { return dspfs_mean(x, out); }
 inline int dsps_rms(const dspf* x, dspf* out) { return dspfs_rms(x, out); }
 inline int dsps_pop_var(const dspf* x, dspf* out) { return dspfs_pop_var(x, out); }
 inline int dsps_magsq_sum(const dspf* x, dspf* out) { return dspfs_magsq_sum(x, out); }
+inline int dsps_sine_fit(const dspf* x, dspf* out, float frequency, int flags) {
+    return dspfs_sine_fit(x, out, frequency, flags);
+}
 
 inline int dsps_psolve(const dspf* polynomial, dspf* out, float x0) {
     return dspfs_psolve(polynomial, out, x0);

@@ -52,6 +52,7 @@ void run(CLI::App& program, int argc, char** argv) {
     wavkit::tool::add_info(program);
     wavkit::tool::add_convert(program);
     wavkit::tool::add_spectrum(program);
+    wavkit::tool::add_distortion(program);
     wavkit::tool::add_correlate(program);
     wavkit::tool::add_envelope(program);
     wavkit::tool::add_window(program);
@@ -72,6 +73,7 @@ void run(CLI::App& program, int argc, char** argv) {
     wavkit::tool::add_derive(program);
     wavkit::tool::add_integrate(program);
     wavkit::tool::add_edges(program);
+    wavkit::tool::add_peaks(program);
     wavkit::tool::add_help(program);
     wavkit::tool::offer_skipping(program);
     if (argc > 1 && argv[1][0] != '-') wavkit::tool::check_command(program, argv[1]);

@@ -1,5 +1,6 @@
 /** @file measure.h
- *  Measurement spectra: amplitudes of a windowed signal, running averages, sliding correlation.
+ *  Measurement spectra: amplitudes of a windowed signal, harmonics and noise of a tone, running
+ *  averages, sliding correlation.
  *
  *  These functions put those of the other headers together in the order that a measurement needs:
  *  dsph_fft() windows a time record, pads it to a power of two and transforms it so that a sine of
@@ -93,6 +94,62 @@ WAVKIT_API int dspfh_fft(const dspf *in, dspf *out, int npts, float fraction, in
  *  @return 0; -1 for a null record, an unknown window, or when memory runs out */
 WAVKIT_API int dsph_dft(const dsp *in, dsp *out, int window, int flags);
 WAVKIT_API int dspfh_dft(const dspf *in, dspf *out, int window, int flags);
+
+/** Measures a tone as converters, amplifiers and generators are judged by it: its harmonics, the
+ *  noise, and the strongest of what does not belong to it. 14 real points:
+ *
+ *  | index | value                                                                |
+ *  |-------|----------------------------------------------------------------------|
+ *  |   0   | frequency f of the tone                                              |
+ *  |   1   | amplitude A[1]                                                       |
+ *  |   2   | phase at the first sample, as a cosine, in radians                   |
+ *  |   3   | offset                                                               |
+ *  |   4   | THD = sqrt(A[2]^2 + ... + A[count]^2) / A[1]                         |
+ *  |   5   | THD+N = sqrt(noise^2 + (A[2]^2 + ... + A[count]^2) / 2) / rms,       |
+ *  |       | rms = A[1] / sqrt 2                                                  |
+ *  |   6   | SINAD = -20 log10(THD+N), in decibels                                |
+ *  |   7   | SNR = 20 log10(rms / noise), in decibels                             |
+ *  |   8   | SFDR = 20 log10(A[1] / A of the strongest other component)           |
+ *  |   9   | ENOB = (SINAD - 10 log10 1.5) / (20 log10 2), in bits: those of an   |
+ *  |       | ideal converter that the tone fills                                  |
+ *  |  10   | noise: rms value of all that is neither harmonic nor offset          |
+ *  |  11   | noise floor: its rms value per root of the frequency,                |
+ *  |       | noise sqrt(2 delta)                                                  |
+ *  |  12   | where the strongest other component shows, from 0 to 1 / (2 delta)   |
+ *  |  13   | its amplitude                                                        |
+ *
+ *  The frequency is that of dsps_sine_fit() from `frequency` or the highest bin on. The signal is
+ *  seen through the window at its own length, dsph_dft(). A window leaks every component into the
+ *  bins of its main lobe, whose powers, over its noise bandwidth, add up to the component's: at
+ *  whatever place between bins it lies. A lobe reaches K bins to either side for a sum of K cosines
+ *  (Uniform 1, Hann 2, Gausstop 5, P601 7), 4 to 6 for Kaiser's, 5 for Gauss's, 2 otherwise.
+ *  Harmonic h is looked for at h f, beyond half the sampling rate where it is folded to. What no
+ *  lobe of offset, tone and harmonics holds is noise, and counts as if there were as much of it in
+ *  their bins. What leaks beyond the main lobe counts as noise, too, and limits it: see
+ *  docs/program.md for how far down each window sees. Through the uniform window the record must
+ *  hold whole periods.
+ *
+ *  A harmonic whose lobe meets that of the offset, the tone or a lower harmonic cannot be told from
+ *  it: it is NaN, and in no figure.
+ *
+ *  See IEEE Std 1241 and 1057 (terms and test methods for converters), and F. J. Harris, "On the
+ *  use of windows for harmonic analysis with the discrete Fourier transform", 1978.
+ *  @param x          real signal that holds at least twice as many periods as a lobe has bins to
+ *                    one side; a `delta` of 0 counts as 1
+ *  @param out        its `delta` is kept; may be x
+ *  @param harmonics  count + 1 complex points, `delta` = f, or null: the offset, and of each
+ *                    harmonic A[h] e^(i phi[h]), its amplitude and its phase at the first sample,
+ *                    so that x[n] = offset + sum A[h] cos(2 pi h f n delta + phi[h]). May be x,
+ *                    not out.
+ *  @param frequency  where the tone is looked for, or 0: the strongest one
+ *  @param count      harmonics, the tone itself among them; below 1: 1
+ *  @param window     identifier, see window.h
+ *  @return 0; -1 for a complex signal, too few points or periods, a tone within a lobe of half the
+ *          sampling rate, an unknown window (nothing is then touched), or when memory runs out */
+WAVKIT_API int dsph_distortion(const dsp *x, dsp *out, dsp *harmonics, double frequency, int count,
+                               int window);
+WAVKIT_API int dspfh_distortion(const dspf *x, dspf *out, dspf *harmonics, float frequency,
+                                int count, int window);
 
 /** What `flags` of dsph_avg() is put together from: one type and any of the last two. */
 enum {

@@ -1,11 +1,11 @@
 /** @file statistics.h
- *  A signal reduced to one value, to a histogram, to a peak or to a straight line.
+ *  A signal reduced to one value, to a histogram, to peaks, to a line or to a sine.
  *
  *  The input is read only and its `delta` is not used, except for the abscissae of
- *  dsps_lin_regres(). The functions down to dsps_hmean() size `out` as one point, real unless said
- *  otherwise, and leave its `delta` alone. `out` may be the input or a record over its buffer. N is
- *  the number of points; the value for an empty record is 0 except where another one is named, and
- *  an empty record is no error.
+ *  dsps_lin_regres() and dsps_sine_fit(). The functions down to dsps_hmean() size `out` as one
+ *  point, real unless said otherwise, and leave its `delta` alone. `out` may be the input or a
+ *  record over its buffer. N is the number of points; the value for an empty record is 0 except
+ *  where another one is named, and an empty record is no error.
  *
  *  B stands for the large value, 1e100 in double and 1e15 in single precision: values beyond +-B
  *  count as +-B in the sums of powers and deviations, and B marks a ratio whose denominator is 0.
@@ -163,6 +163,56 @@ enum {
 WAVKIT_API int dsps_peak(const dsp *x, dsp *out, unsigned flags, int index);
 WAVKIT_API int dspfs_peak(const dspf *x, dspf *out, unsigned flags, int index);
 
+/** The values that dsps_peaks() gives for a peak, by their place among them. */
+enum {
+    DSP_PEAKS_INDEX = 0,      /**< the sample */
+    DSP_PEAKS_HEIGHT = 1,     /**< its value */
+    DSP_PEAKS_PROMINENCE = 2, /**< how far it rises above the higher of its bases */
+    DSP_PEAKS_LEFT_BASE = 3,  /**< lowest sample on the way to a higher one, or to the end */
+    DSP_PEAKS_RIGHT_BASE = 4, /**< the same to the other side */
+    DSP_PEAKS_WIDTH = 5,      /**< in samples, from DSP_PEAKS_LEFT to DSP_PEAKS_RIGHT */
+    DSP_PEAKS_LEFT = 6,       /**< where the signal falls to the height of the width */
+    DSP_PEAKS_RIGHT = 7,      /**< the same to the other side */
+    DSP_PEAKS_POSITION = 8,   /**< of the top, between samples */
+    DSP_PEAKS_TOP = 9,        /**< its height there */
+    DSP_PEAKS_VALUES = 10     /**< how many values a peak has */
+};
+
+/** Finds the peaks of a real signal that are high, steep, lonely, prominent and wide enough: a row
+ *  of DSP_PEAKS_VALUES real points for each, in the order of the signal.
+ *
+ *  A peak is a sample above its neighbours, or the middle (rounded down) of several equal ones that
+ *  are above theirs; the first and the last sample are none. Of all peaks those are kept, in this
+ *  order of the conditions, that
+ *
+ *  - are at least `height` high: x[i] >= height
+ *  - rise from both neighbours by `threshold`: x[i] - max(x[i - 1], x[i + 1]) >= threshold
+ *  - have no higher kept peak nearer than `distance` samples: beginning with the highest, of equal
+ *    ones the last, a peak takes away all that are nearer to it than `distance`, rounded up
+ *  - have a prominence of at least `prominence`. The signal is followed to either side until it is
+ *    higher than the peak or ends; the lowest samples on the way, of equal ones the nearest, are
+ *    the bases, and the prominence is the height above the higher one.
+ *  - are at least `width` wide at the height x[i] - rel_height prominence, which a line between
+ *    samples crosses, no further away than the bases
+ *
+ *  NaN for a condition asks for nothing. These are the definitions of find_peaks() of SciPy. They
+ *  take O(N log N) whatever the signal: prominences by a stack of the samples that are still to be
+ *  exceeded, widths by a tree of minima.
+ *
+ *  Position and top are those of the parabola through the sample and its neighbours, as with
+ *  DSP_PEAK_PARABOLIC; of several equal samples, those of their middle. A NaN among the samples is
+ *  no peak, nor are its neighbours; beside it the signal ends for prominences and widths.
+ *  Positions of single precision are exact up to 2^24 samples.
+ *  @param x           real signal; `delta` is not used
+ *  @param out         DSP_PEAKS_VALUES points for each peak; its `delta` is kept; may be x
+ *  @param height,threshold,distance,prominence,width  least values, or NaN
+ *  @param rel_height  where widths are measured, in shares of the prominence; 0.5 is usual
+ *  @return 0; -1 for a complex signal (`out` is then untouched) or when memory runs out */
+WAVKIT_API int dsps_peaks(const dsp *x, dsp *out, double height, double threshold, double distance,
+                          double prominence, double width, double rel_height);
+WAVKIT_API int dspfs_peaks(const dspf *x, dspf *out, float height, float threshold, float distance,
+                           float prominence, float width, float rel_height);
+
 /** Fits a straight line by least squares: two real points, slope and intercept of y on x.
  *
  *  A real signal gives y[i] = data[i] at x[i] = i * delta (a `delta` of 0 counts as 1). Its
@@ -207,6 +257,51 @@ WAVKIT_API int dspfs_lin_regres(const dspf *data, dspf *out);
  *  @return 0, or -1 when memory runs out */
 WAVKIT_API int dsps_lin_regres2(const dsp *data, dsp *out);
 WAVKIT_API int dspfs_lin_regres2(const dspf *data, dspf *out);
+
+/** What `flags` of dsps_sine_fit() holds. */
+enum {
+    DSP_SINE_FREE = 0, /**< four parameters: the frequency that fits best */
+    DSP_SINE_FIXED = 1 /**< three parameters: the frequency as it is given */
+};
+
+/** Fits a sine by least squares, and tells how well: 9 real points. The model of a signal of N
+ *  points is
+ *
+ *      x[n] = C + A cos(2 pi f n delta + phi),  n = 0 .. N - 1
+ *
+ *  | index | value                                                             |
+ *  |-------|-------------------------------------------------------------------|
+ *  |   0   | frequency f, not negative                                         |
+ *  |   1   | amplitude A, not negative                                         |
+ *  |   2   | phase phi at the first sample, in radians, within [-pi, pi]       |
+ *  |   3   | offset C                                                          |
+ *  |   4   | rms value of what the sine leaves, sqrt(sum r[n]^2 / N)           |
+ *  | 5 - 8 | standard errors of f, A, phi and C: what they would scatter if    |
+ *  |       | the rest were white noise; 0 where N is the number of parameters  |
+ *
+ *  These are the three- and the four-parameter fit of IEEE Std 1057 (annex A), by the method of
+ *  Gauss and Newton about the middle of the record, where all sums are formed in double precision
+ *  whatever that of the samples. With DSP_SINE_FREE a `frequency` above 0 is where the search
+ *  begins: it finds the best fit from within half a bin, 1 / (2 N delta), and goes on from further
+ *  off as long as the rest becomes less. Otherwise it begins at the highest bin of the spectrum
+ *  (through a Hann window, interpolated between bins), which takes a tone of at least one period
+ *  that is stronger than anything else. Harmonics and other tones disturb the fit by little, as
+ *  they are nearly orthogonal to the sine over many periods.
+ *
+ *  In noise of variance s^2 the errors reach the bound of Cramer and Rao: f then has the
+ *  variance 6 s^2 / (pi^2 A^2 N^3 delta^2) for long records (D. C. Rife and R. R. Boorstyn,
+ *  "Single-tone parameter estimation from discrete-time observations", 1974). A parameter that the
+ *  samples cannot tell from the others stays 0: the amplitude at a frequency of 0, the sine part at
+ *  half the sampling rate. The squares of the samples must not overflow.
+ *  @param x          real signal of 4 points or more, or 3 with DSP_SINE_FIXED; a `delta` of 0
+ *                    counts as 1
+ *  @param out        its `delta` is kept; may be x
+ *  @param frequency  in cycles per unit of `delta`
+ *  @param flags      DSP_SINE_... constants
+ *  @return 0; -1 for a complex signal or too few points (`out` is then untouched), or when memory
+ *          runs out */
+WAVKIT_API int dsps_sine_fit(const dsp *x, dsp *out, double frequency, int flags);
+WAVKIT_API int dspfs_sine_fit(const dspf *x, dspf *out, float frequency, int flags);
 
 #ifdef __cplusplus
 }

@@ -213,4 +213,68 @@ public static unsafe class DspApi
     /// <returns>0, or -1 when memory runs out.</returns>
     public static int dsps_max(DspInput input, DspInput output) =>
         Call(NativeMethods.dsps_max, input, output);
+
+    /// <summary>Fits a sine by least squares.</summary>
+    /// <param name="input">The signal, real, 4 samples or more (3 with
+    /// <see cref="DspSine.Fixed"/>).</param>
+    /// <param name="output">Nine samples: frequency, amplitude, phase at the first sample in radians,
+    /// offset, the rms value of what the sine leaves, and the standard errors of the first
+    /// four.</param>
+    /// <param name="frequency">Where the frequency is looked for, or what it is; 0 for the strongest
+    /// tone.</param>
+    /// <param name="flags">A <see cref="DspSine"/>.</param>
+    /// <returns>0; -1 for a complex or too short a signal, or when memory runs out.</returns>
+    public static int dsps_sine_fit(DspInput input, DspInput output, double frequency, int flags)
+    {
+        int result = NativeMethods.dsps_sine_fit(input.GetDspPtr(), output.GetDspPtr(), frequency, flags);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        return result;
+    }
+
+    /// <summary>Finds peaks by height, steepness, distance, prominence and width; NaN asks for
+    /// nothing.</summary>
+    /// <param name="input">The signal, real.</param>
+    /// <param name="output">Ten samples for each peak: index, height, prominence, left and right base,
+    /// width, its left and right end, the place between samples and the height there.</param>
+    /// <param name="height">How high at least.</param>
+    /// <param name="threshold">How far above both neighbours.</param>
+    /// <param name="distance">How many samples from higher peaks.</param>
+    /// <param name="prominence">How far above the higher base.</param>
+    /// <param name="width">How many samples wide.</param>
+    /// <param name="relHeight">Where widths are measured, in shares of the prominence; 0.5 is
+    /// usual.</param>
+    /// <returns>0; -1 for a complex signal, or when memory runs out.</returns>
+    public static int dsps_peaks(DspInput input, DspInput output, double height, double threshold,
+        double distance, double prominence, double width, double relHeight)
+    {
+        int result = NativeMethods.dsps_peaks(input.GetDspPtr(), output.GetDspPtr(), height, threshold,
+            distance, prominence, width, relHeight);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        return result;
+    }
+
+    /// <summary>Measures harmonics and noise of a tone.</summary>
+    /// <param name="input">The signal, real.</param>
+    /// <param name="output">Fourteen samples: frequency, amplitude, phase in radians, offset, THD, THD+N,
+    /// SINAD, SNR and SFDR in decibels, ENOB, rms noise, noise per root of the frequency, and frequency
+    /// and amplitude of the strongest other component.</param>
+    /// <param name="harmonics">The offset and the harmonics as complex samples, amplitude and phase, the
+    /// tone's frequency apart; or null.</param>
+    /// <param name="frequency">Where the tone is looked for; 0 for the strongest one.</param>
+    /// <param name="count">How many harmonics, the tone among them.</param>
+    /// <param name="window">A <see cref="DspWindow"/>.</param>
+    /// <returns>0; -1 for a complex signal, for one with too few periods, for a window that does not
+    /// exist, or when memory runs out.</returns>
+    public static int dsph_distortion(DspInput input, DspInput output, DspInput? harmonics,
+        double frequency, int count, int window)
+    {
+        int result = NativeMethods.dsph_distortion(input.GetDspPtr(), output.GetDspPtr(),
+            harmonics == null ? null : harmonics.GetDspPtr(), frequency, count, window);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(harmonics);
+        return result;
+    }
 }

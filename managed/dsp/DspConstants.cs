@@ -85,3 +85,12 @@ public enum DspDirection
     /// <summary>From bins to samples.</summary>
     Inverse = 1,
 }
+
+/// <summary>What <see cref="DspApi.dsps_sine_fit"/> fits.</summary>
+public enum DspSine
+{
+    /// <summary>Four parameters: the frequency that fits best.</summary>
+    Free = 0,
+    /// <summary>Three parameters: the frequency as it is given.</summary>
+    Fixed = 1,
+}

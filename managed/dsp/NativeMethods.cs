@@ -8,7 +8,10 @@ using unsafe OfRecord = delegate* unmanaged[Cdecl]<dsp_struct*, int>;
 using unsafe OfRecordAndDouble = delegate* unmanaged[Cdecl]<dsp_struct*, double, int>;
 using unsafe OfRecordAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, int, int>;
 using unsafe OfRecordAndWindow = delegate* unmanaged[Cdecl]<dsp_struct*, int, int, double, int>;
+using unsafe OfThreeRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, double, int, int, int>;
 using unsafe OfTwoRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int>;
+using unsafe OfTwoRecordsAndSine = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, double, int, int>;
+using unsafe OfTwoRecordsAndPeaks = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, double, double, double, double, double, double, int>;
 
 /// <summary>
 /// The native functions, as plain pointers: their arguments are what the processor takes, so that a call
@@ -24,6 +27,9 @@ internal static unsafe class NativeMethods
     internal static OfRecordAndWindow dspi_window2;
     internal static OfTwoRecords dsps_mean, dsps_median, dsps_rms, dsps_samp_stddev, dsps_samp_var,
         dsps_min, dsps_max;
+    internal static OfTwoRecordsAndSine dsps_sine_fit;
+    internal static OfTwoRecordsAndPeaks dsps_peaks;
+    internal static OfThreeRecords dsph_distortion;
     internal static OfFourRecords dspd_fir;
 
     /// <exception cref="EntryPointNotFoundException">The library lacks a function.</exception>
@@ -55,6 +61,9 @@ internal static unsafe class NativeMethods
         dsps_samp_var = (OfTwoRecords)Find(nameof(dsps_samp_var));
         dsps_min = (OfTwoRecords)Find(nameof(dsps_min));
         dsps_max = (OfTwoRecords)Find(nameof(dsps_max));
+        dsps_sine_fit = (OfTwoRecordsAndSine)Find(nameof(dsps_sine_fit));
+        dsps_peaks = (OfTwoRecordsAndPeaks)Find(nameof(dsps_peaks));
+        dsph_distortion = (OfThreeRecords)Find(nameof(dsph_distortion));
 
         void* Find(string name) => (void*)SharedObject.Find(library, name);
     }

@@ -33,6 +33,14 @@ public unsafe class CallTests
             [_, int w, int s, double l] =>
                 ((delegate* unmanaged[Cdecl]<Record*, int, int, double, int>)f)(r, w, s, l),
             [_, _] => ((delegate* unmanaged[Cdecl]<Record*, Record*, int>)f)(r, r + 1),
+            [_, _, double v, int n] =>
+                ((delegate* unmanaged[Cdecl]<Record*, Record*, double, int, int>)f)(r, r + 1, v, n),
+            [_, _, _, double v, int n, int w] =>
+                ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, double, int, int, int>)f)(
+                    r, r + 1, r + 2, v, n, w),
+            [_, _, double a, double b, double c, double d, double e, double g] =>
+                ((delegate* unmanaged[Cdecl]<Record*, Record*, double, double, double, double, double,
+                    double, int>)f)(r, r + 1, a, b, c, d, e, g),
             _ => ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, Record*, int>)f)(
                 r, r + 1, r + 2, arguments[3] == null ? null : r + 3),
         };

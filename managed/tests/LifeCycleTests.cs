@@ -49,11 +49,12 @@ public unsafe partial class LifeCycleTests
                 var refusal = Assert.Throws<ObjectDisposedException>(() => Call(place.Position, disposed));
                 Assert.Equal("DspInput", refusal.ObjectName);
                 ++places;
-                if (place.Position == 3) continue; // the filter's state may be missing
+                // The filter's state and the harmonics may be missing.
+                if (place.Position == 3 || place.Name == "harmonics") continue;
                 Assert.Throws<NullReferenceException>(() => Call(place.Position, null));
             }
         }
-        Assert.Equal(36, places); // of 26 functions
+        Assert.Equal(43, places); // of 29 functions
     }
 
     /// <summary>What hosts are compiled against, in the order that they know.</summary>

@@ -83,6 +83,7 @@ inline const std::map<std::string, Cases> numbers = {
     {"dsph_avg", each_average()},
     {"dsph_corr", {{1, 0}, {3, 1}}},
     {"dsph_dft", {{20, 0}, {2, 1}, {0, 4}, {0, 0x80}}},
+    {"dsph_distortion", {{0.25, 3, 0}, {0.2, 2, 2}}},
     {"dsph_fft", {{0, 1, 2, 0}, {0, 1, 0, 1}, {0, 1, 0, 4}, {0, 1, 0, 0x80}, {700, 0.5, 6, 2}}},
     {"dspi_dct", {{0}, {3}}},
     {"dspi_dft", {{0}, {1}}},
@@ -100,14 +101,17 @@ inline const std::map<std::string, Cases> numbers = {
     {"dspi_zpad2", {{700, 0x301}}},
     {"dsps_hist", {{0, 2, 6}}},
     {"dsps_peak", {{0, 0}, {0x100, 0}, {0x1200, 2}}},
+    {"dsps_peaks", {{1.05, 0.01, 2, 0.01, 0.1, 0.5}}},
+    {"dsps_sine_fit", {{0.25, 1}, {0.2, 0}, {0, 0}}},
     {"dspu_subvec", {{1, 3}}},
 };
 
 /// Records that may be left out, by their place among those of the function.
 inline const std::map<std::string, std::size_t> optional_records = {
-    {"dsp_interp", 2},  {"dsp_cspline", 2}, {"dspd_fir", 3},  {"dspd_sfir", 3},
-    {"dspd_deci", 3},   {"dspd_hwfilt", 3}, {"dspd_rsmp", 3}, {"dspd_rsmp2", 4},
-    {"dspi_hwfilt", 2}, {"dsph_avg", 2},    {"dsph_corr", 3}, {"dspb_corr", 3}};
+    {"dsp_interp", 2},     {"dsp_cspline", 2}, {"dspd_fir", 3},  {"dspd_sfir", 3},
+    {"dspd_deci", 3},      {"dspd_hwfilt", 3}, {"dspd_rsmp", 3}, {"dspd_rsmp2", 4},
+    {"dspi_hwfilt", 2},    {"dsph_avg", 2},    {"dsph_corr", 3}, {"dspb_corr", 3},
+    {"dsph_distortion", 2}};
 
 /// Functions that read a whole number behind the history of a stream, where there is one.
 inline bool keeps_place(const std::string& name) {

@@ -32,6 +32,7 @@ TEST_F(ReportsTest, EveryFileHasALineOfJson) {
                                        {"fit --degree 0", "coefficients"},
                                        {"hist", "counts"},
                                        {"edges", "rising"},
+                                       {"peaks", "peaks"},
                                        {"envelope", "max_at"},
                                        {"roots", "roots"}}) {
         const auto name = std::string(command).substr(0, std::string(command).find(" "));

@@ -8,6 +8,7 @@ namespace wavkit::tool {
 void add_info(CLI::App& program);
 void add_convert(CLI::App& program);
 void add_spectrum(CLI::App& program);
+void add_distortion(CLI::App& program);
 void add_correlate(CLI::App& program);
 void add_envelope(CLI::App& program);
 void add_window(CLI::App& program);
@@ -28,6 +29,7 @@ void add_scale(CLI::App& program);
 void add_derive(CLI::App& program);
 void add_integrate(CLI::App& program);
 void add_edges(CLI::App& program);
+void add_peaks(CLI::App& program);
 
 void add_help(CLI::App& program);
 

@@ -1,4 +1,4 @@
-// wavkit fit: lines and polynomials through a signal.
+// wavkit fit: lines, polynomials and sines through a signal.
 #include <wavkit/dsp.h>
 
 #include <algorithm>
@@ -7,12 +7,15 @@
 #include <cstdio>
 #include <functional>
 #include <memory>
+#include <numbers>
 #include <span>
 #include <vector>
 
 #include "base/error.hpp"
 #include "base/mark.hpp"
+#include "base/options.hpp"
 #include "base/progress.hpp"
+#include "base/text.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
 #include "measure/polynomial_fit.hpp"
@@ -29,7 +32,8 @@ struct FitOptions {
     ReportFiles files;
     std::string plot;
     std::optional<int> degree;
-    bool centred = false;
+    bool centred = false, sine = false;
+    std::optional<double> near, at;  // where a sine's frequency is looked for, or what it is
     ReadOptions reading;
     PictureLook look;
 };
@@ -216,13 +220,92 @@ void fit_polynomial(const Signal& pairs, const std::string& file, const FitOptio
     if (options.plot.empty()) print_polynomial(page.text(), fit, about, pairs->points);
 }
 
+// The entries of dsps_sine_fit(): four parameters, the rest, and the parameters' errors.
+constexpr std::array sine_names{"frequency", "amplitude", "phase", "offset"};
+enum : std::size_t { frequency = 0, amplitude = 1, phase = 2, offset = 3, rest = 4, errors = 5 };
+
+/// Phases are told in degrees.
+double told(std::span<const double> table, std::size_t parameter, std::size_t first) {
+    const double value = table[first + parameter];
+    return parameter == phase ? value * 180 / std::numbers::pi : value;
+}
+
+void print_sine(std::FILE* to, std::span<const double> table, int points, const Facts& facts,
+                bool seconds) {
+    const auto unit_of = [&](std::size_t i) {
+        return i == frequency ? inverse_unit(facts.axis(seconds))
+               : i == phase   ? std::string("degrees")
+                              : facts.unit;
+    };
+    const auto name = [&](std::size_t i) {
+        return printable(with_unit(sine_names[i], unit_of(i)));
+    };
+    std::fprintf(to, "%-22s %18d\n\n%-22s %18s %16s\n", "points", points, "", "value",
+                 "standard error");
+    for (std::size_t i = 0; i < sine_names.size(); ++i) {
+        std::fprintf(to, "%-22s %18.12g %16.6g\n", name(i).c_str(), told(table, i, 0),
+                     told(table, i, errors));
+    }
+    std::fprintf(to, "\n%-22s %18.9g\n",
+                 printable(with_unit("rms of the rest", facts.unit)).c_str(), table[rest]);
+}
+
+void add_sine(JsonMembers& members, std::span<const double> table) {
+    for (const std::size_t first : {std::size_t(0), std::size_t(errors)}) {
+        for (std::size_t i = 0; i < sine_names.size(); ++i) {
+            members.emplace_back(std::string(sine_names[i]) + (first ? "_error" : ""),
+                                 json_number(told(table, i, first)));
+        }
+    }
+    members.emplace_back("residual_rms", json_number(table[rest]));
+}
+
+void fit_sine(Signal x, const std::string& file, const FitOptions& options, bool seconds,
+              Page& page) {
+    const int parameters = options.at ? 3 : 4;
+    if (x->complex) throw DataError("a sine is fitted to a real signal");
+    if (x->points < parameters) {
+        throw DataError("a sine takes " + std::to_string(parameters) + " samples");
+    }
+    Signal result;
+    {
+        Progress progress("fitting");
+        check(dsps_sine_fit(x, result, options.at.value_or(options.near.value_or(0)),
+                            options.at ? DSP_SINE_FIXED : DSP_SINE_FREE),
+              "fitting a sine");
+    }
+    const auto table = std::as_const(result).values();
+    if (options.files.json) add_sine(page.signals.back(), table);
+    if (options.plot.empty()) {
+        if (!options.files.json) print_sine(page.text(), table, x->points, x.facts, seconds);
+        return;
+    }
+    const auto pairs = pairs_of(std::move(x));
+    const auto sine = [&](double place) {
+        const double turns = table[frequency] * (place - pairs.facts.start);
+        return table[offset] +
+               table[amplitude] * std::cos(2 * std::numbers::pi * turns + table[phase]);
+    };
+    // As fine as the eye asks, as long as that is no more than a page can hold.
+    const double span = pairs->data[2 * pairs->points - 2] - pairs->data[0];
+    const double steps = std::clamp(40 * std::fabs(table[frequency] * span), 1000.0, 1e5);
+    auto points = marks_of(pairs);
+    auto curve = places_of(sine, points, int(steps));
+    draw_fit(pairs, std::move(points), std::move(curve), file, options);
+}
+
 void tell(const std::string& file, const FitOptions& options, Page& page) {
     auto reading = options.reading;
-    reading.csv.pairs = true;
-    auto x = first_signal(file, reading);
+    reading.csv.pairs = !options.sine;
+    InputFile input(file);
+    const auto source = open_signals(input, reading);
+    auto x = first_signal(*source);
     if (x->points < 1) throw DataError("the signal has no samples");
     check_finite(x);
     page.add_signal(x);
+    if (options.sine) {
+        return fit_sine(std::move(x), file, options, source->sound || reading.rate, page);
+    }
     const auto pairs = pairs_of(std::move(x));
     if (options.degree.value_or(1) == 1 && !options.centred) {
         fit_line(pairs, file, options, page);
@@ -235,6 +318,9 @@ void run(FitOptions& options) {
     if (!options.plot.empty()) picture_of_name(options.plot);
     options.files.check_single("", options.plot);
     if (options.centred && !options.degree) throw UsageError("--centre goes with --degree");
+    if ((options.near || options.at) && !options.sine) {
+        throw UsageError("--near and --at go with --sine");
+    }
     report_files("fit", options.files,
                  [&](const std::string& file, Page& page) { tell(file, options, page); });
 }
@@ -249,24 +335,40 @@ scatter them; their roots are the standard errors. R squared is the share of the
 the line explains. 1e100 stands for the slope of a line over equal abscissae.
 
 --degree N fits a polynomial instead and prints its coefficients in ascending powers of x, with
---centre of x less its mean, each with its standard error. --plot draws the data and the line of y
-on x, or the polynomial.
+--centre of x less its mean, each with its standard error.
+
+--sine fits offset + amplitude cos(2 pi frequency t + phase), t from the first sample on: the
+four-parameter fit of IEEE 1057, which begins at the strongest tone, or with --near at the
+frequency that is given. --at takes that frequency as it is and fits the other three.
+
+--plot draws the data and the line of y on x, the polynomial or the sine.
 
 Examples:
   wavkit fit examples/data/sunspots-yearly.txt
   wavkit fit calibration.csv --column force,voltage --plot line.png
-  wavkit fit thermistor.csv --column 1,2 --degree 3 --json)";
+  wavkit fit thermistor.csv --column 1,2 --degree 3 --json
+  wavkit fit mains.wav --sine --near 50)";
 
 }  // namespace
 
 void add_fit(CLI::App& program) {
     auto* const command =
-        program.add_subcommand("fit", "Fits a straight line or a polynomial to a signal.");
+        program.add_subcommand("fit", "Fits a straight line, a polynomial or a sine to a signal.");
     const auto options = std::make_shared<FitOptions>();
     options->files.declare(*command);
-    command->add_option("--degree", options->degree, "fit a polynomial of this degree")
-        ->check(CLI::Range(0, 100))
-        ->type_name("N");
+    auto* const sine = command->add_flag("--sine", options->sine, "fit a sine");
+    auto* const degree =
+        command->add_option("--degree", options->degree, "fit a polynomial of this degree")
+            ->check(CLI::Range(0, 100))
+            ->type_name("N");
+    degree->excludes(sine);
+    auto* const near =
+        command->add_option("--near", options->near, "look for the sine's frequency from here on");
+    near->check(number_between(1e-300, 1e300))->type_name("F");
+    command->add_option("--at", options->at, "the sine's frequency, which is not fitted")
+        ->check(number_between(0, 1e300))
+        ->type_name("F")
+        ->excludes(near);
     command->add_flag("--centre,--center", options->centred,
                       "powers of x less its mean, for abscissae far from 0");
     declare_plot(*command, options->plot, "data and line");

@@ -189,6 +189,7 @@ class Panel {
             std::fprintf(script_, "set label '' at %s point pt 7 ps 0.7 lc rgb '#c0392b' front\n",
                          canvas_.at(at.x, at.y).c_str());
         }
+        if (!curve_.named) return;
         const auto names = this->names();
         for (std::size_t i = 0; i < names.size(); ++i) {
             // The way up from the other marks stays free for their labels.

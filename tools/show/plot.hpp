@@ -30,7 +30,8 @@ struct Curve {
     std::optional<std::pair<double, double>> range, x_range;
     std::vector<std::size_t> gaps;  // points that begin a line of their own
     std::string unit;               // of the period, for the labels of the peaks
-    std::vector<Mark> marked;       // peaks to label
+    std::vector<Mark> marked;       // peaks to mark
+    bool named = true;              // and to label with their place
 };
 
 /// Throws where two of JSON, an output and a picture would go to standard output.
