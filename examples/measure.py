@@ -10,7 +10,9 @@ import wavkit
 
 def main(path: str, picture: str, rate: float | None = None) -> None:
     samples, told = wavkit.read(path)
-    spectrum = wavkit.spectrum(samples, rate or told, window="gausstop", any_length=True, detrend=True)
+    spectrum = wavkit.spectrum(
+        samples, rate or told, window="gausstop", any_length=True, detrend=True
+    )
     print(f"{len(samples)} samples, mean {wavkit.stats(samples).mean:.6g}")
     print(f"{'frequency':>12}{'period':>12}{'amplitude':>12}")
     for frequency, amplitude in spectrum.peaks(3):

@@ -18,7 +18,13 @@ from pathlib import Path
 from cffi import FFI
 
 RECORDS = {"dsp *", "dspf *"}
-PYTHON_TYPES = {"int": "int", "unsigned": "int", "uint64_t": "int", "double": "float", "float": "float"}
+PYTHON_TYPES = {
+    "int": "int",
+    "unsigned": "int",
+    "uint64_t": "int",
+    "double": "float",
+    "float": "float",
+}
 
 
 @dataclass
@@ -52,7 +58,9 @@ class Function:
 
     def documented(self, parameter: str) -> str | None:
         """What the documentation of this function says of a parameter."""
-        for names, text in re.findall(r"^@param +(\S+) +((?:.|\n(?!@))*)", self.documentation, re.M):
+        for names, text in re.findall(
+            r"^@param +(\S+) +((?:.|\n(?!@))*)", self.documentation, re.M
+        ):
             if parameter in names.split(","):
                 return str(text)
         return None
@@ -64,7 +72,10 @@ def in_order(directory: Path, name: str, seen: set[str]) -> str:
         return ""
     seen.add(name)
     text = (directory / name).read_text(encoding="utf-8")
-    before = [in_order(directory, other, seen) for other in re.findall(r'^#include "(\w+\.h)"', text, re.M)]
+    before = [
+        in_order(directory, other, seen)
+        for other in re.findall(r'^#include "(\w+\.h)"', text, re.M)
+    ]
     return "".join(before) + text
 
 
@@ -90,13 +101,21 @@ def parameters_of(text: str) -> list[Parameter]:
         kind, star, name = match.groups()
         constant_text = kind == "char" and "const" in part
         name += "_" if keyword.iskeyword(name) else ""
-        found.append(Parameter(name, f"{kind} *" if star and (kind != "char" or constant_text) else
-                               f"{kind}[]" if star else kind))
+        found.append(
+            Parameter(
+                name,
+                f"{kind} *"
+                if star and (kind != "char" or constant_text)
+                else f"{kind}[]"
+                if star
+                else kind,
+            )
+        )
     return found
 
 
 def functions_of(text: str) -> list[Function]:
-    """Every exported function, with the comment above it or above the one that it is the twin of."""
+    """Every exported function, with the comment above it or above its twin."""
     functions, documentation = [], ""
     text = re.sub(r"/\*\*<.*?\*/", "", text, flags=re.S)
     for comment, statement in re.findall(r"(/\*.*?\*/)|WAVKIT_API\s([^;]*);", text, re.S):
@@ -105,7 +124,9 @@ def functions_of(text: str) -> list[Function]:
             continue
         match = re.fullmatch(r"(\w+ \*?)\s*(\w+)\((.*)\)", " ".join(statement.split()))
         assert match, statement
-        functions.append(Function(match[2], match[1].strip(), parameters_of(match[3]), documentation))
+        functions.append(
+            Function(match[2], match[1].strip(), parameters_of(match[3]), documentation)
+        )
     mark_null(functions)
     return functions
 
@@ -122,13 +143,17 @@ def mark_null(functions: list[Function]) -> None:
     for function in functions:
         for parameter in function.parameters:
             text = function.documented(parameter.name)
-            null = known.get(parameter.name, False) if text is None else re.search(r"\bnull\b", text)
+            null = (
+                known.get(parameter.name, False) if text is None else re.search(r"\bnull\b", text)
+            )
             parameter.may_be_null = bool(null)
 
 
 def constants_of(text: str) -> dict[str, int]:
     constants: dict[str, int] = {}
-    for body in re.findall(r"^enum \{(.*?)\}", re.sub(r"/\*.*?\*/", "", text, flags=re.S), re.M | re.S):
+    for body in re.findall(
+        r"^enum \{(.*?)\}", re.sub(r"/\*.*?\*/", "", text, flags=re.S), re.M | re.S
+    ):
         following = 0
         for item in filter(None, map(str.strip, body.split(","))):
             name, _, value = map(str.strip, item.partition("="))
@@ -165,7 +190,7 @@ _{function.name} = _library.{function.name}
 '''
 
 
-HEAD = '''"""Every exported function and every constant. Made from the public headers: do not edit."""
+HEAD = '''"""Every exported function and constant. Made from the public headers: do not edit."""
 
 from __future__ import annotations
 

@@ -122,41 +122,61 @@ def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
     record, out = lib.Record(x), lib.Record()
     kernel = wavkit.Resampler(48000, 44100).kernel / 147
     return [
-        ("real transform", lambda: rfft(x), {
-            "NumPy": lambda: np.fft.rfft(x),
-            "SciPy": lambda: scipy.fft.rfft(x),
-            "pyFFTW": lambda: planned(x),
-        }),
-        ("spectrum", lambda: wavkit.spectrum(x, 1.0), {
-            "SciPy": lambda: scipy.signal.periodogram(x, 1.0, whole, detrend=False),
-        }),
-        ("average", lambda: wavkit.average(x, 1.0, segment), {
-            "SciPy": lambda: scipy.signal.welch(x, 1.0, window, detrend=False),
-        }),
-        ("filter, 201 taps", lambda: wavkit.filter(x, taps=taps), {
-            "NumPy": lambda: np.convolve(x, taps, "same"),
-            "SciPy": lambda: scipy.signal.oaconvolve(x, taps, "same"),
-        }),
-        ("resample, 48 to 44.1 kHz", lambda: wavkit.resample(x, 48000, 44100), {
-            "SciPy": lambda: scipy.signal.resample_poly(x, 147, 160, window=kernel),
-        }),
-        ("envelope", lambda: wavkit.envelope(x), {
-            "SciPy": lambda: np.abs(scipy.signal.hilbert(x)),
-        }),
+        (
+            "real transform",
+            lambda: rfft(x),
+            {
+                "NumPy": lambda: np.fft.rfft(x),
+                "SciPy": lambda: scipy.fft.rfft(x),
+                "pyFFTW": lambda: planned(x),
+            },
+        ),
+        (
+            "spectrum",
+            lambda: wavkit.spectrum(x, 1.0),
+            {"SciPy": lambda: scipy.signal.periodogram(x, 1.0, whole, detrend=False)},
+        ),
+        (
+            "average",
+            lambda: wavkit.average(x, 1.0, segment),
+            {"SciPy": lambda: scipy.signal.welch(x, 1.0, window, detrend=False)},
+        ),
+        (
+            "filter, 201 taps",
+            lambda: wavkit.filter(x, taps=taps),
+            {
+                "NumPy": lambda: np.convolve(x, taps, "same"),
+                "SciPy": lambda: scipy.signal.oaconvolve(x, taps, "same"),
+            },
+        ),
+        (
+            "resample, 48 to 44.1 kHz",
+            lambda: wavkit.resample(x, 48000, 44100),
+            {"SciPy": lambda: scipy.signal.resample_poly(x, 147, 160, window=kernel)},
+        ),
+        (
+            "envelope",
+            lambda: wavkit.envelope(x),
+            {"SciPy": lambda: np.abs(scipy.signal.hilbert(x))},
+        ),
         ("median", lambda: lib.dsps_median(record, out), {"NumPy": lambda: np.median(x)}),
-        ("rms", lambda: lib.dsps_rms(record, out), {
-            "NumPy": lambda: np.sqrt(np.mean(x * x)),
-        }),
+        ("rms", lambda: lib.dsps_rms(record, out), {"NumPy": lambda: np.sqrt(np.mean(x * x))}),
     ]
 
 
 def beside_peers(points: int) -> None:
     names = ["NumPy", "SciPy", "pyFFTW"]
-    print(f"\n{f'{points} samples':28}{'wavkit, us':>12}" + "".join(f"{name + ', us':>14}" for name in names))
+    print(
+        f"\n{f'{points} samples':28}{'wavkit, us':>12}"
+        + "".join(f"{name + ', us':>14}" for name in names)
+    )
     for row, ours, theirs in peers(points):
         mine, *others = best(ours, *theirs.values())
         cells = dict(zip(theirs, others))
-        texts = [f"{cells[name] * 1e6:8.1f} {cells[name] / mine:4.1f}x" if name in cells else "" for name in names]
+        texts = [
+            f"{cells[name] * 1e6:8.1f} {cells[name] / mine:4.1f}x" if name in cells else ""
+            for name in names
+        ]
         print(f"{row:28}{mine * 1e6:12.1f}" + "".join(f"{text:>14}" for text in texts))
 
 

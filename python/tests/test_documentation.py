@@ -11,7 +11,10 @@ import wavkit
 from wavkit import lib
 
 PAGE = Path(__file__).parents[2] / "docs" / "python.md"
-MODULES = sorted({"wavkit"} | {f"wavkit.{m.name}" for m in pkgutil.iter_modules(wavkit.__path__)} - {"wavkit.__main__"})
+MODULES = sorted(
+    {"wavkit"}
+    | {f"wavkit.{m.name}" for m in pkgutil.iter_modules(wavkit.__path__)} - {"wavkit.__main__"}
+)
 NAMES = {"np": np, "wavkit": wavkit, "lib": lib}
 FLAGS = doctest.NORMALIZE_WHITESPACE | doctest.ELLIPSIS
 
@@ -25,14 +28,30 @@ def test_examples_of_a_module(name, tmp_path, monkeypatch):
 
 def test_examples_of_the_page(tmp_path, monkeypatch):
     monkeypatch.chdir(tmp_path)
-    result = doctest.testfile(str(PAGE), module_relative=False, globs=dict(NAMES), optionflags=FLAGS)
+    result = doctest.testfile(
+        str(PAGE), module_relative=False, globs=dict(NAMES), optionflags=FLAGS
+    )
     assert result.attempted > 30 and result.failed == 0
 
 
 def test_every_name_has_an_example():
     """Functions and classes that are called; what they return is shown by them."""
-    returned = {"Correlation", "Error", "Histogram", "Line", "Peaks", "Response", "Signal", "Spectrogram", "Spectrum", "Stats", "lib"}
+    returned = {
+        "Correlation",
+        "Error",
+        "Histogram",
+        "Line",
+        "Peaks",
+        "Response",
+        "Signal",
+        "Spectrogram",
+        "Spectrum",
+        "Stats",
+        "lib",
+    }
     for name in set(wavkit.__all__) - returned:
         assert ">>>" in getattr(wavkit, name).__doc__, name
     page = PAGE.read_text()
-    assert [name for name in wavkit.__all__ if f"`{name}" not in page and f"wavkit.{name}" not in page] == []
+    assert [
+        name for name in wavkit.__all__ if f"`{name}" not in page and f"wavkit.{name}" not in page
+    ] == []

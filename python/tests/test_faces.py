@@ -43,7 +43,9 @@ def test_spectrum_with_zeros(x, window):
     expected = np.abs(np.fft.fft((x - x.mean()) * w, 4096)) / 3000 * 2
     frequency = np.fft.fftfreq(4096, 1 / RATE)
     if np.iscomplexobj(x):
-        close(found.amplitude, np.fft.fftshift(expected) / 2), close(found.frequency, np.fft.fftshift(frequency))
+        close(found.amplitude, np.fft.fftshift(expected) / 2), close(
+            found.frequency, np.fft.fftshift(frequency)
+        )
     else:
         close(found.amplitude, expected[:2049] * np.where(np.arange(2049) % 2048, 1, 0.5))
         close(found.frequency, np.abs(frequency[:2049]))
@@ -62,7 +64,14 @@ def test_peaks_lie_between_bins(window):
 
 def test_side_lobes_are_no_peaks():
     for window in ("uniform", "hann", "flattop"):
-        assert len(wavkit.spectrum(TONES - TONES + np.sin(0.7 * np.arange(3000)), RATE, window).peaks(9)) == 1
+        assert (
+            len(
+                wavkit.spectrum(TONES - TONES + np.sin(0.7 * np.arange(3000)), RATE, window).peaks(
+                    9
+                )
+            )
+            == 1
+        )
     whole = np.sin(2 * np.pi * 50 * T) + 1e-4 * np.sin(2 * np.pi * 60 * T)
     found = wavkit.spectrum(whole, RATE, "uniform", any_length=True).peaks(9)
     close(found.frequency, [50.0, 60.0], 1e-6)
@@ -107,7 +116,13 @@ def test_other_averages(type, mean):
 
 def test_spectrogram():
     frequency, time, expected = scipy.signal.spectrogram(
-        NOISE, RATE, wavkit.window("hann", 128), noverlap=96, detrend=False, scaling="spectrum", mode="magnitude"
+        NOISE,
+        RATE,
+        wavkit.window("hann", 128),
+        noverlap=96,
+        detrend=False,
+        scaling="spectrum",
+        mode="magnitude",
     )
     found = wavkit.spectrogram(NOISE, RATE, 128, overlap=75)
     close(found.frequency, frequency), close(found.time, time)
@@ -121,7 +136,9 @@ def test_windows():
     close(wavkit.window("kaiser70", 65, symmetric=True), np.kaiser(65, 9.473960131326246))
     for name in wavkit.windows():
         w = wavkit.window(name, 512)
-        assert wavkit.noise_bandwidth(name, 512) == pytest.approx(512 * (w**2).sum() / w.sum() ** 2, rel=2e-3)
+        assert wavkit.noise_bandwidth(name, 512) == pytest.approx(
+            512 * (w**2).sum() / w.sum() ** 2, rel=2e-3
+        )
         assert wavkit.coherent_gain(name, 512) == pytest.approx(w.mean(), rel=1e-3)
         assert wavkit.window(name, 512, scale="rms", dtype="f4").dtype == np.float32
         assert (wavkit.window(name, 512, scale="rms") ** 2).mean() == pytest.approx(1, rel=2e-3)
@@ -141,7 +158,12 @@ def test_windows():
 def test_designs(kind, edges, cutoff, passes):
     ours = wavkit.design(kind, *edges, rate=RATE, transition=40, attenuation=70)
     expected = scipy.signal.firwin(
-        len(ours), cutoff, window=("kaiser", 0.1102 * (70 - 8.7)), fs=RATE, pass_zero=passes, scale=False
+        len(ours),
+        cutoff,
+        window=("kaiser", 0.1102 * (70 - 8.7)),
+        fs=RATE,
+        pass_zero=passes,
+        scale=False,
     )
     close(ours, expected, 2e-3)  # Kaiser's estimates of beta differ by the rounding of N
     gain = wavkit.response(ours, RATE, 500)
@@ -151,17 +173,27 @@ def test_designs(kind, edges, cutoff, passes):
 
 
 def test_other_designs():
-    assert len(wavkit.design("fixed20")) == 39 and np.array_equal(wavkit.design("fixed12"), wavkit.design("fixed12")[::-1])
+    assert len(wavkit.design("fixed20")) == 39 and np.array_equal(
+        wavkit.design("fixed12"), wavkit.design("fixed12")[::-1]
+    )
     slope = wavkit.design("differentiator", 0.4, transition=0.1)
     t = np.arange(400)
     close(wavkit.filter(np.sin(0.5 * t), taps=slope)[100:300], 0.5 * np.cos(0.5 * t)[100:300], 2e-3)
     assert wavkit.design("delay", 0.4, 0.25).sum() == pytest.approx(1)
-    for wrong in (("lowpass",), ("lowpass", 0.6), ("bandpass", 0.2, 0.1), ("notch", 0.1), ("highpass", 0.0)):
+    for wrong in (
+        ("lowpass",),
+        ("lowpass", 0.6),
+        ("bandpass", 0.2, 0.1),
+        ("notch", 0.1),
+        ("highpass", 0.0),
+    ):
         with pytest.raises(ValueError):
             wavkit.design(*wrong)
 
 
-@pytest.mark.parametrize("x", [NOISE, COMPLEX, NOISE.astype("f4")], ids=["real", "complex", "single"])
+@pytest.mark.parametrize(
+    "x", [NOISE, COMPLEX, NOISE.astype("f4")], ids=["real", "complex", "single"]
+)
 def test_filtering_at_once_and_by_blocks(x):
     taps = RNG.normal(size=101)
     expected = scipy.signal.lfilter(taps, 1, x)
@@ -211,17 +243,25 @@ def test_resampling_keeps_the_band_alone():
     x = np.cos(2 * np.pi * 900.5 * t) + np.cos(2 * np.pi * 1100 * t)
     ours = wavkit.decimate(x, 10, 20000, "best")[300:-300]
     close(ours, np.cos(2 * np.pi * 900.5 * t)[::10][300:-300], 1e-8)
-    close(wavkit.resample(np.stack([x, 2 * x], 1), 1, 3, axis=0)[:, 1], 2 * wavkit.resample(x, 1, 3))
+    close(
+        wavkit.resample(np.stack([x, 2 * x], 1), 1, 3, axis=0)[:, 1], 2 * wavkit.resample(x, 1, 3)
+    )
     close(wavkit.resample(x + 1j * x, 2, 1).imag, wavkit.resample(x, 2, 1))
 
 
 def test_envelope_and_slopes():
     close(wavkit.envelope(NOISE), np.abs(scipy.signal.hilbert(NOISE)))
-    close(wavkit.envelope(NOISE + 5, detrend=True), np.abs(scipy.signal.hilbert(NOISE - NOISE.mean())))
+    close(
+        wavkit.envelope(NOISE + 5, detrend=True), np.abs(scipy.signal.hilbert(NOISE - NOISE.mean()))
+    )
     close(wavkit.derive(NOISE, RATE)[1:], np.diff(NOISE) * RATE)
     close(wavkit.integrate(NOISE, RATE), np.cumsum(NOISE) / RATE)
     x = np.sin(2 * np.pi * 3 * T + 0.1)
-    close(wavkit.edges(x, 0.0, RATE, "falling"), (np.arange(1, 18, 2) * np.pi - 0.1) / (6 * np.pi), 1e-4)
+    close(
+        wavkit.edges(x, 0.0, RATE, "falling"),
+        (np.arange(1, 18, 2) * np.pi - 0.1) / (6 * np.pi),
+        1e-4,
+    )
 
 
 @pytest.mark.parametrize("other", [NOISE[:777], COMPLEX[:777]], ids=["real", "complex"])
@@ -248,7 +288,11 @@ def test_statistics(x):
         (s.harmonic_mean, 1 / np.mean(1 / x)),
     ]
     if x.dtype != complex:
-        pairs += [(s.median, np.median(x)), (s.skewness, scipy.stats.skew(x)), (s.excess_kurtosis, scipy.stats.kurtosis(x))]
+        pairs += [
+            (s.median, np.median(x)),
+            (s.skewness, scipy.stats.skew(x)),
+            (s.excess_kurtosis, scipy.stats.kurtosis(x)),
+        ]
         pairs += [(s.geometric_mean, scipy.stats.gmean(x))] if x.min() > 0 else []
     for ours, theirs in pairs:
         assert ours == pytest.approx(theirs, rel=1e-9, abs=1e-12)
@@ -318,6 +362,11 @@ def test_files_that_cannot_be_read(tmp_path):
     (tmp_path / "bad.dsp").write_bytes(b"\xbe\x30\x03\xeb" + bytes(12))
     (tmp_path / "bad.wav").write_text("no sound")
     (tmp_path / "empty.txt").write_text("")
-    for name, error in (("bad.dsp", wavkit.Error), ("bad.wav", OSError), ("none.dsp", OSError), ("empty.txt", OSError)):
+    for name, error in (
+        ("bad.dsp", wavkit.Error),
+        ("bad.wav", OSError),
+        ("none.dsp", OSError),
+        ("empty.txt", OSError),
+    ):
         with pytest.raises(error):
             wavkit.read(tmp_path / name)

@@ -1,6 +1,7 @@
 """Records, ownership, errors and threads of `wavkit.lib`."""
 
 import gc
+import pickle
 import re
 import subprocess
 import sys
@@ -12,23 +13,34 @@ import pytest
 import wavkit
 from wavkit import lib
 
+MASKED = np.ma.masked_equal([1.0, 2.0], 2.0)
 DTYPES = ["f4", "f8", "c8", "c16"]
 
 
 def test_every_exported_name_is_there():
     from wavkit._native import find
 
-    symbols = subprocess.run(["nm", "-D", "--defined-only", find()], capture_output=True, text=True, check=True)
+    symbols = subprocess.run(
+        ["nm", "-D", "--defined-only", find()], capture_output=True, text=True, check=True
+    )
     exported = set(re.findall(r" T (\w+)", symbols.stdout))
-    assert len(exported) > 300 and exported == {name for name in lib.__all__ if name.startswith("dsp")}
+    assert len(exported) > 300 and exported == {
+        name for name in lib.__all__ if name.startswith("dsp")
+    }
 
 
 def test_a_function_is_documented_and_typed():
-    assert "arithmetic mean" in lib.dsps_mean.__doc__.lower() and "empty" not in lib.dsps_mean.__doc__
+    assert (
+        "arithmetic mean" in lib.dsps_mean.__doc__.lower() and "empty" not in lib.dsps_mean.__doc__
+    )
     assert lib.dspfs_mean.__doc__ == lib.dsps_mean.__doc__
     assert lib.dspd_fir.__annotations__["state"] == "_Record | None"
     assert lib.dspb_cspline_2d.__annotations__["y2"] == "_Record"
-    assert lib.DSP_SPLINE_NATURAL == 3 and lib.DSP_EDGE_FALLING == -1 and lib.DSP_PEAK_SMALLEST == 0x2000
+    assert (
+        lib.DSP_SPLINE_NATURAL == 3
+        and lib.DSP_EDGE_FALLING == -1
+        and lib.DSP_PEAK_SMALLEST == 0x2000
+    )
 
 
 @pytest.mark.parametrize("dtype", DTYPES)
@@ -63,7 +75,8 @@ def test_what_cannot_be_borrowed_is_copied(dtype, change):
 
 
 @pytest.mark.parametrize(
-    ("samples", "error"), [(np.zeros((2, 2)), ValueError), (["a"], TypeError), (3.0, ValueError)]
+    ("samples", "error"),
+    [(np.zeros((2, 2)), ValueError), (["a"], TypeError), (3.0, ValueError), (MASKED, ValueError)],
 )
 def test_what_is_no_signal_is_refused(samples, error):
     with pytest.raises(error):
@@ -144,11 +157,16 @@ def test_faces_take_no_memory():
 
 
 def test_failures_say_which_call_and_why():
-    with pytest.raises(wavkit.Error, match=r"dspb_mul\(<dsp: 3 real .*<dsp: 2 real.* failed: when the lengths differ"):
+    with pytest.raises(
+        wavkit.Error,
+        match=r"dspb_mul\(<dsp: 3 real .*<dsp: 2 real.* failed: when the lengths differ",
+    ):
         lib.dspb_mul(lib.Record(np.ones(3)), lib.Record(np.ones(2)), lib.Record())
     with pytest.raises(wavkit.Error) as caught:
         lib.dspfi_window(lib.Record(np.ones(4, "f4")), 99, 0)
     assert caught.value.function == "dspfi_window"
+    again = pickle.loads(pickle.dumps(caught.value))
+    assert str(again) == str(caught.value) and again.reason == caught.value.reason
     for wrong in (lib.Record(np.ones(3, "f4")), None, np.ones(3)):
         with pytest.raises((TypeError, AttributeError)):
             lib.dspi_neg(wrong)
@@ -168,7 +186,11 @@ def test_threads_get_the_results_of_one():
     signals = [rng.normal(size=1000 + 37 * i).astype(DTYPES[i % 2]) for i in range(24)]
 
     def measure(x):
-        return wavkit.spectrum(x, 8, "flattop").bins, wavkit.filter(x, 8, lowpass=1), wavkit.stats(x).rms
+        return (
+            wavkit.spectrum(x, 8, "flattop").bins,
+            wavkit.filter(x, 8, lowpass=1),
+            wavkit.stats(x).rms,
+        )
 
     with ThreadPoolExecutor(8) as pool:
         many = list(pool.map(measure, signals * 4))
@@ -199,6 +221,13 @@ def test_the_interpreter_is_free_while_the_library_works():
 
 
 def test_the_program():
-    told = subprocess.run([sys.executable, "-m", "wavkit", "roots", "6", "-5", "1", "--json"], capture_output=True, text=True)
+    told = subprocess.run(
+        [sys.executable, "-m", "wavkit", "roots", "6", "-5", "1", "--json"],
+        capture_output=True,
+        text=True,
+    )
     assert told.returncode == 0 and '"roots"' in told.stdout
-    assert subprocess.run([sys.executable, "-m", "wavkit", "nonsense"], capture_output=True).returncode == 2
+    assert (
+        subprocess.run([sys.executable, "-m", "wavkit", "nonsense"], capture_output=True).returncode
+        == 2
+    )

@@ -44,7 +44,9 @@ def test_any_shape_is_run_by_run(name, seed):
     axis = int(rng.integers(-len(shape) - 1, len(shape) + 1))
     shape.insert(axis if axis >= 0 else len(shape) + 1 + axis, int(rng.integers(20, 60)))
     dtype = ["f4", "f8", "c8", "c16", "i2", "f2"][seed]
-    x = (100 * rng.normal(size=shape) + (100j * rng.normal(size=shape) if dtype[0] == "c" else 0)).astype(dtype)
+    x = (
+        100 * rng.normal(size=shape) + (100j * rng.normal(size=shape) if dtype[0] == "c" else 0)
+    ).astype(dtype)
     before = x.copy()
     found = function(random_layout(x), axis)
     expected = np.apply_along_axis(function, axis, x) if x.size else None
@@ -55,7 +57,9 @@ def test_any_shape_is_run_by_run(name, seed):
     assert np.shape(found) == expected.shape
     np.testing.assert_array_equal(found, expected)
     single = dtype in ("f4", "c8", "f2")
-    assert np.asarray(found).dtype.itemsize * (1 if np.iscomplexobj(found) else 2) == (8 if single else 16)
+    assert np.asarray(found).dtype.itemsize * (1 if np.iscomplexobj(found) else 2) == (
+        8 if single else 16
+    )
 
 
 def test_empty_and_senseless_input():
@@ -76,7 +80,9 @@ TIME = 5 + np.arange(64) / 8
 
 def test_xarray_keeps_coordinates():
     values = RNG.normal(size=(64, 2))
-    x = xarray.DataArray(values, dims=["time", "channel"], coords={"time": TIME, "channel": ["a", "b"]}, name="u")
+    x = xarray.DataArray(
+        values, dims=["time", "channel"], coords={"time": TIME, "channel": ["a", "b"]}, name="u"
+    )
     spectrum = wavkit.spectrum(x, axis="time")
     assert spectrum.amplitude.dims == ("frequency", "channel") and spectrum.frequency[-1] == 4
     plain = wavkit.spectrum(values, 8, axis=0).amplitude

@@ -81,11 +81,15 @@ def read(path: str | os.PathLike[str]) -> Signal:
     if len(found) == 1:
         return first
     if any(len(s.samples) != len(first.samples) or s.rate != first.rate for s in found):
-        raise ValueError(f"the signals in {os.fspath(path)} differ; wavkit.signals() reads them one by one")
+        raise ValueError(
+            f"the signals in {os.fspath(path)} differ; wavkit.signals() reads them one by one"
+        )
     return Signal(np.stack([signal.samples for signal in found]), first.rate)
 
 
-def write(path: str | os.PathLike[str], samples: ArrayLike | Any, rate: float | None = None) -> None:
+def write(
+    path: str | os.PathLike[str], samples: ArrayLike | Any, rate: float | None = None
+) -> None:
     """Writes a signal, or every row of an array, in the format of the name: text for `.txt` and
     `.dsa`, binary for `.dsp`, `.sig` and `.bin`, in the precision of the samples; other formats
     (`.wav`, `.csv`, `.mat` ...) as the program writes them.

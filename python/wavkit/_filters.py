@@ -44,8 +44,8 @@ _MOST_TAPS = 1 << 24
 def _size(
     edges: Sequence[float], transition: float | None, attenuation: float | None, length: int | None
 ) -> tuple[int, float]:
-    """Number of taps and transition by J. F. Kaiser's estimate (1974): a filter of N taps attenuates
-    by 7.95 dB and 14.36 dB more for every cycle of (N - 1) transition."""
+    """Number of taps and transition by J. F. Kaiser's estimate (1974): a filter of N taps
+    attenuates by 7.95 dB and 14.36 dB more for every cycle of (N - 1) transition."""
     cycles = ((60 if attenuation is None else attenuation) - 7.95) / 14.36
     if length is not None:
         if transition is not None and attenuation is not None:
@@ -95,7 +95,9 @@ def design(
     if kind in _FIXED:
         return _fixed(kind, letter)
     if kind not in _DESIGNS:
-        raise ValueError(f"no design is called {kind!r}; there are {', '.join([*_DESIGNS, *_FIXED])}")
+        raise ValueError(
+            f"no design is called {kind!r}; there are {', '.join([*_DESIGNS, *_FIXED])}"
+        )
     wanted = 2 if kind in (*_BANDS, "delay") else 1
     if len(parameters) != wanted and not (kind.startswith("sinh") and not parameters):
         raise ValueError(f"{kind} takes {wanted} parameter{'s' if wanted > 1 else ''}")
@@ -118,7 +120,12 @@ def design(
         call("dspc_fir", taps, _DESIGNS[kind], f1, f2)
         if kind in _TAPERED or window is not None:
             number = _TAPERS.get(window or "kaiser")
-            call("dspi_window_fir", taps, window_number(window or "") if number is None else number, width)
+            call(
+                "dspi_window_fir",
+                taps,
+                window_number(window or "") if number is None else number,
+                width,
+            )
         result: Array = taps.take()
     # The sum of a delay was made 1 before the ends were taken off.
     if kind == "delay":
@@ -143,11 +150,13 @@ def _fixed(kind: str, letter: str) -> Array:
 
 
 def delay_of(taps: Array) -> int:
-    """By how many samples taps delay: half of them, where they are symmetric or antisymmetric as far
-    as single precision or printed digits tell."""
+    """By how many samples taps delay: half of them, where they are symmetric or antisymmetric as
+    far as single precision or printed digits tell."""
     largest = np.max(np.abs(taps), initial=0)
     mirrored = taps[::-1]
-    apart = min(np.max(np.abs(taps - mirrored), initial=0), np.max(np.abs(taps + mirrored), initial=0))
+    apart = min(
+        np.max(np.abs(taps - mirrored), initial=0), np.max(np.abs(taps + mirrored), initial=0)
+    )
     return (len(taps) - 1) // 2 if apart <= 1e-6 * largest else 0
 
 
@@ -197,7 +206,9 @@ class Filter:
             self._of = signals
             self._states = [Record(dtype=letter.lower()) for _ in range(count)]
         elif self._of != signals:
-            raise ValueError("a block has the shape and the precision of the one before; or reset()")
+            raise ValueError(
+                "a block has the shape and the precision of the one before; or reset()"
+            )
 
     def blocks(self, source: Iterable[ArrayLike]) -> Iterator[Array]:
         """The filtered blocks of a source, one by one."""
@@ -237,7 +248,12 @@ def filter(
     """
     runs = Runs(x, rate, axis)
     given = {"lowpass": lowpass, "highpass": highpass, "bandpass": bandpass, "bandstop": bandstop}
-    shape: dict[str, Any] = {"transition": transition, "attenuation": attenuation, "length": length, "window": window}
+    shape: dict[str, Any] = {
+        "transition": transition,
+        "attenuation": attenuation,
+        "length": length,
+        "window": window,
+    }
     chain = [] if taps is None else [np.array(samples_of(taps))]
     for kind, edges in given.items():
         if edges is not None:

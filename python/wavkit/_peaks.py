@@ -1,5 +1,5 @@
-"""The components of a spectrum: maxima that are neither side lobes nor within a stronger one's lobe,
-placed between bins by the rule that fits the window."""
+"""The components of a spectrum: maxima that are neither side lobes nor within a stronger one's
+lobe, placed between bins by the rule that fits the window."""
 
 from __future__ import annotations
 
@@ -42,7 +42,32 @@ class Layout:
 
 
 # By identifier: from the top of the main lobe to its first zero or to -100 dB, in bins.
-_HALF_WIDTHS = (1, 2, 2, 2, 3, 3, 4, 5, 4, 5, 6, 7, 6, 7, 3.2, 3.6, 4, 4.4, 4.8, 5.1, 4, 4.4, 4.8, 2)
+_HALF_WIDTHS = (
+    1,
+    2,
+    2,
+    2,
+    3,
+    3,
+    4,
+    5,
+    4,
+    5,
+    6,
+    7,
+    6,
+    7,
+    3.2,
+    3.6,
+    4,
+    4.4,
+    4.8,
+    5.1,
+    4,
+    4.4,
+    4.8,
+    2,
+)
 _FLAT = range(lib.DSP_WINDOW_FLAT4, lib.DSP_WINDOW_P601 + 1)
 _NOISE_FLOOR = 1e-11  # rounding noise, beside the strongest bin
 _MARGIN = 1.25  # by which a component stands out of what others leak

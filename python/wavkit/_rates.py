@@ -45,7 +45,9 @@ class _Stream:
         delay = (len(self.kernel) - 1) // 2
         self.early = 0
         history = (len(self.kernel) - 1) // resampler.phases
-        state = np.zeros(history + (1 if self.exact else 0), in_precision_of(np.zeros(1), letter).dtype)
+        state = np.zeros(
+            history + (1 if self.exact else 0), in_precision_of(np.zeros(1), letter).dtype
+        )
         if self.exact:
             # The output at the first sample comes as late as the filter delays.
             self.early, state[-1] = divmod(delay, self.down)
@@ -62,7 +64,7 @@ class _Stream:
         self.taken += count
 
     def _places(self, count: int) -> Array:
-        """Of the outputs within the next samples, m down / up + delay, from the first of them on."""
+        """Of the outputs within the next samples: m down / up + delay."""
         first = self.made
         start = first * self.down - self.taken * self.up
         # As many as lie before the end of the block.
@@ -92,7 +94,9 @@ class Resampler:
     1001
     """
 
-    def __init__(self, rate: float | Fraction, new_rate: float | Fraction, quality: str = "normal") -> None:
+    def __init__(
+        self, rate: float | Fraction, new_rate: float | Fraction, quality: str = "normal"
+    ) -> None:
         if quality not in _QUALITIES:
             raise ValueError(f"quality is one of {', '.join(_QUALITIES)}, not {quality!r}")
         if not (0 < rate < math.inf and 0 < new_rate < math.inf):

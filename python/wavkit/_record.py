@@ -25,14 +25,22 @@ class Error(Exception):
     def __init__(self, function: str, call: str, reason: str) -> None:
         super().__init__(f"{call} failed: {reason}")
         self.function = function
+        self.call = call
         self.reason = reason
+
+    def __reduce__(self) -> tuple[type[Error], tuple[str, str, str]]:
+        return Error, (self.function, self.call, self.reason)  # between processes
 
 
 def failed(function: Callable[..., Any], *arguments: object) -> Error:
     """The error of a call, with its arguments and the reasons that the headers give."""
     name, text = function.__name__, " ".join((function.__doc__ or "").split())
     returns = re.search(r"Returns .*?-1\b[,:]? *(.*)", text)
-    reason = returns[1] if returns else "the record is complex where a real one is wanted, or memory ran out"
+    reason = (
+        returns[1]
+        if returns
+        else "the record is complex where a real one is wanted, or memory ran out"
+    )
     return Error(name, f"{name}({', '.join(map(repr, arguments))})", reason)
 
 
@@ -73,7 +81,12 @@ def _kind_of(dtype: DTypeLike) -> _Kind:
 
 def samples_of(values: ArrayLike, dtype: DTypeLike = None) -> Array:
     """An array of one of the four types that records are made of, copied only if it was another."""
-    array = values if type(values) is np.ndarray and dtype is None else np.asarray(values, dtype)
+    if type(values) is np.ndarray and dtype is None:
+        array = values
+    elif isinstance(values, np.ma.MaskedArray) and np.any(values.mask):
+        raise ValueError("samples are missing: the array is masked")
+    else:
+        array = np.asarray(values, dtype)
     if array.dtype.char not in _kinds or not array.dtype.isnative:
         array = array.astype(letter_of(array.dtype))
     return array
@@ -173,7 +186,8 @@ class Record:
 
     def __repr__(self) -> str:
         kind = "complex" if self.complex else "real"
-        return f"<{'dspf' if self.single else 'dsp'}: {self.points} {kind} points, delta {self.delta:g}>"
+        name = "dspf" if self.single else "dsp"
+        return f"<{name}: {self.points} {kind} points, delta {self.delta:g}>"
 
     def take(self) -> Array:
         """The samples as an array, and leaves the record empty. What the library allocated is not
@@ -193,7 +207,9 @@ class Record:
         self.release()
         if array is None or points < 1:
             return np.empty(0, dtype)
-        return array if len(array) == points and array.dtype == dtype else array.view(dtype)[:points]
+        return (
+            array if len(array) == points and array.dtype == dtype else array.view(dtype)[:points]
+        )
 
     def first(self) -> Any:
         """The first sample, of a result that is one."""

@@ -89,7 +89,9 @@ class _DataArray(_Labels):
 
     def along(self, values: Array, name: str, places: Array) -> Any:
         dims = [name if dim == self.dim else dim for dim in self.x.dims]
-        return type(self.x)(values, dims=dims, coords={**self._others(), name: places}, name=self.x.name)
+        return type(self.x)(
+            values, dims=dims, coords={**self._others(), name: places}, name=self.x.name
+        )
 
 
 class _Frame(_Labels):
@@ -146,8 +148,10 @@ class Runs:
         self.array = array if array.ndim == 1 else np.moveaxis(array, self.axis, -1)
         self.shape = self.array.shape[:-1]
         contiguous = np.ascontiguousarray(self.array)
-        self.rows = [contiguous] if array.ndim == 1 else list(
-            contiguous.reshape(math.prod(self.shape), self.points)
+        self.rows = (
+            [contiguous]
+            if array.ndim == 1
+            else list(contiguous.reshape(math.prod(self.shape), self.points))
         )
 
     @property
@@ -174,8 +178,8 @@ class Runs:
         return self.each(result)
 
     def each(self, result: Callable[[Array], Array]) -> Array:
-        """What a function makes of every signal, along its last axis. Where there is no signal, what
-        it would make of one tells the shape."""
+        """What a function makes of every signal, along its last axis. Where there is no signal,
+        what it would make of one tells the shape."""
         if not self.shape:
             return result(self.rows[0])
         rows = self.rows or [np.zeros(self.points, self.array.dtype)]

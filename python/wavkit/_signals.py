@@ -71,7 +71,9 @@ def integrate(
     return runs.same(runs.map(same_length("dspi_integ")))
 
 
-def edges(x: ArrayLike | Any, level: float, rate: float | None = None, direction: str = "either") -> Array:
+def edges(
+    x: ArrayLike | Any, level: float, rate: float | None = None, direction: str = "either"
+) -> Array:
     """The times at which one signal crosses a level, on the lines between its samples.
 
     >>> wavkit.edges([0.0, 2.0, 2.0, 0.0], 0.5, direction="rising")
@@ -98,8 +100,8 @@ def interp(
     axis: int | str = -1,
 ) -> Labelled:
     """A table y over x at other places, in any order; without x, a signal at any times. Between the
-    samples it is held (`hold`), a line (`linear`), a parabola (`quadratic`) or a cubic `spline` with
-    not-a-knot ends; outside of the table its ends are held unless `extrapolate` lets them go on.
+    samples it is held (`hold`), a line (`linear`), a parabola (`quadratic`) or a cubic `spline`
+    with not-a-knot ends; outside of the table its ends are held, or go on with `extrapolate`.
 
     >>> wavkit.interp([0.0, 1.0, 2.0, 3.0, 4.0], [0.0, 1.0, 8.0, 27.0, 64.0], [1.5, 2.5], "spline")
     array([ 3.375, 15.625])
@@ -175,7 +177,14 @@ def correlate(
         scales.append(first.points / np.sqrt(energies) if energies > 0 else 0.0)
         padded = np.pad(other, shift)
         with Record(dtype=dtype.char.lower()) as out:
-            call("dspb_corr", lend(row, first.delta), lend(padded, first.delta), out, None, first.points)
+            call(
+                "dspb_corr",
+                lend(row, first.delta),
+                lend(padded, first.delta),
+                out,
+                None,
+                first.points,
+            )
             values.append(out.take())
     value = np.reshape(values, (*shape, -1))
     lag = (np.arange(value.shape[-1]) - shift) * first.delta + second.start() - first.start()

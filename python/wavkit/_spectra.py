@@ -76,8 +76,8 @@ class Spectrum:
 
     @property
     def phase(self) -> Labelled:
-        """The phase of each bin in radians, at the middle of the measured samples (under the uniform
-        window at the first one)."""
+        """The phase of each bin in radians, at the middle of the measured samples (under the
+        uniform window at the first one)."""
         return self._labelled(np.angle(self._bins))
 
     @property
@@ -103,7 +103,8 @@ class Spectrum:
         lobes, and what lies within the main lobe of a stronger component, are none.
 
         >>> x = 2 * np.sin(2 * np.pi * 50.3 * np.arange(1000) / 1000)
-        >>> for frequency, amplitude in wavkit.spectrum(x, 1000, "gausstop", any_length=True).peaks(1):
+        >>> spectrum = wavkit.spectrum(x, 1000, "gausstop", any_length=True)
+        >>> for frequency, amplitude in spectrum.peaks(1):
         ...     print(f"{frequency:.3f} Hz: {amplitude:.2f}")
         50.300 Hz: 2.00
         """
@@ -121,7 +122,9 @@ class Spectrum:
         axes = axes or _new_axes()
         height = np.moveaxis(np.asarray(self.db if db else self.amplitude), self._runs.axis, 0)
         axes.plot(self.frequency, height.reshape(len(height), -1), **options)
-        axes.set(xlabel="frequency", ylabel="amplitude, dB" if db else "amplitude", title=self._title)
+        axes.set(
+            xlabel="frequency", ylabel="amplitude, dB" if db else "amplitude", title=self._title
+        )
         axes.margins(x=0)
         return axes
 

@@ -68,7 +68,7 @@ def stats(x: ArrayLike | Any, axis: int | str = -1) -> Stats:
     if runs.points < 1:
         raise ValueError("a signal without samples has no statistics")
     found = runs.each(_figures)
-    values = {field.name: found[..., i] for i, field in enumerate(fields(Stats))}
+    values: dict[str, Any] = {field.name: found[..., i] for i, field in enumerate(fields(Stats))}
     for name in values:
         if name.endswith("_sample"):
             values[name] = values[name].real.astype(np.int64)
@@ -76,7 +76,9 @@ def stats(x: ArrayLike | Any, axis: int | str = -1) -> Stats:
             values[name] = values[name].real
     if runs.is_complex:
         values.update(dict.fromkeys(_OF_REAL_SIGNALS))
-    return Stats(**{n: None if v is None else runs.reduced(np.asarray(v)) for n, v in values.items()})
+    return Stats(
+        **{n: None if v is None else runs.reduced(np.asarray(v)) for n, v in values.items()}
+    )
 
 
 def _figures(row: Array) -> Array:
@@ -88,7 +90,10 @@ def _figures(row: Array) -> Array:
             if not is_complex or name not in _OF_REAL_SIGNALS:
                 call(function, x, out)
                 values[name] = out.first()
-        for name, flags in (("min_sample", lib.DSP_PEAK_SMALLEST), ("max_sample", lib.DSP_PEAK_SAMPLE)):
+        for name, flags in (
+            ("min_sample", lib.DSP_PEAK_SMALLEST),
+            ("max_sample", lib.DSP_PEAK_SAMPLE),
+        ):
             call("dsps_peak", x, out, flags, 0)
             values[name] = out.pointer.data[1]
     # Rounding takes the variance of a constant a little below 0.
@@ -181,7 +186,9 @@ class Line:
         return result
 
 
-def fit(x: ArrayLike | Any, y: ArrayLike | None = None, rate: float | None = None, axis: int | str = -1) -> Line:
+def fit(
+    x: ArrayLike | Any, y: ArrayLike | None = None, rate: float | None = None, axis: int | str = -1
+) -> Line:
     """The least-squares line of y over x; of one signal alone, over the places of its samples.
 
     >>> line = wavkit.fit([0.0, 1.0, 2.0, 3.0], [1.0, 3.1, 4.9, 7.0])
@@ -209,8 +216,8 @@ def fit(x: ArrayLike | Any, y: ArrayLike | None = None, rate: float | None = Non
 
 
 def roots(coefficients: ArrayLike, descending: bool = False) -> Array:
-    """The roots of a polynomial with real coefficients, in ascending powers: from closed forms up to
-    degree 5, in their order, and by search beyond, sorted by modulus. The array is complex where
+    """The roots of a polynomial with real coefficients, in ascending powers: from closed forms up
+    to degree 5, in their order, and by search beyond, sorted by modulus. The array is complex where
     one of them is, and beyond degree 5.
 
     >>> wavkit.roots([6, -5, 1])  # of 6 - 5x + x^2

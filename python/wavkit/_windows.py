@@ -2,6 +2,8 @@
 
 from __future__ import annotations
 
+from functools import lru_cache
+
 import numpy as np
 from numpy.typing import DTypeLike
 
@@ -27,6 +29,7 @@ def windows() -> list[str]:
     return found
 
 
+@lru_cache(64)
 def window_number(name: str | int) -> int:
     if isinstance(name, int):
         return name
@@ -34,7 +37,9 @@ def window_number(name: str | int) -> int:
     try:
         lib.dsp_window_from_str(name, number)
     except Error:
-        raise ValueError(f"no window is called {name!r}; there are {', '.join(windows())}") from None
+        raise ValueError(
+            f"no window is called {name!r}; there are {', '.join(windows())}"
+        ) from None
     return int(number[0])
 
 
@@ -44,7 +49,12 @@ def takes_width(number: int) -> bool:
 
 
 def window(
-    name: str, points: int, *, scale: str = "peak", symmetric: bool = False, dtype: DTypeLike = float
+    name: str,
+    points: int,
+    *,
+    scale: str = "peak",
+    symmetric: bool = False,
+    dtype: DTypeLike = float,
 ) -> Array:
     """The samples of a window, as transforms want them: `N` is its period.
 
