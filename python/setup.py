@@ -33,6 +33,7 @@ class BuildPackage(build_py):
         prefix, package = Path(os.environ["WAVKIT_PREFIX"]), Path(self.build_lib) / "wavkit"
         interface.write(prefix / "include", package)
         (package / "_version.py").write_text(f'version = "{version}"\n')
+        shutil.copy(here.parent / "LICENSE", package)
         for name in ("lib/libwavkit.so.2", "bin/wavkit"):
             (package / "_native" / name).parent.mkdir(parents=True, exist_ok=True)
             shutil.copy(prefix / name, package / "_native" / name)

@@ -181,9 +181,7 @@ class Filter:
     """
 
     def __init__(self, taps: ArrayLike) -> None:
-        self.taps = np.array(samples_of(taps))
-        if self.taps.ndim != 1:
-            raise ValueError("taps have one dimension")
+        self.taps = _checked(taps)
         self.delay = delay_of(self.taps)
         self.reset()
 
@@ -247,23 +245,30 @@ def filter(
     0.002
     """
     runs = Runs(x, rate, axis)
-    given = {"lowpass": lowpass, "highpass": highpass, "bandpass": bandpass, "bandstop": bandstop}
-    shape: dict[str, Any] = {
-        "transition": transition,
-        "attenuation": attenuation,
-        "length": length,
-        "window": window,
-    }
-    chain = [] if taps is None else [np.array(samples_of(taps))]
-    for kind, edges in given.items():
-        if edges is not None:
-            chain.append(design(kind, *np.atleast_1d(edges).tolist(), rate=1 / runs.delta, **shape))
-    if not chain:
-        raise ValueError("a filter takes taps or a band: lowpass, highpass, bandpass or bandstop")
-    for each in chain:
+    bands = {"lowpass": lowpass, "highpass": highpass, "bandpass": bandpass, "bandstop": bandstop}
+    shape = {"attenuation": attenuation, "length": length, "window": window}
+    for each in chain(1 / runs.delta, taps, bands, transition=transition, **shape):
         back = delay_of(each) if delay is None else delay
         runs.rows = [_aligned(row, each, back, hold) for row in runs.rows]
     return runs.same(runs.each(lambda row: row))
+
+
+def chain(rate: float, taps: ArrayLike | None, bands: dict[str, Any], **shape: Any) -> list[Array]:
+    """The filters that `filter()` puts behind one another."""
+    found = [] if taps is None else [_checked(taps)]
+    for kind, edges in bands.items():
+        if edges is not None:
+            found.append(design(kind, *np.atleast_1d(edges).tolist(), rate=rate, **shape))
+    if not found:
+        raise ValueError("a filter takes taps or a band: lowpass, highpass, bandpass or bandstop")
+    return found
+
+
+def _checked(taps: ArrayLike) -> Array:
+    found = np.array(samples_of(taps))
+    if found.ndim != 1 or len(found) == 0:
+        raise ValueError("taps are a list of numbers")
+    return found
 
 
 def _aligned(row: Array, taps: Array, delay: int, hold: bool) -> Array:

@@ -273,6 +273,11 @@ class _Segments:
             take(i, out)
 
 
+def step_of(length: int, overlap: float) -> int:
+    """From one segment to the next."""
+    return max(1, math.floor(length * (1 - overlap / 100) + 0.5))
+
+
 def _segments(
     runs: Runs, settings: _Settings, length: int, overlap: float, detrend: bool
 ) -> _Segments:
@@ -280,7 +285,7 @@ def _segments(
         raise ValueError(f"segments overlap by 0 to less than 100 percent, not {overlap}")
     if not 0 < length <= runs.points:
         raise ValueError(f"the signal has {runs.points} samples, fewer than a segment of {length}")
-    step = max(1, math.floor(length * (1 - overlap / 100) + 0.5))
+    step = step_of(length, overlap)
     return _Segments(length, step, settings, settings.layout(runs, length), detrend)
 
 
