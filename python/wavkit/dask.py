@@ -85,7 +85,7 @@ def _add_harmonic(a: Array, b: Array, share: float) -> Array:
 
 #: How the powers of two averages become that of both; `share` is the weight of the second.
 _MERGES: Mapping[str, Callable[[Array, Array, float], Array]] = {
-    "linear": lambda a, b, share: a + share * (b - a),
+    "linear": lambda a, b, share: np.add(a, share * (b - a)),
     "max": lambda a, b, share: np.maximum(a, b),
     "min": lambda a, b, share: np.minimum(a, b),
     "harmonic": _add_harmonic,
