@@ -8,6 +8,7 @@ from __future__ import annotations
 import os
 import sys
 import time
+from concurrent.futures import ThreadPoolExecutor
 from typing import Any, Callable
 
 os.environ.setdefault("OPENBLAS_NUM_THREADS", "1")
@@ -105,6 +106,21 @@ def long_arrays(ffi: Any, native: Any) -> None:
         print(f"{name:28}{mine * 1e6:12.1f}{theirs * 1e6:10.1f}{mine / theirs:10.3f}")
 
 
+def threads() -> None:
+    """How much more two threads do than one."""
+    x = np.random.default_rng(1).normal(size=1 << 18)
+
+    def measure(_: int) -> None:
+        wavkit.spectrum(x, 1.0, "flattop")
+
+    measure(0)
+    with ThreadPoolExecutor(2) as pool:
+        one, two = best(
+            lambda: [measure(i) for i in range(8)], lambda: list(pool.map(measure, range(8)))
+        )
+    print(f"\n8 spectra of 2^18 samples: {one / two:.2f} times as fast in two threads as in one")
+
+
 def rfft(x: Any) -> Any:
     with lib.Record() as out, lib.Record(x) as record:
         lib.dsp_copy(out, record)
@@ -184,6 +200,7 @@ def main() -> None:
     ffi, native = native_loops(sys.argv[1])
     short_calls(ffi, native)
     long_arrays(ffi, native)
+    threads()
     for points in (1024, 1 << 16, 1 << 20):
         beside_peers(points)
 

@@ -1,11 +1,15 @@
 """What the functions compute, beside SciPy and NumPy."""
 
+import json
+import subprocess
+
 import numpy as np
 import pytest
 import scipy.interpolate
 import scipy.signal
 import scipy.stats
 import wavkit
+from wavkit.__main__ import program
 
 RATE = 1000.0
 T = np.arange(3000) / RATE
@@ -76,6 +80,20 @@ def test_side_lobes_are_no_peaks():
     found = wavkit.spectrum(whole, RATE, "uniform", any_length=True).peaks(9)
     close(found.frequency, [50.0, 60.0], 1e-6)
     assert len(wavkit.spectrum(whole, RATE, "hann").peaks(9, band=(55, 70))) == 1
+
+
+@pytest.mark.parametrize("window", wavkit.windows()[::3])
+@pytest.mark.parametrize("points", [500, 4096, 40_000])
+def test_peaks_are_those_of_the_program(window, points, tmp_path):
+    """Which lists neither side lobes nor what hides in them, near and far out."""
+    t, path = np.arange(points) / RATE, tmp_path / "tones.dsp"
+    tones = zip(10 ** RNG.uniform(-4, 0, 4), RNG.uniform(5, 495, 4), RNG.uniform(0, 6, 4))
+    x = sum(a * np.sin(2 * np.pi * f * t + p) for a, f, p in tones) + RNG.choice([0, 0.3])
+    wavkit.write(path, x, RATE)
+    command = [program(), "spectrum", path, "--peaks", "6", "--window", window, "--json"]
+    told = json.loads(subprocess.run(command, capture_output=True, check=True).stdout)
+    theirs = [(p["frequency"], p["amplitude"]) for p in told["signals"][0]["peaks"]]
+    np.testing.assert_allclose(list(wavkit.spectrum(x, RATE, window).peaks(6)), theirs, rtol=1e-6)
 
 
 def welch(x, window, length, **options):

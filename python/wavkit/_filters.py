@@ -101,6 +101,8 @@ def design(
     wanted = 2 if kind in (*_BANDS, "delay") else 1
     if len(parameters) != wanted and not (kind.startswith("sinh") and not parameters):
         raise ValueError(f"{kind} takes {wanted} parameter{'s' if wanted > 1 else ''}")
+    if not 0 < rate < math.inf:
+        raise ValueError(f"a sampling rate is a number above 0, not {rate}")
     edges = [f / rate for f in (parameters[:1] if kind == "delay" else parameters)]
     if not kind.startswith("sinh"):
         _check_edges(edges, rate)

@@ -5,8 +5,10 @@ from __future__ import annotations
 
 import math
 from dataclasses import dataclass
+from functools import cached_property
 
 import numpy as np
+from numpy.lib.stride_tricks import sliding_window_view
 
 from . import _functions as lib
 from ._native import ffi
@@ -118,12 +120,23 @@ def _refined(layout: Layout, bins: Array, m: Array, at: int) -> tuple[float, flo
 
 
 class _Leakage:
-    """What components show in other bins, by the transform of the window."""
+    """What components show in the bins of other maxima, by the transform of the window."""
 
     FINENESS = 32  # values a bin
     LONGEST = 1 << 14  # longer windows have the same lobes
 
-    def __init__(self, layout: Layout) -> None:
+    def __init__(self, layout: Layout, tops: Array) -> None:
+        self.layout = layout
+        self.scale = layout.samples / layout.length
+        self.components = 0
+        self.total: Array = np.zeros(len(tops))
+        self._places = tops - layout.origin
+        self._highest: dict[int, Array] = {}
+
+    @cached_property
+    def lobes(self) -> Array:
+        """The magnitude of the transform of the window, by the fraction of a bin."""
+        layout = self.layout
         points = min(layout.samples, self.LONGEST)
         width = points - (layout.samples - layout.width)
         flags = lib.DSP_SCALE_NO_ROTATION | (lib.DSP_SCALE_WIDTH if width < points else 0)
@@ -132,23 +145,59 @@ class _Leakage:
             lib.dspi_zpad(x, self.FINENESS * points)
             lib.dspi_rdft(x)
             lib.dspi_mag(x)
-            lobes = x.take()
-        self.lobes = lobes / lobes[0]
-        self.layout = layout
-        self.scale = layout.samples / layout.length
-        self.components: list[tuple[float, float, float, bool]] = []
+            lobes: Array = x.take()
+        lobes /= lobes[0]
+        # The half next to the middle of a shortened window is like that of the whole one.
+        return lobes if points == layout.samples else lobes[: len(lobes) // 2]
 
-    def response(self, bins: Array | float) -> Array:
-        return np.interp(bins, np.arange(len(self.lobes)) / self.FINENESS, self.lobes)
+    @cached_property
+    def reach(self) -> float:
+        """How far the table goes, in bins."""
+        return (len(self.lobes) - 1) / self.FINENESS
 
-    def near(self, bins: float, blur: float) -> float:
-        """The highest response about a place."""
-        if bins <= blur:
-            return 1.0
-        low, high = bins - blur, bins + blur
-        inner = self.lobes[math.ceil(low * self.FINENESS) : math.ceil(high * self.FINENESS)]
-        ends = self.response(np.array([low, high]))
-        return float(max(ends.max(), inner.max() if len(inner) else 0.0))
+    @cached_property
+    def decay(self) -> float:
+        """The power by which lobes fall beyond the table."""
+        ends = np.array([self.reach / 2, self.reach - 1])
+        inner, outer = self._within(ends, 1.0)
+        return float(np.clip(np.log2(inner / outer), 0, 6)) if outer > 0 else 0.0
+
+    def response(self, bins: Array) -> Array:
+        """Between the values of the table."""
+        at = np.minimum(bins * self.FINENESS, len(self.lobes) - 1)
+        whole = at.astype(int)
+        following = self.lobes[np.minimum(whole + 1, len(self.lobes) - 1)]
+        result: Array = self.lobes[whole] + (at - whole) * (following - self.lobes[whole])
+        return result
+
+    def highest(self, count: int) -> Array:
+        """The highest of so many values, from each of the table on."""
+        if count not in self._highest:
+            padded = np.pad(self.lobes, (0, count - 1), mode="edge")
+            self._highest[count] = sliding_window_view(padded, count).max(axis=-1)
+        return self._highest[count]
+
+    def near(self, bins: Array, blur: float) -> Array:
+        """The highest response about places. Far out, lobes repeat from bin to bin, those of a
+        triangle every other bin, and fall."""
+        beyond = bins > self.reach
+        if not beyond.any():
+            return self._within(bins, blur)
+        same = math.floor(self.reach / 2 - 1) * 2 + bins % 2
+        fall = np.where(beyond, (self.reach / np.maximum(bins, 1)) ** self.decay, 1)
+        return self._within(np.where(beyond, same, bins), blur) * fall
+
+    def _within(self, bins: Array, blur: float) -> Array:
+        low, high = np.maximum(bins - blur, 0), bins + blur
+        first = np.ceil(low * self.FINENESS).astype(int)
+        counts = np.ceil(high * self.FINENESS).astype(int) - first
+        first = np.minimum(first, len(self.lobes) - 1)
+        result: Array = np.maximum(self.response(low), self.response(high))
+        for count in np.unique(counts[counts > 0]):
+            here = counts == count
+            result[here] = np.maximum(result[here], self.highest(int(count))[first[here]])
+        result[bins <= blur] = 1
+        return result
 
     def add(self, m: Array, at: int) -> None:
         """Places a component by the bins on either side: as the higher one grows beside the top,
@@ -169,19 +218,16 @@ class _Leakage:
         doubt = abs(float(np.interp(offset, offsets, nearer)) - max(left, right) / top)
         doubt += abs(float(np.interp(offset, offsets, farther)) - min(left, right) / top)
         # The lobe of a flat window does not tell the place at all.
-        blur = 0.5 if self.response(0.5) > 0.9 else min(2 * doubt + 1e-4, 0.5)
+        flat = self.lobes[self.FINENESS // 2] > 0.9
+        blur = 0.5 if flat else min(2 * doubt + 1e-4, 0.5)
         place = at - self.layout.origin + (offset if right >= left else -offset)
+        height = top / float(np.interp(offset, offsets, tops))
         mirrored = not self.layout.two_sided and at not in self.layout.without_mirror()
-        height = top / float(self.response(offset * self.scale))
-        self.components.append((place, height, blur, mirrored))
-
-    def at(self, bin_: int) -> float:
-        total, length = 0.0, self.layout.length
-        for place, height, blur, mirrored in self.components:
-            for source in (place, -place) if mirrored else (place,):
-                apart = abs(bin_ - self.layout.origin - source)
-                total += height * self.near(min(apart, length - apart) * self.scale, blur)
-        return total
+        for source in (place, -place) if mirrored else (place,):
+            apart = np.abs(self._places - source)
+            apart = np.minimum(apart, length - apart) * self.scale
+            self.total += height * self.near(apart, blur)
+        self.components += 1
 
 
 def find_peaks(
@@ -190,36 +236,36 @@ def find_peaks(
     """Frequency and amplitude of the strongest components, the strongest first."""
     m = np.asarray(magnitudes, float)
     padded: Array = np.pad(m, 1, constant_values=-1.0)
-    is_top = (m > padded[:-2]) & (m >= padded[2:]) & (m > 0)
+    is_top = (m > padded[:-2]) & (m >= padded[2:]) & (m > 0) & np.isfinite(m)
     if not layout.two_sided:
         is_top[0] = False
     tops = np.flatnonzero(is_top)
     tops = tops[np.argsort(-m[tops], kind="stable")]
+    tops = tops[m[tops] >= _NOISE_FLOOR * m[tops[:1]]]
+    frequencies = (tops - layout.origin) * layout.delta
+    wanted = (band[0] <= frequencies) & (frequencies <= band[1])
     lobe = _HALF_WIDTHS[layout.window] * layout.length / layout.samples
     reach = max(math.ceil(lobe) - 1, 0)
-    taken = np.zeros(len(m), bool)
-    leakage = _Leakage(layout)
+    leakage = _Leakage(layout, tops)
     if not layout.two_sided and len(m) > 1 and m[0] > 0.95 * m[1]:
         leakage.add(m, 0)
-    mirrorless = layout.without_mirror()
     found: list[tuple[float, float]] = []
-    for at in map(int, tops):
-        if len(found) == count or m[at] < _NOISE_FLOOR * m[tops[0]]:
+    free = np.ones(len(tops), bool)  # neither looked at nor in the lobe of a stronger one
+    while len(found) < count:
+        leaks = leakage.components < _MOST_LEAKING
+        candidates = free & (leaks | wanted) & (m[tops] > _MARGIN * leakage.total)
+        if not candidates.any():
             break
-        if taken[at]:
-            continue
-        frequency = (at - layout.origin) * layout.delta
-        wanted = band[0] <= frequency <= band[1]
-        leaks = len(leakage.components) < _MOST_LEAKING
-        if (wanted or leaks) and m[at] <= _MARGIN * leakage.at(at):
-            continue
-        if leaks:
-            leakage.add(m, at)
-        taken[max(at - reach, 0) : at + reach + 1] = True
-        if wanted:
-            height, offset = _refined(layout, bins, m, at)
-            share = 0.5 if at in mirrorless else 1.0
-            found.append((frequency + offset * layout.delta, height * share))
+        at = int(candidates.argmax())
+        top = int(tops[at])
+        if wanted[at]:
+            height, offset = _refined(layout, bins, m, top)
+            share = 0.5 if top in layout.without_mirror() else 1.0
+            found.append((float(frequencies[at]) + offset * layout.delta, height * share))
+        if leaks and len(found) < count:
+            leakage.add(m, top)
+        free &= np.abs(tops - top) > reach
+        free[: at + 1] = False
     return sorted(found, key=lambda peak: -peak[1])
 
 

@@ -223,7 +223,7 @@ def roots(coefficients: ArrayLike, descending: bool = False) -> Array:
     >>> wavkit.roots([6, -5, 1])  # of 6 - 5x + x^2
     array([2., 3.])
     """
-    given = samples_of(coefficients)
+    given = np.atleast_1d(samples_of(coefficients))
     with Record(given[::-1] if descending else given.copy()) as c, Record(dtype=given.dtype) as out:
         degree = max(np.flatnonzero(given[::-1] if descending else given), default=0)
         if given.dtype.kind != "c" and degree <= 5:
@@ -241,7 +241,7 @@ def from_roots(roots: ArrayLike, descending: bool = False) -> Array:
     >>> wavkit.from_roots([2.0, 3.0])
     array([ 6., -5.,  1.])
     """
-    given = samples_of(roots)
+    given = np.atleast_1d(samples_of(roots))
     with Record(given.copy()) as x:
         call("dspi_pztoc", x)
         c = x.take()
