@@ -29,3 +29,21 @@ WAVKIT_API void repeat_rfft(int times, double* samples) {
         dspi_rfft(&x);
     }
 }
+
+/* Long signals, in place: what a host adds to them must not be seen. */
+WAVKIT_API void repeat_long_scale(int times, double* samples, int points) {
+    dsp x = {1, samples, 0, points, 0, 0};
+    for (int i = 0; i < times; ++i) dspi_scale(&x, 1.0);
+}
+
+WAVKIT_API void repeat_long_rms(int times, double* samples, int points) {
+    dsp x = {1, samples, 0, points, 0, 0}, out;
+    dsp_init(&out);
+    for (int i = 0; i < times; ++i) dsps_rms(&x, &out);
+    dsp_destroy(&out);
+}
+
+WAVKIT_API void repeat_long_fft(int times, double* samples, int points) {
+    dsp x = {1, samples, 0, points / 2, 1, 0};
+    for (int i = 0; i < times; ++i) dspi_fft(&x, 0);
+}

@@ -1,0 +1,390 @@
+"""What the functions compute, beside SciPy and NumPy."""
+
+import json
+import subprocess
+
+import numpy as np
+import pytest
+import scipy.interpolate
+import scipy.signal
+import scipy.stats
+import wavkit
+from wavkit.__main__ import program
+
+RATE = 1000.0
+T = np.arange(3000) / RATE
+RNG = np.random.default_rng(3)
+NOISE = RNG.normal(size=3000)
+TONES = 2 * np.sin(2 * np.pi * 50.3 * T + 0.4) + 0.01 * np.sin(2 * np.pi * 220.7 * T)
+COMPLEX = NOISE + 1j * RNG.normal(size=3000)
+
+
+def close(actual, expected, tolerance=1e-10):
+    scale = np.max(np.abs(expected), initial=1e-300)
+    assert np.shape(actual) == np.shape(expected)
+    np.testing.assert_allclose(actual, expected, atol=tolerance * scale, rtol=0)
+
+
+@pytest.mark.parametrize("window", ["hann", "Blackman_Harris4", "flattop", "kaiser90", "uniform"])
+def test_spectrum_at_any_length(window):
+    w = wavkit.window(window, 3000, scale="mean")
+    expected = 2 * np.fft.rfft(NOISE * w) / 3000
+    found = wavkit.spectrum(NOISE, RATE, window, any_length=True)
+    close(found.frequency, np.fft.rfftfreq(3000, 1 / RATE))
+    expected[[0, -1]] /= 2
+    close(found.amplitude, np.abs(expected))
+    phase = np.exp(1j * found.phase)
+    centre = 0 if window == "uniform" else 1500
+    turned = expected * np.exp(2j * np.pi * centre * np.arange(1501) / 3000)
+    close(phase * np.abs(expected), turned)
+
+
+@pytest.mark.parametrize("window", ["hann", "kaiser70"])
+@pytest.mark.parametrize("x", [NOISE, COMPLEX], ids=["real", "complex"])
+def test_spectrum_with_zeros(x, window):
+    found = wavkit.spectrum(x, RATE, window, points=4096, detrend=True)
+    w = wavkit.window(window, 3000, scale="mean")
+    expected = np.abs(np.fft.fft((x - x.mean()) * w, 4096)) / 3000 * 2
+    frequency = np.fft.fftfreq(4096, 1 / RATE)
+    if np.iscomplexobj(x):
+        close(found.amplitude, np.fft.fftshift(expected) / 2), close(
+            found.frequency, np.fft.fftshift(frequency)
+        )
+    else:
+        close(found.amplitude, expected[:2049] * np.where(np.arange(2049) % 2048, 1, 0.5))
+        close(found.frequency, np.abs(frequency[:2049]))
+
+
+@pytest.mark.parametrize("window", wavkit.windows())
+def test_peaks_lie_between_bins(window):
+    spectrum = wavkit.spectrum(TONES, RATE, window, any_length=True)
+    (first, amplitude), *others = spectrum.peaks(2)
+    bins = abs(first - 50.3) * 3
+    assert bins < 0.25 and amplitude == pytest.approx(2, rel=0.33 if window == "Uniform" else 0.16)
+    if window in ("Blackman_Harris4", "Gausstop", "Flattop", "Kaiser90", "Gauss80"):
+        assert bins < (0.17 if window == "Flattop" else 0.01)
+        assert others[0] == (pytest.approx(220.7, abs=0.06), pytest.approx(0.01, rel=0.01))
+
+
+def test_side_lobes_are_no_peaks():
+    for window in ("uniform", "hann", "flattop"):
+        assert (
+            len(
+                wavkit.spectrum(TONES - TONES + np.sin(0.7 * np.arange(3000)), RATE, window).peaks(
+                    9
+                )
+            )
+            == 1
+        )
+    whole = np.sin(2 * np.pi * 50 * T) + 1e-4 * np.sin(2 * np.pi * 60 * T)
+    found = wavkit.spectrum(whole, RATE, "uniform", any_length=True).peaks(9)
+    close(found.frequency, [50.0, 60.0], 1e-6)
+    assert len(wavkit.spectrum(whole, RATE, "hann").peaks(9, band=(55, 70))) == 1
+
+
+@pytest.mark.parametrize("window", wavkit.windows()[::3])
+@pytest.mark.parametrize("points", [500, 4096, 40_000])
+def test_peaks_are_those_of_the_program(window, points, tmp_path):
+    """Which lists neither side lobes nor what hides in them, near and far out."""
+    t, path = np.arange(points) / RATE, tmp_path / "tones.dsp"
+    tones = zip(10 ** RNG.uniform(-4, 0, 4), RNG.uniform(5, 495, 4), RNG.uniform(0, 6, 4))
+    x = sum(a * np.sin(2 * np.pi * f * t + p) for a, f, p in tones) + RNG.choice([0, 0.3])
+    wavkit.write(path, x, RATE)
+    command = [program(), "spectrum", path, "--peaks", "6", "--window", window, "--json"]
+    told = json.loads(subprocess.run(command, capture_output=True, check=True).stdout)
+    theirs = [(p["frequency"], p["amplitude"]) for p in told["signals"][0]["peaks"]]
+    np.testing.assert_allclose(list(wavkit.spectrum(x, RATE, window).peaks(6)), theirs, rtol=1e-6)
+
+
+def welch(x, window, length, **options):
+    w = wavkit.window(window, length)
+    return scipy.signal.welch(x, RATE, w, nperseg=length, **{"detrend": False, **options})
+
+
+@pytest.mark.parametrize("detrend", [False, True])
+def test_average_is_that_of_welch(detrend):
+    x = NOISE + 1
+    _, power = welch(x, "hann", 256, detrend="constant" if detrend else False)
+    close(wavkit.average(x, RATE, 256, detrend=detrend).density ** 2, power, 1e-9)
+    _, power = welch(COMPLEX, "blackman", 250, noverlap=200, return_onesided=False)
+    found = wavkit.average(COMPLEX, RATE, 250, "blackman", overlap=80, any_length=True).density
+    close(found**2, np.fft.fftshift(power), 1e-9)
+
+
+@pytest.mark.parametrize(
+    ("type", "mean"),
+    [
+        ("max", lambda p: p.max(0)),
+        ("min", lambda p: p.min(0)),
+        ("last", lambda p: p[-1]),
+        ("harmonic", scipy.stats.hmean),
+        ("log", scipy.stats.gmean),
+        ("every", lambda p: p[(len(p) - 1) // 3 * 3]),
+    ],
+)
+def test_other_averages(type, mean):
+    course = wavkit.spectrogram(NOISE, RATE, 256)
+    found = wavkit.average(NOISE, RATE, 256, type=type, every=3).amplitude
+    power = course.amplitude.T**2
+    power[:, [0, -1]] *= 4  # averaged as the transform left them
+    expected = np.sqrt(mean(power))
+    expected[[0, -1]] /= 2
+    close(found, expected, 1e-9)
+
+
+def test_spectrogram():
+    frequency, time, expected = scipy.signal.spectrogram(
+        NOISE,
+        RATE,
+        wavkit.window("hann", 128),
+        noverlap=96,
+        detrend=False,
+        scaling="spectrum",
+        mode="magnitude",
+    )
+    found = wavkit.spectrogram(NOISE, RATE, 128, overlap=75)
+    close(found.frequency, frequency), close(found.time, time)
+    expected[1:-1] *= 2
+    close(found.amplitude, expected, 1e-9)
+
+
+def test_windows():
+    for name in ("hann", "bartlett"):
+        close(wavkit.window(name, 64), scipy.signal.get_window(name, 64))
+    close(wavkit.window("kaiser70", 65, symmetric=True), np.kaiser(65, 9.473960131326246))
+    for name in wavkit.windows():
+        w = wavkit.window(name, 512)
+        assert wavkit.noise_bandwidth(name, 512) == pytest.approx(
+            512 * (w**2).sum() / w.sum() ** 2, rel=2e-3
+        )
+        assert wavkit.coherent_gain(name, 512) == pytest.approx(w.mean(), rel=1e-3)
+        assert wavkit.window(name, 512, scale="rms", dtype="f4").dtype == np.float32
+        assert (wavkit.window(name, 512, scale="rms") ** 2).mean() == pytest.approx(1, rel=2e-3)
+    with pytest.raises(ValueError, match="no window is called 'han'; there are Uniform, "):
+        wavkit.window("han", 8)
+
+
+@pytest.mark.parametrize(
+    ("kind", "edges", "cutoff", "passes"),
+    [
+        ("lowpass", (100,), 100, True),
+        ("highpass", (100,), 100, False),
+        ("bandpass", (100, 200), [100, 200], False),
+        ("bandstop", (100, 200), [100, 200], True),
+    ],
+)
+def test_designs(kind, edges, cutoff, passes):
+    ours = wavkit.design(kind, *edges, rate=RATE, transition=40, attenuation=70)
+    expected = scipy.signal.firwin(
+        len(ours),
+        cutoff,
+        window=("kaiser", 0.1102 * (70 - 8.7)),
+        fs=RATE,
+        pass_zero=passes,
+        scale=False,
+    )
+    close(ours, expected, 2e-3)  # Kaiser's estimates of beta differ by the rounding of N
+    gain = wavkit.response(ours, RATE, 500)
+    w, theirs = scipy.signal.freqz(ours, worN=501, include_nyquist=True)
+    close(np.abs(gain.gain), np.abs(theirs)), close(gain.frequency, w * RATE / 2 / np.pi)
+    assert np.abs(gain.gain.imag).max() < 1e-12
+
+
+def test_other_designs():
+    assert len(wavkit.design("fixed20")) == 39 and np.array_equal(
+        wavkit.design("fixed12"), wavkit.design("fixed12")[::-1]
+    )
+    slope = wavkit.design("differentiator", 0.4, transition=0.1)
+    t = np.arange(400)
+    close(wavkit.filter(np.sin(0.5 * t), taps=slope)[100:300], 0.5 * np.cos(0.5 * t)[100:300], 2e-3)
+    assert wavkit.design("delay", 0.4, 0.25).sum() == pytest.approx(1)
+    for wrong in (
+        ("lowpass",),
+        ("lowpass", 0.6),
+        ("bandpass", 0.2, 0.1),
+        ("notch", 0.1),
+        ("highpass", 0.0),
+    ):
+        with pytest.raises(ValueError):
+            wavkit.design(*wrong)
+
+
+@pytest.mark.parametrize(
+    "x", [NOISE, COMPLEX, NOISE.astype("f4")], ids=["real", "complex", "single"]
+)
+def test_filtering_at_once_and_by_blocks(x):
+    taps = RNG.normal(size=101)
+    expected = scipy.signal.lfilter(taps, 1, x)
+    tolerance = 1e-5 if x.dtype == "f4" else 1e-12
+    close(wavkit.filter(x, taps=taps, delay=0), expected, tolerance)
+    stream = wavkit.Filter(taps)
+    pieces = [stream(block) for block in np.split(x, [1, 2, 50, 700, 705, 2999])]
+    close(np.concatenate(pieces), expected, tolerance)
+    both = wavkit.Filter(taps)
+    pieces = [both(block) for block in np.split(np.stack([x, x[::-1]]), [900], axis=1)]
+    close(np.concatenate(pieces, axis=1)[0], expected, tolerance)
+    stream.reset()
+    assert stream(x[:0]).shape == (0,)
+    with pytest.raises(ValueError, match="reset"):
+        stream(np.ones((2, 3)))
+
+
+def test_filters_delay_nothing():
+    taps = wavkit.design("lowpass", 60, rate=RATE)
+    expected = np.convolve(TONES, taps)[len(taps) // 2 :][:3000]
+    close(wavkit.filter(TONES, RATE, lowpass=60), expected)
+    close(wavkit.filter(np.ones(50), RATE, lowpass=60, hold=True), np.full(50, taps.sum()))
+    twice = wavkit.filter(wavkit.filter(TONES, RATE, lowpass=60), RATE, highpass=10)
+    close(wavkit.filter(TONES, RATE, lowpass=60, highpass=10), twice)
+    with pytest.raises(ValueError):
+        wavkit.filter(TONES, RATE)
+
+
+@pytest.mark.parametrize("new_rate", [44100, 16000, 96000, 48000, 12345.678, 47999.9, 3000])
+@pytest.mark.parametrize("quality", ["fast", "best"])
+def test_resampling_is_exact_and_streams(new_rate, quality):
+    def tone(rate):
+        t = np.arange(int(np.ceil(rate * 0.25 - 1e-6))) / rate
+        return np.sin(2 * np.pi * 600.3 * t) * np.sin(np.pi * t / 0.25) ** 4
+
+    x, expected = tone(48000), tone(new_rate)
+    at_once = wavkit.resample(x, 48000, new_rate, quality)
+    assert len(at_once) == int(np.ceil(len(x) * new_rate / 48000 - 1e-9))
+    close(at_once, expected[: len(at_once)], 2e-5 if quality == "fast" else 1e-8)
+    stream = wavkit.Resampler(48000, new_rate, quality)
+    blocks = stream.blocks(np.split(x, np.cumsum(RNG.integers(1, 2500, 6))))
+    close(np.concatenate(list(blocks)), at_once, 1e-9)
+
+
+def test_resampling_keeps_the_band_alone():
+    t = np.arange(20000) / 20000
+    x = np.cos(2 * np.pi * 900.5 * t) + np.cos(2 * np.pi * 1100 * t)
+    ours = wavkit.decimate(x, 10, 20000, "best")[300:-300]
+    close(ours, np.cos(2 * np.pi * 900.5 * t)[::10][300:-300], 1e-8)
+    close(
+        wavkit.resample(np.stack([x, 2 * x], 1), 1, 3, axis=0)[:, 1], 2 * wavkit.resample(x, 1, 3)
+    )
+    close(wavkit.resample(x + 1j * x, 2, 1).imag, wavkit.resample(x, 2, 1))
+
+
+def test_envelope_and_slopes():
+    close(wavkit.envelope(NOISE), np.abs(scipy.signal.hilbert(NOISE)))
+    close(
+        wavkit.envelope(NOISE + 5, detrend=True), np.abs(scipy.signal.hilbert(NOISE - NOISE.mean()))
+    )
+    close(wavkit.derive(NOISE, RATE)[1:], np.diff(NOISE) * RATE)
+    close(wavkit.integrate(NOISE, RATE), np.cumsum(NOISE) / RATE)
+    x = np.sin(2 * np.pi * 3 * T + 0.1)
+    close(
+        wavkit.edges(x, 0.0, RATE, "falling"),
+        (np.arange(1, 18, 2) * np.pi - 0.1) / (6 * np.pi),
+        1e-4,
+    )
+
+
+@pytest.mark.parametrize("other", [NOISE[:777], COMPLEX[:777]], ids=["real", "complex"])
+def test_correlation(other):
+    found = wavkit.correlate(NOISE[500:700], other, RATE)
+    close(found.value, np.correlate(other, NOISE[500:700], "full") / 200)
+    assert found.lag[0] == -0.199
+    same = wavkit.correlate(other, -other)
+    assert same.best == 0 and same.coefficient.real.min() == pytest.approx(-1)
+
+
+@pytest.mark.parametrize("x", [NOISE, np.exp(NOISE), COMPLEX], ids=["noise", "positive", "complex"])
+def test_statistics(x):
+    s = wavkit.stats(x)
+    pairs = [
+        (s.mean, x.mean()),
+        (s.sum, x.sum()),
+        (s.rms, np.sqrt(np.mean(np.abs(x) ** 2))),
+        (s.energy, np.sum(np.abs(x) ** 2)),
+        (s.population_variance, x.var()),
+        (s.sample_deviation, x.std(ddof=1)),
+        (s.min_sample, np.argmin(np.abs(x) if x.dtype == complex else x)),
+        (s.max, x[np.argmax(np.abs(x) if x.dtype == complex else x)]),
+        (s.harmonic_mean, 1 / np.mean(1 / x)),
+    ]
+    if x.dtype != complex:
+        pairs += [
+            (s.median, np.median(x)),
+            (s.skewness, scipy.stats.skew(x)),
+            (s.excess_kurtosis, scipy.stats.kurtosis(x)),
+        ]
+        pairs += [(s.geometric_mean, scipy.stats.gmean(x))] if x.min() > 0 else []
+    for ours, theirs in pairs:
+        assert ours == pytest.approx(theirs, rel=1e-9, abs=1e-12)
+    assert wavkit.stats(np.full(9, 0.1)).sample_deviation < 1e-15
+
+
+def test_histograms():
+    x = np.concatenate((NOISE, [np.nan, 9.0, -9.0]))
+    found = wavkit.hist(x, 20, (-3, 3))
+    counts, edges = np.histogram(x[~np.isnan(x)], 20, (-3, 3))
+    assert np.array_equal(found.counts, counts) and np.allclose(found.edges, edges)
+    assert (found.nan, found.below, found.above) == (1, np.sum(x < -3), np.sum(x > 3))
+    assert wavkit.hist(np.abs(COMPLEX)).counts.tolist() == wavkit.hist(COMPLEX).counts.tolist()
+    assert wavkit.hist(np.ones(5)).counts.sum() == 5
+
+
+def test_lines():
+    x = RNG.normal(size=500) + 7
+    y = 3 * x - 2 + RNG.normal(size=500)
+    ours, theirs = wavkit.fit(x, y), scipy.stats.linregress(x, y)
+    for name in ("slope", "intercept"):
+        assert getattr(ours, name) == pytest.approx(getattr(theirs, name))
+    assert ours.slope_error == pytest.approx(theirs.stderr)
+    assert ours.intercept_error == pytest.approx(theirs.intercept_stderr)
+    assert ours.r_squared == pytest.approx(theirs.rvalue**2)
+    close(ours(x), theirs.slope * x + theirs.intercept)
+    drift = wavkit.fit(np.stack([T, 2 * T + 1]), rate=10)
+    close(drift.slope, [0.01, 0.02]), close(drift([0.0, 1.0])[1], [1.0, 1.02])
+
+
+@pytest.mark.parametrize("degree", [1, 2, 3, 4, 5, 9, 20])
+def test_roots(degree):
+    wanted = RNG.normal(size=degree)
+    c = np.polynomial.polynomial.polyfromroots(wanted)
+    close(np.sort(wavkit.roots(c).real), np.sort(wanted), 1e-4 if degree == 20 else 1e-9)
+    close(wavkit.roots(c[::-1], descending=True), wavkit.roots(c), 1e-6)
+    close(wavkit.from_roots(wanted), c)
+    assert wavkit.from_roots([1 + 2j, 1 - 2j]).tolist() == [5, -2, 1]
+
+
+@pytest.mark.parametrize(
+    ("method", "kind"), [("linear", "linear"), ("hold", "previous"), ("spline", "cubic")]
+)
+def test_interpolation(method, kind):
+    x = np.cumsum(RNG.random(30) + 0.1)
+    y = np.stack([np.sin(x), x**3])
+    at = RNG.uniform(x[0], x[-1], 200)
+    close(wavkit.interp(x, y, at, method), scipy.interpolate.interp1d(x, y, kind)(at), 1e-9)
+    assert wavkit.interp(x, y[0], [[0.0], [99.0]], method).tolist() == [[y[0, 0]], [y[0, -1]]]
+    close(wavkit.interp(None, T, [0.5, 0.25], rate=RATE), [0.5, 0.25])
+    with pytest.raises(wavkit.Error):
+        wavkit.interp([0.0, 1.0, 1.0, 2.0], [1.0, 2.0, 3.0, 4.0], [1.5])
+
+
+@pytest.mark.parametrize("suffix", [".dsp", ".txt", ".wav", ".csv"])
+def test_files(tmp_path, suffix):
+    path = tmp_path / f"signal{suffix}"
+    wavkit.write(path, NOISE / 8, 8000)
+    samples, rate = wavkit.read(path)
+    assert rate == 8000
+    close(samples, NOISE / 8, 1e-7 if suffix == ".wav" else 1e-15)
+    wavkit.write(tmp_path / "two.dsp", np.stack([COMPLEX, -COMPLEX]), 10)
+    assert np.array_equal(wavkit.read(tmp_path / "two.dsp").samples, np.stack([COMPLEX, -COMPLEX]))
+
+
+def test_files_that_cannot_be_read(tmp_path):
+    (tmp_path / "bad.dsp").write_bytes(b"\xbe\x30\x03\xeb" + bytes(12))
+    (tmp_path / "bad.wav").write_text("no sound")
+    (tmp_path / "empty.txt").write_text("")
+    for name, error in (
+        ("bad.dsp", wavkit.Error),
+        ("bad.wav", OSError),
+        ("none.dsp", OSError),
+        ("empty.txt", OSError),
+    ):
+        with pytest.raises(error):
+            wavkit.read(tmp_path / name)

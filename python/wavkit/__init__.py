@@ -1,0 +1,66 @@
+"""Signal processing for measurement software, over NumPy arrays.
+
+    import wavkit
+    wavkit.spectrum(samples, rate, window="flattop").plot()
+
+Arrays of any shape work: signals lie along `axis`, the last one unless said otherwise. float32 and
+complex64 are computed in single precision, everything else in double. Objects of xarray and pandas
+keep their coordinates, and tell the rate by them. Any number of threads work at once.
+
+`wavkit.lib` has every function of the library by its own name. `python -m wavkit` is the program.
+"""
+
+from __future__ import annotations
+
+from . import lib as lib
+from ._files import Signal, read, signals, write
+from ._filters import Filter, Response, design, filter, response
+from ._rates import Resampler, decimate, resample
+from ._record import Error
+from ._signals import Correlation, correlate, derive, edges, envelope, integrate, interp
+from ._spectra import Peaks, Spectrogram, Spectrum, average, spectrogram, spectrum
+from ._statistics import Histogram, Line, Stats, fit, from_roots, hist, roots, stats
+from ._version import version as __version__
+from ._windows import coherent_gain, noise_bandwidth, window, windows
+
+__all__ = [
+    "Correlation",
+    "Error",
+    "Filter",
+    "Histogram",
+    "Line",
+    "Peaks",
+    "Resampler",
+    "Response",
+    "Signal",
+    "Spectrogram",
+    "Spectrum",
+    "Stats",
+    "average",
+    "coherent_gain",
+    "correlate",
+    "decimate",
+    "derive",
+    "design",
+    "edges",
+    "envelope",
+    "filter",
+    "fit",
+    "from_roots",
+    "hist",
+    "integrate",
+    "interp",
+    "lib",
+    "noise_bandwidth",
+    "read",
+    "resample",
+    "response",
+    "roots",
+    "signals",
+    "spectrogram",
+    "spectrum",
+    "stats",
+    "window",
+    "windows",
+    "write",
+]

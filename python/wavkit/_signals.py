@@ -1,0 +1,191 @@
+"""Signals into other signals: envelopes, slopes, values between samples, crossings, correlation."""
+
+from __future__ import annotations
+
+from dataclasses import dataclass
+from typing import Any
+
+import numpy as np
+from numpy.typing import ArrayLike
+
+from . import _functions as lib
+from ._record import Array, Record, lend, samples_of
+from ._runs import Labelled, Runs, call, same_length, without_mean
+
+_METHODS = {
+    "hold": lib.DSP_INTERP_HOLD,
+    "linear": lib.DSP_INTERP_LINEAR,
+    "quadratic": lib.DSP_INTERP_QUADRATIC,
+    "spline": lib.DSP_INTERP_SPLINE,
+}
+_DIRECTIONS = {
+    "rising": lib.DSP_EDGE_RISING,
+    "falling": lib.DSP_EDGE_FALLING,
+    "either": lib.DSP_EDGE_EITHER,
+}
+
+
+def envelope(x: ArrayLike | Any, detrend: bool = False, axis: int | str = -1) -> Labelled:
+    """The magnitude of the analytic signal: of a tone, its amplitude over time.
+
+    >>> t = np.arange(1000) / 1000
+    >>> tone = (1 + 0.5 * np.cos(2 * np.pi * 4 * t)) * np.cos(2 * np.pi * 100 * t)
+    >>> wavkit.envelope(tone)[[0, 125]].round(3)
+    array([1.5, 0.5])
+    """
+    runs = Runs(x, 1.0, axis)
+    if detrend:
+        runs.rows = [without_mean(row) for row in runs.rows]
+
+    def step(x: Record, out: Record) -> None:
+        call("dsp_copy", out, x)
+        call("dspi_analytic", out)
+        call("dspi_mag", out)
+
+    return runs.same(runs.map(step))
+
+
+def derive(x: ArrayLike | Any, rate: float | None = None, axis: int | str = -1) -> Labelled:
+    """The slope at every sample from the one before; the first sample takes that of the second.
+
+    >>> wavkit.derive([0.0, 1.0, 4.0, 9.0], rate=10)
+    array([10., 10., 30., 50.])
+    """
+    runs = Runs(x, rate, axis)
+    values = runs.map(same_length("dspi_differ"))
+    values[..., :1] = values[..., 1:2] if runs.points > 1 else 0
+    return runs.same(values)
+
+
+def integrate(
+    x: ArrayLike | Any, rate: float | None = None, detrend: bool = False, axis: int | str = -1
+) -> Labelled:
+    """The sum of all samples so far times their spacing.
+
+    >>> wavkit.integrate([1.0, 1.0, 2.0], rate=10)
+    array([0.1, 0.2, 0.4])
+    """
+    runs = Runs(x, rate, axis)
+    if detrend:
+        runs.rows = [without_mean(row) for row in runs.rows]
+    return runs.same(runs.map(same_length("dspi_integ")))
+
+
+def edges(
+    x: ArrayLike | Any, level: float, rate: float | None = None, direction: str = "either"
+) -> Array:
+    """The times at which one signal crosses a level, on the lines between its samples.
+
+    >>> wavkit.edges([0.0, 2.0, 2.0, 0.0], 0.5, direction="rising")
+    array([0.25])
+    """
+    if direction not in _DIRECTIONS:
+        raise ValueError(f"a direction is {', '.join(_DIRECTIONS)}, not {direction!r}")
+    runs = Runs(x, rate)
+    if runs.shape:
+        raise ValueError("the edges of several signals are of different number: pass one at a time")
+    places = runs.map(same_length("dspi_edge", _DIRECTIONS[direction], level))
+    result: Array = runs.start() + places * runs.delta
+    return result
+
+
+def interp(
+    x: ArrayLike | None,
+    y: ArrayLike | Any,
+    at: ArrayLike,
+    method: str = "linear",
+    *,
+    rate: float | None = None,
+    extrapolate: bool = False,
+    axis: int | str = -1,
+) -> Labelled:
+    """A table y over x at other places, in any order; without x, a signal at any times. Between the
+    samples it is held (`hold`), a line (`linear`), a parabola (`quadratic`) or a cubic `spline`
+    with not-a-knot ends; outside of the table its ends are held, or go on with `extrapolate`.
+
+    >>> wavkit.interp([0.0, 1.0, 2.0, 3.0, 4.0], [0.0, 1.0, 8.0, 27.0, 64.0], [1.5, 2.5], "spline")
+    array([ 3.375, 15.625])
+    """
+    if method not in _METHODS:
+        raise ValueError(f"a method is one of {', '.join(_METHODS)}, not {method!r}")
+    runs = Runs(y, rate, axis)
+    letter = runs.array.dtype.char
+    if runs.is_complex:
+        raise ValueError("tables hold real values")
+    places = runs.start() + np.arange(runs.points) * runs.delta if x is None else samples_of(x)
+    table = lend(np.ascontiguousarray(places, letter))
+    wanted = np.asarray(at, float)
+    order = np.argsort(wanted, axis=None, kind="stable")
+    ascending = lend(np.ascontiguousarray(wanted.ravel()[order], letter))
+    flags = _METHODS[method] | (0 if extrapolate else lib.DSP_INTERP_HOLD_ENDS)
+
+    def step(y: Record, out: Record) -> None:
+        call("dsp_interp", table, y, None, ascending, out, flags)
+
+    values = runs.map(step)
+    result = np.empty_like(values)
+    result[..., order] = values
+    if wanted.ndim != 1:
+        return result.reshape(*runs.shape, *wanted.shape)[()]
+    return runs.along(result, "at", wanted)
+
+
+@dataclass(frozen=True)
+class Correlation:
+    """What `correlate()` returns: the values and the coefficients at every lag."""
+
+    lag: Array
+    value: Array
+    coefficient: Array
+
+    @property
+    def best(self) -> Any:
+        """The lag at which the signals match best."""
+        return self.lag[np.abs(self.value).argmax(axis=-1)]
+
+
+def correlate(
+    a: ArrayLike | Any,
+    b: ArrayLike | Any,
+    rate: float | None = None,
+    detrend: bool = False,
+    axis: int | str = -1,
+) -> Correlation:
+    """Slides A along B: the value at a lag is the mean over A of conj(a[n]) b[n + lag], with zeros
+    where B has no samples, and strongest where B holds what A holds, that much later. Coefficients
+    are 1 for a copy and -1 for a copy upside down.
+
+    >>> sent = np.random.default_rng(1).normal(size=500)
+    >>> received = np.concatenate((np.zeros(30), sent))
+    >>> wavkit.correlate(sent, received, rate=1000).best
+    0.03
+    """
+    first, second = Runs(a, rate, axis), Runs(b, rate, axis)
+    if not (first.points and second.points):
+        raise ValueError("a signal has no samples")
+    dtype = np.result_type(first.array, second.array)
+    shape = np.broadcast_shapes(first.shape, second.shape)
+    shift = first.points - 1
+
+    def rows(runs: Runs) -> list[Array]:
+        every = np.broadcast_to(runs.array, (*shape, runs.points)).reshape(-1, runs.points)
+        return [without_mean(row) if detrend else row for row in every.astype(dtype)]
+
+    values, scales = [], []
+    for row, other in zip(rows(first), rows(second)):
+        energies = float(np.vdot(row, row).real) * float(np.vdot(other, other).real)
+        scales.append(first.points / np.sqrt(energies) if energies > 0 else 0.0)
+        padded = np.pad(other, shift)
+        with Record(dtype=dtype.char.lower()) as out:
+            call(
+                "dspb_corr",
+                lend(row, first.delta),
+                lend(padded, first.delta),
+                out,
+                None,
+                first.points,
+            )
+            values.append(out.take())
+    value = np.reshape(values, (*shape, -1))
+    lag = (np.arange(value.shape[-1]) - shift) * first.delta + second.start() - first.start()
+    return Correlation(lag, value, value * np.reshape(scales, (*shape, 1)))
