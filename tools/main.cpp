@@ -2,6 +2,7 @@
 #include <wavkit/dsp.h>
 
 #include <cerrno>
+#include <csignal>
 #include <cstdio>
 #include <cstring>
 #include <exception>
@@ -100,6 +101,7 @@ int outcome(CLI::App& program, int argc, char** argv) {
 }  // namespace
 
 int main(int argc, char** argv) {
+    std::signal(SIGXFSZ, SIG_IGN);  // a file that becomes too long is an error like a full disk
     try {
         CLI::App program("Looks at sampled signals, converts them and measures their spectra.",
                          "wavkit");

@@ -10,6 +10,7 @@
 #include <csignal>
 #include <cstring>
 #include <filesystem>
+#include <utility>
 
 #include "base/error.hpp"
 #include "base/scratch.hpp"
@@ -17,19 +18,53 @@
 namespace wavkit::tool {
 namespace {
 
-/// The temporary file of the moment, for the handler of interruptions, which may touch little else.
-std::array<char, 4096> unfinished{};
+/// The temporary files of the moment, for the handler of interruptions, which may touch little
+/// else.
+using Path = std::array<char, 4096>;
+std::array<Path, 4> unfinished{};
+
+constexpr int interruptions[] = {SIGINT, SIGTERM, SIGHUP, SIGQUIT, SIGPIPE};
 
 void remove_unfinished(int signal) {
-    if (unfinished[0]) unlink(unfinished.data());
+    for (const Path& path : unfinished) {
+        if (path[0]) unlink(path.data());
+    }
     std::signal(signal, SIG_DFL);
     std::raise(signal);
 }
 
+/// No interruption is heard while it lives.
+class Uninterrupted {
+  public:
+    Uninterrupted() {
+        sigset_t all;
+        sigemptyset(&all);
+        for (const int signal : interruptions) sigaddset(&all, signal);
+        pthread_sigmask(SIG_BLOCK, &all, &before_);
+    }
+    ~Uninterrupted() { pthread_sigmask(SIG_SETMASK, &before_, nullptr); }
+    Uninterrupted(const Uninterrupted&) = delete;
+    Uninterrupted& operator=(const Uninterrupted&) = delete;
+
+  private:
+    sigset_t before_;
+};
+
+/// Has interruptions remove a file, until forget().
 void remember(const std::string& path) {
-    std::copy_n(path.c_str(), std::min(path.size() + 1, unfinished.size() - 1), unfinished.data());
-    for (const int signal : {SIGINT, SIGTERM, SIGHUP}) {
+    for (const int signal : interruptions) {
         if (std::signal(signal, remove_unfinished) == SIG_IGN) std::signal(signal, SIG_IGN);
+    }
+    for (Path& place : unfinished) {
+        if (place[0] || path.size() >= place.size()) continue;
+        std::copy_n(path.c_str(), path.size() + 1, place.data());
+        return;
+    }
+}
+
+void forget(const std::string& path) {
+    for (Path& place : unfinished) {
+        if (path == place.data()) place[0] = '\0';
     }
 }
 
@@ -72,6 +107,7 @@ OutputFile::OutputFile(const std::string& path)
     } else {
         target_ = behind_links(path);
         temporary_ = target_ + ".XXXXXX.tmp";
+        const Uninterrupted uninterrupted;
         const int file = mkstemps(temporary_.data(), 4);
         if (file < 0) fail();
         remember(temporary_);
@@ -82,8 +118,9 @@ OutputFile::OutputFile(const std::string& path)
 
 OutputFile::~OutputFile() {
     if (stream_) std::fclose(stream_);
-    if (!temporary_.empty()) unlink(temporary_.c_str());
-    unfinished[0] = '\0';
+    if (temporary_.empty()) return;
+    unlink(temporary_.c_str());
+    forget(temporary_);
 }
 
 void OutputFile::fail() const {
@@ -95,7 +132,7 @@ void OutputFile::commit() {
     if (temporary_.empty()) return hand_over();
     if (fchmod(fileno(stream_), permissions(target_)) != 0) fail();
     if (std::rename(temporary_.c_str(), target_.c_str()) != 0) fail();
-    temporary_.clear();
+    forget(std::exchange(temporary_, ""));
 }
 
 void OutputFile::hand_over() {

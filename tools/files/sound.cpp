@@ -23,11 +23,38 @@ constexpr std::size_t block_scalars = 1 << 16;
 
 using Handle = std::unique_ptr<SNDFILE, int (*)(SNDFILE*)>;
 
-/// libsndfile on the descriptor of a stream whose buffer holds nothing yet.
+sf_count_t seek(sf_count_t to, int whence, void* stream) {
+    auto* const file = static_cast<std::FILE*>(stream);
+    return fseeko(file, off_t(to), whence) == 0 ? sf_count_t(ftello(file)) : -1;
+}
+
+sf_count_t place(void* stream) { return ftello(static_cast<std::FILE*>(stream)); }
+
+sf_count_t size(void* stream) {
+    const sf_count_t at = place(stream), end = seek(0, SEEK_END, stream);
+    seek(at, SEEK_SET, stream);
+    return end;
+}
+
+/// libsndfile does not tell of all that it could not write; a stream remembers.
+SF_VIRTUAL_IO written_stream = {
+    size, seek,
+    [](void* to, sf_count_t count, void* stream) {
+        return sf_count_t(std::fread(to, 1, std::size_t(count), static_cast<std::FILE*>(stream)));
+    },
+    [](const void* from, sf_count_t count, void* stream) {
+        return sf_count_t(
+            std::fwrite(from, 1, std::size_t(count), static_cast<std::FILE*>(stream)));
+    },
+    place};
+
+/// libsndfile on a stream whose buffer holds nothing yet: on its descriptor where it reads.
 Handle open_sound(std::FILE* stream, int mode, SF_INFO& info, const std::string& what) {
     const int file = fileno(stream);
     lseek(file, 0, SEEK_SET);
-    Handle handle(sf_open_fd(file, mode, &info, SF_FALSE), sf_close);
+    Handle handle(mode == SFM_READ ? sf_open_fd(file, mode, &info, SF_FALSE)
+                                   : sf_open_virtual(&written_stream, mode, &info, stream),
+                  sf_close);
     if (!handle) {
         std::string reason = sf_strerror(nullptr);
         while (!reason.empty() && (reason.back() == '\n' || reason.back() == '.')) {
