@@ -40,6 +40,9 @@ def test_every_name_has_an_example():
     """Functions and classes that are called; what they return is shown by them."""
     returned = {
         "Correlation",
+        "Distortion",
+        "SignalPeaks",
+        "Sine",
         "Error",
         "Histogram",
         "Line",

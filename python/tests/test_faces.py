@@ -6,6 +6,7 @@ import subprocess
 import numpy as np
 import pytest
 import scipy.interpolate
+import scipy.optimize
 import scipy.signal
 import scipy.stats
 import wavkit
@@ -339,6 +340,78 @@ def test_lines():
     close(ours(x), theirs.slope * x + theirs.intercept)
     drift = wavkit.fit(np.stack([T, 2 * T + 1]), rate=10)
     close(drift.slope, [0.01, 0.02]), close(drift([0.0, 1.0])[1], [1.0, 1.02])
+
+
+@pytest.mark.parametrize(
+    "conditions",
+    [
+        {},
+        {"height": 0.5, "distance": 9.5},
+        {"prominence": 1.5, "width": 3, "width_at": 70},
+        {"threshold": 0.3},
+    ],
+)
+def test_peaks_of_signals(conditions):
+    found = wavkit.peaks(NOISE, **conditions)
+    theirs = {"prominence": 0, "width": 0, **conditions}
+    theirs["rel_height"] = theirs.pop("width_at", 50) / 100
+    samples, values = scipy.signal.find_peaks(NOISE, **theirs)
+    assert len(found) == len(samples) and np.array_equal(found.sample, samples)
+    pairs = {
+        "prominence": "prominences",
+        "width": "widths",
+        "left": "left_ips",
+        "left_base": "left_bases",
+    }
+    for ours, name in pairs.items():
+        close(getattr(found, ours), values[name])
+    close(wavkit.peaks(NOISE, RATE).right, wavkit.peaks(NOISE).right / RATE)
+
+
+def test_sines():
+    x = 0.7 * np.cos(2 * np.pi * 21.37 * T + 0.3) - 0.2 + 0.01 * NOISE
+
+    def model(t, frequency, amplitude, phase, offset):
+        return offset + amplitude * np.cos(2 * np.pi * frequency * t + phase)
+
+    theirs, covariance = scipy.optimize.curve_fit(model, T, x, (21.4, 0.7, 0.3, -0.2))
+    ours = wavkit.fit_sine(x, RATE)
+    names = ("frequency", "amplitude", "phase", "offset")
+    close([getattr(ours, name) for name in names], theirs, 1e-7)
+    close([getattr(ours, name + "_error") for name in names], np.sqrt(np.diag(covariance)), 1e-3)
+    close(ours(T), model(T, *theirs), 1e-6)
+    assert ours.residual_rms == pytest.approx(np.sqrt(np.mean((x - ours(T)) ** 2)))
+    two = wavkit.fit_sine(np.stack([x, 2 * x], 1), RATE, at=21.37, axis=0)
+    close(
+        two([0.0, 0.1]),
+        model(
+            np.array([[0.0, 0.1]]),
+            21.37,
+            two.amplitude[:, None],
+            two.phase[:, None],
+            two.offset[:, None],
+        ),
+    )
+
+
+@pytest.mark.parametrize("single", [False, True], ids=["double", "single"])
+def test_distortion(single):
+    t = np.arange(1 << 15) / 48000
+    parts = {1: (1.0, 0.4), 2: (1e-2, 1.0), 3: (3e-3, -2.0), 7: (1e-3, 0.0)}
+    x = sum(a * np.cos(2 * np.pi * 997.3 * h * t + p) for h, (a, p) in parts.items())
+    x = x + 0.25 + 1e-4 * np.cos(2 * np.pi * 5432.1 * t) + 1e-4 * RNG.normal(size=len(t))
+    found = wavkit.distortion(x.astype("f4") if single else x, 48000)
+    for h, (a, p) in parts.items():
+        assert abs(found.harmonics[h] - a * np.exp(1j * p)) < (1e-4 if single else 2e-5)
+    assert found.thd == pytest.approx(np.sqrt(1e-4 + 9e-6 + 1e-6), rel=1e-3)
+    rms = np.hypot(1e-4, 1e-4 / np.sqrt(2))
+    assert found.noise == pytest.approx(rms, rel=0.02)
+    assert found.snr == pytest.approx(20 * np.log10(np.sqrt(0.5) / rms), abs=0.2)
+    # The strongest other component is the second harmonic.
+    assert found.spur_frequency == pytest.approx(1994.6, abs=0.1)
+    assert found.sfdr == pytest.approx(40, abs=0.01)
+    assert found.offset == pytest.approx(0.25, abs=1e-4)
+    assert found.enob == pytest.approx((found.sinad - 1.7609) / 6.0206, abs=1e-3)
 
 
 @pytest.mark.parametrize("degree", [1, 2, 3, 4, 5, 9, 20])

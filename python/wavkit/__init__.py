@@ -20,11 +20,13 @@ from ._record import Error
 from ._signals import Correlation, correlate, derive, edges, envelope, integrate, interp
 from ._spectra import Peaks, Spectrogram, Spectrum, average, spectrogram, spectrum
 from ._statistics import Histogram, Line, Stats, fit, from_roots, hist, roots, stats
+from ._tones import Distortion, SignalPeaks, Sine, distortion, fit_sine, peaks
 from ._version import version as __version__
 from ._windows import coherent_gain, noise_bandwidth, window, windows
 
 __all__ = [
     "Correlation",
+    "Distortion",
     "Error",
     "Filter",
     "Histogram",
@@ -33,6 +35,8 @@ __all__ = [
     "Resampler",
     "Response",
     "Signal",
+    "SignalPeaks",
+    "Sine",
     "Spectrogram",
     "Spectrum",
     "Stats",
@@ -42,16 +46,19 @@ __all__ = [
     "decimate",
     "derive",
     "design",
+    "distortion",
     "edges",
     "envelope",
     "filter",
     "fit",
+    "fit_sine",
     "from_roots",
     "hist",
     "integrate",
     "interp",
     "lib",
     "noise_bandwidth",
+    "peaks",
     "read",
     "resample",
     "response",

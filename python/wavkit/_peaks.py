@@ -185,7 +185,8 @@ class _Leakage:
             return self._within(bins, blur)
         same = math.floor(self.reach / 2 - 1) * 2 + bins % 2
         fall = np.where(beyond, (self.reach / np.maximum(bins, 1)) ** self.decay, 1)
-        return self._within(np.where(beyond, same, bins), blur) * fall
+        result: Array = self._within(np.where(beyond, same, bins), blur) * fall
+        return result
 
     def _within(self, bins: Array, blur: float) -> Array:
         low, high = np.maximum(bins - blur, 0), bins + blur
