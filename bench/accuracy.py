@@ -78,7 +78,7 @@ def distortion(count=16384, runs=20):
                 if line["harmonic"] in levels:
                     error = abs(line["level_db"] - levels[line["harmonic"]])
                     errors[line["harmonic"]] = max(errors[line["harmonic"]], error)
-        row = [window, f"{floor:.0f} dB"] + [f"{e:.4f} dB" for e in errors.values()]
+        row = [window, f"{floor:.0f} dB"] + [f"{e:.4f} dB" if e >= 1e-4 else "< 0.0001 dB" for e in errors.values()]
         print("| " + " | ".join(row) + f" | {2 * lobe} |")
 
 

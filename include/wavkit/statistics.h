@@ -196,8 +196,8 @@ enum {
  *    samples crosses, no further away than the bases
  *
  *  NaN for a condition asks for nothing. These are the definitions of find_peaks() of SciPy. They
- *  take O(N log N) whatever the signal: prominences by a stack of the samples that are still to be
- *  exceeded, widths by a tree of minima.
+ *  take O(N log N) whatever the signal: where bases are far, prominences go by a stack of samples
+ *  that are still to be exceeded, and widths by a tree of minima.
  *
  *  Position and top are those of the parabola through the sample and its neighbours, as with
  *  DSP_PEAK_PARABOLIC; of several equal samples, those of their middle. A NaN among the samples is

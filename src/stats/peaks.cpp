@@ -2,9 +2,11 @@
 #include <algorithm>
 #include <array>
 #include <cmath>
+#include <cstdint>
+#include <cstdlib>
+#include <limits>
 #include <memory>
 #include <new>
-#include <numeric>
 
 #include "record_view.hpp"
 
@@ -64,13 +66,18 @@ std::size_t keep_peaks(Peak<T>* peaks, std::size_t count, Keeps keeps) {
 /// Has the highest peaks take away those that are too near; false when memory runs out.
 template <class T>
 bool keep_apart(std::span<const T> x, Peak<T>* peaks, std::size_t& count, T distance) {
-    const auto order = block<std::size_t>(count);
+    struct Ranked {
+        T height;
+        std::uint32_t peak;
+    };
+    const auto order = block<Ranked>(count);
     const auto kept = block<bool>(count);
     if (!order || !kept) return false;
-    const auto height = [=](std::size_t i) { return x[std::size_t(peaks[i].index)]; };
-    std::iota(order.get(), order.get() + count, std::size_t(0));
-    std::sort(order.get(), order.get() + count, [&](std::size_t a, std::size_t b) {
-        return height(a) > height(b) || (height(a) == height(b) && a > b);
+    for (std::size_t i = 0; i < count; ++i) {
+        order[i] = {x[std::size_t(peaks[i].index)], std::uint32_t(i)};
+    }
+    std::sort(order.get(), order.get() + count, [](Ranked a, Ranked b) {
+        return a.height > b.height || (a.height == b.height && a.peak > b.peak);
     });
     std::fill_n(kept.get(), count, true);
     const double least = std::ceil(double(distance));
@@ -78,7 +85,7 @@ bool keep_apart(std::span<const T> x, Peak<T>* peaks, std::size_t& count, T dist
         return double(peaks[b].index) - peaks[a].index < least;
     };
     for (std::size_t i = 0; i < count; ++i) {
-        const std::size_t j = order[i];
+        const std::size_t j = order[i].peak;
         if (!kept[j]) continue;
         for (std::size_t k = j; k > 0 && near(k - 1, j); --k) kept[k - 1] = false;
         for (std::size_t k = j + 1; k < count && near(j, k); ++k) kept[k] = false;
@@ -89,6 +96,32 @@ bool keep_apart(std::span<const T> x, Peak<T>* peaks, std::size_t& count, T dist
     }
     count = left;
     return true;
+}
+
+/// Walks from every peak to its bases, which is fast where most of them are near. False where it
+/// becomes long.
+template <class T>
+bool walk_to_bases(std::span<const T> x, Peak<T>* peaks, std::size_t count) {
+    const int n = int(x.size());
+    std::int64_t steps_left = 4 * std::int64_t(n);
+    for (std::size_t k = 0; k < count && steps_left >= 0; ++k) {
+        auto& peak = peaks[k];
+        const T top = x[std::size_t(peak.index)];
+        const auto base = [&](int step) {
+            Base<T> lowest{top, peak.index};
+            int i = peak.index;
+            for (; i >= 0 && i < n && x[std::size_t(i)] <= top; i += step) {
+                if (x[std::size_t(i)] < lowest.low) lowest = {x[std::size_t(i)], i};
+            }
+            steps_left -= std::abs(i - peak.index);
+            return lowest;
+        };
+        const auto left = base(-1), right = base(1);
+        peak.left_base = left.at;
+        peak.right_base = right.at;
+        peak.prominence = top - std::max(left.low, right.low);
+    }
+    return steps_left >= 0;
 }
 
 /// The bases of all peaks on one side. The samples that no later one has exceeded are on a stack,
@@ -206,16 +239,15 @@ class Minima {
     std::size_t levels_ = 0;
 };
 
-/// Where the line between samples has the height h, between a peak and one of its bases.
-template <class T>
-bool find_widths(std::span<const T> x, Peak<T>* peaks, std::size_t count, T rel_height) {
-    Minima<T> minima;
-    if (!minima.build(x)) return false;
+/// Where the line between samples has the height of the width, between a peak and its bases:
+/// `next(i, end, step, h)` finds the first sample from i on that is not above h, or the end.
+template <class T, class Next>
+void find_widths(std::span<const T> x, Peak<T>* peaks, std::size_t count, T rel_height, Next next) {
     for (std::size_t k = 0; k < count; ++k) {
         auto& peak = peaks[k];
         const T h = x[std::size_t(peak.index)] - peak.prominence * rel_height;
         const auto crossing = [&](int base, int step) {
-            const int i = minima.next(peak.index, base, step, h);
+            const int i = next(peak.index, base, step, h);
             const T low = x[std::size_t(i)];
             if (!(low < h)) return T(i);
             const T share = (h - low) / (x[std::size_t(i - step)] - low);
@@ -224,6 +256,23 @@ bool find_widths(std::span<const T> x, Peak<T>* peaks, std::size_t count, T rel_
         peak.left = crossing(peak.left_base, -1);
         peak.right = crossing(peak.right_base, 1);
     }
+}
+
+/// The widths, walked to where the bases have been near, else by a tree. False when memory runs
+/// out.
+template <class T>
+bool find_widths(std::span<const T> x, Peak<T>* peaks, std::size_t count, T rel_height, bool near) {
+    if (near) {
+        find_widths(x, peaks, count, rel_height, [=](int i, int end, int step, T h) {
+            while (i != end && !(x[std::size_t(i)] <= h)) i += step;
+            return i;
+        });
+        return true;
+    }
+    Minima<T> minima;
+    if (!minima.build(x)) return false;
+    find_widths(x, peaks, count, rel_height,
+                [&](int i, int end, int step, T h) { return minima.next(i, end, step, h); });
     return true;
 }
 
@@ -268,21 +317,24 @@ int find_peaks(const R* signal, R* out, Conditions<scalar<R>> least) {
         });
     }
     if (least.distance > 1 && !keep_apart<T>(x, peaks.get(), count, least.distance)) return -1;
-    if (!find_prominences<T>(x, peaks.get(), count)) return -1;
+    const bool near = walk_to_bases<T>(x, peaks.get(), count);
+    if (!near && !find_prominences<T>(x, peaks.get(), count)) return -1;
     if (!std::isnan(least.prominence)) {
         keep([=](auto& p) { return p.prominence >= least.prominence; });
     }
-    if (!find_widths<T>(x, peaks.get(), count, least.rel_height)) return -1;
+    if (!find_widths<T>(x, peaks.get(), count, least.rel_height, near)) return -1;
     if (!std::isnan(least.width)) keep([=](auto& p) { return p.right - p.left >= least.width; });
 
     const std::size_t most = std::size_t(std::numeric_limits<int>::max()) / DSP_PEAKS_VALUES;
     if (count > most) return -1;
-    Temporary<R> rows;
-    rows->points = int(count * DSP_PEAKS_VALUES);
-    rows->delta = out->delta;
-    if (dsp_alloc(rows)) return -1;
-    write_rows<R>(x, peaks.get(), count, rows);
-    return dsp_copy(out, rows);
+    return write_to<R>(out, shares_memory(signal, out), [&](R* rows) {
+        rows->points = int(count * DSP_PEAKS_VALUES);
+        rows->complex = 0;
+        rows->delta = out->delta;
+        if (dsp_alloc(rows)) return -1;
+        write_rows<R>(x, peaks.get(), count, rows);
+        return 0;
+    });
 }
 
 }  // namespace

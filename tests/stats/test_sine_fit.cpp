@@ -75,9 +75,11 @@ BOTH_PRECISIONS(SineFit, LeavesNothingThatAParameterCouldTake) {
         for (int i = 0; i < c.n; ++i) x.push_back(T(c.tone.at(i * delta) + c.scatter * noise()));
         const double bin = 1 / (c.n * double(delta)), truth = double(c.tone.frequency);
         // Searched for, from nearby, and held beside the best.
-        for (const auto& [start, flags] : {std::pair(0.0, DSP_SINE_FREE),
-                                           {truth + 0.4 * bin, DSP_SINE_FREE},
-                                           {truth + 0.1 * bin, DSP_SINE_FIXED}}) {
+        for (const auto& way : {std::pair(0.0, DSP_SINE_FREE),
+                                {truth + 0.4 * bin, DSP_SINE_FREE},
+                                {truth + 0.1 * bin, DSP_SINE_FIXED}}) {
+            const double start = way.first;
+            const int flags = way.second;
             SCOPED_TRACE(::testing::Message() << c.n << " points, from " << start);
             const bool free = flags == DSP_SINE_FREE;
             if (c.n < 6 && free && start > 0) continue;

@@ -235,8 +235,8 @@ Noise is all that the main lobes of the offset, the tone and its harmonics do no
 half the sampling rate are looked for where they are folded to; one that lies in the lobe of another
 component cannot be told. The tone is the strongest one, or with --near the one about there.
 
-The window must leak less than there is to be seen. P601 sees 140 dB down and needs 14 periods; Gausstop
-120 dB and 10, Blackman_Harris4 90 dB and 8. Uniform is for records of whole periods.
+The window must leak less than there is to be seen. P601 sees 130 dB down and needs 14 periods; Kaiser100
+105 dB and 10, Blackman_Harris4 86 dB and 8. Uniform is for records of whole periods.
 
 Every signal of a file is measured. --plot draws their spectra with the harmonics.
 
