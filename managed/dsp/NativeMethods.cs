@@ -10,8 +10,8 @@ using unsafe OfRecordAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, int, int>;
 using unsafe OfRecordAndWindow = delegate* unmanaged[Cdecl]<dsp_struct*, int, int, double, int>;
 using unsafe OfThreeRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, double, int, int, int>;
 using unsafe OfTwoRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int>;
-using unsafe OfTwoRecordsAndSine = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, double, int, int>;
 using unsafe OfTwoRecordsAndPeaks = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, double, double, double, double, double, double, int>;
+using unsafe OfTwoRecordsAndSine = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, double, int, int>;
 
 /// <summary>
 /// The native functions, as plain pointers: their arguments are what the processor takes, so that a call
