@@ -7,6 +7,14 @@ set(WAVKIT_GENERATED ${PROJECT_BINARY_DIR}/generated)
 wavkit_write_sets("${WAVKIT_HEADERS}" ${WAVKIT_GENERATED})
 set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${WAVKIT_HEADERS})
 
+if(CMAKE_SYSTEM_PROCESSOR MATCHES "^(i.86|x86.*|AMD64)$" AND CMAKE_SIZEOF_VOID_P EQUAL 4)
+  # Each step rounded as it is stated, not as the registers of the x87 have it.
+  target_compile_options(wavkit_options INTERFACE -msse2 -mfpmath=sse)
+endif()
+if(CMAKE_SIZEOF_VOID_P EQUAL 4)
+  target_compile_definitions(wavkit_options INTERFACE _FILE_OFFSET_BITS=64)
+endif()
+
 # Objects of the library, for every processor of the target or for those of one instruction set.
 function(wavkit_add_objects name)
   add_library(${name} OBJECT ${ARGN})

@@ -28,7 +28,7 @@ struct Places {
             }
         }
 #endif
-        Lanes<T> values;
+        Lanes<T> values{};
         for (std::size_t i = 0; i < V; ++i) {
             values[i] = table[std::size_t(std::ptrdiff_t(first) + std::ptrdiff_t(at[i]))];
         }

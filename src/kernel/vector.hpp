@@ -166,7 +166,7 @@ template <class T, int V>
 /// 1, -1, 1, -1, ... or the other way round.
 template <class T, int V>
 [[gnu::always_inline]] inline Vec<T, 2 * V> alternating(T first) {
-    Vec<T, 2 * V> signs;
+    Vec<T, 2 * V> signs{};
     for (int i = 0; i < 2 * V; ++i) signs[i] = i % 2 ? -first : first;
     return signs;
 }

@@ -110,10 +110,14 @@ T splitting_root(T b3, T b2, T b1, T b0, T noise) {
     const std::array resolvent{-b0 * b3 * b3 + 4 * b0 * b2 - b1 * b1, b3 * b1 - 4 * b0, -b2, T(1)};
     auto roots = solve_cubic(resolvent[2], resolvent[1], resolvent[0]);
     correct<T>(resolvent, roots.all());
-    if (roots.complex) return roots.z[0].re;
     const auto splits = [&](T y) {
         return !(y + b3 * b3 / 4 - b2 < -noise) && !(y * y / 4 - b0 < -noise);
     };
+    if (roots.complex) {
+        // A double root may come out as a pair; then it is the one that splits.
+        const T y = roots.z[0].re, of_pair = roots.z[1].re;
+        return splits(y) || !splits(of_pair) ? y : of_pair;
+    }
     for (const std::size_t i : {1, 2}) {
         if (splits(roots.z[i].re)) return roots.z[i].re;
     }

@@ -22,11 +22,9 @@ struct Tangent {
 };
 
 /// The arithmetic of residuals, which near a root are what cancellation leaves over: the next wider
-/// type that the processor has.
+/// type that there is, also where the processor leaves its steps to the runtime.
 template <class T>
-using wider = std::conditional_t<
-    std::same_as<T, float>, double,
-    std::conditional_t<std::numeric_limits<long double>::digits == 64, long double, T>>;
+using wider = std::conditional_t<std::same_as<T, float>, double, long double>;
 
 template <class To, class T>
 To convert(T value) {

@@ -3,6 +3,8 @@
 #include <bit>
 #include <climits>
 #include <cstring>
+#include <filesystem>
+#include <fstream>
 #include <string>
 
 #include "support/signals.hpp"
@@ -276,6 +278,29 @@ BOTH_PRECISIONS(File, ReportsWhatCannotBeWritten) {
     EXPECT_EQ(dspf_fwrite(Signal<R>(), only_read), -1);
     EXPECT_EQ(dspf_fwrite2(Signal<R>(), only_read, 0x100), 0);
     EXPECT_EQ(dspff_fclose(only_read), 0);
+}
+
+TEST(FileStreams, MayBeLongerThanTwoGigabytes) {
+    const std::string path = ::testing::TempDir() + "wavkit-long-file";
+    std::ofstream(path, std::ios::binary).put('1');
+    std::filesystem::resize_file(path, (std::uintmax_t(1) << 31) + 16);
+    std::string ones;
+    for (int i = 0; i < 100; ++i) ones += " 1";
+    std::ofstream(path, std::ios::binary | std::ios::app) << "#DSP points = 100\n"
+                                                          << ones << " 7 8";
+    if (FILE* const file = dspf_fopen(path.c_str(), "rb")) {
+        std::fseek(file, INT_MAX, SEEK_SET);
+        std::fseek(file, 17, SEEK_CUR);
+        Signal<dsp> x;
+        EXPECT_EQ(dspf_fread(x, file), 1);
+        EXPECT_TRUE(is_real<dsp>(x, std::vector<long double>(100, 1)));
+        EXPECT_EQ(dspf_fread(x, file), 1);
+        EXPECT_TRUE(is_real<dsp>(x, {7, 8}));
+        dspf_fclose(file);
+    } else {
+        ADD_FAILURE() << "it cannot be opened";
+    }
+    std::filesystem::remove(path);
 }
 
 TEST(FileStreams, DashMeansTheStandardStreams) {

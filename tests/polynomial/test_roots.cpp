@@ -145,6 +145,17 @@ BOTH_PRECISIONS(Roots, MultipleAndClusteredRoots) {
     }
 }
 
+BOTH_PRECISIONS(Roots, SquaresOfQuadraticsHaveTheirPairsTwice) {
+    for (int i = 0; i < 400; ++i) {
+        const long double re = (i % 20 - 10) / 8.0L, im = std::sqrt(1 + i / 40.0L);
+        const long double s = -2 * re, b = re * re + im * im;  // (x^2 + s x + b)^2
+        Signal<R> roots;
+        ASSERT_EQ(dsps_proots(real<R>({b * b, 2 * s * b, s * s + 2 * b, 2 * s, 1}), roots), 0);
+        const Samples want{{re, im}, {re, im}, {re, -im}, {re, -im}};
+        EXPECT_LT(distance<R>(roots, want), 32 * std::sqrt((long double)epsilon<R>)) << re << ' ' << im;
+    }
+}
+
 BOTH_PRECISIONS(Roots, CoefficientsFromRoots) {
     const std::pair<Signal<R>, Signal<R>> cases[] = {
         {real<R>({2, 3}), real<R>({6, -5, 1})},

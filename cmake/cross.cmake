@@ -1,0 +1,15 @@
+# Debian's cross compilers, and QEMU to run what they make: WAVKIT_CROSS names the processor, as
+# ./run cross does.
+list(APPEND CMAKE_TRY_COMPILE_PLATFORM_VARIABLES WAVKIT_CROSS)
+set(CMAKE_SYSTEM_NAME Linux)
+set(CMAKE_SYSTEM_PROCESSOR ${WAVKIT_CROSS})
+set(triplet ${WAVKIT_CROSS}-linux-gnu)
+
+set(CMAKE_C_COMPILER ${triplet}-gcc)
+set(CMAKE_CXX_COMPILER ${triplet}-g++)
+set(CMAKE_CROSSCOMPILING_EMULATOR qemu-${WAVKIT_CROSS}-static -L /usr/${triplet})
+set(CMAKE_FIND_ROOT_PATH /usr/${triplet})
+set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
+set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
+set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
+set(CMAKE_FIND_ROOT_PATH_MODE_PACKAGE ONLY)
