@@ -28,9 +28,9 @@
  *  m keeps one m-th of the digits: a double root 7 or 8 in double precision, 3 or 4 in single. It
  *  may come out as real roots or as a pair with small imaginary parts.
  *
- *  Residuals are computed in a wider arithmetic than the samples': in double, and for double in long
- *  double. Where that is no wider (Microsoft's compilers, ARM with 32 bits), only the residual is as
- *  small as said. */
+ *  Residuals are computed in a wider arithmetic than the samples': in double, and for double in
+ * long double. Where that is no wider (Microsoft's compilers, ARM with 32 bits), only the residual
+ * is as small as said. */
 #ifndef WAVKIT_POLYNOMIAL_H
 #define WAVKIT_POLYNOMIAL_H
 

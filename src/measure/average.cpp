@@ -33,8 +33,8 @@ bool lost(const R* x) {
 }
 
 /// The weighted mean of what `forth` makes of the spectra, turned back by `back`. All steps run
-/// even after a failure, as far as there are samples: an average that has gone forth comes back. One
-/// over a host's array moves before that, so that the host finds there what it was.
+/// even after a failure, as far as there are samples: an average that has gone forth comes back.
+/// One over a host's array moves before that, so that the host finds there what it was.
 template <Record R, class Forth, class Back>
 int transformed_mean(const R* input, R* avg, R* scratch, scalar<R> weight, Forth forth, Back back) {
     bool failed = fails_into(scratch, dsp_copy(scratch, input));

@@ -152,7 +152,8 @@ BOTH_PRECISIONS(Roots, SquaresOfQuadraticsHaveTheirPairsTwice) {
         Signal<R> roots;
         ASSERT_EQ(dsps_proots(real<R>({b * b, 2 * s * b, s * s + 2 * b, 2 * s, 1}), roots), 0);
         const Samples want{{re, im}, {re, im}, {re, -im}, {re, -im}};
-        EXPECT_LT(distance<R>(roots, want), 32 * std::sqrt((long double)epsilon<R>)) << re << ' ' << im;
+        EXPECT_LT(distance<R>(roots, want), 32 * std::sqrt((long double)epsilon<R>))
+            << re << ' ' << im;
     }
 }
 
