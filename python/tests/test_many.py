@@ -14,7 +14,7 @@ RNG = np.random.default_rng(11)
 
 @pytest.fixture(scope="module")
 def client():
-    with LocalCluster(2, threads_per_worker=1, dashboard_address=None) as cluster:
+    with LocalCluster(2, threads_per_worker=1, dashboard_address=":0") as cluster:
         with Client(cluster) as client:
             yield client
 
@@ -46,7 +46,7 @@ def test_a_worker_that_dies_loses_nothing(client, files, tmp_path):
 
     found = wavkit.dask.measure(files, what, client)
     assert found.results == {path: 100.0 * i for i, path in enumerate(files)} and not found.errors
-    client.wait_for_workers(2)
+    client.wait_for_workers(2, timeout=60)
     assert set(client.run(os.getpid).values()) != set(at_work.values())
 
 

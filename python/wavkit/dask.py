@@ -49,7 +49,7 @@ def measure(files: Iterable[Path], what: Callable[[Signal], Any], client: Any) -
 
     >>> from distributed import Client
     >>> wavkit.write("one.dsp", [3.0, 4.0])
-    >>> with Client(processes=False, n_workers=1, dashboard_address=None) as client:
+    >>> with Client(processes=False, n_workers=1, dashboard_address=":0") as client:
     ...     found = wavkit.dask.measure(
     ...         ["one.dsp", "none.dsp"], lambda signal: wavkit.stats(signal.samples).energy, client
     ...     )
