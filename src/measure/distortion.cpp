@@ -5,6 +5,7 @@
 #include <limits>
 
 #include "record_view.hpp"
+#include "stats/result.hpp"
 #include "window/catalogue.hpp"
 
 namespace wavkit {
@@ -159,8 +160,8 @@ struct Tone {
         }
         // (The spacing of the bins is infinite where that of the samples is 0.)
         if (!(frequency > 0)) {
-            const double unit = x->delta == 0 ? 1 : std::fabs(double(x->delta));
-            frequency = scalar<R>(strongest<R>(spectrum, half_lobe) / (x->points * unit));
+            const double delta = std::fabs(double(spacing(x)));
+            frequency = scalar<R>(strongest<R>(spectrum, half_lobe) / (x->points * delta));
         }
         return dsps_sine_fit(x, sine, frequency, DSP_SINE_FREE);
     }
@@ -173,7 +174,7 @@ int distortion(const R* x, R* out, R* harmonics, scalar<R> frequency, int count,
     if (x->complex || tone.measure(x, frequency, window)) return -1;
     const int n = x->points;
     count = std::max(count, 1);
-    const double delta = x->delta == 0 ? 1 : std::fabs(double(x->delta));
+    const double delta = std::fabs(double(spacing(x)));
     const double f = tone.sine->data[0], cycles = f * delta;
     Lines<R> lines(tone.spectrum, n, tone.half_lobe, double(tone.bandwidth));
 
@@ -228,10 +229,7 @@ int distortion(const R* x, R* out, R* harmonics, scalar<R> frequency, int count,
                       noise * std::sqrt(2 * delta),
                       spur_at / (n * delta),
                       spur};
-    out->points = int(table.size());
-    out->complex = 0;
-    if (dsp_alloc(out)) return -1;
-    std::ranges::transform(table, out->data, [](double v) { return T(v); });
+    if (store(out, table)) return -1;
     return harmonics ? dsp_copy(harmonics, levels) : 0;
 }
 

@@ -3,6 +3,7 @@
 #include <array>
 
 #include "stats/blockwise.hpp"
+#include "stats/result.hpp"
 
 namespace wavkit {
 namespace {
@@ -109,11 +110,6 @@ Fit<scalar<R>> fit_pairs(const R* data, bool residues) {
             return attempt({from.x + m.x, from.y + m.y}, finish);
         return finish(from, m, pairs);
     });
-}
-
-template <Record R>
-scalar<R> spacing(const R* data) {
-    return data->delta == scalar<R>(0) ? scalar<R>(1) : data->delta;
 }
 
 /// The abscissae of a real signal: a ramp that begins anew after every block, about its middle.
@@ -250,15 +246,6 @@ Table<T> fit(const R* data) {
 }
 
 template <Record R>
-int store(std::span<const scalar<R>> entries, R* out) {
-    out->points = int(entries.size());
-    out->complex = 0;
-    if (dsp_alloc(out)) return -1;
-    std::ranges::copy(entries, out->data);
-    return 0;
-}
-
-template <Record R>
 int regress(const R* data, R* out) {
     using T = scalar<R>;
     std::array<T, 2> slope_intercept{};
@@ -267,14 +254,14 @@ int regress(const R* data, R* out) {
         slope_intercept =
             length(data) == 1 ? std::array{T(0), f.y.mean} : line<R>(f.x, f.y, f.covariance);
     }
-    return store<R>(slope_intercept, out);
+    return store(out, slope_intercept);
 }
 
 template <Record R>
 int regress_in_full(const R* data, R* out) {
     const auto table = fit(data);
     out->delta = 1;
-    return store<R>(table, out);
+    return store(out, table);
 }
 
 }  // namespace

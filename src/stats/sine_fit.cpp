@@ -13,6 +13,7 @@
 
 #include "kernel/lanes.hpp"
 #include "record_view.hpp"
+#include "stats/result.hpp"
 
 namespace wavkit {
 namespace {
@@ -329,16 +330,11 @@ int sine_fit(const R* x, R* out, scalar<R> frequency, int flags) {
     const bool free = !(flags & DSP_SINE_FIXED);
     const int n = int(length(x));
     if (x->complex || n < (free ? 4 : 3)) return -1;
-    const double delta = x->delta == 0 ? 1 : double(x->delta);
+    const double delta = double(spacing(x));
     double start = double(frequency) * delta;
     if (free && !(start > 0)) start = strongest_frequency(x);
     if (free && start == 0) return -1;
-    const Table table = table_of(n, fit(values(x), start, free), delta, free);
-    out->points = int(table.size());
-    out->complex = 0;
-    if (dsp_alloc(out)) return -1;
-    std::ranges::transform(table, out->data, [](double v) { return scalar<R>(v); });
-    return 0;
+    return store(out, table_of(n, fit(values(x), start, free), delta, free));
 }
 
 }  // namespace
