@@ -5,13 +5,13 @@
 #include <cmath>
 #include <cstdio>
 #include <memory>
-#include <numbers>
 #include <optional>
 
 #include "base/error.hpp"
 #include "base/number.hpp"
 #include "base/options.hpp"
 #include "base/progress.hpp"
+#include "base/scales.hpp"
 #include "base/text.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
@@ -41,9 +41,6 @@ constexpr std::array names{
     "spur_frequency", "spur_amplitude"};
 enum Entry : std::size_t { frequency, amplitude, phase, offset, thd, thd_n, sinad, snr, sfdr };
 enum LaterEntry : std::size_t { enob = 9, noise, noise_density, spur_frequency, spur_amplitude };
-
-double decibels(double ratio) { return 20 * std::log10(ratio); }
-double degrees(double radians) { return radians * 180 / std::numbers::pi; }
 
 struct Harmonic {
     int order;

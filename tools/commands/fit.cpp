@@ -15,6 +15,7 @@
 #include "base/mark.hpp"
 #include "base/options.hpp"
 #include "base/progress.hpp"
+#include "base/scales.hpp"
 #include "base/text.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
@@ -227,7 +228,7 @@ enum : std::size_t { frequency = 0, amplitude = 1, phase = 2, offset = 3, rest =
 /// Phases are told in degrees.
 double told(std::span<const double> table, std::size_t parameter, std::size_t first) {
     const double value = table[first + parameter];
-    return parameter == phase ? value * 180 / std::numbers::pi : value;
+    return parameter == phase ? degrees(value) : value;
 }
 
 void print_sine(std::FILE* to, std::span<const double> table, int points, const Facts& facts,

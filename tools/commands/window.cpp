@@ -9,6 +9,7 @@
 
 #include "base/error.hpp"
 #include "base/options.hpp"
+#include "base/scales.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
 #include "measure/windows.hpp"
@@ -27,8 +28,6 @@ struct WindowOptions {
     int points = 1024;
     bool json = false;
 };
-
-double decibels(double ratio) { return 20 * std::log10(ratio); }
 
 /// The samples, 1 at the centre, in the order of time.
 Signal samples_of(int window, int points) {

@@ -8,6 +8,8 @@
 #include <numbers>
 #include <optional>
 
+#include "base/scales.hpp"
+
 namespace wavkit::tool {
 namespace {
 
@@ -19,7 +21,7 @@ std::size_t transform_length(std::size_t taps) {
     return std::max(std::clamp(std::bit_ceil(fineness * taps), least, most), std::bit_ceil(taps));
 }
 
-double in_decibels(double gain) { return 20 * std::log10(std::max(gain, 1e-15)); }
+double in_decibels(double gain) { return decibels(std::max(gain, 1e-15)); }
 
 /// Where the slope that begins at `from` ends in its first extremum on the way to `to`; `to` itself
 /// where it goes on.
@@ -63,7 +65,7 @@ Response response_of(const Signal& taps) {
         const double turns = double(k * (count - 1) % (2 * length)) / double(2 * length);
         const double re = bins->data[2 * k], im = bins->data[2 * k + 1];
         const double magnitude = std::hypot(re, im);
-        double phase = (std::atan2(im, re) + 2 * pi * turns) * 180 / pi;
+        double phase = degrees(std::atan2(im, re) + 2 * pi * turns);
         phase -= 360 * std::ceil((phase - 190) / 360);
         response.magnitude.push_back(magnitude);
         response.phase.push_back(phase);
