@@ -56,13 +56,19 @@ constexpr std::array columns{
 };
 constexpr std::size_t printed_columns = 5;
 
+/// What the peaks of a signal stand out of: its values, or magnitudes.
+Signal heights_of(const Signal& x) {
+    Signal heights;
+    check(x->complex ? dspu_mag(x, heights) : dsp_copy(heights, x), "looking at heights");
+    return heights;
+}
+
 /// The peaks of a signal, in its own units.
 class Peaks {
   public:
     Peaks(const Signal& x, const PeaksOptions& options)
         : facts_(x.facts), delta_(x->delta), valleys_(options.valleys) {
-        Signal heights;
-        check(x->complex ? dspu_mag(x, heights) : dsp_copy(heights, x), "finding peaks");
+        auto heights = heights_of(x);
         if (valleys_) check(dspi_neg(heights), "finding peaks");
         const double unit = options.samples ? 1 : std::fabs(delta_);
         if (unit == 0 && (options.distance || options.width)) {
@@ -139,8 +145,7 @@ void write_table(std::FILE* to, const Peaks& peaks) {
 
 Curve curve_of(const Signal& x, const Peaks& peaks, const PeaksOptions& options,
                const std::string& file, bool seconds) {
-    Signal heights;
-    check(x->complex ? dspu_mag(x, heights) : dsp_copy(heights, x), "drawing peaks");
+    const auto heights = heights_of(x);
     Curve curve;
     curve.title = short_name(file);
     curve.x_label = x.facts.axis(seconds) == "Hz" ? "frequency" : seconds ? "time" : "x";
