@@ -279,8 +279,15 @@ def step_of(length: int, overlap: float) -> int:
 
 
 def _segments(
-    runs: Runs, settings: _Settings, length: int, overlap: float, detrend: bool
+    runs: Runs,
+    window: str,
+    length: int,
+    overlap: float,
+    two_sided: bool,
+    any_length: bool,
+    detrend: bool,
 ) -> _Segments:
+    settings = _settings(window, 0, 1.0, two_sided, any_length)
     if not 0 <= overlap < 100:
         raise ValueError(f"segments overlap by 0 to less than 100 percent, not {overlap}")
     if not 0 < length <= runs.points:
@@ -326,8 +333,7 @@ def average(
     if type not in _AVERAGES:
         raise ValueError(f"an average is one of {', '.join(_AVERAGES)}, not {type!r}")
     runs = Runs(x, rate, axis)
-    settings = _settings(window, 0, 1.0, two_sided, any_length)
-    segments = _segments(runs, settings, points, overlap, detrend)
+    segments = _segments(runs, window, points, overlap, two_sided, any_length, detrend)
     flags = _AVERAGES[type] | lib.DSP_AVG_POWER | (lib.DSP_AVG_LIMITED if forget > 0 else 0)
 
     def averaged(row: Array) -> Array:
@@ -365,8 +371,7 @@ def spectrogram(
     array([ 500., 1500.])
     """
     runs = Runs(x, rate, axis)
-    settings = _settings(window, 0, 1.0, two_sided, any_length)
-    segments = _segments(runs, settings, points, overlap, detrend)
+    segments = _segments(runs, window, points, overlap, two_sided, any_length, detrend)
     layout, count = segments.layout, segments.count(runs.points)
 
     def course(row: Array) -> Array:
