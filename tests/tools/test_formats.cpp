@@ -157,6 +157,9 @@ TEST_F(FormatsTest, DamagedFilesAreRefused) {
         "for f in m*; do (ulimit -t 20; wavkit info $f >out 2>err); s=$?;"
         "[ $s -le 1 ] || echo $f $s; done");
     EXPECT_EQ(done.out, "") << count;
+    auto wide = file("vibration.uff");  // a number with an exponent, wider than any field
+    write("wide.uff", wide.insert(wide.find("1.234567890123D"), 1 << 22, '1'));
+    EXPECT_NE(shell("wavkit info wide.uff").err.find("is not a number"), std::string::npos);
     write("daqmx.tdms", bytes_of("\"TDSm\" 8E000000 69120000 0000000000000000 0000000000000000"));
     EXPECT_NE(shell("wavkit info daqmx.tdms").err.find("DAQmx"), std::string::npos);
 }

@@ -24,9 +24,10 @@ std::string_view part(std::string_view line, std::size_t first, std::size_t coun
 std::optional<double> take_field(std::string_view& line) {
     line = line.substr(std::min(line.find_first_not_of(" \t,"), line.size()));
     if (line.empty()) return std::nullopt;
-    const auto end = std::min(line.find_first_of("dD \t"), line.size());
-    if (end == line.size() || line[end] == ' ' || line[end] == '\t') return take_number(line);
-    std::string text(line.substr(0, 40));
+    constexpr std::size_t widest = 40;
+    const auto end = line.find_first_of("dD \t");
+    if (end >= widest || line[end] == ' ' || line[end] == '\t') return take_number(line);
+    std::string text(line.substr(0, widest));
     text[end] = 'e';
     std::string_view rest = text;
     const auto value = take_number(rest);
