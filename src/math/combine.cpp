@@ -29,6 +29,7 @@ int multiply_apart(const R* a, const R* b, R* out) {
     R p = *a, q = *b;
     out->delta = (p.delta + q.delta) * scalar<R>(0.5);
     if (size_output(p, q, out, n && m ? n + m - 1 : 0, p.complex || q.complex)) return -1;
+    if (out->points == 0) return 0;
     const auto multiply = [](auto first, auto second, auto product) {
         if (!multiply_by_spectra<R>(first, second, product))
             convolve<scalar<R>>(first, second, product);

@@ -184,16 +184,17 @@ BOTH_PRECISIONS(Binary, ProductsOfWholePolynomialsAreWhole) {
 
 BOTH_PRECISIONS(Binary, PolynomialsKeepEveryCoefficient) {
     Noise noise;
-    for (const auto& [n, m] : {std::pair{1, 9}, {7, 40}, {61, 30}, {130, 150}, {700, 1100}}) {
+    for (const auto& [n, m] :
+         {std::pair{1, 9}, {8, 0}, {7, 40}, {61, 30}, {130, 150}, {700, 1100}}) {
         for (int kinds = 0; kinds < 8; ++kinds) {
             Signal<R> a = kinds & 1 ? noise.complex<R>(n) : noise.real<R>(n), out;
             const Signal<R> b = kinds & 2 ? noise.complex<R>(m) : noise.real<R>(m);
             int fall = 0;
             for (auto& v : values(a.get())) v = std::ldexp(v, kinds & 4 ? 0 : -fall++ / 16);
             ASSERT_EQ(dspb_pmul(a, b, out), 0);
-            ASSERT_EQ(out->points, n + m - 1);
+            ASSERT_EQ(out->points, m ? n + m - 1 : 0);
             const Samples p = samples_of<R>(a), q = samples_of<R>(b), got = samples_of<R>(out);
-            for (int k = 0; k < n + m - 1; ++k) {
+            for (int k = 0; k < out->points; ++k) {
                 std::complex<long double> sum = 0;
                 long double magnitude = 0;
                 for (int i = std::max(0, k - m + 1); i <= std::min(k, n - 1); ++i) {
