@@ -2,12 +2,10 @@
 // family, which WAVKIT_FUZZ names, or any. Whatever they are given, nothing undefined happens,
 // records hold together, and inputs stay as they were.
 #include <algorithm>
-#include <cerrno>
 #include <cstdio>
 #include <functional>
 #include <list>
 #include <map>
-#include <new>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -19,25 +17,29 @@
 namespace wavkit::fuzz {
 namespace {
 
-/// The functions of a target, by how their names begin, and the points of the longest records.
+/// The functions of a target, by how their names begin; how many an input may call, and the points
+/// of its longest records.
 struct Family {
-    int longest;
+    int calls, longest;
     std::vector<std::string_view> beginnings;
 };
 const std::map<std::string_view, Family> families = {
-    {"calls", {512, {"dsp"}}},
-    {"design", {1024, {"dspc_fir", "dspi_window_fir", "dspc_rsmp"}}},
-    {"filters", {1024, {"dspd_fir", "dspd_sfir", "dspb_corr", "dsph_", "dspb_pmul"}}},
+    {"calls", {16, 512, {"dsp"}}},
+    {"design", {4, 1024, {"dspc_", "dspi_window_fir"}}},
+    {"filters", {4, 1024, {"dspd_", "dspi_hwfilt", "dspb_corr", "dspb_pmul"}}},
     {"interpolation",
-     {1024, {"dsp_interp", "dsp_cspline", "dspb_cspline", "dspb_inter", "dspi_edge"}}},
-    {"polynomials", {64, {"dsps_p", "dspi_p", "dspb_pmul"}}},
-    {"rates", {1024, {"dspd_deci", "dspd_hwfilt", "dspi_hwfilt", "dspd_rsmp", "dspi_zinter"}}},
+     {4, 1024, {"dsp_interp", "dsp_cspline", "dspb_cspline", "dspb_inter", "dspi_edge"}}},
+    {"measures", {4, 1024, {"dsph_", "dsps_", "dspbs_"}}},
+    {"polynomials",
+     {4, 64, {"dsps_peval", "dsps_ps", "dsps_pc", "dsps_pr", "dspi_p", "dspb_pmul"}}},
+    {"rates", {4, 1024, {"dspd_deci", "dspd_hwfilt", "dspi_hwfilt", "dspd_rsmp", "dspi_zinter"}}},
     {"transforms",
-     {4096,
+     {4,
+      4096,
       {"dspi_fft", "dspi_rfft", "dspi_irfft", "dspi_dft", "dspi_rdft", "dspi_irdft", "dspi_dct",
        "dspi_analytic", "dspi_hilbert", "dspi_bitrev", "dsph_fft", "dsph_dft", "dspi_zpad",
        "dspi_unzpad", "dspi_orecon", "dspi_recon", "dspi_swap"}}},
-    {"windows", {1024, {"dspi_window", "dsp_window"}}},
+    {"windows", {4, 1024, {"dspi_window", "dsp_window"}}},
 };
 
 const Family* family;
@@ -72,7 +74,8 @@ class Records {
         dsp_destroy(&x);
         const int shape = in.byte();
         x.complex = shape & 1;
-        x.points = std::min((shape >> 3) * (shape & 4 ? int(in.byte()) : 1), family->longest);
+        const int times = shape & 4 ? std::max(2 * in.byte() - 384, 1) : 1;  // short mostly
+        x.points = std::min((shape >> 3) * times, family->longest);
         x.delta = shape & 16 ? scalar<R>(1) : in.scalar<scalar<R>>();
         if (shape & 2) {
             x.data = arrays_.emplace_back(used(&x)).data();
@@ -247,8 +250,7 @@ template <Record R>
 void run(Bytes& in) {
     static const auto calls = calls_of_family<R>();
     Records<R> records(in);
-    constexpr int most_calls = 32;
-    for (int i = 0; i < most_calls && !in.empty(); ++i) {
+    for (int i = 0; i < family->calls && !in.empty(); ++i) {
         if (const int renewed = in.byte(); renewed < 32) records.make(records[renewed], in);
         calls[in.byte() % calls.size()](records, in);
     }
@@ -257,34 +259,7 @@ void run(Bytes& in) {
 }  // namespace
 }  // namespace wavkit::fuzz
 
-// The linker sends the library's allocations here: blocks too large for a machine with little
-// memory are not to be had. A block that cannot grow is given up by the library on purpose.
-constexpr std::size_t most_bytes = 1 << 20;
-
 extern "C" {
-void* __real_malloc(std::size_t);
-void* __real_realloc(void*, std::size_t);
-int __real_posix_memalign(void**, std::size_t, std::size_t);
-void* __real__ZnwmSt11align_val_tRKSt9nothrow_t(std::size_t, std::align_val_t,
-                                                const std::nothrow_t&);
-
-void* __wrap_malloc(std::size_t bytes) {
-    return bytes > most_bytes ? nullptr : __real_malloc(bytes);
-}
-void* __wrap_realloc(void* block, std::size_t bytes) {
-    if (bytes <= most_bytes) return __real_realloc(block, bytes);
-    std::free(block);
-    return nullptr;
-}
-int __wrap_posix_memalign(void** block, std::size_t alignment, std::size_t bytes) {
-    return bytes > most_bytes ? ENOMEM : __real_posix_memalign(block, alignment, bytes);
-}
-void* __wrap__ZnwmSt11align_val_tRKSt9nothrow_t(std::size_t bytes, std::align_val_t alignment,
-                                                const std::nothrow_t& tag) {
-    return bytes > most_bytes ? nullptr
-                              : __real__ZnwmSt11align_val_tRKSt9nothrow_t(bytes, alignment, tag);
-}
-
 int LLVMFuzzerInitialize(int*, char***) {
     const char* const name = std::getenv("WAVKIT_FUZZ");
     const auto found = wavkit::fuzz::families.find(name ? name : "calls");
