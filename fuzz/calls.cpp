@@ -151,6 +151,8 @@ class Arguments {
         } else if constexpr (std::same_as<P, const dsp*> && !std::same_as<R, dsp>) {
             for (auto& place : places_) place = in_.scalar<double>();
             return &positions_;
+        } else if constexpr (std::same_as<P, dsp*> && !std::same_as<R, dsp>) {
+            return state_;
         } else {
             return record<P>(in_.byte());
         }
@@ -207,6 +209,7 @@ class Arguments {
     scalar<R> number_ = 0;
     std::array<double, 3> places_{};
     dsp positions_{1, places_.data(), 0, int(places_.size()), 0, 0};
+    Temporary<dsp> state_;  // of calls in single precision
 };
 
 template <Record R>

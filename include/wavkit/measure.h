@@ -1,6 +1,6 @@
 /** @file measure.h
- *  Measurement spectra: amplitudes of a windowed signal, harmonics and noise of a tone, running
- *  averages, sliding correlation.
+ *  Measurement spectra: amplitudes of a windowed signal, harmonics and noise of a tone, the
+ *  response between two signals, running averages, sliding correlation.
  *
  *  These functions put those of the other headers together in the order that a measurement needs:
  *  dsph_fft() windows a time record, pads it to a power of two and transforms it so that a sine of
@@ -150,6 +150,74 @@ WAVKIT_API int dsph_distortion(const dsp *x, dsp *out, dsp *harmonics, double fr
                                int window);
 WAVKIT_API int dspfh_distortion(const dspf *x, dspf *out, dspf *harmonics, float frequency,
                                 int count, int window);
+
+/** What `flags` of dsph_cross() is put together from. */
+enum {
+    DSP_CROSS_MEAN = 1 /**< take its mean out of each segment first */
+};
+
+/** Adds what two signals have in common, segment by segment, to a state, which dsph_response() then
+ *  tells the response, the coherence and the delay from (P. D. Welch, "The use of fast Fourier
+ *  transform for the estimation of power spectra", 1967).
+ *
+ *  Segments of `length` samples begin at every `step`-th one of the stream. Through a window of
+ * mean square 1, and transformed at their own length to X and Y, they add to the sums of |X|^2,
+ * |Y|^2 and conj(X) Y at the frequencies 0 .. 1 / (2 delta).
+ *
+ *  A stream goes on from block to block, with blocks of any length: the state keeps the samples
+ * that a next segment begins with, and all blocks together leave what one call leaves, to the last
+ * bit. It is a record in double precision for both, empty for a fresh stream, of 4 (length / 2 + 1)
+ * + 2 length + 6 real points afterwards: segments so far, the four numbers of the call, the samples
+ *  that are kept (below 0: that are still to be passed over), the sums, and these samples. It takes
+ *  the `delta` of the first block of x, and must share no memory with x and y.
+ *
+ *  @param x,y     as many real samples, of the input and of the output of what lies in between
+ *  @param state   the sums
+ *  @param length  of a segment, at least 2; any length will do, powers of two go fastest
+ *  @param step    from a segment to the next, at least 1: half the length is usual
+ *  @param window  identifier, see window.h
+ *  @param flags   DSP_CROSS_... constants
+ *  @return 0; -1 for complex signals, different lengths, a window that is unknown, a state that was
+ *          begun with other numbers or by something else (nothing is then touched), or when memory
+ *          runs out: the block is then lost */
+WAVKIT_API int dsph_cross(const dsp *x, const dsp *y, dsp *state, int length, int step, int window,
+                          int flags);
+WAVKIT_API int dspfh_cross(const dspf *x, const dspf *y, dsp *state, int length, int step,
+                           int window, int flags);
+
+/** What dsph_response() tells. With the means Sxx, Syy and Sxy of a state: */
+enum {
+    DSP_RESPONSE_H1 = 0,        /**< Sxy / Sxx, complex: noise in the output averages out */
+    DSP_RESPONSE_H2 = 1,        /**< Syy / conj(Sxy), complex: noise in the input does */
+    DSP_RESPONSE_COHERENCE = 2, /**< |Sxy|^2 / (Sxx Syy), from 0 to 1 */
+    DSP_RESPONSE_CROSS = 3,     /**< cross-spectral density, complex: its real part sums up to the
+                                     mean of x y */
+    DSP_RESPONSE_INPUT = 4,     /**< power density of x, which sums up to the mean square */
+    DSP_RESPONSE_OUTPUT = 5,    /**< power density of y */
+    DSP_RESPONSE_PHASE = 6,     /**< angle of Sxy in radians, without jumps */
+    DSP_RESPONSE_DELAY = 7      /**< by how much y comes behind x, one point */
+};
+
+/** Tells the response from x to y, and how far it is one, from the state of dsph_cross().
+ *
+ *  Spectra have length / 2 + 1 points, from 0 to half the sampling rate in steps of `delta` =
+ *  1 / (length delta); densities are one-sided and per unit of frequency. A bin without any power
+ * is NaN where it is divided by. The coherence of a single segment is 1 everywhere, that of n
+ * segments without any connection about 1/n.
+ *
+ *  The delay is the one whose line fits the angles of all bins best, weighted by what their
+ *  coherence says of them (C. H. Knapp and G. C. Carter, "The generalized correlation method for
+ *  estimation of time delay", 1976): in the unit of `delta`, between samples, less than half a
+ *  segment either way, negative where y comes first, NaN where no bin is coherent. An inverted y
+ *  has the same delay. The phase is unwrapped beside this line, so that long delays make no jumps.
+ *
+ *  @param state  of dsph_cross(), with at least one segment; it shares no memory with `out`
+ *  @param out    real or complex, as listed; for the delay `delta` of the signals
+ *  @param kind   a DSP_RESPONSE_... constant
+ *  @return 0; -1 for a state without segments or of something else, another kind (nothing is then
+ *          touched), or when memory runs out */
+WAVKIT_API int dsph_response(const dsp *state, dsp *out, int kind);
+WAVKIT_API int dspfh_response(const dsp *state, dspf *out, int kind);
 
 /** What `flags` of dsph_avg() is put together from: one type and any of the last two. */
 enum {

@@ -277,4 +277,40 @@ public static unsafe class DspApi
         GC.KeepAlive(harmonics);
         return result;
     }
+
+    /// <summary>Adds what two signals have in common, segment by segment, to a state.</summary>
+    /// <param name="input">What went in, real.</param>
+    /// <param name="output">What came out, as many real samples.</param>
+    /// <param name="state">The sums: empty for a fresh stream, then passed from block to
+    /// block.</param>
+    /// <param name="length">Samples of a segment, 2 or more.</param>
+    /// <param name="step">From a segment to the next, 1 or more.</param>
+    /// <param name="window">A <see cref="DspWindow"/>.</param>
+    /// <param name="flags">1 takes the mean out of each segment, 0 does not.</param>
+    /// <returns>0; -1 for complex signals, different lengths, a state that was begun with other numbers,
+    /// a window that does not exist, or when memory runs out.</returns>
+    public static int dsph_cross(DspInput input, DspInput output, DspInput state, int length, int step,
+        int window, int flags)
+    {
+        int result = NativeMethods.dsph_cross(input.GetDspPtr(), output.GetDspPtr(), state.GetDspPtr(),
+            length, step, window, flags);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(state);
+        return result;
+    }
+
+    /// <summary>Tells the response, the coherence or the delay from a state of
+    /// <see cref="dsph_cross"/>.</summary>
+    /// <param name="state">The state, with a segment or more.</param>
+    /// <param name="output">A sample for each frequency, or the delay.</param>
+    /// <param name="kind">A <see cref="DspResponse"/>.</param>
+    /// <returns>0; -1 for another state or kind, or when memory runs out.</returns>
+    public static int dsph_response(DspInput state, DspInput output, int kind)
+    {
+        int result = NativeMethods.dsph_response(state.GetDspPtr(), output.GetDspPtr(), kind);
+        GC.KeepAlive(state);
+        GC.KeepAlive(output);
+        return result;
+    }
 }

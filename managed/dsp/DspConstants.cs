@@ -94,3 +94,24 @@ public enum DspSine
     /// <summary>Three parameters: the frequency as it is given.</summary>
     Fixed = 1,
 }
+
+/// <summary>What <see cref="DspApi.dsph_response"/> tells.</summary>
+public enum DspResponse
+{
+    /// <summary>Cross-spectrum over that of the input.</summary>
+    H1 = 0,
+    /// <summary>Spectrum of the output over the conjugate cross-spectrum.</summary>
+    H2 = 1,
+    /// <summary>How much of the output the input explains, 0 to 1.</summary>
+    Coherence = 2,
+    /// <summary>Cross-spectral density.</summary>
+    Cross = 3,
+    /// <summary>Power density of the input.</summary>
+    Input = 4,
+    /// <summary>Power density of the output.</summary>
+    Output = 5,
+    /// <summary>The phase in radians, without jumps.</summary>
+    Phase = 6,
+    /// <summary>By how much the output comes later.</summary>
+    Delay = 7,
+}

@@ -9,7 +9,9 @@ using unsafe OfRecordAndDouble = delegate* unmanaged[Cdecl]<dsp_struct*, double,
 using unsafe OfRecordAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, int, int>;
 using unsafe OfRecordAndWindow = delegate* unmanaged[Cdecl]<dsp_struct*, int, int, double, int>;
 using unsafe OfThreeRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, double, int, int, int>;
+using unsafe OfThreeRecordsAndSegments = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, int, int, int, int, int>;
 using unsafe OfTwoRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int>;
+using unsafe OfTwoRecordsAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int>;
 using unsafe OfTwoRecordsAndPeaks = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, double, double, double, double, double, double, int>;
 using unsafe OfTwoRecordsAndSine = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, double, int, int>;
 
@@ -30,6 +32,8 @@ internal static unsafe class NativeMethods
     internal static OfTwoRecordsAndSine dsps_sine_fit;
     internal static OfTwoRecordsAndPeaks dsps_peaks;
     internal static OfThreeRecords dsph_distortion;
+    internal static OfThreeRecordsAndSegments dsph_cross;
+    internal static OfTwoRecordsAndInt dsph_response;
     internal static OfFourRecords dspd_fir;
 
     /// <exception cref="EntryPointNotFoundException">The library lacks a function.</exception>
@@ -64,6 +68,8 @@ internal static unsafe class NativeMethods
         dsps_sine_fit = (OfTwoRecordsAndSine)Find(nameof(dsps_sine_fit));
         dsps_peaks = (OfTwoRecordsAndPeaks)Find(nameof(dsps_peaks));
         dsph_distortion = (OfThreeRecords)Find(nameof(dsph_distortion));
+        dsph_cross = (OfThreeRecordsAndSegments)Find(nameof(dsph_cross));
+        dsph_response = (OfTwoRecordsAndInt)Find(nameof(dsph_response));
 
         void* Find(string name) => (void*)SharedObject.Find(library, name);
     }

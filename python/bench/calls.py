@@ -133,7 +133,7 @@ def rfft(x: Any) -> Any:
 
 def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
     rng = np.random.default_rng(1)
-    x = rng.normal(size=points)
+    x, y = rng.normal(size=(2, points))
     taps = wavkit.design("lowpass", 0.1, length=201, transition=0.02)
     planned = pyfftw.builders.rfft(x.copy(), threads=1, planner_effort="FFTW_MEASURE")
     segment, window = min(1024, points // 4), wavkit.window("hann", min(1024, points // 4))
@@ -159,6 +159,16 @@ def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
             "average",
             lambda: wavkit.average(x, 1.0, segment),
             {"SciPy": lambda: scipy.signal.welch(x, 1.0, window, detrend=False)},
+        ),
+        (
+            "transfer",
+            lambda: wavkit.transfer(x, y, 1.0, segment),
+            {
+                "SciPy": lambda: (
+                    scipy.signal.csd(x, y, 1.0, window, detrend=False),
+                    scipy.signal.coherence(x, y, 1.0, window, detrend=False),
+                )
+            },
         ),
         (
             "filter, 201 taps",

@@ -414,6 +414,39 @@ def test_distortion(single):
     assert found.enob == pytest.approx((found.sinad - 1.7609) / 6.0206, abs=1e-3)
 
 
+@pytest.mark.parametrize("detrend", [False, True])
+@pytest.mark.parametrize(
+    ("window", "points", "overlap"),
+    [("hann", 256, 50), ("uniform", 100, 0), ("blackman_harris4", 75, 75)],
+)
+def test_transfer(window, points, overlap, detrend):
+    x = RNG.normal(size=5000) + 1
+    y = scipy.signal.lfilter([0.2, 0.5, -0.3], [1, -0.4], x) + 0.3 * RNG.normal(size=5000)
+    given = {
+        "fs": RATE,
+        "window": wavkit.window(window, points),
+        "noverlap": points - wavkit._spectra.step_of(points, overlap),
+        "detrend": "constant" if detrend else False,
+    }
+    found = wavkit.transfer(x, y, RATE, points, window, overlap=overlap, detrend=detrend)
+    f, cross = scipy.signal.csd(x, y, **given)
+    power = scipy.signal.welch(x, **given)[1]
+    skip = slice(2 if detrend else 0, None)  # where the mean was there is rounding alone
+    close(found.frequency, f)
+    close(found.cross[skip], cross[skip], 1e-11)
+    close(found.input[skip], power[skip], 1e-11)
+    close(found.output[skip], scipy.signal.welch(y, **given)[1][skip], 1e-11)
+    close(found.coherence[skip], scipy.signal.coherence(x, y, **given)[1][skip], 1e-9)
+    close(found.h1[skip], (cross / power)[skip], 1e-9)
+    several = wavkit.transfer(x, np.stack([y, x]), RATE, points, window, overlap=overlap)
+    assert several.h1.shape == (2, points // 2 + 1) and several.delay.shape == (2,)
+    single = wavkit.transfer(x.astype("f4"), y.astype("f4"), RATE, points, window, overlap=overlap)
+    assert single.h1.dtype == np.complex64
+    close(single.h1, several.h1[0], 1e-3)
+    with pytest.raises(ValueError):
+        wavkit.transfer(x[:50], y[:50], RATE, points)
+
+
 @pytest.mark.parametrize("degree", [1, 2, 3, 4, 5, 9, 20])
 def test_roots(degree):
     wanted = RNG.normal(size=degree)

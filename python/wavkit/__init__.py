@@ -21,6 +21,7 @@ from ._signals import Correlation, correlate, derive, edges, envelope, integrate
 from ._spectra import Peaks, Spectrogram, Spectrum, average, spectrogram, spectrum
 from ._statistics import Histogram, Line, Stats, fit, from_roots, hist, roots, stats
 from ._tones import Distortion, SignalPeaks, Sine, distortion, fit_sine, peaks
+from ._transfer import Transfer, TransferMeter, transfer
 from ._version import version as __version__
 from ._windows import coherent_gain, noise_bandwidth, window, windows
 
@@ -40,6 +41,8 @@ __all__ = [
     "Spectrogram",
     "Spectrum",
     "Stats",
+    "Transfer",
+    "TransferMeter",
     "average",
     "coherent_gain",
     "correlate",
@@ -67,6 +70,7 @@ __all__ = [
     "spectrogram",
     "spectrum",
     "stats",
+    "transfer",
     "window",
     "windows",
     "write",

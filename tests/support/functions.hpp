@@ -82,6 +82,7 @@ inline const std::map<std::string, Cases> numbers = {
     {"dspf_fwrite2", {{0, 0}, {0, 1}}},
     {"dsph_avg", each_average()},
     {"dsph_corr", {{1, 0}, {3, 1}}},
+    {"dsph_cross", {{4, 2, 2, 1}, {5, 7, 14, 0}}},
     {"dsph_dft", {{20, 0}, {2, 1}, {0, 4}, {0, 0x80}}},
     {"dsph_distortion", {{0.25, 3, 0}, {0.2, 2, 2}}},
     {"dsph_fft", {{0, 1, 2, 0}, {0, 1, 0, 1}, {0, 1, 0, 4}, {0, 1, 0, 0x80}, {700, 0.5, 6, 2}}},
@@ -99,6 +100,7 @@ inline const std::map<std::string, Cases> numbers = {
     {"dspi_window_kaiser", {{3, 1}}},
     {"dspi_zpad", {{700}}},
     {"dspi_zpad2", {{700, 0x301}}},
+    {"dsph_response", {{0}, {6}, {7}}},
     {"dsps_hist", {{0, 2, 6}}},
     {"dsps_peak", {{0, 0}, {0x100, 0}, {0x1200, 2}}},
     {"dsps_peaks", {{1.05, 0.01, 2, 0.01, 0.1, 0.5}}},
@@ -117,6 +119,9 @@ inline const std::map<std::string, std::size_t> optional_records = {
 inline bool keeps_place(const std::string& name) {
     return name == "dspd_deci" || name == "dspd_rsmp" || name.ends_with("_hwfilt");
 }
+
+/// Functions whose last record is a state that knows what it is one of.
+inline bool begins_anew(const std::string& name) { return name == "dsph_cross"; }
 
 /// Writes a signal whose header is followed by zeros.
 template <class T>
@@ -154,6 +159,7 @@ struct Arguments {
     std::size_t next_record = 0, next_number = 0;
     std::array<double, 3> places{0.25, 7.5, 2};
     dsp positions{1, places.data(), 0, int(places.size()), 0, 0};
+    Signal<dsp> state{};  // of calls in single precision
 
     template <class P>
     P next() {
@@ -170,6 +176,8 @@ struct Arguments {
             return stream.get();
         } else if constexpr (std::same_as<P, const dsp*> && !std::same_as<R, dsp>) {
             return &positions;
+        } else if constexpr (std::same_as<P, dsp*> && !std::same_as<R, dsp>) {
+            return state;
         } else {
             return records[next_record++];
         }
@@ -252,6 +260,11 @@ void add_own_calls(Add add) {
     };
     add("dspf_fopen", open_and_close);
     add("dspf_fclose", open_and_close);
+    add("dsph_response", [](const R* x, R* out, int kind) {
+        Signal<dsp> state;
+        return status(dsph_cross(x, x, state, 4, 2, DSP_WINDOW_HANN, 0) ||
+                      dsph_response(state, out, kind));
+    });
     add("dspc_seed", [](R* x) { return status(seed_random<R>(5) || dspc_rand(x, 0)); });
 }
 
@@ -323,6 +336,7 @@ struct Run {
         }
         // A short history leaves the place to the zeros behind it.
         if (keeps_place(of.name)) hosts.back().record.points /= 4;
+        if (begins_anew(of.name) && of.is_const.size() > 2) hosts.back().record.points = 0;
         if (to != from) records[to] = records[from];
     }
 
@@ -370,6 +384,7 @@ struct Run {
     }
 
     void release() {
+        arguments.reset();
         for (auto& x : hosts) dsp_destroy(&x.record);
     }
 

@@ -30,6 +30,7 @@ void add_derive(CLI::App& program);
 void add_integrate(CLI::App& program);
 void add_edges(CLI::App& program);
 void add_peaks(CLI::App& program);
+void add_response(CLI::App& program);
 
 void add_help(CLI::App& program);
 

@@ -76,13 +76,6 @@ double energy(const Signal& x) {
     return sum;
 }
 
-/// By how much B starts behind A, as far as both are told to begin.
-double later_start(const Signal& a, const Signal& b) {
-    const auto from = moment_of(a.facts.origin), to = moment_of(b.facts.origin);
-    const double places = b.facts.start - a.facts.start;
-    return from && to ? places + to->since(*from) : places;
-}
-
 /// The correlation at every lag at which the two overlap, with zeros beyond the ends of B.
 Correlation correlated(const Signal& a, Signal b) {
     if (std::fabs(a->delta - b->delta) > 1e-6 * std::fabs(a->delta)) {
@@ -95,7 +88,7 @@ Correlation correlated(const Signal& a, Signal b) {
     if (b->points + 2L * shift > longest) throw Error("the signals are too long to correlate");
     b->delta = a->delta;
     Correlation result{
-        {}, shift, energies > 0 ? a->points / std::sqrt(energies) : 0, later_start(a, b)};
+        {}, shift, energies > 0 ? a->points / std::sqrt(energies) : 0, later_start(a.facts, b.facts)};
     result.values.facts.start = result.lag(0);
     check(dspi_zpad2(b, b->points + shift, DSP_PAD_UNSCALED | DSP_PAD_AT_END) ||
               dspi_zpad(b, b->points + shift) || dspb_corr(a, b, result.values, nullptr, a->points),

@@ -110,6 +110,12 @@ std::optional<Moment> moment_of(std::string_view text) {
     return text.empty() ? std::optional(moment) : std::nullopt;
 }
 
+double later_start(const Facts& first, const Facts& second) {
+    const auto from = moment_of(first.origin), to = moment_of(second.origin);
+    const double places = second.start - first.start;
+    return from && to ? places + to->since(*from) : places;
+}
+
 std::string iso_text(const Moment& moment) {
     auto seconds = moment.seconds;
     auto nanoseconds = std::int64_t(std::llround(moment.fraction * 1e9));

@@ -94,6 +94,7 @@ class Panel {
         canvas_.set_plot_box(script_, box_);
         std::fprintf(script_, "set xlabel %s\nset ylabel %s\n", script_text(x_.label).c_str(),
                      script_text(y_.label).c_str());
+        if (curve_.logarithmic) std::fputs("set logscale x\n", script_);
         write_range('x', across_, x_.factor);
         write_range('y', upwards_, y_.factor);
         const bool given = curve_.y_tics > 0;

@@ -25,6 +25,7 @@ struct Curve {
     bool decibels = false;
     double depth = 150;  // decibels worth showing below the highest value
     bool filled = true;  // down to 0, unless in decibels
+    bool logarithmic = false;  // over the logarithm of x, which is above 0 then
     double y_tics = 0;   // between the numbers at the height axis; 0: as it suits
     // Of the axes, where the points do not choose them.
     std::optional<std::pair<double, double>> range, x_range;
