@@ -14,6 +14,7 @@
 #include "measure.h"
 #include "polynomial.h"
 #include "record.h"
+#include "smooth.h"
 #include "statistics.h"
 #include "transform.h"
 #include "types.h"

@@ -74,9 +74,12 @@ inline const std::map<std::string, Cases> numbers = {
     {"dspc_rsmp", {{2, 0.2, 0.8, 40}}},
     {"dspc_rsmp_pcos", {{3, 0.4, 2}}},
     {"dspd_deci", {{1}, {3}}},
+    {"dspd_hampel", {{3, 1, 0, 0}, {18, 3, 2, 1}}},
     {"dspd_hwfilt", {{0}, {1}, {2}}},
+    {"dspd_median", {{3, 1, 1}, {17, 0, 0}, {256, 2, 0}}},
     {"dspd_rsmp", {{3, 2}}},
     {"dspd_rsmp2", {{1}, {3}}},
+    {"dspd_savgol", {{5, 2, 1, 1}, {9, 3, 0, 0}}},
     {"dspd_sfir", {{0, 1}, {1, 0}}},
     {"dspf_fread", {{0}, {1}, {2}, {3}, {4}}},
     {"dspf_fwrite2", {{0, 0}, {0, 1}}},
@@ -110,10 +113,10 @@ inline const std::map<std::string, Cases> numbers = {
 
 /// Records that may be left out, by their place among those of the function.
 inline const std::map<std::string, std::size_t> optional_records = {
-    {"dsp_interp", 2},     {"dsp_cspline", 2}, {"dspd_fir", 3},  {"dspd_sfir", 3},
-    {"dspd_deci", 3},      {"dspd_hwfilt", 3}, {"dspd_rsmp", 3}, {"dspd_rsmp2", 4},
-    {"dspi_hwfilt", 2},    {"dsph_avg", 2},    {"dsph_corr", 3}, {"dspb_corr", 3},
-    {"dsph_distortion", 2}};
+    {"dsp_interp", 2},      {"dsp_cspline", 2}, {"dspd_fir", 3},    {"dspd_sfir", 3},
+    {"dspd_deci", 3},       {"dspd_hwfilt", 3}, {"dspd_rsmp", 3},   {"dspd_rsmp2", 4},
+    {"dspi_hwfilt", 2},     {"dsph_avg", 2},    {"dsph_corr", 3},   {"dspb_corr", 3},
+    {"dsph_distortion", 2}, {"dspd_savgol", 2}, {"dspd_median", 2}, {"dspd_hampel", 3}};
 
 /// Functions that read a whole number behind the history of a stream, where there is one.
 inline bool keeps_place(const std::string& name) {
