@@ -89,6 +89,8 @@ inline const std::map<std::string, Cases> numbers = {
     {"dsph_dft", {{20, 0}, {2, 1}, {0, 4}, {0, 0x80}}},
     {"dsph_distortion", {{0.25, 3, 0}, {0.2, 2, 2}}},
     {"dsph_fft", {{0, 1, 2, 0}, {0, 1, 0, 1}, {0, 1, 0, 4}, {0, 1, 0, 0x80}, {700, 0.5, 6, 2}}},
+    {"dsph_istft", {{0, 8, 3, 0, 1}, {20, 5, 2, 2, 0}}},
+    {"dsph_stft", {{2, 8, 3, 0, 1}, {20, 5, 2, 2, 0}}},
     {"dspi_dct", {{0}, {3}}},
     {"dspi_dft", {{0}, {1}}},
     {"dspi_edge", {{0, 4.5}}},
@@ -116,7 +118,8 @@ inline const std::map<std::string, std::size_t> optional_records = {
     {"dsp_interp", 2},      {"dsp_cspline", 2}, {"dspd_fir", 3},    {"dspd_sfir", 3},
     {"dspd_deci", 3},       {"dspd_hwfilt", 3}, {"dspd_rsmp", 3},   {"dspd_rsmp2", 4},
     {"dspi_hwfilt", 2},     {"dsph_avg", 2},    {"dsph_corr", 3},   {"dspb_corr", 3},
-    {"dsph_distortion", 2}, {"dspd_savgol", 2}, {"dspd_median", 2}, {"dspd_hampel", 3}};
+    {"dsph_distortion", 2}, {"dspd_savgol", 2}, {"dspd_median", 2}, {"dspd_hampel", 3},
+    {"dsph_stft", 2},       {"dsph_istft", 2}};
 
 /// Functions that read a whole number behind the history of a stream, where there is one.
 inline bool keeps_place(const std::string& name) {
