@@ -14,13 +14,18 @@ PROGRAM = sys.argv[1] if len(sys.argv) > 1 else "build/bin/wavkit"
 random.seed(1)
 
 
+def array_file(samples):
+    """Samples as a NumPy file holds them."""
+    head = f"{{'descr': '<f8', 'fortran_order': False, 'shape': ({len(samples)},), }}"
+    head = head.ljust(117) + "\n"
+    return (b"\x93NUMPY\x01\x00" + struct.pack("<H", len(head)) + head.encode()
+            + struct.pack(f"<{len(samples)}d", *samples))
+
+
 def measured(samples, *arguments):
     """The first signal of a report about these samples."""
     with tempfile.NamedTemporaryFile(suffix=".npy", delete=False) as file:
-        head = f"{{'descr': '<f8', 'fortran_order': False, 'shape': ({len(samples)},), }}"
-        head = head.ljust(117) + "\n"
-        file.write(b"\x93NUMPY\x01\x00" + struct.pack("<H", len(head)) + head.encode())
-        file.write(struct.pack(f"<{len(samples)}d", *samples))
+        file.write(array_file(samples))
     try:
         report = subprocess.run([PROGRAM, arguments[0], file.name, *arguments[1:], "--json"],
                                 check=True, capture_output=True).stdout
@@ -93,6 +98,64 @@ def converters(count=65536):
         print(f"| {bits} bits | {m['enob']:.3f} | {m['snr']:.2f} dB | {ideal:.2f} dB |")
 
 
-for table in (sine_fits, distortion, converters):
+def written(samples, *commands):
+    """The samples that commands make of these, one of what the other leaves; none where one fails."""
+    with tempfile.TemporaryDirectory() as folder:
+        path = os.path.join(folder, "0.npy")
+        with open(path, "wb") as file:
+            file.write(array_file(samples))
+        for i, (name, *options) in enumerate(commands, 1):
+            target = os.path.join(folder, f"{i}.npy")
+            if subprocess.run([PROGRAM, name, path, *options, "-o", target],
+                              stderr=subprocess.DEVNULL).returncode:
+                return None
+            path = target
+        with open(path, "rb") as file:
+            data = file.read()[128:]
+    return struct.unpack(f"<{len(data) // 8}d", data)
+
+
+def local_polynomials(count=1000):
+    print("| order | window | value | slope | curvature |\n|---|---|---|---|---|")
+    for order, window in ((2, 5), (3, 21), (4, 101), (9, 101), (15, 201)):
+        scale = [random.uniform(-1, 1) / (order + 1) for _ in range(order + 1)]
+        errors = []
+        for derivative in range(3):
+            factors = [math.prod(range(k - derivative + 1, k + 1)) for k in range(order + 1)]
+            x = [sum(a * (n / 1000) ** k for k, a in enumerate(scale)) for n in range(count)]
+            want = [sum(a * f * (n / 1000) ** (k - derivative)
+                        for k, (a, f) in enumerate(zip(scale, factors)) if k >= derivative)
+                    for n in range(count)]
+            got = written(x, ("smooth", "--window", str(window), "--order", str(order),
+                              "--derivative", str(derivative), "--delta", "0.001"))
+            errors.append(max(abs(a - b) for a, b in zip(got, want)))
+        print(f"| {order} | {window} | " + " | ".join(f"{e:.1e}" for e in errors) + " |")
+
+
+def outliers(count=100000):
+    print("| threshold | outliers found | others taken for some |\n|---|---|---|")
+    x = [random.gauss(0, 1) + (10 if n % 100 == 50 else 0) for n in range(count)]
+    for threshold in (3, 4, 5):
+        found = measured(x, "smooth", "--method", "hampel", "--window", "11",
+                         "--threshold", str(threshold))["outliers_at"]
+        right = sum(at % 100 == 50 for at in found)
+        print(f"| {threshold} | {100 * right / (count / 100):.1f} % "
+              f"| {100 * (len(found) - right) / (count * 0.99):.2f} % |")
+
+
+def frames(count=100000):
+    print("| window | hop 256 | hop 512 | hop 1000 |\n|---|---|---|---|")
+    x = [random.gauss(0, 1) for _ in range(count)]
+    for window in ("uniform", "Hann", "Blackman_Harris4", "Kaiser100", "P601"):
+        row = [window]
+        for hop in ("256", "512", "1000"):
+            options = ("--length", "1024", "--hop", hop, "--window", window)
+            back = written(x, ("stft", *options),
+                           ("stft", "--inverse", "--points", str(count), *options))
+            row.append(f"{max(abs(a - b) for a, b in zip(back, x)):.1e}" if back else "refused")
+        print("| " + " | ".join(row) + " |")
+
+
+for table in (sine_fits, distortion, converters, local_polynomials, outliers, frames):
     table()
     print()

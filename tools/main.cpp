@@ -54,6 +54,7 @@ void run(CLI::App& program, int argc, char** argv) {
     wavkit::tool::add_convert(program);
     wavkit::tool::add_spectrum(program);
     wavkit::tool::add_distortion(program);
+    wavkit::tool::add_stft(program);
     wavkit::tool::add_correlate(program);
     wavkit::tool::add_envelope(program);
     wavkit::tool::add_window(program);
@@ -64,6 +65,7 @@ void run(CLI::App& program, int argc, char** argv) {
     wavkit::tool::add_interp(program);
     wavkit::tool::add_design(program);
     wavkit::tool::add_filter(program);
+    wavkit::tool::add_smooth(program);
     wavkit::tool::add_generate(program);
     wavkit::tool::add_resample(program);
     wavkit::tool::add_decimate(program);

@@ -313,4 +313,120 @@ public static unsafe class DspApi
         GC.KeepAlive(output);
         return result;
     }
+
+    /// <summary>Smooths by the polynomials that fit the samples around each best (Savitzky and Golay), or
+    /// takes their derivatives.</summary>
+    /// <param name="input">The signal or its next block.</param>
+    /// <param name="output">The samples that are known by now; all of a whole signal.</param>
+    /// <param name="window">Samples that a polynomial is fitted to, an odd number.</param>
+    /// <param name="order">Of the polynomials, below the window.</param>
+    /// <param name="derivative">0 for the values, 1 for slopes and so on, in the unit of
+    /// <see cref="DspInput.Delta"/>.</param>
+    /// <param name="state">A stream, empty at first, or null for a whole signal.</param>
+    /// <param name="last">Anything but 0 ends the stream.</param>
+    /// <returns>0; -1 for an even window, an order that it does not suffice for, or a signal shorter than
+    /// it, or when memory runs out.</returns>
+    public static int dspd_savgol(DspInput input, DspInput output, int window, int order, int derivative,
+        DspInput? state, int last)
+    {
+        int result = NativeMethods.dspd_savgol(input.GetDspPtr(), output.GetDspPtr(), window, order,
+            derivative, state == null ? null : state.GetDspPtr(), last);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(state);
+        return result;
+    }
+
+    /// <summary>Takes the median of the samples around each.</summary>
+    /// <param name="input">The signal or its next block, real.</param>
+    /// <param name="output">The medians that are known by now; all of a whole signal.</param>
+    /// <param name="window">How many samples.</param>
+    /// <param name="ends">A <see cref="DspEnds"/>.</param>
+    /// <param name="state">A stream, empty at first, or null for a whole signal.</param>
+    /// <param name="last">Anything but 0 ends the stream.</param>
+    /// <returns>0; -1 for a complex signal or one shorter than the window, or when memory runs
+    /// out.</returns>
+    public static int dspd_median(DspInput input, DspInput output, int window, int ends, DspInput? state,
+        int last)
+    {
+        int result = NativeMethods.dspd_median(input.GetDspPtr(), output.GetDspPtr(), window, ends,
+            state == null ? null : state.GetDspPtr(), last);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(state);
+        return result;
+    }
+
+    /// <summary>Replaces outliers, and what is no number, by the median of the samples around
+    /// them.</summary>
+    /// <param name="input">The signal or its next block, real.</param>
+    /// <param name="output">The samples that are known by now; all of a whole signal.</param>
+    /// <param name="outliers">Where in the output they were, or null.</param>
+    /// <param name="window">How many samples.</param>
+    /// <param name="threshold">How many standard deviations, 1.4826 median deviations, a sample may be off
+    /// the median; 3 is usual.</param>
+    /// <param name="ends">A <see cref="DspEnds"/>.</param>
+    /// <param name="state">A stream, empty at first, or null for a whole signal.</param>
+    /// <param name="last">Anything but 0 ends the stream.</param>
+    /// <returns>0; -1 for a complex signal or one shorter than the window, or when memory runs
+    /// out.</returns>
+    public static int dspd_hampel(DspInput input, DspInput output, DspInput? outliers, int window,
+        double threshold, int ends, DspInput? state, int last)
+    {
+        int result = NativeMethods.dspd_hampel(input.GetDspPtr(), output.GetDspPtr(),
+            outliers == null ? null : outliers.GetDspPtr(), window, threshold, ends,
+            state == null ? null : state.GetDspPtr(), last);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(outliers);
+        GC.KeepAlive(state);
+        return result;
+    }
+
+    /// <summary>Spectra of short frames, one behind the other.</summary>
+    /// <param name="input">The signal or its next block.</param>
+    /// <param name="output">Complex rows, size / 2 + 1 bins each, or size bins of a complex signal.</param>
+    /// <param name="window">A <see cref="DspWindow"/>.</param>
+    /// <param name="size">Samples of a frame.</param>
+    /// <param name="hop">Samples from frame to frame.</param>
+    /// <param name="flags">A <see cref="DspSpectrum"/>.</param>
+    /// <param name="state">A stream, empty at first, or null for a whole signal.</param>
+    /// <param name="last">Anything but 0 ends the stream.</param>
+    /// <returns>0; -1 for a hop beyond the size or a window that does not exist, or when memory runs
+    /// out.</returns>
+    public static int dsph_stft(DspInput input, DspInput output, int window, int size, int hop, int flags,
+        DspInput? state, int last)
+    {
+        int result = NativeMethods.dsph_stft(input.GetDspPtr(), output.GetDspPtr(), window, size, hop,
+            flags, state == null ? null : state.GetDspPtr(), last);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(state);
+        return result;
+    }
+
+    /// <summary>The signal whose frames have the spectra of <see cref="dsph_stft"/>, or come nearest to
+    /// them.</summary>
+    /// <param name="input">Whole rows of bins, all or the next ones.</param>
+    /// <param name="output">The samples that are known by now; of all rows, up to the centre of the last
+    /// frame.</param>
+    /// <param name="window">That of the rows.</param>
+    /// <param name="size">That of the rows.</param>
+    /// <param name="hop">That of the rows.</param>
+    /// <param name="flags">Those of the rows; <see cref="DspSpectrum.TwoSided"/> gives a complex
+    /// signal.</param>
+    /// <param name="state">A stream, empty at first, or null for all rows.</param>
+    /// <param name="last">Anything but 0 ends the stream.</param>
+    /// <returns>0; -1 where windows that far apart lose samples, for rows that are not whole, or when
+    /// memory runs out.</returns>
+    public static int dsph_istft(DspInput input, DspInput output, int window, int size, int hop, int flags,
+        DspInput? state, int last)
+    {
+        int result = NativeMethods.dsph_istft(input.GetDspPtr(), output.GetDspPtr(), window, size, hop,
+            flags, state == null ? null : state.GetDspPtr(), last);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(state);
+        return result;
+    }
 }

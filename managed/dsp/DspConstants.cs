@@ -115,3 +115,27 @@ public enum DspResponse
     /// <summary>By how much the output comes later.</summary>
     Delay = 7,
 }
+
+/// <summary>What windows of <see cref="DspApi.dspd_median"/> and <see cref="DspApi.dspd_hampel"/> find
+/// beyond the ends of a signal.</summary>
+public enum DspEnds
+{
+    /// <summary>Nothing: they hold fewer samples there.</summary>
+    Shorter = 0,
+    /// <summary>The sample at the end over and over.</summary>
+    Hold = 1,
+    /// <summary>The signal backwards, its last sample first.</summary>
+    Mirror = 2,
+    /// <summary>Zeros.</summary>
+    Zero = 3,
+}
+
+/// <summary>Flags of <see cref="DspApi.dsph_stft"/> and <see cref="DspApi.dsph_istft"/>.</summary>
+[Flags]
+public enum DspSpectrum
+{
+    /// <summary>Half of the bins, as real signals need.</summary>
+    OneSided = 0,
+    /// <summary>All bins, the frequency 0 in the middle.</summary>
+    TwoSided = 2,
+}

@@ -4,10 +4,14 @@ using System.Runtime.CompilerServices;
 namespace Corvane.QuillonInternal.DataAnalysis;
 
 using unsafe OfFourRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, dsp_struct*, int>;
+using unsafe OfFrames = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int, int, int, dsp_struct*, int, int>;
+using unsafe OfHampel = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, int, double, int, dsp_struct*, int, int>;
+using unsafe OfMedian = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int, dsp_struct*, int, int>;
 using unsafe OfRecord = delegate* unmanaged[Cdecl]<dsp_struct*, int>;
 using unsafe OfRecordAndDouble = delegate* unmanaged[Cdecl]<dsp_struct*, double, int>;
 using unsafe OfRecordAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, int, int>;
 using unsafe OfRecordAndWindow = delegate* unmanaged[Cdecl]<dsp_struct*, int, int, double, int>;
+using unsafe OfSavgol = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int, int, dsp_struct*, int, int>;
 using unsafe OfThreeRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, double, int, int, int>;
 using unsafe OfThreeRecordsAndSegments = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, int, int, int, int, int>;
 using unsafe OfTwoRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int>;
@@ -35,6 +39,10 @@ internal static unsafe class NativeMethods
     internal static OfThreeRecordsAndSegments dsph_cross;
     internal static OfTwoRecordsAndInt dsph_response;
     internal static OfFourRecords dspd_fir;
+    internal static OfSavgol dspd_savgol;
+    internal static OfMedian dspd_median;
+    internal static OfHampel dspd_hampel;
+    internal static OfFrames dsph_stft, dsph_istft;
 
     /// <exception cref="EntryPointNotFoundException">The library lacks a function.</exception>
     internal static void Resolve(IntPtr library)
@@ -58,6 +66,11 @@ internal static unsafe class NativeMethods
         dspi_besy0 = (OfRecord)Find(nameof(dspi_besy0));
         dspi_besy1 = (OfRecord)Find(nameof(dspi_besy1));
         dspd_fir = (OfFourRecords)Find(nameof(dspd_fir));
+        dspd_savgol = (OfSavgol)Find(nameof(dspd_savgol));
+        dspd_median = (OfMedian)Find(nameof(dspd_median));
+        dspd_hampel = (OfHampel)Find(nameof(dspd_hampel));
+        dsph_stft = (OfFrames)Find(nameof(dsph_stft));
+        dsph_istft = (OfFrames)Find(nameof(dsph_istft));
         dsps_mean = (OfTwoRecords)Find(nameof(dsps_mean));
         dsps_median = (OfTwoRecords)Find(nameof(dsps_median));
         dsps_rms = (OfTwoRecords)Find(nameof(dsps_rms));

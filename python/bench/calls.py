@@ -16,6 +16,7 @@ os.environ.setdefault("OPENBLAS_NUM_THREADS", "1")
 import numpy as np
 import pyfftw
 import scipy.fft
+import scipy.ndimage
 import scipy.signal
 import wavkit
 from cffi import FFI
@@ -137,6 +138,8 @@ def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
     taps = wavkit.design("lowpass", 0.1, length=201, transition=0.02)
     planned = pyfftw.builders.rfft(x.copy(), threads=1, planner_effort="FFTW_MEASURE")
     segment, window = min(1024, points // 4), wavkit.window("hann", min(1024, points // 4))
+    frames = wavkit.stft(x, 1.0, segment)
+    bins = scipy.signal.stft(x, 1.0, window, segment, segment * 3 // 4)[2]
     whole = wavkit.window("hann", points)
     record, out = lib.Record(x), lib.Record()
     kernel = wavkit.Resampler(48000, 44100).kernel / 147
@@ -171,6 +174,16 @@ def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
             },
         ),
         (
+            "frames, hop a quarter",
+            lambda: wavkit.stft(x, 1.0, segment),
+            {"SciPy": lambda: scipy.signal.stft(x, 1.0, window, segment, segment * 3 // 4)},
+        ),
+        (
+            "signal of frames",
+            lambda: wavkit.istft(frames),
+            {"SciPy": lambda: scipy.signal.istft(bins, 1.0, window, segment, segment * 3 // 4)},
+        ),
+        (
             "filter, 201 taps",
             lambda: wavkit.filter(x, taps=taps),
             {
@@ -187,6 +200,21 @@ def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
             "envelope",
             lambda: wavkit.envelope(x),
             {"SciPy": lambda: np.abs(scipy.signal.hilbert(x))},
+        ),
+        (
+            "Savitzky-Golay, 21 samples",
+            lambda: wavkit.smooth(x, window=21),
+            {"SciPy": lambda: scipy.signal.savgol_filter(x, 21, 3)},
+        ),
+        (
+            "moving median, 9 samples",
+            lambda: wavkit.smooth(x, window=9, method="median", ends="mirror"),
+            {"SciPy": lambda: scipy.ndimage.median_filter(x, 9)},
+        ),
+        (
+            "moving median, 101 samples",
+            lambda: wavkit.smooth(x, window=101, method="median", ends="mirror"),
+            {"SciPy": lambda: scipy.ndimage.median_filter(x, 101)},
         ),
         ("median", lambda: lib.dsps_median(record, out), {"NumPy": lambda: np.median(x)}),
         ("rms", lambda: lib.dsps_rms(record, out), {"NumPy": lambda: np.sqrt(np.mean(x * x))}),

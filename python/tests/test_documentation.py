@@ -44,6 +44,7 @@ def test_every_name_has_an_example():
         "SignalPeaks",
         "Sine",
         "Error",
+        "Frames",
         "Histogram",
         "Line",
         "Peaks",

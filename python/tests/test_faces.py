@@ -1,11 +1,13 @@
 """What the functions compute, beside SciPy and NumPy."""
 
+import dataclasses
 import json
 import subprocess
 
 import numpy as np
 import pytest
 import scipy.interpolate
+import scipy.ndimage
 import scipy.optimize
 import scipy.signal
 import scipy.stats
@@ -494,3 +496,60 @@ def test_files_that_cannot_be_read(tmp_path):
     ):
         with pytest.raises(error):
             wavkit.read(tmp_path / name)
+
+
+@pytest.mark.parametrize(
+    "window, order, derivative", [(5, 2, 0), (21, 3, 1), (15, 4, 0), (9, 4, 2), (3, 1, 2)]
+)
+@pytest.mark.parametrize("x", [NOISE, np.stack((TONES, NOISE))])
+def test_local_polynomials(x, window, order, derivative):
+    found = wavkit.smooth(x, RATE, window, order=order, derivative=derivative)
+    expected = scipy.signal.savgol_filter(x, window, order, derivative, 1 / RATE)
+    close(found, expected, 1e-12)
+
+
+@pytest.mark.parametrize("window", [1, 2, 3, 8, 9, 15, 16, 31, 100, 257])
+def test_moving_medians(window):
+    for ends, mode in (("mirror", "reflect"), ("hold", "nearest"), ("zero", "constant")):
+        ranks = [
+            scipy.ndimage.rank_filter(NOISE, rank, window, mode=mode)
+            for rank in ((window - 1) // 2, window // 2)
+        ]
+        found = wavkit.smooth(NOISE, window=window, method="median", ends=ends)
+        np.testing.assert_array_equal(found, (ranks[0] + ranks[1]) * 0.5)
+    with pytest.raises(ValueError):
+        wavkit.smooth(NOISE[:window], window=window + 1, method="median")
+
+
+def test_outliers_along_an_axis():
+    x = np.stack((TONES, NOISE), axis=1)
+    clean, outlier = wavkit.replace_outliers(x, 7, 2, axis=0, ends="mirror")
+    median = scipy.ndimage.median_filter(x, (7, 1))
+    windows = np.lib.stride_tricks.sliding_window_view(
+        np.pad(x, ((3, 3), (0, 0)), "symmetric"), 7, 0
+    )
+    spread = np.median(np.abs(windows - median[..., None]), axis=-1)
+    expected = np.abs(x - median) > 2 * 1.4826 * spread
+    np.testing.assert_array_equal(outlier, expected)
+    np.testing.assert_array_equal(clean, np.where(expected, median, x))
+
+
+@pytest.mark.parametrize("size, hop", [(256, 64), (100, 50), (128, 16)])
+@pytest.mark.parametrize("x", [NOISE, COMPLEX, np.stack((TONES, NOISE))])
+def test_frames_and_back(x, size, hop):
+    frames = wavkit.stft(x, RATE, size, hop=hop)
+    settings = dict(window="hann", nperseg=size, noverlap=size - hop)
+    two_sided = np.iscomplexobj(x)
+    f, t, bins = scipy.signal.stft(x, RATE, return_onesided=not two_sided, **settings)
+    turns = np.exp(1j * np.pi * np.arange(len(f)))[:, None]  # from the begin to the centre
+    bins = bins * turns * (1 if two_sided else 2)
+    if two_sided:
+        f, bins = np.fft.fftshift(f), np.fft.fftshift(bins, axes=-2)
+    count = min(bins.shape[-1], frames.bins.shape[-1])
+    close(frames.bins[..., :count], bins[..., :count])
+    close(frames.frequency, f), close(frames.time[:count], t[:count])
+    close(wavkit.istft(frames), x, 1e-13)
+    louder = dataclasses.replace(frames, bins=2 * frames.bins)
+    close(wavkit.istft(louder), 2 * x, 1e-13)
+    with pytest.raises(wavkit.Error):
+        wavkit.istft(wavkit.stft(x, RATE, size, hop=size))  # Hann is 0 where frames meet

@@ -18,7 +18,18 @@ from ._filters import Filter, Response, design, filter, response
 from ._rates import Resampler, decimate, resample
 from ._record import Error
 from ._signals import Correlation, correlate, derive, edges, envelope, integrate, interp
-from ._spectra import Peaks, Spectrogram, Spectrum, average, spectrogram, spectrum
+from ._smooth import replace_outliers, smooth
+from ._spectra import (
+    Frames,
+    Peaks,
+    Spectrogram,
+    Spectrum,
+    average,
+    istft,
+    spectrogram,
+    spectrum,
+    stft,
+)
 from ._statistics import Histogram, Line, Stats, fit, from_roots, hist, roots, stats
 from ._tones import Distortion, SignalPeaks, Sine, distortion, fit_sine, peaks
 from ._transfer import Transfer, TransferMeter, transfer
@@ -30,6 +41,7 @@ __all__ = [
     "Distortion",
     "Error",
     "Filter",
+    "Frames",
     "Histogram",
     "Line",
     "Peaks",
@@ -59,17 +71,21 @@ __all__ = [
     "hist",
     "integrate",
     "interp",
+    "istft",
     "lib",
     "noise_bandwidth",
     "peaks",
     "read",
+    "replace_outliers",
     "resample",
     "response",
     "roots",
     "signals",
+    "smooth",
     "spectrogram",
     "spectrum",
     "stats",
+    "stft",
     "transfer",
     "window",
     "windows",

@@ -387,3 +387,79 @@ def spectrogram(
     frequency = (np.arange(layout.bins) - layout.origin) * layout.delta
     time = runs.start() + (np.arange(count) * segments.step + points / 2) * runs.delta
     return Spectrogram(frequency, time, runs.each(course))
+
+
+@dataclass(frozen=True)
+class Frames:
+    """What `stft()` returns: complex `bins[..., frequency, time]`, which `istft()` takes."""
+
+    frequency: Array
+    time: Array
+    bins: Array
+    rate: float
+    window: str
+    size: int
+    hop: int
+    points: int  #: samples of the signal
+    two_sided: bool
+
+
+def stft(
+    x: ArrayLike | Any,
+    rate: float | None = None,
+    size: int = 1024,
+    window: str = "hann",
+    *,
+    hop: int | None = None,
+    two_sided: bool = False,
+    axis: int | str = -1,
+) -> Frames:
+    """The spectra of frames of `size` samples, `hop` (a quarter of that) from one to the next, with
+    amplitudes as those of `spectrum()` and the phases at the frames' centres. Frame m is about
+    sample m hop, so that every sample is in frames about it.
+
+    >>> x = np.random.default_rng(1).normal(size=5000)
+    >>> frames = wavkit.stft(x, 8000, 512)
+    >>> frames.bins.shape, frames.time[:3]
+    ((257, 41), array([0.   , 0.016, 0.032]))
+    >>> bool(np.allclose(wavkit.istft(frames), x))
+    True
+    """
+    runs = Runs(x, rate, axis)
+    step = max(size // 4, 1) if hop is None else hop
+    full = two_sided or runs.is_complex
+    flags, number = lib.DSP_SPECTRUM_TWO_SIDED if full else 0, window_number(window)
+    if size < 2 or not 1 <= step <= size:
+        raise ValueError("a frame has 2 samples or more, and the next one begins amid or behind it")
+    count = size if full else size // 2 + 1
+    rows = runs.map(lambda x, out: call("dsph_stft", x, out, number, size, step, flags, None, 1))
+    bins = np.swapaxes(rows.reshape(*rows.shape[:-1], -1, count), -1, -2)
+    delta = 1 / (size * runs.delta)
+    frequency = (np.arange(count) - (size // 2 if full else 0)) * delta
+    time = runs.start() + np.arange(bins.shape[-1]) * (step * runs.delta)
+    return Frames(
+        frequency, time, bins, 1 / runs.delta, window, size, step, runs.points, two_sided=full
+    )
+
+
+def istft(frames: Frames) -> Array:
+    """The signal of frames, along the last axis: the one that was transformed, to rounding, or of
+    changed bins (`dataclasses.replace(frames, bins=...)`) the one that comes nearest to them.
+
+    >>> frames = wavkit.stft(np.arange(9.0), size=4, hop=2)
+    >>> wavkit.istft(frames).round(12)
+    array([0., 1., 2., 3., 4., 5., 6., 7., 8.])
+    """
+    letter = "F" if frames.bins.dtype == np.complex64 else "D"
+    rows = np.ascontiguousarray(np.swapaxes(frames.bins, -1, -2), letter)
+    if rows.shape[-1] != len(frames.frequency):
+        raise ValueError(f"frames have {len(frames.frequency)} bins, not {rows.shape[-1]}")
+    runs = Runs(rows.reshape(*rows.shape[:-2], rows.shape[-2] * rows.shape[-1]))
+    settings = (
+        window_number(frames.window),
+        frames.size,
+        frames.hop,
+        lib.DSP_SPECTRUM_TWO_SIDED if frames.two_sided else 0,
+    )
+    samples = runs.map(lambda x, out: call("dsph_istft", x, out, *settings, None, 1))
+    return samples[..., : frames.points]

@@ -77,7 +77,7 @@ class Cut : public BlockChange {
 
     bool complete() const override { return position_ >= extent_.last; }
 
-    void finish() override {
+    std::span<const double> finish() override {
         const auto end = rounded(start_ + double(position_) * step_);
         if (position_ <= extent_.first) {
             throw DataError("there is nothing to keep: the signal ends at " + end);
@@ -85,6 +85,7 @@ class Cut : public BlockChange {
         if (extent_.last != endless && position_ < extent_.last) {
             std::fprintf(stderr, "wavkit: the signal ends at %s already\n", end.c_str());
         }
+        return {};
     }
 
   private:

@@ -18,8 +18,8 @@
 #include "measure/prepare.hpp"
 #include "measure/spectrum.hpp"
 #include "measure/taps.hpp"
+#include "show/comparison.hpp"
 #include "show/labels.hpp"
-#include "show/outline.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -157,54 +157,6 @@ class Filters {
     std::optional<double> delta_;
 };
 
-/// A signal before and after, as a picture.
-class Comparison {
-  public:
-    Comparison(const FilterOptions& options, const SampleStream& stream, bool sound)
-        : options_(options),
-          axis_unit_(stream.facts_of(0).axis(sound || options.reading.rate)),
-          caption_(options.reading.chosen(sound)),
-          values_(stream.facts_of(0)),
-          before_(outline(stream)),
-          after_(before_),
-          width_(stream.channels) {}
-
-    void add(std::span<const double> in, std::span<const double> out) {
-        before_.add(in, width_);
-        after_.add(out, width_);
-    }
-
-    void draw() const {
-        std::vector panels{before_.curve(), after_.curve()};
-        panels[0].title = short_name(options_.in);
-        panels[1].title = "filtered";
-        const auto [a, b] = std::pair(*panels[0].range, *panels[1].range);
-        for (auto& panel : panels) {
-            panel.x_label = "time";
-            panel.x_unit = axis_unit_;
-            panel.y_label = values_.label("value");
-            panel.y_unit = options_.look.unit_of(values_);
-            panel.range = {std::min(a.first, b.first), std::max(a.second, b.second)};
-        }
-        panels[0].caption = caption_;
-        tool::draw(panels, options_.plot, options_.look);
-    }
-
-  private:
-    Outline outline(const SampleStream& stream) const {
-        const double start = stream.facts_of(0).start;
-        return options_.span.empty()
-                   ? Outline(stream.delta, start)
-                   : Outline(stream.delta, start, options_.span[0], options_.span[1]);
-    }
-
-    const FilterOptions& options_;
-    std::string axis_unit_, caption_;
-    Facts values_;
-    Outline before_, after_;
-    std::size_t width_;
-};
-
 /// One run of the program.
 class FilterRun {
   public:
@@ -215,7 +167,7 @@ class FilterRun {
         if (!options_.out.empty()) output_.emplace(options_.out, options_.writing);
         const auto source = open_channels(input_, options_.reading);
         while (auto* const stream = source->next()) filter(*stream, source->sound);
-        if (comparison_) comparison_->draw();
+        if (comparison_) comparison_->draw(options_.plot, options_.look);
         if (output_) output_->commit();
     }
 
@@ -225,7 +177,13 @@ class FilterRun {
         ChannelFilter filter(filtering, stream);
         const bool draws = !options_.plot.empty() && !comparison_;
         if (draws && filter.complex_output()) throw DataError("--plot draws real signals only");
-        if (draws) comparison_.emplace(options_, stream, sound);
+        if (draws) {
+            const auto facts = stream.facts_of(0);
+            comparison_.emplace(ComparisonLabels{short_name(options_.in), "filtered",
+                                                 facts.axis(sound || options_.reading.rate),
+                                                 options_.reading.chosen(sound), facts},
+                                stream.delta, options_.span, stream.channels);
+        }
         auto* const writer = output_ ? &output_->writer() : nullptr;
         if (writer)
             writer->begin({stream.delta, filter.complex_output(), stream.channels, stream.length,

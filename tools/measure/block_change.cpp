@@ -37,7 +37,7 @@ void change_all(InputFile& input, const PassOptions& options, const std::string&
             output.writer().write(change->pass(std::span(block).first(count)));
             progress.done(stream->done());
         }
-        change->finish();
+        output.writer().write(change->finish());
         output.writer().end();
     }
     output.commit();

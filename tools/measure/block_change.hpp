@@ -27,8 +27,8 @@ class BlockChange {
     /// Whether the rest of the stream does not matter.
     virtual bool complete() const { return false; }
 
-    /// Called behind the last block.
-    virtual void finish() {}
+    /// Called behind the last block; gives what is still to come.
+    virtual std::span<const double> finish() { return {}; }
 };
 
 /// From where to where.
