@@ -69,12 +69,13 @@ std::size_t extent(const R* x) {
     return x->alloc > 0 ? std::size_t(x->alloc) : used(x);
 }
 
-/// Whether two records have memory in common. One record does with itself, empty or not.
-template <Record R>
-bool shares_memory(const R* x, const R* y) {
-    if (x == y) return true;
+/// Whether two records have memory in common, whatever the precision of either. One record does
+/// with itself, empty or not.
+template <Record R, Record S>
+bool shares_memory(const R* x, const S* y) {
+    if (static_cast<const void*>(x) == y) return true;
     if (!x->data || !y->data) return false;
-    const auto address = [](const scalar<R>* p) { return reinterpret_cast<std::uintptr_t>(p); };
+    const auto address = [](const void* p) { return reinterpret_cast<std::uintptr_t>(p); };
     return address(x->data) < address(y->data + extent(y)) &&
            address(y->data) < address(x->data + extent(x));
 }

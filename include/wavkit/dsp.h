@@ -7,6 +7,7 @@
 #include "file.h"
 #include "filter.h"
 #include "generate.h"
+#include "iir.h"
 #include "interpolate.h"
 #include "layout.h"
 #include "library.h"

@@ -142,18 +142,6 @@ class AnyPlace {
     T* table_ = nullptr;
 };
 
-/// Whether blocks have memory in common, whatever the precision of either.
-template <Record R>
-bool shares_block(const R* out, const dsp* at) {
-    if constexpr (std::same_as<R, dsp>) {
-        return shares_memory(out, at);
-    } else {
-        const auto address = [](const void* p) { return reinterpret_cast<std::uintptr_t>(p); };
-        return out->data && at->data && address(out->data) < address(at->data + extent(at)) &&
-               address(at->data) < address(out->data + extent(out));
-    }
-}
-
 template <Record R>
 int resample_at(const R* in, R* out, const R* taps, int phases, const dsp* at, R* state) {
     if (length(taps) == 0 || phases < 1 || at->complex) return -1;
@@ -166,7 +154,7 @@ int resample_at(const R* in, R* out, const R* taps, int phases, const dsp* at, R
             return AnyPlace<R>(call, part, phases).run(call, &positions, parts);
         });
     };
-    return run_filter(call, what, out, state, compute, shares_block(out, at));
+    return run_filter(call, what, out, state, compute, shares_memory(out, at));
 }
 
 }  // namespace
