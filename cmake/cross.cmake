@@ -1,15 +1,39 @@
-# Debian's cross compilers, and QEMU to run what they make: WAVKIT_CROSS names the processor, as
-# ./run cross does.
+# Debian's cross compilers, and what runs their programs on this machine: WAVKIT_CROSS names the
+# platform, as ./run cross does.
 list(APPEND CMAKE_TRY_COMPILE_PLATFORM_VARIABLES WAVKIT_CROSS)
 set(CMAKE_SYSTEM_NAME Linux)
 set(CMAKE_SYSTEM_PROCESSOR ${WAVKIT_CROSS})
 set(triplet ${WAVKIT_CROSS}-linux-gnu)
+set(emulator ${WAVKIT_CROSS})
+if(WAVKIT_CROSS STREQUAL "armhf")
+  set(CMAKE_SYSTEM_PROCESSOR armv7l)
+  set(triplet arm-linux-gnueabihf)
+  set(emulator arm)
+elseif(WAVKIT_CROSS STREQUAL "windows")
+  set(CMAKE_SYSTEM_NAME Windows)
+  set(CMAKE_SYSTEM_PROCESSOR AMD64)
+  set(triplet x86_64-w64-mingw32)
+endif()
 
 set(CMAKE_C_COMPILER ${triplet}-gcc)
 set(CMAKE_CXX_COMPILER ${triplet}-g++)
-set(CMAKE_CROSSCOMPILING_EMULATOR qemu-${WAVKIT_CROSS}-static -L /usr/${triplet})
 set(CMAKE_FIND_ROOT_PATH /usr/${triplet})
 set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
 set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_PACKAGE ONLY)
+if(WAVKIT_CROSS STREQUAL "windows")
+  # With POSIX threads, which std::mutex takes; and no runtime libraries to carry along.
+  set(CMAKE_C_COMPILER ${triplet}-gcc-posix)
+  set(CMAKE_CXX_COMPILER ${triplet}-g++-posix)
+  set(CMAKE_RC_COMPILER ${triplet}-windres)
+  set(CMAKE_EXE_LINKER_FLAGS_INIT -static)
+  set(CMAKE_SHARED_LINKER_FLAGS_INIT -static)
+  set(CMAKE_CROSSCOMPILING_EMULATOR /usr/lib/wine/wine64)
+elseif(WAVKIT_CROSS STREQUAL "i686")
+  # The processor runs them itself. (Threads hang in QEMU 7.2 there.)
+  set(CMAKE_CROSSCOMPILING_EMULATOR /usr/${triplet}/lib/ld-linux.so.2
+      --library-path /usr/${triplet}/lib)
+else()
+  set(CMAKE_CROSSCOMPILING_EMULATOR qemu-${emulator}-static -L /usr/${triplet})
+endif()

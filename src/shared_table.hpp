@@ -71,7 +71,7 @@ void let_go_of_all(HeldTables<Table>& held, std::uint32_t epoch) {
 
 /// The table of a power of two, built under the lock; null when memory runs out.
 template <class Table, class Build>
-[[gnu::noinline]] const Table* add_power(std::mutex& building, std::atomic<const Table*>& published,
+[[gnu::noinline]] const Table* add_power(Mutex& building, std::atomic<const Table*>& published,
                                          const Build& build) {
     const std::lock_guard lock(building);
     const Table* table = published.load(std::memory_order_acquire);

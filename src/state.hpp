@@ -44,9 +44,30 @@ struct HeldTables {
     std::uint32_t epoch = 0;
 };
 
+/// A mutex that is ready before anything runs, as MinGW's std::mutex is not.
+#if defined(__MINGW32__)
+class Mutex {
+  public:
+    void lock() {
+        while (locked_.test_and_set(std::memory_order_acquire)) {
+            locked_.wait(true, std::memory_order_relaxed);
+        }
+    }
+    void unlock() {
+        locked_.clear(std::memory_order_release);
+        locked_.notify_one();
+    }
+
+  private:
+    std::atomic_flag locked_;
+};
+#else
+using Mutex = std::mutex;
+#endif
+
 template <class T>
 struct SharedState {
-    std::mutex building;                  // of a table, by one thread at a time
+    Mutex building;                       // of a table, by one thread at a time
     std::atomic<std::uint32_t> epoch{0};  // counts releases; what a thread held before is gone
     SharedTables<Transform<T>> transforms;
     SharedTables<T> half_turns;     // e^(-pi i k / n): what n complex bins of a real signal take

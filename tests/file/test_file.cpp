@@ -268,7 +268,7 @@ BOTH_PRECISIONS(File, TakesMemoryAsDataArrives) {
 }
 
 BOTH_PRECISIONS(File, ReportsWhatCannotBeWritten) {
-    FILE* const only_read = dspf_fopen("/dev/null", "r");
+    FILE* const only_read = dspf_fopen(null_device, "r");
     ASSERT_NE(only_read, nullptr);
     const auto x = real<R>({1, 2});
     for (const int flags : {0, 0x100, 0x200, 3, 0xFF}) {

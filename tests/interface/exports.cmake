@@ -1,10 +1,19 @@
 # Compares what the library exports with what its headers declare: the two must be the same names.
-#   cmake -DNM=<nm> -DLIBRARY=<shared library> -DHEADERS=<directory> -P exports.cmake
+#   cmake -DNM=<nm> -DOBJDUMP=<objdump> -DLIBRARY=<shared library> -DHEADERS=<directory>
+#         -P exports.cmake
 
-execute_process(COMMAND ${NM} -D --defined-only --format=posix ${LIBRARY}
-                OUTPUT_VARIABLE symbols COMMAND_ERROR_IS_FATAL ANY)
-string(REGEX MATCHALL "[^\n]+" symbols "${symbols}")
-list(TRANSFORM symbols REPLACE " .*" "" OUTPUT_VARIABLE exported)
+if(LIBRARY MATCHES "\\.dll$")
+  execute_process(COMMAND ${OBJDUMP} -p ${LIBRARY} OUTPUT_VARIABLE tables COMMAND_ERROR_IS_FATAL ANY)
+  string(REGEX REPLACE ".*Ordinal/Name Pointer. Table[^\n]*\n" "" names "${tables}")
+  string(REGEX REPLACE "\n\n.*" "\n" names "${names}")
+  string(REGEX MATCHALL "[A-Za-z0-9_]+\n" exported "${names}")
+  list(TRANSFORM exported STRIP)
+else()
+  execute_process(COMMAND ${NM} -D --defined-only --format=posix ${LIBRARY}
+                  OUTPUT_VARIABLE symbols COMMAND_ERROR_IS_FATAL ANY)
+  string(REGEX MATCHALL "[^\n]+" symbols "${symbols}")
+  list(TRANSFORM symbols REPLACE " .*" "" OUTPUT_VARIABLE exported)
+endif()
 
 file(GLOB headers ${HEADERS}/*.h)
 set(declared)

@@ -266,7 +266,7 @@ void add_own_calls(Add add) {
         return pick<R>(::dsp_window_from_str, ::dspf_window_from_str)("Hann", window);
     });
     constexpr auto open_and_close = [](R*) {
-        FILE* const file = pick<R>(::dspf_fopen, ::dspff_fopen)("/dev/null", "rb");
+        FILE* const file = pick<R>(::dspf_fopen, ::dspff_fopen)(null_device, "rb");
         return file ? pick<R>(::dspf_fclose, ::dspff_fclose)(file) : -1;
     };
     add("dspf_fopen", open_and_close);
