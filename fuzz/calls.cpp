@@ -24,12 +24,15 @@ struct Family {
     std::vector<std::string_view> beginnings;
 };
 const std::map<std::string_view, Family> families = {
-    {"calls", {16, 512, {"dsp"}}},
+    {"calls", {16, 128, {"dsp"}}},
     {"design", {4, 1024, {"dspc_", "dspi_window_fir"}}},
     {"filters", {4, 1024, {"dspd_", "dspi_hwfilt", "dspb_corr", "dspb_pmul"}}},
     {"interpolation",
      {4, 1024, {"dsp_interp", "dsp_cspline", "dspb_cspline", "dspb_inter", "dspi_edge"}}},
-    {"measures", {4, 1024, {"dsph_", "dsps_", "dspbs_"}}},
+    {"measures",
+     {4,
+      1024,
+      {"dsph_", "dspbs_", "dsps_peak", "dsps_pop", "dsps_s", "dsps_m", "dsps_l", "dsps_h"}}},
     {"polynomials",
      {4, 64, {"dsps_peval", "dsps_ps", "dsps_pc", "dsps_pr", "dspi_p", "dspb_pmul"}}},
     {"rates", {4, 1024, {"dspd_deci", "dspd_hwfilt", "dspi_hwfilt", "dspd_rsmp", "dspi_zinter"}}},

@@ -29,11 +29,11 @@ int size_output(R& a, R& b, R* out, std::int64_t points, bool complex) {
     const bool over_b = out->data && out->data == b.data;
     const bool owned = out->alloc > 0;
     const bool kept_complex = (over_a && a.complex) || (over_b && b.complex);
+    const auto kept = std::max(over_a ? length(&a) : 0, over_b ? length(&b) : 0);
 
     out->points = int(std::min(points, most));
     out->complex = complex || points > most;  // a count beyond int must not fit by being cut
-    if (over_a || over_b ? dsp_realloc(out, int(length(&a)), kept_complex) : dsp_alloc(out))
-        return -1;
+    if (over_a || over_b ? dsp_realloc(out, int(kept), kept_complex) : dsp_alloc(out)) return -1;
     if (owned && over_a) a.data = out->data;
     if (owned && over_b) b.data = out->data;
     return 0;

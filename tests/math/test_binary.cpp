@@ -205,6 +205,13 @@ BOTH_PRECISIONS(Binary, PolynomialsKeepEveryCoefficient) {
             }
         }
     }
+    // An empty record over the host's array that holds the shorter factor.
+    T host[] = {2};
+    const R factor{1, host, 0, 1, 0, 0};
+    R product{1, host, 0, 0, 0, 0};
+    ASSERT_EQ(dspb_pmul(real<R>({1, 3, 5}), &factor, &product), 0);
+    EXPECT_TRUE(is_real<R>(&product, {2, 6, 10}));
+    dsp_destroy(&product);
 }
 
 }  // namespace
