@@ -49,9 +49,9 @@ const Family* family;
 
 /// Records that may be left out, by their place among those of the function.
 const std::map<std::string_view, int> optional_records = {
-    {"dsp_interp", 2},  {"dsp_cspline", 2}, {"dspd_fir", 3},  {"dspd_sfir", 3},
-    {"dspd_deci", 3},   {"dspd_hwfilt", 3}, {"dspd_rsmp", 3}, {"dspd_rsmp2", 4},
-    {"dspi_hwfilt", 2}, {"dsph_avg", 2},    {"dsph_corr", 3}, {"dspb_corr", 3}};
+    {"dsp_interp", 2},  {"dsp_cspline", 2}, {"dspd_fir", 3},   {"dspd_sfir", 3},   {"dspd_deci", 3},
+    {"dspd_hwfilt", 3}, {"dspd_rsmp", 3},   {"dspd_rsmp2", 4}, {"dspi_hwfilt", 2}, {"dsph_avg", 2},
+    {"dsph_corr", 3},   {"dspb_corr", 3},   {"dspd_iir", 3}};
 
 /// Records that calls share, and hosts' arrays that some of them borrow.
 template <Record R>
@@ -210,7 +210,7 @@ class Arguments {
     std::vector<R*> outputs_;
     int integer_ = 0;
     scalar<R> number_ = 0;
-    std::array<double, 3> places_{};
+    std::array<double, 6> places_{};  // a row of sections, too
     dsp positions_{1, places_.data(), 0, int(places_.size()), 0, 0};
     Temporary<dsp> state_;  // of calls in single precision
 };

@@ -429,4 +429,75 @@ public static unsafe class DspApi
         GC.KeepAlive(state);
         return result;
     }
+
+    /// <summary>Designs a recursive filter as second-order sections.</summary>
+    /// <param name="sections">Rows of six samples, b0 b1 b2 a0 a1 a2, a row for each section.</param>
+    /// <param name="design">A <see cref="DspIir"/>.</param>
+    /// <param name="band">A <see cref="DspIirBand"/>; notch and peak have none.</param>
+    /// <param name="order">Of the prototype, half that of a filter for a band.</param>
+    /// <param name="f1">The edge or the lower one, in cycles per sample; of notch and peak where they
+    /// lie.</param>
+    /// <param name="f2">The upper edge of a band; of notch and peak how wide they are.</param>
+    /// <param name="ripple">Of the pass band of Chebyshev I and elliptic filters in decibels.</param>
+    /// <param name="attenuation">Of the stop band of Chebyshev II and elliptic filters in
+    /// decibels.</param>
+    /// <returns>0; -1 for what there is no design of, or when memory runs out.</returns>
+    public static int dspc_iir(DspInput sections, int design, int band, int order, double f1, double f2,
+        double ripple, double attenuation)
+    {
+        int result = NativeMethods.dspc_iir(sections.GetDspPtr(), design, band, order, f1, f2, ripple,
+            attenuation);
+        GC.KeepAlive(sections);
+        return result;
+    }
+
+    /// <summary>Filters a block by sections; the state carries a long signal from block to
+    /// block.</summary>
+    /// <param name="input">The signal.</param>
+    /// <param name="output">As many samples.</param>
+    /// <param name="sections">Rows of six samples.</param>
+    /// <param name="state">The history of the stream, empty at its start; or null.</param>
+    /// <returns>0; -1 where there are no sections, or when memory runs out.</returns>
+    public static int dspd_iir(DspInput input, DspInput output, DspInput sections, DspInput? state)
+    {
+        int result = NativeMethods.dspd_iir(input.GetDspPtr(), output.GetDspPtr(), sections.GetDspPtr(),
+            state == null ? null : state.GetDspPtr());
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(sections);
+        GC.KeepAlive(state);
+        return result;
+    }
+
+    /// <summary>Filters forwards and backwards: without delay, by the square of the gain.</summary>
+    /// <param name="input">The signal.</param>
+    /// <param name="output">As many samples.</param>
+    /// <param name="sections">Rows of six samples.</param>
+    /// <param name="extension">Samples by which the ends are continued; below 0 as many as is
+    /// usual.</param>
+    /// <returns>0; -1 where there are no sections, for a pole at 1, or when memory runs out.</returns>
+    public static int dspd_iir_zero_phase(DspInput input, DspInput output, DspInput sections, int extension)
+    {
+        int result = NativeMethods.dspd_iir_zero_phase(input.GetDspPtr(), output.GetDspPtr(),
+            sections.GetDspPtr(), extension);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(sections);
+        return result;
+    }
+
+    /// <summary>The gain of sections at any frequencies.</summary>
+    /// <param name="output">Complex, as many samples as frequencies.</param>
+    /// <param name="sections">Rows of six samples.</param>
+    /// <param name="at">Frequencies in cycles per sample.</param>
+    /// <returns>0; -1 where there are no sections, or when memory runs out.</returns>
+    public static int dspc_iir_response(DspInput output, DspInput sections, DspInput at)
+    {
+        int result = NativeMethods.dspc_iir_response(output.GetDspPtr(), sections.GetDspPtr(),
+            at.GetDspPtr());
+        GC.KeepAlive(output);
+        GC.KeepAlive(sections);
+        GC.KeepAlive(at);
+        return result;
+    }
 }

@@ -139,3 +139,39 @@ public enum DspSpectrum
     /// <summary>All bins, the frequency 0 in the middle.</summary>
     TwoSided = 2,
 }
+
+/// <summary>What <see cref="DspApi.dspc_iir"/> designs.</summary>
+public enum DspIir
+{
+    /// <summary>Flattest where it passes; 3 dB down at its edges.</summary>
+    Butterworth = 0,
+    /// <summary>Ripples where it passes.</summary>
+    Chebyshev1 = 1,
+    /// <summary>Ripples where it stops.</summary>
+    Chebyshev2 = 2,
+    /// <summary>Ripples everywhere: the steepest of its order.</summary>
+    Elliptic = 3,
+    /// <summary>Flattest delay; 3 dB down at its edges.</summary>
+    Bessel = 4,
+    /// <summary>The same with the asymptote of Butterworth's filter.</summary>
+    BesselPhase = 5,
+    /// <summary>The same with the edges of a prototype that delays by 1.</summary>
+    BesselDelay = 6,
+    /// <summary>Stops a single frequency.</summary>
+    Notch = 7,
+    /// <summary>Passes a single frequency.</summary>
+    Peak = 8,
+}
+
+/// <summary>The bands of <see cref="DspApi.dspc_iir"/>.</summary>
+public enum DspIirBand
+{
+    /// <summary>Passes what is between two edges.</summary>
+    BandPass = 0,
+    /// <summary>Stops what is between two edges.</summary>
+    BandStop = 1,
+    /// <summary>Passes what is above the edge.</summary>
+    HighPass = 2,
+    /// <summary>Passes what is below the edge.</summary>
+    LowPass = 3,
+}

@@ -14,6 +14,9 @@ using unsafe OfRecordAndWindow = delegate* unmanaged[Cdecl]<dsp_struct*, int, in
 using unsafe OfSavgol = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int, int, dsp_struct*, int, int>;
 using unsafe OfThreeRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, double, int, int, int>;
 using unsafe OfThreeRecordsAndSegments = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, int, int, int, int, int>;
+using unsafe OfRecordAndDesign = delegate* unmanaged[Cdecl]<dsp_struct*, int, int, int, double, double, double, double, int>;
+using unsafe OfThreeRecordsAlone = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, int>;
+using unsafe OfThreeRecordsAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, int, int>;
 using unsafe OfTwoRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int>;
 using unsafe OfTwoRecordsAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int>;
 using unsafe OfTwoRecordsAndPeaks = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, double, double, double, double, double, double, int>;
@@ -38,11 +41,14 @@ internal static unsafe class NativeMethods
     internal static OfThreeRecords dsph_distortion;
     internal static OfThreeRecordsAndSegments dsph_cross;
     internal static OfTwoRecordsAndInt dsph_response;
-    internal static OfFourRecords dspd_fir;
     internal static OfSavgol dspd_savgol;
     internal static OfMedian dspd_median;
     internal static OfHampel dspd_hampel;
     internal static OfFrames dsph_stft, dsph_istft;
+    internal static OfFourRecords dspd_fir, dspd_iir;
+    internal static OfRecordAndDesign dspc_iir;
+    internal static OfThreeRecordsAlone dspc_iir_response;
+    internal static OfThreeRecordsAndInt dspd_iir_zero_phase;
 
     /// <exception cref="EntryPointNotFoundException">The library lacks a function.</exception>
     internal static void Resolve(IntPtr library)
@@ -71,6 +77,10 @@ internal static unsafe class NativeMethods
         dspd_hampel = (OfHampel)Find(nameof(dspd_hampel));
         dsph_stft = (OfFrames)Find(nameof(dsph_stft));
         dsph_istft = (OfFrames)Find(nameof(dsph_istft));
+        dspd_iir = (OfFourRecords)Find(nameof(dspd_iir));
+        dspc_iir = (OfRecordAndDesign)Find(nameof(dspc_iir));
+        dspc_iir_response = (OfThreeRecordsAlone)Find(nameof(dspc_iir_response));
+        dspd_iir_zero_phase = (OfThreeRecordsAndInt)Find(nameof(dspd_iir_zero_phase));
         dsps_mean = (OfTwoRecords)Find(nameof(dsps_mean));
         dsps_median = (OfTwoRecords)Find(nameof(dsps_median));
         dsps_rms = (OfTwoRecords)Find(nameof(dsps_rms));

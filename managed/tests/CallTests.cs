@@ -41,6 +41,12 @@ public unsafe class CallTests
             [_, _, double a, double b, double c, double d, double e, double g] =>
                 ((delegate* unmanaged[Cdecl]<Record*, Record*, double, double, double, double, double,
                     double, int>)f)(r, r + 1, a, b, c, d, e, g),
+            [_, int design, int band, int order, double a, double b, double c, double d] =>
+                ((delegate* unmanaged[Cdecl]<Record*, int, int, int, double, double, double, double,
+                    int>)f)(r, design, band, order, a, b, c, d),
+            [_, _, _] => ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, int>)f)(r, r + 1, r + 2),
+            [_, _, _, int n] =>
+                ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, int, int>)f)(r, r + 1, r + 2, n),
             _ => ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, Record*, int>)f)(
                 r, r + 1, r + 2, arguments[3] == null ? null : r + 3),
         };
@@ -73,15 +79,20 @@ public unsafe class CallTests
         object?[] arguments = [.. function.GetParameters().Select(parameter =>
         {
             int place = parameter.Position;
-            if (parameter.ParameterType == typeof(double)) return (object?)2.5;
+            if (parameter.Name is "f1" or "f2") return (object?)(parameter.Name == "f1" ? 0.1 : 0.2);
+            if (parameter.Name == "attenuation") return 40.0;
+            if (parameter.Name == "order") return 3;
+            if (parameter.ParameterType == typeof(double)) return 2.5;
             if (parameter.Name == "window") return (int)DspWindow.Hann;
             if (parameter.Name == "scaleType") return (int)(DspScale.Peak | DspScale.Width);
             if (parameter.ParameterType == typeof(int)) return 4 * flag;
+            bool table = parameter.Name == "sections"; // of one row
+            int count = table ? 6 : points, kind = table ? 0 : complex;
             records[place] = new Record
-                { Delta = 0.5, Data = Samples(place), Alloc = 0, Points = points, Complex = complex, Extra = 7 };
+                { Delta = 0.5, Data = Samples(place), Alloc = 0, Points = count, Complex = kind, Extra = 7 };
             if (place == 3 && flag == 0) return null; // the filter's state, which may be missing
             return new DspInput
-                { Delta = 0.5, Data = Samples(place), Points = points, Complex = complex, Extra = (void*)7 };
+                { Delta = 0.5, Data = Samples(place), Points = count, Complex = kind, Extra = (void*)7 };
         })];
 
         Assert.Equal(CallNative(name, records, arguments), function.Invoke(null, arguments));

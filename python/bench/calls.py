@@ -143,6 +143,7 @@ def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
     whole = wavkit.window("hann", points)
     record, out = lib.Record(x), lib.Record()
     kernel = wavkit.Resampler(48000, 44100).kernel / 147
+    sections = wavkit.design_iir("lowpass", 0.1, order=8)
     return [
         (
             "real transform",
@@ -190,6 +191,16 @@ def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
                 "NumPy": lambda: np.convolve(x, taps, "same"),
                 "SciPy": lambda: scipy.signal.oaconvolve(x, taps, "same"),
             },
+        ),
+        (
+            "4 sections",
+            lambda: wavkit.Filter(sections)(x),
+            {"SciPy": lambda: scipy.signal.sosfilt(sections, x)},
+        ),
+        (
+            "4 sections, zero phase",
+            lambda: wavkit.zero_phase(x, sections),
+            {"SciPy": lambda: scipy.signal.sosfiltfilt(sections, x)},
         ),
         (
             "resample, 48 to 44.1 kHz",

@@ -49,6 +49,7 @@ def test_every_name_has_an_example():
         "Line",
         "Peaks",
         "Response",
+        "SectionResponse",
         "Signal",
         "Spectrogram",
         "Spectrum",

@@ -232,6 +232,40 @@ def test_filtering_at_once_and_by_blocks(x):
         stream(np.ones((2, 3)))
 
 
+@pytest.mark.parametrize(
+    ("prototype", "theirs"),
+    [
+        ("butter", lambda band, wn: scipy.signal.butter(5, wn, band, output="sos", fs=RATE)),
+        ("cheby1", lambda band, wn: scipy.signal.cheby1(5, 1, wn, band, output="sos", fs=RATE)),
+        ("cheby2", lambda band, wn: scipy.signal.cheby2(5, 50, wn, band, output="sos", fs=RATE)),
+        ("elliptic", lambda band, wn: scipy.signal.ellip(5, 1, 50, wn, band, False, "sos", RATE)),
+        ("bessel", lambda band, wn: scipy.signal.bessel(5, wn, band, False, "sos", "mag", RATE)),
+    ],
+)
+def test_sections(prototype, theirs):
+    noise = NOISE[:2000]
+    for band, edges in (("lowpass", (100,)), ("highpass", (200,)), ("bandstop", (100, 300))):
+        ours = wavkit.design_iir(
+            band, *edges, rate=RATE, prototype=prototype, order=5, attenuation=50
+        )
+        sos = theirs(band, edges if len(edges) > 1 else edges[0])
+        w, gain = scipy.signal.sosfreqz(sos, worN=501)
+        answer = wavkit.response_iir(ours, RATE, 501)
+        close(answer.gain[:501], gain, 1e-9), close(answer.frequency[:501], w * RATE / 2 / np.pi)
+        expected = scipy.signal.sosfilt(sos, noise)
+        stream = wavkit.Filter(ours)
+        parts = [stream(block) for block in np.split(noise, [1, 50, 700])]
+        close(np.concatenate(parts), expected, 1e-9)
+        close(wavkit.Filter(ours)(noise.astype("f4")), expected, 1e-5)
+        both = np.stack([noise, noise[::-1]])
+        close(wavkit.zero_phase(both, sos), scipy.signal.sosfiltfilt(sos, both), 1e-9)
+    for wrong in (("lowpass",), ("lowpass", 0.6), ("hilbert", 0.1), ("bandpass", 0.2, 0.1)):
+        with pytest.raises(ValueError):
+            wavkit.design_iir(*wrong)
+    with pytest.raises(ValueError, match="rows of six"):
+        wavkit.zero_phase(noise, [1.0, 0.5])
+
+
 def test_filters_delay_nothing():
     taps = wavkit.design("lowpass", 60, rate=RATE)
     expected = np.convolve(TONES, taps)[len(taps) // 2 :][:3000]

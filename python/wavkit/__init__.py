@@ -17,6 +17,7 @@ from ._files import Signal, read, signals, write
 from ._filters import Filter, Response, design, filter, response
 from ._rates import Resampler, decimate, resample
 from ._record import Error
+from ._sections import SectionResponse, design_iir, response_iir, zero_phase
 from ._signals import Correlation, correlate, derive, edges, envelope, integrate, interp
 from ._smooth import replace_outliers, smooth
 from ._spectra import (
@@ -47,6 +48,7 @@ __all__ = [
     "Peaks",
     "Resampler",
     "Response",
+    "SectionResponse",
     "Signal",
     "SignalPeaks",
     "Sine",
@@ -61,6 +63,7 @@ __all__ = [
     "decimate",
     "derive",
     "design",
+    "design_iir",
     "distortion",
     "edges",
     "envelope",
@@ -79,6 +82,7 @@ __all__ = [
     "replace_outliers",
     "resample",
     "response",
+    "response_iir",
     "roots",
     "signals",
     "smooth",
@@ -90,4 +94,5 @@ __all__ = [
     "window",
     "windows",
     "write",
+    "zero_phase",
 ]

@@ -105,7 +105,7 @@ def design(
         raise ValueError(f"a sampling rate is a number above 0, not {rate}")
     edges = [f / rate for f in (parameters[:1] if kind == "delay" else parameters)]
     if not kind.startswith("sinh"):
-        _check_edges(edges, rate)
+        check_edges(edges, rate)
     if kind in _TAPERED:
         width = None if transition is None else transition / rate
         points, width = _size(edges, width, attenuation, length)
@@ -135,7 +135,7 @@ def design(
     return result
 
 
-def _check_edges(edges: Sequence[float], rate: float) -> None:
+def check_edges(edges: Sequence[float], rate: float) -> None:
     for edge in edges:
         if not 0 < edge <= 0.5:
             raise ValueError(f"{edge * rate:g} does not lie between 0 and half the sampling rate")
@@ -173,7 +173,8 @@ class Filter:
     """A filter that goes on from block to block: the blocks' outputs are those of one call on the
     whole signal, and each output is made of the samples up to its own.
 
-    Blocks may have any shape: signals lie along the last axis, and each has its own state.
+    Blocks may have any shape: signals lie along the last axis, and each has its own state. A table
+    of six columns is one of second-order sections, of which `delay` is 0.
 
     >>> smooth = wavkit.Filter([0.5, 0.5])
     >>> smooth([1.0, 3.0]), smooth([5.0])
@@ -183,8 +184,10 @@ class Filter:
     """
 
     def __init__(self, taps: ArrayLike) -> None:
-        self.taps = _checked(taps)
-        self.delay = delay_of(self.taps)
+        given = samples_of(taps)
+        self._recursive = given.ndim == 2 and given.shape[1] == lib.DSP_IIR_VALUES
+        self.taps = np.array(given, float) if self._recursive else _checked(taps)
+        self.delay = 0 if self._recursive else delay_of(self.taps)
         self.reset()
 
     def reset(self) -> None:
@@ -196,15 +199,20 @@ class Filter:
         runs = Runs(block)
         letter = runs.array.dtype.char
         self._begin(runs.shape, letter, len(runs.rows))
-        taps = lend(in_precision_of(self.taps, letter))
-        states = iter(self._states or [Record(dtype=letter.lower())])
-        return runs.map(lambda x, out: call("dspd_fir", x, out, taps, next(states)))
+        taps = lend(self.taps.ravel() if self._recursive else in_precision_of(self.taps, letter))
+        states = iter(self._states or [self._state(letter)])
+        name = "dspd_iir" if self._recursive else "dspd_fir"
+        return runs.map(lambda x, out: call(name, x, out, taps, next(states)))
+
+    def _state(self, letter: str) -> Record:
+        """Sections run in double precision, whatever that of the signals is."""
+        return Record(dtype="d" if self._recursive else letter.lower())
 
     def _begin(self, shape: tuple[int, ...], letter: str, count: int) -> None:
         signals = (shape, letter in "fF")
         if self._of is None:
             self._of = signals
-            self._states = [Record(dtype=letter.lower()) for _ in range(count)]
+            self._states = [self._state(letter) for _ in range(count)]
         elif self._of != signals:
             raise ValueError(
                 "a block has the shape and the precision of the one before; or reset()"
