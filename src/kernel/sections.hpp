@@ -116,8 +116,13 @@ class Wavefront {
         if constexpr (W == 1) return broadcast<double, V>(in[0]);
         const auto pair = load<double, 2>(in);
         if constexpr (V == 2) return pair;
-        if constexpr (V == 4) return __builtin_shufflevector(pair, pair, 0, 1, 0, 1);
-        if constexpr (V == 8) return __builtin_shufflevector(pair, pair, 0, 1, 0, 1, 0, 1, 0, 1);
+        if constexpr (V > 2) {
+            const auto twice = __builtin_shufflevector(pair, pair, 0, 1, 0, 1);
+            if constexpr (V == 4) return twice;
+            if constexpr (V == 8) {
+                return __builtin_shufflevector(twice, twice, 0, 1, 2, 3, 0, 1, 2, 3);
+            }
+        }
     }
 
     /// The part of the inputs first, so that what they cancel to is exact.
