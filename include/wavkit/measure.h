@@ -96,6 +96,59 @@ WAVKIT_API int dspfh_fft(const dspf *in, dspf *out, int npts, float fraction, in
 WAVKIT_API int dsph_dft(const dsp *in, dsp *out, int window, int flags);
 WAVKIT_API int dspfh_dft(const dspf *in, dspf *out, int window, int flags);
 
+/** Looks at the amplitude spectrum between two frequencies as closely as wanted: dsph_dft() at M
+ *  frequencies of the caller's, by dspi_czt().
+ *
+ *      X[k] = (2/N) sum w[n] x[n] e^(-2 pi i n f[k] delta),
+ *      f[k] = first + k (last - first) / (M - 1)
+ *
+ *  A window widens every component as it does in dsph_dft(): points in between show the shape of
+ *  its lobe, and where its top lies, but separate nothing that is closer. As there, n counts from
+ *  sample N/2 unless the window is the uniform one, which does so with DSP_SPECTRUM_ROTATED or
+ *  DSP_SPECTRUM_SUM only; the factor is 1/N with DSP_SPECTRUM_TWO_SIDED and 1 with
+ *  DSP_SPECTRUM_SUM. The frequencies may lie anywhere, also below 0 and beyond half the sampling
+ *  rate.
+ *
+ *  @param in      N samples, real or complex
+ *  @param out     M complex points; `delta` = (last - first) / (M - 1), 0 for one point. May be in,
+ *                 or share its buffer.
+ *  @param points  M
+ *  @param first   in the unit of 1 / delta, a `delta` of 0 counting as 1; in double precision for
+ *                 both, as the last
+ *  @param last    frequency of the last point; does not count for a single one
+ *  @param window  identifier, see window.h
+ *  @param flags   DSP_SPECTRUM_TWO_SIDED, DSP_SPECTRUM_SUM, DSP_SPECTRUM_ROTATED; others do nothing
+ *  @return 0; -1 for an empty signal, points below 1, frequencies that are not finite, an unknown
+ *          window (nothing is then touched), or when memory runs out */
+WAVKIT_API int dsph_zoom(const dsp *in, dsp *out, int points, double first, double last, int window,
+                         int flags);
+WAVKIT_API int dspfh_zoom(const dspf *in, dspf *out, int points, double first, double last,
+                          int window, int flags);
+
+/** Measures single frequencies of a stream, block by block:
+ *
+ *      X[k] = (2/N) sum x[n] e^(-2 pi i n f[k] delta),  n = 0 .. N - 1
+ *
+ *  over the N samples of all blocks so far; 1/N with DSP_SPECTRUM_TWO_SIDED, 1 with
+ *  DSP_SPECTRUM_SUM. What Goertzel's recurrence ("An algorithm for the evaluation of finite
+ *  trigonometric series", 1958) is used for, without its growing errors: a phasor turns through 256
+ *  samples at a time, from phases that are reduced in whole numbers. Blocks of any length together
+ *  give what one call gives, to the last bit.
+ *
+ *  @param x            the next samples, real or complex; none only tell the result so far
+ *  @param frequencies  F real values in the unit of 1 / delta, a `delta` of 0 counting as 1; in
+ *                      double precision for both
+ *  @param out          F complex points, NaN where there are no samples yet, `delta` of the
+ *                      frequencies; may be x or the frequencies
+ *  @param state        of the stream, in double precision for both: empty at its start, 2 + 67 F
+ * real points afterwards, the first of them N; it shares no memory with the others
+ *  @param flags        DSP_SPECTRUM_TWO_SIDED, DSP_SPECTRUM_SUM
+ *  @return 0; -1 for complex or infinite frequencies, or none, a state that was begun with others
+ * or by something else (nothing is then touched), or when memory runs out */
+WAVKIT_API int dsph_goertzel(const dsp *x, const dsp *frequencies, dsp *out, dsp *state, int flags);
+WAVKIT_API int dspfh_goertzel(const dspf *x, const dsp *frequencies, dspf *out, dsp *state,
+                              int flags);
+
 /** Measures a tone as converters, amplifiers and generators are judged by it: its harmonics, the
  *  noise, and the strongest of what does not belong to it. 14 real points:
  *

@@ -95,6 +95,29 @@ WAVKIT_API int dspfi_rdft(dspf *x);
 WAVKIT_API int dspi_irdft(dsp *x, int odd);
 WAVKIT_API int dspfi_irdft(dspf *x, int odd);
 
+/** Evaluates the z-transform of a signal on an arc of a circle, at any number M of points, however
+ *  close (chirp-z transform: L. R. Rabiner, R. W. Schafer and C. M. Rader, 1969; by the convolution
+ *  of Bluestein, 1970):
+ *
+ *      X[k] = 1/N sum x[n] z[k]^(-n),  z[k] = radius e^(2 pi i (start + k step)),  k = 0 .. M - 1
+ *
+ *  With start 0, step 1/N and radius 1 that are the first M bins of dspi_dft(). All phases are
+ *  reduced in whole numbers before they are rounded, so that long signals and small steps lose
+ *  nothing: on the unit circle the relative error in the L2 norm stays below 20 epsilon log2(N +
+ * M). With another radius the powers radius^(-n) must stay within the precision.
+ *
+ *  The record becomes complex with M points; `delta` becomes |step| / delta, the spacing in
+ *  frequency. The time is that of three transforms of N + M points.
+ *  @param points  M
+ *  @param start   of the arc, in cycles a sample; in double precision for both, as the step
+ *  @param step    from point to point, in cycles a sample; negative steps go clockwise
+ *  @param radius  above 0; 1 for frequencies
+ *  @return 0; -1 for an empty record, points below 1, numbers that are not finite, a radius that is
+ *          not above 0, more than 2^30 points in all (nothing is then touched), or when memory runs
+ *          out */
+WAVKIT_API int dspi_czt(dsp *x, int points, double start, double step, double radius);
+WAVKIT_API int dspfi_czt(dspf *x, int points, double start, double step, double radius);
+
 /** Cosine transform of a real signal of any length N, and its inverse (Makhoul, "A fast cosine
  *  transform in one and two dimensions", 1980).
  *

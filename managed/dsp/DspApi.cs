@@ -500,4 +500,58 @@ public static unsafe class DspApi
         GC.KeepAlive(at);
         return result;
     }
+
+    /// <summary>Evaluates the z-transform of a signal on an arc of a circle, over its points.</summary>
+    /// <param name="input">The signal, which becomes complex with that many samples.</param>
+    /// <param name="points">How many points the arc has.</param>
+    /// <param name="start">The first of them, in cycles a sample.</param>
+    /// <param name="step">From one to the next, in cycles a sample.</param>
+    /// <param name="radius">Of the circle; 1 for frequencies.</param>
+    /// <returns>0; -1 for an empty signal, an arc that does not exist, or when memory runs out.</returns>
+    public static int dspi_czt(DspInput input, int points, double start, double step, double radius)
+    {
+        int result = NativeMethods.dspi_czt(input.GetDspPtr(), points, start, step, radius);
+        GC.KeepAlive(input);
+        return result;
+    }
+
+    /// <summary>Measures the amplitude spectrum between two frequencies, as closely as wanted.</summary>
+    /// <param name="input">The signal.</param>
+    /// <param name="output">The complex bins.</param>
+    /// <param name="points">How many bins.</param>
+    /// <param name="first">The frequency of the first bin.</param>
+    /// <param name="last">The frequency of the last bin.</param>
+    /// <param name="window">A <see cref="DspWindow"/>.</param>
+    /// <param name="flags">0 shows amplitudes; 2 half of them, as a two-sided spectrum does; 4 sums.</param>
+    /// <returns>0; -1 for an empty signal, frequencies or a window that do not exist, or when memory runs
+    /// out.</returns>
+    public static int dsph_zoom(DspInput input, DspInput output, int points, double first, double last,
+        int window, int flags)
+    {
+        int result = NativeMethods.dsph_zoom(input.GetDspPtr(), output.GetDspPtr(), points, first, last,
+            window, flags);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        return result;
+    }
+
+    /// <summary>Measures single frequencies of a stream, block by block.</summary>
+    /// <param name="input">The next samples.</param>
+    /// <param name="frequencies">The frequencies, real.</param>
+    /// <param name="output">A complex sample for each of them, over all samples so far.</param>
+    /// <param name="state">Empty for a fresh stream, then passed from block to block.</param>
+    /// <param name="flags">0 shows amplitudes; 2 half of them, as a two-sided spectrum does; 4 sums.</param>
+    /// <returns>0; -1 for frequencies that do not exist, a state that was begun with others, or when
+    /// memory runs out.</returns>
+    public static int dsph_goertzel(DspInput input, DspInput frequencies, DspInput output, DspInput state,
+        int flags)
+    {
+        int result = NativeMethods.dsph_goertzel(input.GetDspPtr(), frequencies.GetDspPtr(),
+            output.GetDspPtr(), state.GetDspPtr(), flags);
+        GC.KeepAlive(input);
+        GC.KeepAlive(frequencies);
+        GC.KeepAlive(output);
+        GC.KeepAlive(state);
+        return result;
+    }
 }

@@ -7,9 +7,11 @@ using unsafe OfFourRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*
 using unsafe OfFrames = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int, int, int, dsp_struct*, int, int>;
 using unsafe OfHampel = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, int, double, int, dsp_struct*, int, int>;
 using unsafe OfMedian = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int, dsp_struct*, int, int>;
+using unsafe OfFourRecordsAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, dsp_struct*, int, int>;
 using unsafe OfRecord = delegate* unmanaged[Cdecl]<dsp_struct*, int>;
 using unsafe OfRecordAndDouble = delegate* unmanaged[Cdecl]<dsp_struct*, double, int>;
 using unsafe OfRecordAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, int, int>;
+using unsafe OfRecordAndArc = delegate* unmanaged[Cdecl]<dsp_struct*, int, double, double, double, int>;
 using unsafe OfRecordAndWindow = delegate* unmanaged[Cdecl]<dsp_struct*, int, int, double, int>;
 using unsafe OfSavgol = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int, int, dsp_struct*, int, int>;
 using unsafe OfThreeRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, double, int, int, int>;
@@ -20,6 +22,7 @@ using unsafe OfThreeRecordsAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_
 using unsafe OfTwoRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int>;
 using unsafe OfTwoRecordsAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int>;
 using unsafe OfTwoRecordsAndPeaks = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, double, double, double, double, double, double, int>;
+using unsafe OfTwoRecordsAndRange = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, double, double, int, int, int>;
 using unsafe OfTwoRecordsAndSine = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, double, int, int>;
 
 /// <summary>
@@ -49,6 +52,9 @@ internal static unsafe class NativeMethods
     internal static OfRecordAndDesign dspc_iir;
     internal static OfThreeRecordsAlone dspc_iir_response;
     internal static OfThreeRecordsAndInt dspd_iir_zero_phase;
+    internal static OfRecordAndArc dspi_czt;
+    internal static OfTwoRecordsAndRange dsph_zoom;
+    internal static OfFourRecordsAndInt dsph_goertzel;
 
     /// <exception cref="EntryPointNotFoundException">The library lacks a function.</exception>
     internal static void Resolve(IntPtr library)
@@ -93,6 +99,9 @@ internal static unsafe class NativeMethods
         dsph_distortion = (OfThreeRecords)Find(nameof(dsph_distortion));
         dsph_cross = (OfThreeRecordsAndSegments)Find(nameof(dsph_cross));
         dsph_response = (OfTwoRecordsAndInt)Find(nameof(dsph_response));
+        dspi_czt = (OfRecordAndArc)Find(nameof(dspi_czt));
+        dsph_zoom = (OfTwoRecordsAndRange)Find(nameof(dsph_zoom));
+        dsph_goertzel = (OfFourRecordsAndInt)Find(nameof(dsph_goertzel));
 
         void* Find(string name) => (void*)SharedObject.Find(library, name);
     }

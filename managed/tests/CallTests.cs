@@ -47,6 +47,18 @@ public unsafe class CallTests
             [_, _, _] => ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, int>)f)(r, r + 1, r + 2),
             [_, _, _, int n] =>
                 ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, int, int>)f)(r, r + 1, r + 2, n),
+            [_, _, int n] => ((delegate* unmanaged[Cdecl]<Record*, Record*, int, int>)f)(r, r + 1, n),
+            [_, _, _, int l, int s, int w, int n] =>
+                ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, int, int, int, int, int>)f)(
+                    r, r + 1, r + 2, l, s, w, n),
+            [_, int n, double a, double b, double c] =>
+                ((delegate* unmanaged[Cdecl]<Record*, int, double, double, double, int>)f)(r, n, a, b, c),
+            [_, _, int n, double a, double b, int w, int m] =>
+                ((delegate* unmanaged[Cdecl]<Record*, Record*, int, double, double, int, int, int>)f)(
+                    r, r + 1, n, a, b, w, m),
+            [_, _, _, _, int n] =>
+                ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, Record*, int, int>)f)(
+                    r, r + 1, r + 2, r + 3, n),
             _ => ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, Record*, int>)f)(
                 r, r + 1, r + 2, arguments[3] == null ? null : r + 3),
         };

@@ -50,7 +50,7 @@ public unsafe partial class LifeCycleTests
                 Assert.Equal("DspInput", refusal.ObjectName);
                 ++places;
                 // The filter's state and the harmonics may be missing.
-                if (place.Position == 3 || place.Name == "harmonics") continue;
+                if (place is { Position: 3, Member.Name: "dspd_fir" } || place.Name == "harmonics") continue;
                 Assert.Throws<NullReferenceException>(() => Call(place.Position, null));
             }
         }

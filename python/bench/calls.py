@@ -141,6 +141,7 @@ def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
     frames = wavkit.stft(x, 1.0, segment)
     bins = scipy.signal.stft(x, 1.0, window, segment, segment * 3 // 4)[2]
     whole = wavkit.window("hann", points)
+    turn, start = np.exp(-2e-6j * np.pi), np.exp(0.2j * np.pi)
     record, out = lib.Record(x), lib.Record()
     kernel = wavkit.Resampler(48000, 44100).kernel / 147
     sections = wavkit.design_iir("lowpass", 0.1, order=8)
@@ -183,6 +184,16 @@ def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
             "signal of frames",
             lambda: wavkit.istft(frames),
             {"SciPy": lambda: scipy.signal.istft(bins, 1.0, window, segment, segment * 3 // 4)},
+        ),
+        (
+            "zoom, 1000 points",
+            lambda: wavkit.zoom(x, 1.0, 0.1, 0.11, 1000, "uniform"),
+            {"SciPy": lambda: scipy.signal.zoom_fft(x, [0.1, 0.11], 1000, fs=1.0, endpoint=True)},
+        ),
+        (
+            "czt, as many points",
+            lambda: wavkit.czt(x, points, 0.1, 1e-6),
+            {"SciPy": lambda: scipy.signal.czt(x, points, turn, start)},
         ),
         (
             "filter, 201 taps",

@@ -483,6 +483,31 @@ def test_transfer(window, points, overlap, detrend):
         wavkit.transfer(x[:50], y[:50], RATE, points)
 
 
+@pytest.mark.parametrize("x", [NOISE, COMPLEX], ids=["real", "complex"])
+def test_zoom(x):
+    n = len(x)
+    for points, start, step in ((700, 0.1, 1e-4), (5, -0.3, 0.21), (1000, 0.0, 1 / 1000)):
+        ours = n * wavkit.czt(x, points, start, step)
+        turn, begin = np.exp(-2j * np.pi * step), np.exp(2j * np.pi * start)
+        close(ours, scipy.signal.czt(x, points, turn, begin), 1e-8)
+    near = n * wavkit.czt(x, 9, 0.1, 0.02, 0.999)
+    close(near, scipy.signal.czt(x, 9, np.exp(-0.04j * np.pi), 0.999 * np.exp(0.2j * np.pi)), 1e-9)
+    seen = wavkit.zoom(np.stack([x, 2 * x], 1), RATE, 10, 20, 77, "uniform", axis=0)
+    want = scipy.signal.zoom_fft(x, [10, 20], 77, fs=RATE, endpoint=True)
+    scale = (1 if x.dtype.kind == "c" else 2) / n
+    close(seen.bins[:, 1], 2 * scale * want, 1e-9)
+    close(seen.amplitude[:, 0], np.abs(scale * want), 1e-9)
+    close(seen.frequency, np.linspace(10, 20, 77))
+    at = np.array([12.34, 17.0])
+    sums = np.exp(-2j * np.pi * np.outer(at, np.arange(n)) / RATE) @ x
+    close(wavkit.goertzel(x, at, RATE), 2 / n * sums, 1e-12)
+    assert wavkit.goertzel(x.astype("c8"), at, RATE).dtype == np.complex64
+    meter = wavkit.Goertzel(at, RATE)
+    for block in np.array_split(x, 7):
+        last = meter(block)
+    assert np.array_equal(last, wavkit.goertzel(x, at, RATE))
+
+
 @pytest.mark.parametrize("degree", [1, 2, 3, 4, 5, 9, 20])
 def test_roots(degree):
     wanted = RNG.normal(size=degree)

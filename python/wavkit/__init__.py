@@ -36,6 +36,7 @@ from ._tones import Distortion, SignalPeaks, Sine, distortion, fit_sine, peaks
 from ._transfer import Transfer, TransferMeter, transfer
 from ._version import version as __version__
 from ._windows import coherent_gain, noise_bandwidth, window, windows
+from ._zoom import Goertzel, Zoom, czt, goertzel, zoom
 
 __all__ = [
     "Correlation",
@@ -43,6 +44,7 @@ __all__ = [
     "Error",
     "Filter",
     "Frames",
+    "Goertzel",
     "Histogram",
     "Line",
     "Peaks",
@@ -57,9 +59,11 @@ __all__ = [
     "Stats",
     "Transfer",
     "TransferMeter",
+    "Zoom",
     "average",
     "coherent_gain",
     "correlate",
+    "czt",
     "decimate",
     "derive",
     "design",
@@ -71,6 +75,7 @@ __all__ = [
     "fit",
     "fit_sine",
     "from_roots",
+    "goertzel",
     "hist",
     "integrate",
     "interp",
@@ -95,4 +100,5 @@ __all__ = [
     "windows",
     "write",
     "zero_phase",
+    "zoom",
 ]

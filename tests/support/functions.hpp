@@ -94,6 +94,7 @@ inline const std::map<std::string, Cases> numbers = {
     {"dsph_fft", {{0, 1, 2, 0}, {0, 1, 0, 1}, {0, 1, 0, 4}, {0, 1, 0, 0x80}, {700, 0.5, 6, 2}}},
     {"dsph_istft", {{0, 8, 3, 0, 1}, {20, 5, 2, 2, 0}}},
     {"dsph_stft", {{2, 8, 3, 0, 1}, {20, 5, 2, 2, 0}}},
+    {"dspi_czt", {{7, 0.1, 0.01, 1}, {3, -0.2, 0.3, 1.01}}},
     {"dspi_dct", {{0}, {3}}},
     {"dspi_dft", {{0}, {1}}},
     {"dspi_edge", {{0, 4.5}}},
@@ -108,7 +109,9 @@ inline const std::map<std::string, Cases> numbers = {
     {"dspi_window_kaiser", {{3, 1}}},
     {"dspi_zpad", {{700}}},
     {"dspi_zpad2", {{700, 0x301}}},
+    {"dsph_goertzel", {{0}, {2}}},
     {"dsph_response", {{0}, {6}, {7}}},
+    {"dsph_zoom", {{5, 0.1, 0.3, 2, 0}, {1, 0.2, 0, 0, 4}}},
     {"dsps_hist", {{0, 2, 6}}},
     {"dsps_peak", {{0, 0}, {0x100, 0}, {0x1200, 2}}},
     {"dsps_peaks", {{1.05, 0.01, 2, 0.01, 0.1, 0.5}}},
@@ -130,7 +133,9 @@ inline bool keeps_place(const std::string& name) {
 }
 
 /// Functions whose last record is a state that knows what it is one of.
-inline bool begins_anew(const std::string& name) { return name == "dsph_cross"; }
+inline bool begins_anew(const std::string& name) {
+    return name == "dsph_cross" || name == "dsph_goertzel";
+}
 
 /// Writes a signal whose header is followed by zeros.
 template <class T>
