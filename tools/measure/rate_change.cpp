@@ -21,7 +21,7 @@ constexpr std::size_t most_at_once = 1 << 13;   // samples of each signal: what 
 constexpr double deepest = 1.0 / 16, steepest = 64;
 
 /// The band of a change by `ratio` in cycles an input sample.
-Band band_of(double ratio, const RateQuality& quality) {
+PassBand band_of(double ratio, const RateQuality& quality) {
     const double edge = 0.5 * std::min(ratio, 1.0);
     return {quality.band * edge, edge, quality.attenuation};
 }

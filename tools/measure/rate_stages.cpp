@@ -12,7 +12,7 @@ namespace {
 constexpr const char* doing = "changing the rate";
 
 /// A kernel of `phases` values a sample.
-Signal kernel_for(int phases, const Band& band) {
+Signal kernel_for(int phases, const PassBand& band) {
     Signal kernel;
     check(dspc_rsmp(kernel, phases, band.pass, band.stop, band.attenuation), "designing a filter");
     return kernel;
@@ -24,7 +24,7 @@ dsp view_of(std::vector<double>& samples) {
 
 class Decimation : public RateStage {
   public:
-    Decimation(std::size_t planes, int factor, const Band& band)
+    Decimation(std::size_t planes, int factor, const PassBand& band)
         : factor_(factor), taps_(kernel_for(1, band)), states_(planes) {
         // The output at the first sample comes as late as the filter delays, and others before it.
         const int delay = (taps_->points - 1) / 2;
@@ -58,7 +58,8 @@ class Decimation : public RateStage {
 /// 0, so that nothing is delayed.
 class SpectralChange : public RateStage {
   public:
-    SpectralChange(std::size_t planes, int up, int down, const Band& band) : up_(up), down_(down) {
+    SpectralChange(std::size_t planes, int up, int down, const PassBand& band)
+        : up_(up), down_(down) {
         // Taken twice as dense as the samples, the taps reach beyond half the input's rate.
         const auto taps = kernel_for(2, band);
         reach_ = std::size_t(taps->points / 4 + down_) / down_ * down_;
@@ -142,7 +143,8 @@ class SpectralChange : public RateStage {
 
 class ReadingAt : public RateStage {
   public:
-    ReadingAt(std::size_t planes, PlaceOf place, double step, std::int64_t places, const Band& band)
+    ReadingAt(std::size_t planes, PlaceOf place, double step, std::int64_t places,
+              const PassBand& band)
         : place_(std::move(place)), step_(step), places_(places), kernel_(kernel_for(rows, band)) {
         delay_ = (kernel_->points - 1) / (2.0 * rows);
         reach_ = kernel_->points / rows + 3;
@@ -224,21 +226,22 @@ bool has_small_primes(std::int64_t n) {
     return n == 1;
 }
 
-std::unique_ptr<RateStage> decimation(std::size_t planes, int factor, const Band& band) {
+std::unique_ptr<RateStage> decimation(std::size_t planes, int factor, const PassBand& band) {
     return std::make_unique<Decimation>(planes, factor, band);
 }
 
-std::unique_ptr<RateStage> spectral_change(std::size_t planes, int up, int down, const Band& band) {
+std::unique_ptr<RateStage> spectral_change(std::size_t planes, int up, int down,
+                                           const PassBand& band) {
     return std::make_unique<SpectralChange>(planes, up, down, band);
 }
 
 std::unique_ptr<RateStage> reading_at(std::size_t planes, PlaceOf place, std::int64_t places,
-                                      const Band& band) {
+                                      const PassBand& band) {
     return std::make_unique<ReadingAt>(planes, std::move(place), 0, places, band);
 }
 
 std::unique_ptr<RateStage> reading_evenly(std::size_t planes, PlaceOf place, double step,
-                                          const Band& band) {
+                                          const PassBand& band) {
     constexpr auto endless = std::numeric_limits<std::int64_t>::max();
     return std::make_unique<ReadingAt>(planes, std::move(place), step, endless, band);
 }

@@ -24,17 +24,18 @@ class RateStage {
 };
 
 /// A low-pass: edges in cycles an input sample.
-struct Band {
+struct PassBand {
     double pass, stop, attenuation;
 };
 
 /// Keeps every factor-th output of a low-pass.
-std::unique_ptr<RateStage> decimation(std::size_t planes, int factor, const Band& band);
+std::unique_ptr<RateStage> decimation(std::size_t planes, int factor, const PassBand& band);
 
 /// Changes the rate by up / down, each a product of small primes, in the spectrum: a stretch of the
 /// signal is transformed, cut off or continued with zeros, and transformed back at its new length.
 /// The band ends at half of the lower rate or before.
-std::unique_ptr<RateStage> spectral_change(std::size_t planes, int up, int down, const Band& band);
+std::unique_ptr<RateStage> spectral_change(std::size_t planes, int up, int down,
+                                           const PassBand& band);
 
 /// Whether lengths that this divides have a fast transform.
 bool has_small_primes(std::int64_t n);
@@ -48,10 +49,10 @@ using PlaceOf = std::function<SamplePlace(std::int64_t)>;
 
 /// Reads a signal, of which the band up to band.pass counts, at so many places, which ascend.
 std::unique_ptr<RateStage> reading_at(std::size_t planes, PlaceOf place, std::int64_t places,
-                                      const Band& band);
+                                      const PassBand& band);
 
 /// The same at places that are `step` apart, without end.
 std::unique_ptr<RateStage> reading_evenly(std::size_t planes, PlaceOf place, double step,
-                                          const Band& band);
+                                          const PassBand& band);
 
 }  // namespace wavkit::tool
