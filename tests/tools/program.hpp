@@ -111,6 +111,13 @@ class ProgramTest : public ::testing::Test {
     std::filesystem::path home;
 };
 
+/// The number behind the n-th time that a name stands in a line of JSON.
+inline double member(const std::string& json, const std::string& name, int n = 0) {
+    auto at = json.find("\"" + name + "\":");
+    while (n-- > 0 && at != json.npos) at = json.find("\"" + name + "\":", at + 1);
+    return at == json.npos ? NAN : std::strtod(json.c_str() + at + name.size() + 3, nullptr);
+}
+
 /// A sine that lies `cycles` times in `n` samples.
 inline Signal<dsp> sine(int n, double cycles, double amplitude, double delta = 1.0) {
     std::vector<long double> samples;

@@ -8,13 +8,6 @@ namespace {
 
 using TonesTest = ProgramTest;
 
-/// The number behind the n-th time that a name stands in a line of JSON.
-double member(const std::string& json, const std::string& name, int n = 0) {
-    auto at = json.find("\"" + name + "\":");
-    while (n-- > 0 && at != json.npos) at = json.find("\"" + name + "\":", at + 1);
-    return at == json.npos ? NAN : std::strtod(json.c_str() + at + name.size() + 3, nullptr);
-}
-
 Signal<dsp> tone(int n, double delta, double frequency,
                  const std::vector<std::pair<double, double>>& harmonics, double offset = 0) {
     std::vector<long double> x;

@@ -24,9 +24,6 @@
 namespace wavkit::tool {
 namespace {
 
-/// What a scope takes for noise, of the range between the extremes.
-constexpr double usual_hysteresis = 0.1;
-
 struct EdgesOptions {
     ReportFiles files;
     std::string out;
@@ -36,13 +33,9 @@ struct EdgesOptions {
     WriteOptions writing;
 };
 
-struct Range {
-    double low = std::numeric_limits<double>::infinity(), high = -low;
-};
-
 /// One channel in the making.
 struct Channel {
-    double level, hysteresis;
+    Crossing crossing;
     Facts facts;
     EdgeFinder finder;
     EdgeSummary summary;
@@ -117,21 +110,16 @@ class EdgesOfFile {
             ranges_.resize(first + stream->channels);
             each_finite_block(*stream, progress, [&](std::span<const double> values) {
                 for (std::size_t i = 0; i < values.size(); ++i) {
-                    auto& range = ranges_[first + i % stream->channels];
-                    range.low = std::min(range.low, values[i]);
-                    range.high = std::max(range.high, values[i]);
+                    ranges_[first + i % stream->channels].add(values[i]);
                 }
             });
         }
     }
 
     Channel channel(std::size_t signal, const Facts& facts) const {
-        const auto range = ranges_.empty() ? Range{0, 0} : ranges_[signal];
-        const bool empty = range.low > range.high;
-        const double level = options_.level.value_or(empty ? 0 : (range.low + range.high) / 2);
-        const double width = empty ? 0 : usual_hysteresis * (range.high - range.low);
-        const double hysteresis = options_.hysteresis.value_or(options_.level ? 0 : width);
-        return {level, hysteresis, facts, {level, hysteresis}, {}, {}};
+        const auto range = ranges_.empty() ? Range() : ranges_[signal];
+        const Crossing crossing(options_.level, options_.hysteresis, range);
+        return {crossing, facts, EdgeFinder(crossing), {}, {}};
     }
 
     void find_edges(SampleStream& stream, Progress& progress) {
@@ -166,8 +154,8 @@ class EdgesOfFile {
     /// there.
     static std::vector<std::pair<std::string, double>> figures(const Channel& c, double delta) {
         const auto& s = c.summary;
-        std::vector<std::pair<std::string, double>> list{{"level", c.level},
-                                                         {"hysteresis", c.hysteresis},
+        std::vector<std::pair<std::string, double>> list{{"level", c.crossing.level},
+                                                         {"hysteresis", c.crossing.hysteresis},
                                                          {"rising", s.rising()},
                                                          {"falling", s.falling()}};
         if (s.first()) list.emplace_back("first_at", c.facts.start + *s.first() * delta);

@@ -73,13 +73,9 @@ void check_usage(const SpectrumOptions& options) {
     for (const auto& picture : {report.plot, options.waterfall}) {
         options.files.check_single(report.out, picture);
     }
-    if (!options.waterfall.empty() && picture_of_name(options.waterfall) == Picture::terminal) {
-        throw UsageError("the picture of --waterfall is a .png, .svg or .pdf file");
-    }
+    check_waterfall(options.waterfall);
     check_segments(options);
-    if (!report.band.empty() && !(report.band[0] < report.band[1])) {
-        throw UsageError("--band goes from a lower to a higher frequency");
-    }
+    check_band_order(report.band);
     if (report.out.empty() && report.complex) {
         throw UsageError("--complex is for the output that -o names");
     }
@@ -127,18 +123,6 @@ std::string caption_of(const SpectrumOptions& options, const Spectrum& spectrum,
         text += ", transforms of " + std::to_string(spectrum.length);
     }
     return text;
-}
-
-/// Refuses a band without frequencies, which would look like one without peaks.
-void check_band(const SpectrumReport& report) {
-    const auto& spectrum = report.spectrum;
-    for (int i = 0; i < spectrum.bins->points; ++i) {
-        if (report.band.contains(spectrum.frequency(i))) return;
-    }
-    throw DataError("no frequency of the spectrum lies from " + rounded(report.band.low) + " to " +
-                    rounded(report.band.high) + "; it goes from " + rounded(spectrum.frequency(0)) +
-                    " to " + rounded(spectrum.frequency(spectrum.bins->points - 1)) +
-                    " in steps of " + rounded(spectrum.bins->delta));
 }
 
 /// Tells of a transform that hardly anybody wants.

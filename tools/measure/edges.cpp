@@ -6,6 +6,15 @@
 
 namespace wavkit::tool {
 
+Crossing::Crossing(std::optional<double> given_level, std::optional<double> given_hysteresis,
+                   const Range& range) {
+    constexpr double usual = 0.1;
+    const bool empty = range.low > range.high;
+    level = given_level.value_or(empty ? 0 : (range.low + range.high) / 2);
+    const double width = empty || given_level ? 0 : usual * (range.high - range.low);
+    hysteresis = given_hysteresis.value_or(width);
+}
+
 std::optional<Edge> EdgeFinder::take(double value) {
     const double before = std::exchange(before_, value), position = position_++;
     if (position == 0) {

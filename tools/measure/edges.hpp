@@ -1,6 +1,7 @@
 // Where a signal crosses a level, and what follows from that.
 #pragma once
 
+#include <limits>
 #include <optional>
 #include <vector>
 
@@ -12,17 +13,37 @@ struct Edge {
     bool rising;
 };
 
+/// The extremes of a signal.
+struct Range {
+    double low = std::numeric_limits<double>::infinity(), high = -low;
+
+    void add(double value) {
+        if (value < low) low = value;
+        if (value > high) high = value;
+    }
+};
+
+/// What is to be crossed, and how far a signal goes across it for an edge.
+struct Crossing {
+    /// As far as it is given; for the rest, halfway between the extremes by a tenth of their
+    /// distance, which is what a scope takes for noise. A level alone has no hysteresis.
+    Crossing(std::optional<double> given_level, std::optional<double> given_hysteresis,
+             const Range& range);
+
+    double level, hysteresis;
+};
+
 /// Finds the crossings of a level, sample by sample. A signal is high from the sample on at which
 /// it reaches half the hysteresis above the level, until it reaches as much below; without
 /// hysteresis until it is below. The edge lies where the line between two samples last crossed the
 /// level on the way.
 class EdgeFinder {
   public:
-    EdgeFinder(double level, double hysteresis)
-        : level_(level),
-          upper_(level + hysteresis / 2),
-          lower_(level - hysteresis / 2),
-          wide_(hysteresis > 0) {}
+    explicit EdgeFinder(const Crossing& crossing)
+        : level_(crossing.level),
+          upper_(crossing.level + crossing.hysteresis / 2),
+          lower_(crossing.level - crossing.hysteresis / 2),
+          wide_(crossing.hysteresis > 0) {}
 
     std::optional<Edge> take(double value);
 

@@ -7,6 +7,7 @@
 #include <cstdio>
 #include <filesystem>
 
+#include "base/error.hpp"
 #include "base/number.hpp"
 #include "base/progress.hpp"
 #include "base/text.hpp"
@@ -75,6 +76,29 @@ std::string SpectrumReport::frequency_unit() const { return inverse_unit(unit); 
 
 std::string SpectrumReport::quantity_unit() const {
     return tool::quantity_unit(options.density, options.decibels, value_unit, unit);
+}
+
+void check_waterfall(const std::string& picture) {
+    if (!picture.empty() && picture_of_name(picture) == Picture::terminal) {
+        throw UsageError("the picture of --waterfall is a .png, .svg or .pdf file");
+    }
+}
+
+void check_band_order(const std::vector<double>& band) {
+    if (!band.empty() && !(band[0] < band[1])) {
+        throw UsageError("--band goes from a lower to a higher frequency");
+    }
+}
+
+void check_band(const SpectrumReport& report) {
+    const auto& spectrum = report.spectrum;
+    for (int i = 0; i < spectrum.bins->points; ++i) {
+        if (report.band.contains(spectrum.frequency(i))) return;
+    }
+    throw DataError("no frequency of the spectrum lies from " + rounded(report.band.low) + " to " +
+                    rounded(report.band.high) + "; it goes from " + rounded(spectrum.frequency(0)) +
+                    " to " + rounded(spectrum.frequency(spectrum.bins->points - 1)) +
+                    " in steps of " + rounded(spectrum.bins->delta));
 }
 
 void write_output(const SpectrumReport& report) {

@@ -36,6 +36,12 @@ struct SpectrumReport {
     std::string quantity_unit() const;
 };
 
+/// Throws where a picture of spectra over time goes to a terminal, or a band upwards from above.
+void check_waterfall(const std::string& picture);
+void check_band_order(const std::vector<double>& band);
+/// Refuses a band without frequencies, which would look like one without peaks.
+void check_band(const SpectrumReport& report);
+
 /// Writes the file that the options name.
 void write_output(const SpectrumReport& report);
 void print_peaks(std::FILE* to, const SpectrumReport& report, std::size_t count);
