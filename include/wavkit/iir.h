@@ -6,15 +6,17 @@
  *      dspd_iir_zero_phase(&x, &filtered, &sections, -1);  // or at once, without delay
  *
  *  Sections are a real record of rows of six values, b0 b1 b2 a0 a1 a2, a row for each of
+ *
  *      (b0 + b1 z^-1 + b2 z^-2) / (a0 + a1 z^-1 + a2 z^-2),
+ *
  *  which signals pass one behind the other, in the order of other software's `sos` matrices. a0 is
- * 1 in designs; any other value divides its row. Any sections may be filtered by, also of sources
- * of the caller's own.
+ *  1 in designs; any other value divides its row. Any sections may be filtered by, also of sources
+ *  of the caller's own.
  *
  *  **Sections and states are records of double precision for signals of either precision, and
  *  sections run in double precision inside**, since the rounding of coefficients to single
  *  precision moves the poles of low edges visibly. Designs are computed in long double. So
- * functions that take no signal are the same under both of their names.
+ *  functions that take no signal are the same under both of their names.
  *
  *  Frequencies are in cycles per sample, 0.5 being the highest of a sampled signal; `delta` of
  *  sections is neither read nor changed. A record that is no such table (complex, with points that
@@ -108,8 +110,8 @@ WAVKIT_API int dspfc_iir(dsp *sections, int design, int band, int order, double 
 
 /** The same filter by its gain, zeros and poles.
  *  @param zpk  complex: the gain g, N zeros and N poles, so that N = (points - 1) / 2 and the
- * filter is g (z - zero) ... / ((z - pole) ...); of a conjugate pair that above the real axis comes
- * first
+ *              filter is g (z - zero) ... / ((z - pole) ...); of a conjugate pair that above the
+ *              real axis comes first
  *  @return as dspc_iir() */
 WAVKIT_API int dspc_iir_zpk(dsp *zpk, int design, int band, int order, double f1, double f2,
                             double ripple, double attenuation);
@@ -123,7 +125,7 @@ WAVKIT_API int dspfc_iir_zpk(dsp *zpk, int design, int band, int order, double f
  *  samples before, between and behind the sections from call to call: the outputs are those of one
  *  call on the whole signal, to the last bit. A fresh stream starts with an empty state, that is
  *  with zeros, or with that of dspc_iir_state(). Each call gives the state the kind of the input
- * and brings it to 2 (sections + 1) points: x[-2], x[-1] of the input, then two outputs of each
+ *  and brings it to 2 (sections + 1) points: x[-2], x[-1] of the input, then two outputs of each
  *  section, the older one first. Points behind are left.
  *
  *  Neighbouring sections work at once in the lanes of a vector, each some samples behind the one
@@ -161,7 +163,7 @@ WAVKIT_API int dspfc_iir_state(dsp *state, const dsp *sections);
  *  @param sections   rows of six values
  *  @param extension  samples at each end, no more than N - 1 being taken; below 0: three times as
  *                    many as the filter has coefficients, 2 sections + 1 less as many as the b2
- * that are 0 or the a2, whichever are fewer
+ *                    that are 0 or the a2, whichever are fewer
  *  @return 0, or -1: no sections, a pole at 1 (nothing is then touched), or memory that ran out */
 WAVKIT_API int dspd_iir_zero_phase(const dsp *in, dsp *out, const dsp *sections, int extension);
 WAVKIT_API int dspfd_iir_zero_phase(const dspf *in, dspf *out, const dsp *sections, int extension);

@@ -29,8 +29,8 @@
  *  may come out as real roots or as a pair with small imaginary parts.
  *
  *  Residuals are computed in a wider arithmetic than the samples': in double, and for double in
- * long double. Where that is no wider (Microsoft's compilers, ARM with 32 bits), only the residual
- * is as small as said. */
+ *  long double. Where that is no wider (Microsoft's compilers, ARM with 32 bits), only the
+ *  residual is as small as said. */
 #ifndef WAVKIT_POLYNOMIAL_H
 #define WAVKIT_POLYNOMIAL_H
 

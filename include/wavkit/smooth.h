@@ -1,6 +1,6 @@
 /** @file smooth.h
  *  Smoothing by windows that slide along a signal: local polynomials with their derivatives,
- * medians, and the replacement of outliers.
+ *  medians, and the replacement of outliers.
  *
  *  All three give an output for each sample, from the samples around it: of a window of w samples
  *  w / 2, rounded down, lie before it, and the rest but itself behind. Nothing is delayed:
@@ -41,9 +41,9 @@ enum {
  *  j = -h .. h, w = 2h + 1, p^(s) the derivative of order s, and p[0] to p[order] the polynomials
  *  that are orthonormal on these j. The first h outputs are those of the polynomial through the
  *  first window, the last h of that through the last one. So a polynomial of up to that order is
- * reproduced to rounding from end to end, with its derivatives. Higher orders follow peaks more
- * closely, longer windows take more noise away: of white noise a share of sqrt(c[0]) passes the
- * smoothing.
+ *  reproduced to rounding from end to end, with its derivatives. Higher orders follow peaks more
+ *  closely, longer windows take more noise away: of white noise a share of sqrt(c[0]) passes the
+ *  smoothing.
  *
  *  A NaN or an infinity spoils the w outputs around it, in the first or last window h more.
  *
@@ -58,9 +58,9 @@ enum {
  *                     the order is 0.
  *  @param state       the stream, or null
  *  @param last        whether the signal ends with this block
- *  @return 0; -1 for an even window, an order that it does not suffice for, a negative derivative,
- *          or a signal that ends with fewer than w samples (nothing is then touched), or when
- * memory runs out */
+ *  @return 0; -1 for an even window, an order that it does not suffice for, a negative
+ *          derivative, or a signal that ends with fewer than w samples (nothing is then
+ *          touched), or when memory runs out */
 WAVKIT_API int dspd_savgol(const dsp *in, dsp *out, int window, int order, int derivative,
                            dsp *state, int last);
 WAVKIT_API int dspfd_savgol(const dspf *in, dspf *out, int window, int order, int derivative,
@@ -73,8 +73,8 @@ WAVKIT_API int dspfd_savgol(const dspf *in, dspf *out, int window, int order, in
  *  window is. A zero comes out as +0.
  *
  *  A sample takes O(log w) in calls that bring no fewer than w samples, whatever the signal is
- * like; short windows are sorted by networks, several side by side, longer ones by way of sorted
- * blocks. A block of fewer samples takes as long as one of w.
+ *  like; short windows are sorted by networks, several side by side, longer ones by way of sorted
+ *  blocks. A block of fewer samples takes as long as one of w.
  *
  *  See J. Suomela, "Median filtering is equivalent to sorting", 2014.
  *  @param in      real
@@ -83,9 +83,9 @@ WAVKIT_API int dspfd_savgol(const dspf *in, dspf *out, int window, int order, in
  *  @param ends    DSP_ENDS_... constant
  *  @param state   the stream, or null
  *  @param last    whether the signal ends with this block
- *  @return 0; -1 for a complex signal, a window below 1, ends that are none of the constants, or a
- *          signal that ends with fewer than w samples (nothing is then touched), or when memory
- * runs out */
+ *  @return 0; -1 for a complex signal, a window below 1, ends that are none of the constants, or
+ *          a signal that ends with fewer than w samples (nothing is then touched), or when
+ *          memory runs out */
 WAVKIT_API int dspd_median(const dsp *in, dsp *out, int window, int ends, dsp *state, int last);
 WAVKIT_API int dspfd_median(const dspf *in, dspf *out, int window, int ends, dspf *state, int last);
 
@@ -96,8 +96,8 @@ WAVKIT_API int dspfd_median(const dspf *in, dspf *out, int window, int ends, dsp
  *      |x[n] - m| > threshold 1.4826 d
  *
  *  1.4826 d being the standard deviation where the noise is Gaussian. A NaN is an outlier as well;
- * in windows it stands behind all numbers, and behind all deviations. Where m is no finite number,
- * the sample stays as it is.
+ *  in windows it stands behind all numbers, and behind all deviations. Where m is no finite number,
+ *  the sample stays as it is.
  *
  *  A sample takes O(log w) and moving less than w samples in memory.
  *

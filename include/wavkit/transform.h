@@ -68,13 +68,13 @@ WAVKIT_API int dspfi_rfft(dspf *x);
 WAVKIT_API int dspi_irfft(dsp *x);
 WAVKIT_API int dspfi_irfft(dspf *x);
 
-/** Transforms a signal of any length N; a real one becomes complex first.
- *  Fewer than two points are left as they are (a real record stays real), but for `delta`. Powers
- *  of two go through dspi_fft(), products of 2, 3, 5, 7, 11 and 13 through passes of these radices;
- * other lengths are a convolution with a chirp (Bluestein, "A linear filtering approach to the
- *  computation of discrete Fourier transform", 1970), some ten times as long. For all but powers of
- *  two the record grows to 2^m >= 2N - 2 complex points; it keeps that capacity, and `points` is N
- *  again. The relative error in the L2 norm stays below 10 epsilon log2(N).
+/** Transforms a signal of any length N; a real one becomes complex first. Fewer than two points are
+ *  left as they are (a real record stays real), but for `delta`. Powers of two go through
+ *  dspi_fft(), products of 2, 3, 5, 7, 11 and 13 through passes of these radices; other lengths are
+ *  a convolution with a chirp (Bluestein, "A linear filtering approach to the computation of
+ *  discrete Fourier transform", 1970), some ten times as long. For all but powers of two the record
+ *  grows to 2^m >= 2N - 2 complex points; it keeps that capacity, and `points` is N again. The
+ *  relative error in the L2 norm stays below 10 epsilon log2(N).
  *  @param inverse  DSP_TRANSFORM_FORWARD, or anything else for the inverse
  *  @return 0, or -1 when memory runs out or N exceeds 2^29 + 1 */
 WAVKIT_API int dspi_dft(dsp *x, int inverse);

@@ -67,7 +67,7 @@ typedef struct dspf {
 
 /** @cond */
 /* The layout is part of the binary interface. With pointers of 4 bytes, the `extra` of a ::dspf
- * record lies where the platform aligns integers of 64 bits. */
+   record lies where the platform aligns integers of 64 bits. */
 #ifdef __cplusplus
 #define WAVKIT_ASSERT static_assert
 #define WAVKIT_ALIGNOF alignof
