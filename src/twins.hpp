@@ -87,6 +87,17 @@ inline int dsph_dft(const dspf* in, dspf* out, int window, int flags) {
     return dspfh_dft(in, out, window, flags);
 }
 
+inline int dspc_rsmp(dspf* h, int phases, float pass, float stop, float attenuation) {
+    return dspfc_rsmp(h, phases, pass, stop, attenuation);
+}
+inline int dspd_iir(const dspf* in, dspf* out, const dsp* sections, dsp* state) {
+    return dspfd_iir(in, out, sections, state);
+}
+inline int dspd_rsmp2(const dspf* in, dspf* out, const dspf* kernel, int phases, const dsp* at,
+                      dspf* state) {
+    return dspfd_rsmp2(in, out, kernel, phases, at, state);
+}
+
 inline int dspc_line(dspf* x, float slope, float offset) { return dspfc_line(x, slope, offset); }
 
 inline int dsps_sum(const dspf* x, dspf* out) { return dspfs_sum(x, out); }

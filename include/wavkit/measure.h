@@ -1,7 +1,7 @@
 /** @file measure.h
  *  Measurement spectra: amplitudes of a windowed signal, harmonics and noise of a tone, the
- *  response between two signals, short-time spectra and back, running averages, sliding
- *  correlation.
+ *  response between two signals, short-time spectra and back, signals over the angle of a shaft,
+ *  running averages, sliding correlation.
  *
  *  These functions put those of the other headers together in the order that a measurement needs:
  *  dsph_fft() windows a time record, pads it to a power of two and transforms it so that a sine of
@@ -215,15 +215,15 @@ enum {
  *  transform for the estimation of power spectra", 1967).
  *
  *  Segments of `length` samples begin at every `step`-th one of the stream. Through a window of
- * mean square 1, and transformed at their own length to X and Y, they add to the sums of |X|^2,
- * |Y|^2 and conj(X) Y at the frequencies 0 .. 1 / (2 delta).
+ *  mean square 1, and transformed at their own length to X and Y, they add to the sums of |X|^2,
+ *  |Y|^2 and conj(X) Y at the frequencies 0 .. 1 / (2 delta).
  *
  *  A stream goes on from block to block, with blocks of any length: the state keeps the samples
- * that a next segment begins with, and all blocks together leave what one call leaves, to the last
- * bit. It is a record in double precision for both, empty for a fresh stream, of 4 (length / 2 + 1)
- * + 2 length + 6 real points afterwards: segments so far, the four numbers of the call, the samples
- *  that are kept (below 0: that are still to be passed over), the sums, and these samples. It takes
- *  the `delta` of the first block of x, and must share no memory with x and y.
+ *  that a next segment begins with, and all blocks together leave what one call leaves, to the last
+ *  bit. It is a record in double precision for both, empty for a fresh stream, of 4 (length / 2 +
+ *  1) + 2 length + 6 real points afterwards: segments so far, the four numbers of the call, the
+ *  samples that are kept (below 0: that are still to be passed over), the sums, and these samples.
+ *  It takes the `delta` of the first block of x, and must share no memory with x and y.
  *
  *  @param x,y     as many real samples, of the input and of the output of what lies in between
  *  @param state   the sums
@@ -254,10 +254,10 @@ enum {
 
 /** Tells the response from x to y, and how far it is one, from the state of dsph_cross().
  *
- *  Spectra have length / 2 + 1 points, from 0 to half the sampling rate in steps of `delta` =
- *  1 / (length delta); densities are one-sided and per unit of frequency. A bin without any power
- * is NaN where it is divided by. The coherence of a single segment is 1 everywhere, that of n
- * segments without any connection about 1/n.
+ *  Spectra have length / 2 + 1 points, from 0 to half the sampling rate in steps of `delta` = 1 /
+ *  (length delta); densities are one-sided and per unit of frequency. A bin without any power is
+ *  NaN where it is divided by. The coherence of a single segment is 1 everywhere, that of n
+ *  segments without any connection about 1/n.
  *
  *  The delay is the one whose line fits the angles of all bins best, weighted by what their
  *  coherence says of them (C. H. Knapp and G. C. Carter, "The generalized correlation method for
@@ -281,20 +281,20 @@ WAVKIT_API int dspfh_response(const dsp *state, dspf *out, int kind);
  *  n = -(size / 2), rounded down, to (size - 1) / 2 from the frame's centre, w a window of mean 1.
  *  Rows of a complex signal, and with DSP_SPECTRUM_TWO_SIDED, have all `size` bins with the
  *  frequency 0 at index size / 2 and no factor 2. Before and behind the signal there are zeros. Of
- * N samples there are (N - 1) / hop, rounded up, and 1 more frames: the last centre does not lie
+ *  N samples there are (N - 1) / hop, rounded up, and 1 more frames: the last centre does not lie
  *  before the last sample, so that dsph_istft() has them all.
  *
  *  **Streams.** A long signal goes block by block with one state record, empty at first; `last`
- * says that the signal ends with this block, and empties the state for the next signal. A row comes
- * when the samples of its frame are there. All rows together are those of one call on the whole
- * signal, bit for bit. Without a state the block is the whole signal.
+ *  says that the signal ends with this block, and empties the state for the next signal. A row
+ *  comes when the samples of its frame are there. All rows together are those of one call on the
+ *  whole signal, bit for bit. Without a state the block is the whole signal.
  *
  *  See J. B. Allen and L. R. Rabiner, "A unified approach to short-time Fourier analysis and
  *  synthesis", 1977.
  *  @param in      real or complex
  *  @param out     complex, the rows one behind the other; `delta` = 1 / (size delta), that of the
- * bins. May share the buffer of in or state; an output that is the state holds the output in the
- * end.
+ *                 bins. May share the buffer of in or state; an output that is the state holds the
+ *                 output in the end.
  *  @param window  identifier, see window.h
  *  @param size    samples of a frame, from 2 on (in single precision up to 2^24); fast for whatever
  *                 has small prime factors
@@ -310,16 +310,16 @@ WAVKIT_API int dspfh_stft(const dspf *in, dspf *out, int window, int size, int h
                           dspf *state, int last);
 
 /** The signal whose frames have the spectra of dsph_stft(), or of spectra that have been changed
- * the one that comes nearest to them in the sense of least squares: with y[m, n] the samples of row
- * m,
+ *  the one that comes nearest to them in the sense of least squares: with y[m, n] the samples of
+ *  row m,
  *
  *      x[t] = sum over m of w[t - m hop] y[m, t - m hop] / sum over m of w[t - m hop]^2
  *
  *  Of M rows (M - 1) hop + 1 samples come back, up to the last frame's centre: the first N are the
  *  signal, to rounding. Window and hop must allow it: the squares of the windows must add up to
- * more than nothing (1e-10 of the most) at every sample, which a uniform window does up to hop =
- * size, and Hann's, whose first sample is 0, up to size - 1. Where they add up to little, rounding
- * weighs by the root of what they add up to elsewhere over it: half a frame is a good hop.
+ *  more than nothing (1e-10 of the most) at every sample, which a uniform window does up to hop =
+ *  size, and Hann's, whose first sample is 0, up to size - 1. Where they add up to little, rounding
+ *  weighs by the root of what they add up to elsewhere over it: half a frame is a good hop.
  *
  *  Streams go block by block, of whole rows, as with dsph_stft(). Samples come when no later frame
  *  adds to them and they do not lie behind the last centre.
@@ -328,17 +328,49 @@ WAVKIT_API int dspfh_stft(const dspf *in, dspf *out, int window, int size, int h
  *  1984.
  *  @param in      complex, whole rows
  *  @param out     real, or complex with DSP_SPECTRUM_TWO_SIDED; `delta` = 1 / (size delta). May
- * share the buffer of in or state; an output that is the state holds the output in the end.
+ *                 share the buffer of in or state; an output that is the state holds the output in
+ *                 the end.
  *  @param window,size,hop,flags  those that the rows were made with
  *  @param state   sums over frames that are not complete, or null
  *  @param last    whether the signal ends with this block
  *  @return 0; -1 for another size or hop, an unknown window, one that does not add up, rows that
- * are not whole or real, a state of other frames (out is then empty or as it was), or when memory
- *          runs out */
+ *          are not whole or real, a state of other frames (out is then empty or as it was), or
+ *          when memory runs out */
 WAVKIT_API int dsph_istft(const dsp *in, dsp *out, int window, int size, int hop, int flags,
                           dsp *state, int last);
 WAVKIT_API int dspfh_istft(const dspf *in, dspf *out, int window, int size, int hop, int flags,
                            dspf *state, int last);
+
+/** Reads a signal of a machine at equal angles of its shaft instead of equal times, so that what
+ *  comes so many times a revolution keeps its place in the spectrum while the speed changes: order
+ *  tracking. The pulses of a tachometer say how far the shaft has turned. A cubic spline over their
+ *  number, with not-a-knot ends, has the time of every angle between them, and a kernel that passes
+ *  nine tenths of half the sampling rate reads the signal there (dspd_rsmp2()): out[m] lies m /
+ *  angles revolutions behind the first pulse, the last one at the last pulse or before.
+ *
+ *  An order above angles / 2 folds back. With no fewer angles than the longest revolution has
+ *  samples there is no such order in the signal. While a revolution takes S samples, orders up to
+ *  0.45 S are in the band. dsph_dft() of whole revolutions, or the average of such spectra, shows
+ *  the orders: a bin is the reciprocal of the number of revolutions.
+ *
+ *  A pulse that is missing, or one too many, makes the spline swing for some pulses around it.
+ *
+ *  See K. R. Fyfe and E. D. S. Munck, "Analysis of computed order tracking", 1997.
+ *  @param x               signal, real or complex; beyond its ends there are zeros
+ *  @param out             the points that fit, complex if x is; `delta` = 1 / angles, in
+ *                         revolutions. May be x
+ *  @param pulses          places of the pulses in samples from the first one of x, ascending, at
+ *                         least 5; a real record, in double precision for both
+ *  @param per_revolution  pulses in a revolution, which need not be whole
+ *  @param angles          points a revolution; below 1: the smallest power of two that is no less
+ *                         than the samples of the longest revolution
+ *  @return 0; -1 for pulses that are fewer, complex, or do not ascend, for a number of them that is
+ *          not above 0, or more than 2147483647 points (nothing is then touched), or when memory
+ *          runs out */
+WAVKIT_API int dsph_rsmp_angle(const dsp *x, dsp *out, const dsp *pulses, double per_revolution,
+                               int angles);
+WAVKIT_API int dspfh_rsmp_angle(const dspf *x, dspf *out, const dsp *pulses, float per_revolution,
+                                int angles);
 
 /** What `flags` of dsph_avg() is put together from: one type and any of the last two. */
 enum {
