@@ -112,6 +112,25 @@ WAVKIT_API int dspfc_fir2(dspf *h, int type);
 WAVKIT_API int dspi_window_fir(dsp *h, int window, double bw);
 WAVKIT_API int dspfi_window_fir(dspf *h, int window, float bw);
 
+/** Designs a filter that integrates once or twice without drift, as from acceleration to velocity
+ *  and on to displacement: its gain is (2 pi i f)^-times from `low` to 0.45 cycles a sample, to
+ *  some 1e-5 of it, and 0 up to half of `low`. An offset gives 0, and so does what grows evenly
+ *  where there are two integrals. All frequencies are delayed alike, by half the number of taps.
+ *
+ *  The gain is sampled, with steps like the integral of a Gaussian from 0 to what passes, and
+ *  transformed, by L. R. Rabiner's "The frequency sampling method for nonrecursive filters" (1970).
+ *  For samples `delta` apart, the taps are to be multiplied by delta^times.
+ *
+ *  A complex record stays complex, with imaginary parts 0.
+ *  @param h      2 ceil(13.5 / low) + 1 taps, odd for one integral and even for two; a borrowed
+ *                buffer is replaced
+ *  @param times  1 or 2
+ *  @param low    in cycles a sample, above 0, no more than 0.4
+ *  @return 0; -1 for other integrals, another edge or one too low for 2^30 points (nothing is then
+ *          touched), or when memory runs out */
+WAVKIT_API int dspc_integrator(dsp *h, int times, double low);
+WAVKIT_API int dspfc_integrator(dspf *h, int times, float low);
+
 /** Filters a block of samples x: out[n] = sum over k of taps[k] x[n - k], k = 0 .. M - 1.
  *
  *  A long signal is filtered block by block with one state record, which carries the M - 1 samples
