@@ -10,6 +10,7 @@
 #include "iir.h"
 #include "interpolate.h"
 #include "layout.h"
+#include "levels.h"
 #include "library.h"
 #include "math.h"
 #include "measure.h"

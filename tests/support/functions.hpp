@@ -72,9 +72,13 @@ inline const std::map<std::string, Cases> numbers = {
     {"dspb_cspline_2d", {{0, 0, 0, 0}, {1, 2, 3, 2}}},
     {"dspc_fir", {{3}, {4, 0}, {7, 0.05}}},
     {"dspc_fir2", {{100}, {101}}},
+    {"dspc_integrator", {{1, 0.3}, {2, 0.25}}},
+    {"dspc_octave", {{1000, 3, 48000}}},
+    {"dspc_octaves", {{3, 100, 5000}}},
     {"dspc_rand", {{0}, {1}, {3}}},
     {"dspc_rsmp", {{2, 0.2, 0.8, 40}}},
     {"dspc_rsmp_pcos", {{3, 0.4, 2}}},
+    {"dspc_weighting", {{1, 48000}, {2, 8000}}},
     {"dspd_deci", {{1}, {3}}},
     {"dspd_hampel", {{3, 1, 0, 0}, {18, 3, 2, 1}}},
     {"dspd_iir_zero_phase", {{-1}, {3}}},
@@ -280,6 +284,17 @@ void add_own_calls(Add add) {
         Signal<dsp> state;
         return status(dsph_cross(x, x, state, 4, 2, DSP_WINDOW_HANN, 0) ||
                       dsph_response(state, out, kind));
+    });
+    add("dsph_levels", [](const R* x, R* out) {
+        Signal<dsp> state, weighting;
+        return status(
+            pick<R>(::dspc_weighting, ::dspfc_weighting)(weighting, DSP_WEIGHTING_C, 8000) ||
+            dsph_levels(x, out, weighting, 2, 1, state) ||
+            dsph_levels(x, out, weighting, 2, 1, state));
+    });
+    add("dsph_rsmp_angle", [](const R* x, R* out) {
+        const auto pulses = real<dsp>({0.25, 1, 2, 4.5, 7.5});
+        return dsph_rsmp_angle(x, out, pulses, 2, 0);
     });
     add("dspc_iir", [](R*) {
         Signal<dsp> rows;
