@@ -78,6 +78,8 @@ void run(CLI::App& program, int argc, char** argv) {
     wavkit::tool::add_edges(program);
     wavkit::tool::add_peaks(program);
     wavkit::tool::add_response(program);
+    wavkit::tool::add_orders(program);
+    wavkit::tool::add_levels(program);
     wavkit::tool::add_help(program);
     wavkit::tool::offer_skipping(program);
     if (argc > 1 && argv[1][0] != '-') wavkit::tool::check_command(program, argv[1]);

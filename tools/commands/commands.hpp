@@ -33,6 +33,8 @@ void add_integrate(CLI::App& program);
 void add_edges(CLI::App& program);
 void add_peaks(CLI::App& program);
 void add_response(CLI::App& program);
+void add_orders(CLI::App& program);
+void add_levels(CLI::App& program);
 
 void add_help(CLI::App& program);
 

@@ -1,13 +1,19 @@
 // wavkit derive and integrate: slopes of a signal, and the area below it.
+#include <wavkit/dsp.h>
+
 #include <algorithm>
+#include <cmath>
 #include <memory>
+#include <optional>
 #include <vector>
 
 #include "base/error.hpp"
 #include "base/number.hpp"
+#include "base/options.hpp"
 #include "base/progress.hpp"
 #include "commands/commands.hpp"
 #include "measure/calculus.hpp"
+#include "measure/channel_filter.hpp"
 #include "measure/prepare.hpp"
 
 namespace wavkit::tool {
@@ -29,10 +35,11 @@ std::vector<double> means_of(SampleStream& stream, Progress& progress) {
 }
 
 /// The unit of a slope or of an area, where that of the values is known.
-void change_unit(SignalShape& shape, const char* between) {
-    for (auto& facts : shape.facts) {
+void change_unit(std::vector<Facts>& all, const std::string& between,
+                 const std::string& behind = "") {
+    for (auto& facts : all) {
         const auto axis = facts.axis_unit;
-        facts.unit = facts.unit.empty() || axis.empty() ? "" : facts.unit + between + axis;
+        facts.unit = facts.unit.empty() || axis.empty() ? "" : facts.unit + between + axis + behind;
     }
 }
 
@@ -46,17 +53,63 @@ void derive(const DeriveOptions& options) {
         options.files, "differentiating", [&](const SampleStream& stream, SignalShape& shape) {
             if (!(stream.delta > 0))
                 throw DataError("a spacing of " + number(stream.delta) + " has no slopes");
-            change_unit(shape, "/");
+            change_unit(shape.facts, "/");
             return std::make_unique<Derivative>(stream.delta, stream.width(), options.from_zero);
         });
 }
 
 struct IntegrateOptions {
     PassOptions files;
-    bool detrend = false;
+    bool detrend = false, twice = false;
+    std::optional<double> highpass;
 };
 
+/// The filter that integrates what a stream holds above the edge.
+Filtering integrator_for(const SampleStream& stream, const IntegrateOptions& options) {
+    if (!(std::isnormal(stream.delta) && stream.delta > 0)) {
+        throw DataError("a spacing of " + number(stream.delta) + " has no frequencies");
+    }
+    const int times = options.twice ? 2 : 1;
+    Filtering filtering;
+    filtering.hold = true;
+    if (dspc_integrator(filtering.taps, times, *options.highpass * stream.delta) != 0) {
+        throw DataError("--highpass " + number(*options.highpass) +
+                        " is no edge for a sampling rate of " + rounded(1 / stream.delta) +
+                        ": it takes some 1e-7 to 0.4 of it");
+    }
+    check(dspi_scale(filtering.taps, std::pow(stream.delta, times)), "integrating");
+    filtering.delay = delay_of(filtering.taps);
+    return filtering;
+}
+
+void integrate_without_drift(const IntegrateOptions& options) {
+    const auto& files = options.files;
+    InputFile input(files.in);
+    SignalOutput output(files.out, files.writing);
+    const auto source = open_channels(input, files.reading);
+    while (auto* const stream = source->next()) {
+        const auto filtering = integrator_for(*stream, options);
+        ChannelFilter filter(filtering, *stream);
+        auto facts = stream->facts;
+        change_unit(facts, " ", options.twice ? "²" : "");
+        output.writer().begin({stream->delta, filter.complex_output(), stream->channels,
+                               stream->length, std::move(facts)});
+        Progress progress("integrating " + input.name());
+        filter.run([&](std::span<const double>, std::span<const double> out) {
+            output.writer().write(out);
+            progress.done(stream->done());
+        });
+        output.writer().end();
+    }
+    output.commit();
+}
+
 void integrate(const IntegrateOptions& options) {
+    if (options.twice && !options.highpass) throw UsageError("--twice goes with --highpass");
+    if (options.highpass && options.detrend) {
+        throw UsageError("--highpass takes the mean out by itself, without --detrend");
+    }
+    if (options.highpass) return integrate_without_drift(options);
     std::vector<std::vector<double>> means;
     const auto look = [&](SignalSource& source) {
         Progress progress("reading " + source.name());
@@ -64,7 +117,7 @@ void integrate(const IntegrateOptions& options) {
     };
     std::size_t signal = 0;
     const auto make = [&](const SampleStream& stream, SignalShape& shape) {
-        change_unit(shape, " ");
+        change_unit(shape.facts, " ");
         auto offsets = options.detrend ? means.at(signal++) : std::vector<double>(stream.width());
         return std::make_unique<Integral>(stream.delta, std::move(offsets));
     };
@@ -84,12 +137,18 @@ Examples:
 
 constexpr const char* about_integrate =
     R"(Every sample becomes the sum of all up to it, times the spacing. An offset in the signal makes a
-slope in the integral: --detrend takes the mean of the whole signal out first. Every signal of a file
-is taken, and all channels. The recording may be longer than memory.
+slope in the integral: --detrend takes the mean of the whole signal out first.
+
+--highpass F integrates what lies above F, up to 0.45 of the sampling rate, to 1e-5, and stops offsets
+and what is slower than half of F: velocity from acceleration, and with --twice displacement, without
+drift. Phases stay as they are; 13.5 periods of F at either end are not to be trusted.
+
+Every signal of a file is taken, and all channels. The recording may be longer than memory.
 
 Examples:
   wavkit integrate acceleration.wav --detrend -o speed.wav
-  wavkit integrate flow.csv --time -o volume.csv --with-time)";
+  wavkit integrate flow.csv --time -o volume.csv --with-time
+  wavkit integrate acceleration.wav --highpass 2 --twice -o displacement.wav)";
 
 }  // namespace
 
@@ -109,6 +168,11 @@ void add_integrate(CLI::App& program) {
     const auto options = std::make_shared<IntegrateOptions>();
     options->files.declare(*command);
     command->add_flag("--detrend", options->detrend, "remove the mean first");
+    command
+        ->add_option("--highpass", options->highpass, "integrate what lies above F, without drift")
+        ->check(positive_number())
+        ->type_name("F");
+    command->add_flag("--twice", options->twice, "integrate twice (--highpass)");
     command->footer(about_integrate);
     command->callback([options] { integrate(*options); });
 }

@@ -9,6 +9,7 @@ std::string with_unit(const std::string& name, const std::string& unit) {
 }
 
 std::string inverse_unit(const std::string& unit) {
+    if (unit == "rev") return "orders";
     return unit == "s" ? "Hz" : unit.empty() ? "" : "1/" + unit;
 }
 

@@ -99,6 +99,7 @@ class Panel {
         write_range('y', upwards_, y_.factor);
         const bool given = curve_.y_tics > 0;
         std::fprintf(script_, "set ytics %s\n", given ? number(curve_.y_tics).c_str() : "autofreq");
+        write_names();
         write_labels();
     }
 
@@ -116,9 +117,18 @@ class Panel {
             std::fputs("$curve with filledcurves y=0 fc rgb '#1f5fa8' fs transparent solid 0.15, ",
                        script_);
         }
+        const bool from_below = curve_.style == Style::boxes && curve_.decibels;
         if (characters) {
             static constexpr std::array looks{"lines", "boxes", "points pt '+'"};
             std::fprintf(script_, "$curve with %s", looks[std::size_t(curve_.style)]);
+        } else if (from_below) {
+            // Boxes of decibels do not stand on 0, which is no floor.
+            std::fprintf(script_,
+                         "$curve using 1:2:($1-%s):($1+%s):(%s):2 with boxxyerror fs solid 0.35 "
+                         "border rgb '#1f5fa8' fc rgb '#1f5fa8'",
+                         number(curve_.box_width / 2 * x_.factor).c_str(),
+                         number(curve_.box_width / 2 * x_.factor).c_str(),
+                         number(upwards_.low * y_.factor).c_str());
         } else {
             static constexpr std::array looks{"lines lw 1.4 lc",
                                               "boxes fs solid 0.35 border rgb '#1f5fa8' fc",
@@ -136,6 +146,20 @@ class Panel {
     void write_range(char axis, const Range& range, double factor) const {
         std::fprintf(script_, "set %crange [%s:%s]\n", axis, number(range.low * factor).c_str(),
                      number(range.high * factor).c_str());
+    }
+
+    /// Names in place of numbers, as many as there is room for.
+    void write_names() const {
+        if (curve_.names.empty())
+            return std::fputs("set xtics autofreq norotate\n", script_), void();
+        const double room = (box_.right - box_.left) / (canvas_.characters ? 7 : 26);
+        const auto step = std::size_t(std::ceil(double(curve_.names.size()) / room));
+        std::fputs(canvas_.characters ? "set xtics (" : "set xtics rotate by -60 (", script_);
+        for (std::size_t i = 0; i < curve_.names.size(); i += step) {
+            std::fprintf(script_, "%s%s %zu", i > 0 ? ", " : "",
+                         script_text(curve_.names[i]).c_str(), i);
+        }
+        std::fputs(")\n", script_);
     }
 
     void write_data(const char* name, const std::vector<Mark>& points) const {

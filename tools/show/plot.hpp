@@ -20,8 +20,9 @@ struct Curve {
     std::string caption;         // what there is to know about it, under the picture
     std::vector<double> x, y;
     Style style = Style::line;
-    double box_width = 0;    // of boxes, which stand on their x
-    std::vector<Mark> line;  // a straight line's two ends, drawn across
+    double box_width = 0;            // of boxes, which stand on their x
+    std::vector<std::string> names;  // of the places 0, 1, 2 ... in place of numbers
+    std::vector<Mark> line;          // a straight line's two ends, drawn across
     bool decibels = false;
     double depth = 150;  // decibels worth showing below the highest value
     bool filled = true;  // down to 0, unless in decibels
