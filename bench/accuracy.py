@@ -156,6 +156,66 @@ def frames(count=100000):
         print("| " + " | ".join(row) + " |")
 
 
-for table in (sine_fits, distortion, converters, local_polynomials, outliers, frames):
+def weightings():
+    """From the impulse responses, through the program."""
+    print("| rate | A: to | greatest error | bilinear transform |\n|---|---|---|---|")
+    corners = (20.598997, 20.598997, 107.652648, 737.862230, 12194.217148, 12194.217148)
+
+    def analog(f):
+        gain = f ** 8
+        for c in corners:
+            gain /= f * f + c * c
+        return 10 * math.log10(gain)
+
+    for rate in (8000, 16000, 44100, 48000, 96000):
+        highest, worst, plain = min(20000, 0.45 * rate), 0.0, 0.0
+        for step in range(60):
+            f = 10 * (highest / 10) ** (step / 59)
+            # Long enough for the start to count nothing, and whole periods.
+            count = int(rate * max(2, 40 / f))
+            f = max(1, round(f * count / rate)) * rate / count
+            x = tone(count, f / rate, -math.pi / 2)
+            found = levels_of(x, rate)
+            error = found["leq"] + 10 * math.log10(2) - analog(f) + analog(1000)
+            worst = max(worst, abs(error))
+            warped = rate / math.pi * math.tan(math.pi * f / rate)
+            level = rate / math.pi * math.tan(math.pi * 1000 / rate)
+            plain = max(plain, abs(analog(warped) - analog(level) - analog(f) + analog(1000)))
+        print(f"| {rate / 1000:g} kHz | {highest / 1000:g} kHz | {worst:.2f} dB | {plain:.1f} dB |")
+
+
+def levels_of(samples, rate):
+    return measured(samples, "levels", "--rate", str(rate), "--every", "1")
+
+
+def orders(runs=20, rate=5000, seconds=10):
+    print("| pulses | noise of the tachometer | order | amplitude |\n|---|---|---|---|")
+    for pulses, noise in ((1, 0), (1, 1e-3), (4, 0), (4, 1e-3), (60, 0)):
+        worst = [0.0, 0.0]
+        turned = [10 * n / rate + (n / rate) ** 2 for n in range(rate * seconds)]
+        tacho = [math.sin(2 * math.pi * pulses * t) + random.gauss(0, noise) for t in turned]
+        for _ in range(runs):
+            order = random.uniform(0.5, 20)
+            x = [math.cos(2 * math.pi * order * t) for t in turned]
+            found = measured_pair(x, tacho, "orders", "--tacho", "2", "--per-revolution", str(pulses),
+                                  "--window", "Gausstop", "--revolutions", "16")
+            peak = found["peaks"][0]
+            worst = [max(worst[0], abs(peak["frequency"] - order)), max(worst[1], abs(peak["amplitude"] - 1))]
+        print(f"| {pulses} | {noise:g} | {worst[0]:.1e} | {worst[1]:.1e} |")
+
+
+def measured_pair(x, y, *arguments):
+    """The same of two signals side by side."""
+    with tempfile.NamedTemporaryFile("w", suffix=".csv", delete=False) as file:
+        file.writelines(f"{a!r},{b!r}\n" for a, b in zip(x, y))
+    try:
+        report = subprocess.run([PROGRAM, arguments[0], file.name, *arguments[1:], "--rate", "5000", "--json"],
+                                check=True, capture_output=True).stdout
+    finally:
+        os.unlink(file.name)
+    return json.loads(report)["signals"][0]
+
+
+for table in (sine_fits, distortion, converters, weightings, orders, local_polynomials, outliers, frames):
     table()
     print()

@@ -554,4 +554,99 @@ public static unsafe class DspApi
         GC.KeepAlive(state);
         return result;
     }
+
+    /// <summary>Reads a signal at equal angles of a shaft, told by the pulses of its tachometer.</summary>
+    /// <param name="input">The signal.</param>
+    /// <param name="output">The samples over the angle, the reciprocal of their number in a revolution
+    /// apart.</param>
+    /// <param name="pulses">The places of the pulses in samples, ascending, 5 or more.</param>
+    /// <param name="perRevolution">Pulses in a revolution.</param>
+    /// <param name="angles">Samples in a revolution; below 1 enough for the longest one.</param>
+    /// <returns>0; -1 for pulses that are fewer or do not ascend, too many samples, or when memory runs
+    /// out.</returns>
+    public static int dsph_rsmp_angle(DspInput input, DspInput output, DspInput pulses,
+        double perRevolution, int angles)
+    {
+        int result = NativeMethods.dsph_rsmp_angle(input.GetDspPtr(), output.GetDspPtr(),
+            pulses.GetDspPtr(), perRevolution, angles);
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(pulses);
+        return result;
+    }
+
+    /// <summary>Designs the taps of a filter that integrates without drift.</summary>
+    /// <param name="taps">The taps; to be multiplied by the spacing of the samples for each
+    /// integral.</param>
+    /// <param name="times">1 or 2 integrals.</param>
+    /// <param name="low">From where on it integrates, in cycles a sample.</param>
+    /// <returns>0; -1 for other integrals or edges, or when memory runs out.</returns>
+    public static int dspc_integrator(DspInput taps, int times, double low)
+    {
+        int result = NativeMethods.dspc_integrator(taps.GetDspPtr(), times, low);
+        GC.KeepAlive(taps);
+        return result;
+    }
+
+    /// <summary>Makes the second-order sections of a frequency weighting.</summary>
+    /// <param name="sections">Six samples for each section.</param>
+    /// <param name="weighting">A <see cref="DspWeighting"/>.</param>
+    /// <param name="rate">Samples a second, above 2000.</param>
+    /// <returns>0; -1 for another weighting or rate, or when memory runs out.</returns>
+    public static int dspc_weighting(DspInput sections, int weighting, double rate)
+    {
+        int result = NativeMethods.dspc_weighting(sections.GetDspPtr(), weighting, rate);
+        GC.KeepAlive(sections);
+        return result;
+    }
+
+    /// <summary>Makes the second-order sections of a band of a fraction of an octave.</summary>
+    /// <param name="sections">Six samples for each section.</param>
+    /// <param name="centre">Of the band, in hertz.</param>
+    /// <param name="fraction">Bands in an octave.</param>
+    /// <param name="rate">Samples a second.</param>
+    /// <returns>0; -1 for a band that does not end below half the rate, or when memory runs
+    /// out.</returns>
+    public static int dspc_octave(DspInput sections, double centre, int fraction, double rate)
+    {
+        int result = NativeMethods.dspc_octave(sections.GetDspPtr(), centre, fraction, rate);
+        GC.KeepAlive(sections);
+        return result;
+    }
+
+    /// <summary>Lists the centres of the bands of a fraction of an octave.</summary>
+    /// <param name="centres">The centres in hertz.</param>
+    /// <param name="fraction">Bands in an octave.</param>
+    /// <param name="low">The lowest.</param>
+    /// <param name="high">The highest.</param>
+    /// <returns>0; -1 for another fraction or limits, or when memory runs out.</returns>
+    public static int dspc_octaves(DspInput centres, int fraction, double low, double high)
+    {
+        int result = NativeMethods.dspc_octaves(centres.GetDspPtr(), fraction, low, high);
+        GC.KeepAlive(centres);
+        return result;
+    }
+
+    /// <summary>Measures the levels of a signal or of its next block, in decibels.</summary>
+    /// <param name="input">The signal, real, seconds apart.</param>
+    /// <param name="output">Seven samples: levels of the mean square, of the greatest and the least
+    /// time-weighted one, of the greatest value, of a second that holds as much, and of the time-weighted one
+    /// at the end; and how many seconds there were.</param>
+    /// <param name="sections">Those of a weighting or a band; none for the signal as it is.</param>
+    /// <param name="timeConstant">In milliseconds: 125 is fast, 1000 slow.</param>
+    /// <param name="reference">The value of 0 dB.</param>
+    /// <param name="state">Empty for a fresh stream, then passed from block to block; or null.</param>
+    /// <returns>0; -1 for a complex signal, sections, a state or numbers that are none, or when memory
+    /// runs out.</returns>
+    public static int dsph_levels(DspInput input, DspInput output, DspInput sections, double timeConstant,
+        double reference, DspInput? state)
+    {
+        int result = NativeMethods.dsph_levels(input.GetDspPtr(), output.GetDspPtr(), sections.GetDspPtr(),
+            timeConstant, reference, state == null ? null : state.GetDspPtr());
+        GC.KeepAlive(input);
+        GC.KeepAlive(output);
+        GC.KeepAlive(sections);
+        GC.KeepAlive(state);
+        return result;
+    }
 }

@@ -175,3 +175,14 @@ public enum DspIirBand
     /// <summary>Passes what is below the edge.</summary>
     LowPass = 3,
 }
+
+/// <summary>The weightings of <see cref="DspApi.dspc_weighting"/>.</summary>
+public enum DspWeighting
+{
+    /// <summary>None.</summary>
+    Z = 0,
+    /// <summary>As the ear hears soft sounds.</summary>
+    A = 1,
+    /// <summary>As it hears loud ones.</summary>
+    C = 2,
+}

@@ -8,13 +8,18 @@ using unsafe OfFrames = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int
 using unsafe OfHampel = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, int, double, int, dsp_struct*, int, int>;
 using unsafe OfMedian = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int, dsp_struct*, int, int>;
 using unsafe OfFourRecordsAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, dsp_struct*, int, int>;
+using unsafe OfLevels = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, double, double, dsp_struct*, int>;
 using unsafe OfRecord = delegate* unmanaged[Cdecl]<dsp_struct*, int>;
 using unsafe OfRecordAndDouble = delegate* unmanaged[Cdecl]<dsp_struct*, double, int>;
+using unsafe OfRecordAndBand = delegate* unmanaged[Cdecl]<dsp_struct*, double, int, double, int>;
 using unsafe OfRecordAndInt = delegate* unmanaged[Cdecl]<dsp_struct*, int, int>;
 using unsafe OfRecordAndArc = delegate* unmanaged[Cdecl]<dsp_struct*, int, double, double, double, int>;
+using unsafe OfRecordAndKind = delegate* unmanaged[Cdecl]<dsp_struct*, int, double, int>;
+using unsafe OfRecordAndLimits = delegate* unmanaged[Cdecl]<dsp_struct*, int, double, double, int>;
 using unsafe OfRecordAndWindow = delegate* unmanaged[Cdecl]<dsp_struct*, int, int, double, int>;
 using unsafe OfSavgol = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, int, int, int, dsp_struct*, int, int>;
 using unsafe OfThreeRecords = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, double, int, int, int>;
+using unsafe OfThreeRecordsAndAngles = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, double, int, int>;
 using unsafe OfThreeRecordsAndSegments = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, int, int, int, int, int>;
 using unsafe OfRecordAndDesign = delegate* unmanaged[Cdecl]<dsp_struct*, int, int, int, double, double, double, double, int>;
 using unsafe OfThreeRecordsAlone = delegate* unmanaged[Cdecl]<dsp_struct*, dsp_struct*, dsp_struct*, int>;
@@ -44,6 +49,11 @@ internal static unsafe class NativeMethods
     internal static OfThreeRecords dsph_distortion;
     internal static OfThreeRecordsAndSegments dsph_cross;
     internal static OfTwoRecordsAndInt dsph_response;
+    internal static OfThreeRecordsAndAngles dsph_rsmp_angle;
+    internal static OfRecordAndKind dspc_weighting, dspc_integrator;
+    internal static OfRecordAndBand dspc_octave;
+    internal static OfRecordAndLimits dspc_octaves;
+    internal static OfLevels dsph_levels;
     internal static OfSavgol dspd_savgol;
     internal static OfMedian dspd_median;
     internal static OfHampel dspd_hampel;
@@ -102,6 +112,12 @@ internal static unsafe class NativeMethods
         dspi_czt = (OfRecordAndArc)Find(nameof(dspi_czt));
         dsph_zoom = (OfTwoRecordsAndRange)Find(nameof(dsph_zoom));
         dsph_goertzel = (OfFourRecordsAndInt)Find(nameof(dsph_goertzel));
+        dsph_rsmp_angle = (OfThreeRecordsAndAngles)Find(nameof(dsph_rsmp_angle));
+        dspc_integrator = (OfRecordAndKind)Find(nameof(dspc_integrator));
+        dspc_weighting = (OfRecordAndKind)Find(nameof(dspc_weighting));
+        dspc_octave = (OfRecordAndBand)Find(nameof(dspc_octave));
+        dspc_octaves = (OfRecordAndLimits)Find(nameof(dspc_octaves));
+        dsph_levels = (OfLevels)Find(nameof(dsph_levels));
 
         void* Find(string name) => (void*)SharedObject.Find(library, name);
     }

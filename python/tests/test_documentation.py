@@ -46,6 +46,7 @@ def test_every_name_has_an_example():
         "Error",
         "Frames",
         "Histogram",
+        "Levels",
         "Line",
         "Peaks",
         "Response",

@@ -612,3 +612,36 @@ def test_frames_and_back(x, size, hop):
     close(wavkit.istft(louder), 2 * x, 1e-13)
     with pytest.raises(wavkit.Error):
         wavkit.istft(wavkit.stft(x, RATE, size, hop=size))  # Hann is 0 where frames meet
+
+
+def test_levels_of_weighted_noise():
+    noise = np.stack((NOISE, 3 * NOISE[::-1]))
+    rate = 8000.0
+    found = wavkit.levels(noise, rate, "C", response=50, reference=0.5, octaves=1)
+    passed = scipy.signal.sosfilt(wavkit.weighting("C", rate), noise)
+    close(found.equivalent, 10 * np.log10((passed**2).mean(-1) / 0.25))
+    close(found.peak, 20 * np.log10(np.abs(passed).max(-1) / 0.5))
+    share = 1 - np.exp(-1 / rate / 0.05)
+    course = scipy.signal.lfilter([share], [1, share - 1], passed**2)
+    close(found.greatest, 10 * np.log10(course.max(-1) / 0.25))
+    close(found.least, 10 * np.log10(course[:, 1999:].min(-1) / 0.25))
+    centres, bands = wavkit.octave_bands(1, rate=rate)
+    assert found.bands.shape == (2, len(centres)) and len(bands) == 8
+    in_band = scipy.signal.sosfilt(bands[5], noise)
+    close(found.bands[:, 5], 10 * np.log10((in_band**2).mean(-1) / 0.25), 1e-8)
+    with pytest.raises(ValueError, match="a weighting is A, C or Z"):
+        wavkit.levels(NOISE, rate, "B")
+
+
+def test_signals_over_the_angle():
+    turned = 20 * T + 5 * T**2
+    pulses = (-20 + np.sqrt(400 + 20 * np.arange(100))) / 10
+    x = np.stack((np.cos(2 * np.pi * 3 * turned), np.sin(2 * np.pi * turned)))
+    y = wavkit.over_angle(x, pulses, RATE, angles=64)
+    angle = np.arange(y.shape[-1]) / 64
+    close(y[0, 64:-64], np.cos(2 * np.pi * 3 * angle)[64:-64], 1e-5)
+    assert wavkit.over_angle(x, pulses, RATE).shape == (2, 99 * 64 + 1)
+    spectrum = wavkit.orders(x, pulses, RATE, angles=64)
+    close(spectrum.peaks(1).frequency[:, 0], [3, 1], 1e-4)
+    with pytest.raises(ValueError, match="ascending"):
+        wavkit.orders(x, pulses[::-1], RATE)

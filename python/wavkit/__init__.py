@@ -15,6 +15,8 @@ from __future__ import annotations
 from . import lib as lib
 from ._files import Signal, read, signals, write
 from ._filters import Filter, Response, design, filter, response
+from ._levels import Levels, levels, octave_bands, weighting
+from ._orders import orders, over_angle
 from ._rates import Resampler, decimate, resample
 from ._record import Error
 from ._sections import SectionResponse, design_iir, response_iir, zero_phase
@@ -46,6 +48,7 @@ __all__ = [
     "Frames",
     "Goertzel",
     "Histogram",
+    "Levels",
     "Line",
     "Peaks",
     "Resampler",
@@ -80,8 +83,12 @@ __all__ = [
     "integrate",
     "interp",
     "istft",
+    "levels",
     "lib",
     "noise_bandwidth",
+    "octave_bands",
+    "orders",
+    "over_angle",
     "peaks",
     "read",
     "replace_outliers",
@@ -96,6 +103,7 @@ __all__ = [
     "stats",
     "stft",
     "transfer",
+    "weighting",
     "window",
     "windows",
     "write",
