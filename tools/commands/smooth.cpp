@@ -159,7 +159,7 @@ class SmoothRun {
             std::fprintf(page_.text(), "%zu outliers among %s samples\n", places.size(),
                          std::to_string(smoother.points()).c_str());
             for (const double place : places) {
-                std::fprintf(page_.text(), "  at %s\n", number(place).c_str());
+                std::fprintf(page_.text(), "  at %s\n", rounded(place).c_str());
             }
         }
     }
