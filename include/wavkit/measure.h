@@ -273,16 +273,16 @@ enum {
 WAVKIT_API int dsph_response(const dsp *state, dsp *out, int kind);
 WAVKIT_API int dspfh_response(const dsp *state, dspf *out, int kind);
 
-/** Spectra of short frames, one after the other: row m is the spectrum that dsph_dft() gives of the
- *  `size` samples about sample m hop,
+/** Spectra of short frames, one after the other: row m is the spectrum that dsph_dft() gives of
+ *  the `size` samples about sample m hop,
  *
  *      X[m, k] = (2 / size) sum w[n] x[m hop + n] e^(-2 pi i n k / size),  k = 0 .. size / 2
  *
- *  n = -(size / 2), rounded down, to (size - 1) / 2 from the frame's centre, w a window of mean 1.
- *  Rows of a complex signal, and with DSP_SPECTRUM_TWO_SIDED, have all `size` bins with the
- *  frequency 0 at index size / 2 and no factor 2. Before and behind the signal there are zeros. Of
- *  N samples there are (N - 1) / hop, rounded up, and 1 more frames: the last centre does not lie
- *  before the last sample, so that dsph_istft() has them all.
+ *  with w a window of mean 1, and n counted from the frame's centre, from -(size / 2), rounded
+ *  down, to (size - 1) / 2. Rows of a complex signal, and with DSP_SPECTRUM_TWO_SIDED, have all
+ *  `size` bins, the frequency 0 at index size / 2, and no factor 2. Before and behind the signal
+ *  there are zeros. Of N samples there are (N - 1) / hop, rounded up, and 1 more frames: the last
+ *  centre does not lie before the last sample, so that dsph_istft() has them all.
  *
  *  **Streams.** A long signal goes block by block with one state record, empty at first; `last`
  *  says that the signal ends with this block, and empties the state for the next signal. A row
@@ -292,12 +292,12 @@ WAVKIT_API int dspfh_response(const dsp *state, dspf *out, int kind);
  *  See J. B. Allen and L. R. Rabiner, "A unified approach to short-time Fourier analysis and
  *  synthesis", 1977.
  *  @param in      real or complex
- *  @param out     complex, the rows one behind the other; `delta` = 1 / (size delta), that of the
- *                 bins. May share the buffer of in or state; an output that is the state holds the
- *                 output in the end.
+ *  @param out     complex, the rows one behind the other; `delta` = 1 / (size delta), that of
+ *                 the bins. May share the buffer of in or state; an output that is the state
+ *                 holds the output in the end.
  *  @param window  identifier, see window.h
- *  @param size    samples of a frame, from 2 on (in single precision up to 2^24); fast for whatever
- *                 has small prime factors
+ *  @param size    samples of a frame, from 2 on (in single precision up to 2^24); fast for
+ *                 whatever has small prime factors
  *  @param hop     samples from frame to frame, 1 to `size`
  *  @param flags   0 or DSP_SPECTRUM_TWO_SIDED
  *  @param state   the samples from the one before the next frame on, or null
@@ -315,27 +315,28 @@ WAVKIT_API int dspfh_stft(const dspf *in, dspf *out, int window, int size, int h
  *
  *      x[t] = sum over m of w[t - m hop] y[m, t - m hop] / sum over m of w[t - m hop]^2
  *
- *  Of M rows (M - 1) hop + 1 samples come back, up to the last frame's centre: the first N are the
- *  signal, to rounding. Window and hop must allow it: the squares of the windows must add up to
- *  more than nothing (1e-10 of the most) at every sample, which a uniform window does up to hop =
- *  size, and Hann's, whose first sample is 0, up to size - 1. Where they add up to little, rounding
- *  weighs by the root of what they add up to elsewhere over it: half a frame is a good hop.
+ *  Of M rows (M - 1) hop + 1 samples come back, up to the last frame's centre: the first N are
+ *  the signal, to rounding. Window and hop must allow it: the squares of the windows must add up
+ *  to more than nothing (1e-10 of the most) at every sample, which a uniform window does up to
+ *  hop = size, and Hann's, whose first sample is 0, up to size - 1. Where they add up to little,
+ *  rounding weighs by the root of what they add up to elsewhere over it: half a frame is a good
+ *  hop.
  *
  *  Streams go block by block, of whole rows, as with dsph_stft(). Samples come when no later frame
  *  adds to them and they do not lie behind the last centre.
  *
- *  See D. W. Griffin and J. S. Lim, "Signal estimation from modified short-time Fourier transform",
- *  1984.
+ *  See D. W. Griffin and J. S. Lim, "Signal estimation from modified short-time Fourier
+ *  transform", 1984.
  *  @param in      complex, whole rows
  *  @param out     real, or complex with DSP_SPECTRUM_TWO_SIDED; `delta` = 1 / (size delta). May
- *                 share the buffer of in or state; an output that is the state holds the output in
- *                 the end.
+ *                 share the buffer of in or state; an output that is the state holds the output
+ *                 in the end.
  *  @param window,size,hop,flags  those that the rows were made with
  *  @param state   sums over frames that are not complete, or null
  *  @param last    whether the signal ends with this block
  *  @return 0; -1 for another size or hop, an unknown window, one that does not add up, rows that
- *          are not whole or real, a state of other frames (out is then empty or as it was), or
- *          when memory runs out */
+ *          are real or not whole, a state of other frames (nothing is then touched), or when
+ *          memory runs out */
 WAVKIT_API int dsph_istft(const dsp *in, dsp *out, int window, int size, int hop, int flags,
                           dsp *state, int last);
 WAVKIT_API int dspfh_istft(const dspf *in, dspf *out, int window, int size, int hop, int flags,

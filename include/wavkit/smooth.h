@@ -7,15 +7,15 @@
  *
  *      dspd_savgol(&x, &speed, 21, 3, 1, NULL, 1); // the slope of cubics through 21 samples
  *
- *  **Streams.** A long signal goes block by block with one state record, empty at first, that keeps
- *  the last w samples; `last` says that the signal ends with this block, and empties the state for
- *  the next signal. Outputs come when the samples behind them are there: none before the first w
- *  samples, then as many as have come in less (w - 1) / 2, rounded down, the rest with the last
- *  block. Together they are those of one call on the whole signal, bit for bit, however it is cut.
- *  Without a state the block is the whole signal.
+ *  **Streams.** A long signal goes block by block with one state record, empty at first, that
+ *  keeps the last w samples; `last` says that the signal ends with this block, and empties the
+ *  state for the next signal. Outputs come when the samples behind them are there: none before
+ *  the first w samples, then as many as have come in less (w - 1) / 2, rounded down, the rest
+ *  with the last block. Together they are those of one call on the whole signal, bit for bit,
+ *  however it is cut. Without a state the block is the whole signal.
  *
- *  `in`, `out` and `state` may share their buffers; an output that is the state holds the output in
- *  the end. */
+ *  `in`, `out` and `state` may share their buffers; an output that is the state holds the output
+ *  in the end. */
 #ifndef WAVKIT_SMOOTH_H
 #define WAVKIT_SMOOTH_H
 
@@ -38,24 +38,24 @@ enum {
  *
  *      out[n] = sum over j of c[j] x[n + j],  c[j] = delta^-s sum over k of p[k]^(s)(0) p[k](j)
  *
- *  j = -h .. h, w = 2h + 1, p^(s) the derivative of order s, and p[0] to p[order] the polynomials
- *  that are orthonormal on these j. The first h outputs are those of the polynomial through the
- *  first window, the last h of that through the last one. So a polynomial of up to that order is
- *  reproduced to rounding from end to end, with its derivatives. Higher orders follow peaks more
- *  closely, longer windows take more noise away: of white noise a share of sqrt(c[0]) passes the
- *  smoothing.
+ *  j = -h .. h, w = 2h + 1, p^(s) the derivative of order s, and p[0] to p[order] the
+ *  polynomials that are orthonormal on these j. The first h outputs are those of the polynomial
+ *  through the first window, the last h of that through the last one. So a polynomial of up to
+ *  that order is reproduced to rounding from end to end, with its derivatives. Higher orders
+ *  follow peaks more closely, longer windows take more noise away: of white noise a share of
+ *  sqrt(c[0]) passes the smoothing.
  *
  *  A NaN or an infinity spoils the w outputs around it, in the first or last window h more.
  *
- *  See A. Savitzky and M. J. E. Golay, "Smoothing and differentiation of data by simplified least
- *  squares procedures", 1964, and P. A. Gorry, "General least-squares smoothing and differentiation
- *  by the convolution (Savitzky-Golay) method", 1990.
+ *  See A. Savitzky and M. J. E. Golay, "Smoothing and differentiation of data by simplified
+ *  least squares procedures", 1964, and P. A. Gorry, "General least-squares smoothing and
+ *  differentiation by the convolution (Savitzky-Golay) method", 1990.
  *  @param in          real or complex
  *  @param out         of the kind of the input, with its `delta`
  *  @param window      w, odd
  *  @param order       of the polynomials, 0 to w - 1
- *  @param derivative  s, 0 for the value; in the unit of `delta`, of which 0 counts as 1. One above
- *                     the order is 0.
+ *  @param derivative  s, 0 for the value; in the unit of `delta`, of which 0 counts as 1. One
+ *                     above the order is 0.
  *  @param state       the stream, or null
  *  @param last        whether the signal ends with this block
  *  @return 0; -1 for an even window, an order that it does not suffice for, a negative
@@ -73,8 +73,8 @@ WAVKIT_API int dspfd_savgol(const dspf *in, dspf *out, int window, int order, in
  *  window is. A zero comes out as +0.
  *
  *  A sample takes O(log w) in calls that bring no fewer than w samples, whatever the signal is
- *  like; short windows are sorted by networks, several side by side, longer ones by way of sorted
- *  blocks. A block of fewer samples takes as long as one of w.
+ *  like; short windows are sorted by networks, several side by side, longer ones by way of
+ *  sorted blocks. A block of fewer samples takes as long as one of w.
  *
  *  See J. Suomela, "Median filtering is equivalent to sorting", 2014.
  *  @param in      real
@@ -95,9 +95,9 @@ WAVKIT_API int dspfd_median(const dspf *in, dspf *out, int window, int ends, dsp
  *
  *      |x[n] - m| > threshold 1.4826 d
  *
- *  1.4826 d being the standard deviation where the noise is Gaussian. A NaN is an outlier as well;
- *  in windows it stands behind all numbers, and behind all deviations. Where m is no finite number,
- *  the sample stays as it is.
+ *  1.4826 d being the standard deviation where the noise is Gaussian. A NaN is an outlier as
+ *  well; in windows it stands behind all numbers, and behind all deviations. Where m is no
+ *  finite number, the sample stays as it is.
  *
  *  A sample takes O(log w) and moving less than w samples in memory.
  *
@@ -111,9 +111,9 @@ WAVKIT_API int dspfd_median(const dspf *in, dspf *out, int window, int ends, dsp
  *  @param ends       DSP_ENDS_... constant
  *  @param state      the stream, or null
  *  @param last       whether the signal ends with this block
- *  @return 0; -1 for a complex signal, a window below 1, a threshold that is not 0 or above, ends
- *          that are none of the constants, or a signal that ends with fewer than w samples (nothing
- *          is then touched), or when memory runs out */
+ *  @return 0; -1 for a complex signal, a window below 1, a threshold that is not 0 or above,
+ *          ends that are none of the constants, or a signal that ends with fewer than w samples
+ *          (nothing is then touched), or when memory runs out */
 WAVKIT_API int dspd_hampel(const dsp *in, dsp *out, dsp *outliers, int window, double threshold,
                            int ends, dsp *state, int last);
 WAVKIT_API int dspfd_hampel(const dspf *in, dspf *out, dspf *outliers, int window, float threshold,

@@ -54,6 +54,16 @@ int write_apart(const R* in, const R* state, R* out, Compute compute) {
     return apart ? 0 : dsp_copy(out, result);
 }
 
+/// Leaves in the state of a stream what is kept for the next block; none that is the output.
+template <Record R>
+int leave(R* state, const R* out, R* kept, scalar<R> delta) {
+    if (!state || state == out) return 0;
+    state->delta = delta;
+    if (resize(state, length(kept), kept->complex)) return -1;
+    std::copy_n(kept->data, used(kept), state->data);
+    return 0;
+}
+
 /// The samples that a forward call sees: of a stream those that are kept, from the one before the
 /// next frame on, and those of the block.
 template <Record R>
@@ -162,11 +172,7 @@ int stft(const R* in, R* out, int window, int size, int hop, int flags, R* state
         return 0;
     };
     if (write_apart(in, state, out, rows)) return -1;
-    if (!state || state == out) return 0;
-    state->delta = delta;
-    if (resize(state, length(kept.get()), kept->complex)) return -1;
-    std::copy_n(kept->data, used(kept.get()), state->data);
-    return 0;
+    return leave<R>(state, out, kept, delta);
 }
 
 /// Whether the squares of windows a hop apart add up to something everywhere, at the ends too,
@@ -215,17 +221,17 @@ class Sums {
 
     /// Before the first sample there is half a frame.
     void begin() { skipped_ = frames_.half() + frames_.hop - early(); }
-    /// -1 where the state is not one of such frames.
-    int resume(const R* state) {
-        if (length(state) != kept() || width(state) != int(width_)) return -1;
-        const auto most = scalar<R>(frames_.half() + frames_.hop);
+    /// Whether a state is one of such frames.
+    bool fits(const R* state) const {
+        if (length(state) != kept() || width(state) != int(width_)) return false;
         const scalar<R> skipped = state->data[width_ * (kept() - 1)];
-        if (!(skipped >= 0 && skipped <= most)) return -1;
-        skipped_ = std::size_t(skipped);
+        return skipped >= 0 && skipped <= scalar<R>(frames_.half() + frames_.hop);
+    }
+    void resume(const R* state) {
         std::copy_n(state->data, width_ * pending(), sums_);
         const scalar<R>* const squares = state->data + width_ * pending();
         for (std::size_t i = 0; i < pending(); ++i) squares_[i] = squares[width_ * i];
-        return 0;
+        skipped_ = std::size_t(squares[width_ * pending()]);
     }
     int keep(R* state) const {
         if (resize(state, kept(), width_ == 2)) return -1;
@@ -309,17 +315,14 @@ int istft(const R* in, R* out, int window, int size, int hop, int flags, R* stat
     const std::size_t points = length(in), count = points / frames.bins();
     const bool goes_on = state && state->points > 0, ends = !state || last;
     if ((points > 0 && !in->complex) || points % frames.bins() != 0) return -1;
+    Sums<R> sums(frames, count);
+    if (goes_on && !sums.fits(state)) return -1;
     const auto delta = in->delta;
     const scalar<R>* const rows = in->data;
     Temporary<R> kept;
     const auto samples = [&](R* result) {
-        Sums<R> sums(frames, count);
         if (sums.reserve(result)) return -1;
-        if (goes_on) {
-            if (sums.resume(state)) return -1;
-        } else {
-            sums.begin();
-        }
+        goes_on ? sums.resume(state) : sums.begin();
         for (std::size_t i = 0; i < count; ++i) {
             if (sums.add(i, rows + 2 * frames.bins() * i)) return -1;
         }
@@ -334,11 +337,7 @@ int istft(const R* in, R* out, int window, int size, int hop, int flags, R* stat
         return 0;
     };
     if (write_apart(in, state, out, samples)) return -1;
-    if (!state || state == out) return 0;
-    state->delta = delta;
-    if (resize(state, length(kept.get()), kept->complex)) return -1;
-    std::copy_n(kept->data, used(kept.get()), state->data);
-    return 0;
+    return leave<R>(state, out, kept, delta);
 }
 
 }  // namespace

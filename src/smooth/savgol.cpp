@@ -74,7 +74,8 @@ struct Fit {
     int window, order, derivative;
     long double unit;  // of the derivative
 
-    long double place(std::size_t i) const { return (long double)(i)-window / 2; }
+    int half() const { return window / 2; }
+    long double place(std::size_t i) const { return int(i) - half(); }
 };
 
 /// The taps, the last sample's first.
@@ -82,7 +83,7 @@ template <class T>
 void write_taps(const Fit& fit, Polynomials& p, T* taps) {
     const long double* const centre = p.keep(0, fit.derivative);
     for (int k = 0; k < fit.window; ++k) {
-        const long double* const values = p.at(fit.window / 2 - k, 0);
+        const long double* const values = p.at(fit.half() - k, 0);
         long double sum = 0;
         for (int i = 0; i <= p.order(); ++i) sum += centre[i] * values[i];
         taps[k] = T(sum * fit.unit);
