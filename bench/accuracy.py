@@ -1,6 +1,7 @@
 #!/usr/bin/env python3
 """Tables of how exact measurements are, for docs/program.md: synthetic signals whose answers are known,
 measured by the program. Called with the program, prints Markdown."""
+import cmath
 import json
 import math
 import os
@@ -216,6 +217,55 @@ def measured_pair(x, y, *arguments):
     return json.loads(report)["signals"][0]
 
 
-for table in (sine_fits, distortion, converters, weightings, orders, local_polynomials, outliers, frames):
+def response(x, y, *arguments):
+    """The report about two signals, and the rows of the table: frequency, gain, phase, coherence."""
+    with tempfile.TemporaryDirectory() as folder:
+        path = os.path.join(folder, "pair.csv")
+        with open(path, "w", encoding="ascii") as file:
+            file.write("# delta = 1\n" + "".join(f"{a!r},{b!r}\n" for a, b in zip(x, y)))
+        call = [PROGRAM, "response", path, *arguments]
+        report = subprocess.run([*call, "--json"], check=True, capture_output=True).stdout
+        table = subprocess.run([*call, "-o", "-", "--to", "csv"], check=True, capture_output=True).stdout
+    rows = [[float(v) for v in line.split(",")] for line in table.decode().splitlines()[1:]]
+    return json.loads(report), rows
+
+
+def responses(count=65536):
+    taps, delay = [0.2, 0.6, 0.2], 6  # the delay is that of the middle tap
+    x = [random.gauss(0, 1) for _ in range(count + 7)]
+    y = [sum(t * x[n + 2 - k] for k, t in enumerate(taps)) for n in range(count)]
+    x = x[7:]
+    print("| noise in the output | segment | segments | gain | phase | delay, samples |"
+          "\n|---|---|---|---|---|---|")
+    for noise in (0.0, 0.1, 1.0):
+        noisy = [v + random.gauss(0, noise) for v in y]
+        for segment in (256, 1024, 4096):
+            report, rows = response(x, noisy, "--segment", str(segment))
+            gains, phases = [], []
+            for f, gain, phase, _ in rows[1:-1]:
+                h = 0.6 + 0.4 * math.cos(2 * math.pi * f)
+                gains.append(20 * math.log10(gain / h))
+                phases.append(math.remainder(phase + 360 * f * delay, 360))
+            print(f"| {noise:g} | {segment} | {report['segments']} | {rms(gains):.3f} dB |"
+                  f" {rms(phases):.2f}° | {abs(report['delay_samples'] - delay):.4f} |")
+
+
+def zooms(count=4096, runs=200):
+    print("| window | frequency, bins | amplitude |\n|---|---|---|")
+    for window in ("Hann", "Blackman_Harris4", "Gausstop", "Flattop", "Kaiser100"):
+        worst = [0.0, 0.0]
+        for _ in range(runs):
+            f = random.uniform(0.05, 0.45)
+            low, high = f - random.uniform(1.5, 2.5) / count, f + 2 / count
+            x = tone(count, f, random.uniform(-3, 3))
+            top = measured(x, "spectrum", "--window", window, "--zoom", repr(low), repr(high),
+                           "--peaks", "1")["peaks"][0]
+            worst[0] = max(worst[0], abs(top["frequency"] - f) * count)
+            worst[1] = max(worst[1], abs(top["amplitude"] - 1))
+        print(f"| {window} | {worst[0]:.1e} | {worst[1]:.1e} |")
+
+
+for table in (sine_fits, distortion, converters, responses, zooms, weightings, orders, local_polynomials,
+              outliers, frames):
     table()
     print()

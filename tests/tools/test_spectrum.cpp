@@ -137,5 +137,42 @@ TEST_F(SpectrumTest, TheSlopeOfASineBeatsTwiceAPeriod) {
     }
 }
 
+TEST_F(SpectrumTest, ZoomsBetweenTwoFrequencies) {
+    write("x.dsp", Signals{sine(4000, 50.013 * 4, 3, 1e-3)});
+    const std::string zoom = "spectrum x.dsp --zoom 49 51 --zoom-points 2001 ";
+    for (const std::string options : {"", "--window Blackman_Harris4 ", "--average 2000 "}) {
+        const auto peaks = rows(printed(zoom + options + "--peaks 3"));
+        ASSERT_EQ(peaks.size(), 1u) << options;  // neither lobes nor ends
+        EXPECT_NEAR(peaks[0][0], 50.013, 1e-4) << options;
+        EXPECT_NEAR(peaks[0][2], 3, 1e-3) << options;
+    }
+    const auto table = rows(printed(zoom + "-o - --to csv"));
+    ASSERT_EQ(table.size(), 2001u);
+    EXPECT_NEAR(table[0][0], 49, 1e-9);
+    EXPECT_NEAR(table[1013][0], 50.013, 1e-9);
+    EXPECT_NEAR(table[1013][1], 3, 1e-3);
+    printed(zoom + "-o z.txt");
+    EXPECT_NE(contents("z.txt").find("# start = 49\n"), std::string::npos);
+    EXPECT_NE(printed(zoom + "--density").find("zoom of 2001 points"), std::string::npos);
+    // The density of noise is the same through a zoom.
+    write("n.dsp", Signals{Noise(1).real<dsp>(1 << 14)});
+    const auto density = [&](const std::string& options) {
+        double squares = 0;
+        const auto all = rows(printed("spectrum n.dsp --density -o - --to csv " + options));
+        for (const auto& row : all) squares += row[1] * row[1] / double(all.size());
+        return squares;
+    };
+    EXPECT_NEAR(density("--zoom 0.1 0.3 --zoom-points 3277") / density("--band 0.1 0.3"), 1, 0.02);
+    for (const auto& [options, status, told] :
+         {std::tuple("--zoom 51 49", 2, "from a lower to a higher"),
+          {"--zoom 400 600", 1, "there are frequencies from 0 to 500, not from 400 to 600"},
+          {"--zoom 49 51 --points 100", 2, "--zoom takes all samples"},
+          {"--zoom-points 5", 2, "--zoom"}}) {
+        const auto done = shell(std::string("wavkit spectrum x.dsp ") + options);
+        EXPECT_EQ(done.status, status) << options;
+        EXPECT_NE(done.err.find(told), std::string::npos) << done.err;
+    }
+}
+
 }  // namespace
 }  // namespace wavkit::test

@@ -75,6 +75,17 @@ void check_usage(const SpectrumOptions& options) {
     }
     check_waterfall(options.waterfall);
     check_segments(options);
+    const auto& zoom = options.settings.zoom;
+    if (!zoom.empty()) {
+        if (!(zoom[0] < zoom[1]))
+            throw UsageError("--zoom goes from a lower to a higher frequency");
+        if (options.settings.points > 0 || options.settings.fraction < 1 ||
+            options.settings.any_length || !options.waterfall.empty()) {
+            throw UsageError(
+                "--zoom takes all samples: without --points, --fraction, --any-length and "
+                "--waterfall");
+        }
+    }
     check_band_order(report.band);
     if (report.out.empty() && report.complex) {
         throw UsageError("--complex is for the output that -o names");
@@ -119,7 +130,9 @@ std::string caption_of(const SpectrumOptions& options, const Spectrum& spectrum,
     } else {
         text += samples + " samples";
     }
-    if (spectrum.length != spectrum.samples) {
+    if (spectrum.zoomed) {
+        text += ", zoom of " + std::to_string(spectrum.bins->points) + " points";
+    } else if (spectrum.length != spectrum.samples) {
         text += ", transforms of " + std::to_string(spectrum.length);
     }
     return text;
@@ -248,6 +261,7 @@ Examples:
   wavkit spectrum tone.wav --peaks 5
   wavkit spectrum log.csv --time --detrend --db --plot log.png
   wavkit spectrum run*.wav --peaks 3 --json --jobs 4
+  wavkit spectrum mains.wav --zoom 49.9 50.1 --window Blackman_Harris4 --plot mains.png
   wavkit spectrum hour.wav --average 8192 --density --db --plot noise.png --waterfall hour.png
   wavkit spectrum readings.txt --rate 360 --window Flattop -o spectrum.csv
   wavkit convert tone.wav - --channel 2 | wavkit spectrum - --plot -)";
@@ -319,6 +333,16 @@ void add_spectrum(CLI::App& program) {
         ->add_flag("--any-length", settings.any_length,
                    "transform the samples as many as they are, without zeros")
         ->excludes(fraction);
+    auto* const zoom = command
+                           ->add_option("--zoom", settings.zoom,
+                                        "measure between two frequencies, as closely as wanted")
+                           ->expected(2)
+                           ->type_name("LOW HIGH");
+    command
+        ->add_option("--zoom-points", settings.zoom_points, "frequencies of a zoom (default: 1000)")
+        ->check(CLI::Range(3, 1 << 28))
+        ->type_name("N")
+        ->needs(zoom);
     command->add_flag("--two-sided", settings.two_sided, "show negative frequencies as well");
     command->add_flag("--detrend", options->segments.detrend,
                       "remove the mean first; of every segment by itself with --average");

@@ -79,6 +79,8 @@ double Leakage::response_near(double bins, double blur) const {
 void Leakage::add(std::span<const double> magnitudes, int bin) {
     const int length = spectrum_.length;
     const auto value = [&](int i) {
+        // (What lies beside a zoom is not known; it is no component's top that counts for long.)
+        if (spectrum_.zoomed) i = std::clamp(i, 0, int(magnitudes.size()) - 1);
         i = (i + length) % length;
         return magnitudes[std::size_t(i < int(magnitudes.size()) ? i : length - i)];
     };

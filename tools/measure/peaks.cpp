@@ -135,7 +135,8 @@ std::vector<int> without_leakage(const Spectrum& spectrum, std::span<const doubl
     std::vector<bool> in_lobe(m.size());
     Leakage leakage(spectrum);
     // The constant part is no component, but leaks; a flat lobe may be highest beside it.
-    if (!spectrum.two_sided && m.size() > 1 && m[0] > 0.95 * m[1]) leakage.add(m, 0);
+    if (!spectrum.two_sided && !spectrum.zoomed && m.size() > 1 && m[0] > 0.95 * m[1])
+        leakage.add(m, 0);
     std::vector<int> kept;
     for (const int i : maxima) {
         if (kept.size() == count || height(i) < noise_floor * height(maxima.front())) break;
@@ -158,7 +159,9 @@ std::vector<Peak> find_peaks(const Spectrum& spectrum, std::size_t count, const 
     const auto m = magnitudes.values();
     const int last = magnitudes->points - 1;
     std::vector<int> maxima;
-    for (int i = spectrum.two_sided ? 0 : 1; i <= last; ++i) {
+    // What is highest at an end of a zoom has its top beyond.
+    for (int i = spectrum.two_sided && !spectrum.zoomed ? 0 : 1;
+         i <= last - (spectrum.zoomed ? 1 : 0); ++i) {
         const auto k = std::size_t(i);
         if ((i == 0 || m[k] > m[k - 1]) && (i == last || m[k] >= m[k + 1]) && m[k] > 0) {
             maxima.push_back(i);

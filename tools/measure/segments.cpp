@@ -121,6 +121,8 @@ void SpectrumAverage::add(Spectrum& spectrum) {
     average_.width = spectrum.width;
     average_.window = spectrum.window;
     average_.two_sided = spectrum.two_sided;
+    average_.zoomed = spectrum.zoomed;
+    average_.first = spectrum.first;
     average_.averaged = count;
 }
 

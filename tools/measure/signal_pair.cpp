@@ -81,7 +81,8 @@ std::size_t SignalPair::read(std::size_t which) {
         taken_ += count;
         return count;
     }
-    if (streams_.size() == 2 || !whole_.empty()) return streams_.back()->read(values);
+    if (streams_.size() == 2) return streams_[which]->read(values);
+    if (!whole_.empty()) return streams_[0]->read(values);
     // Side by side in one stream: both are there once the first one is.
     const auto width = streams_[0]->channels;
     if (which == 0) {

@@ -56,6 +56,23 @@ int transform(const Signal& x, Signal& bins, const SpectrumSettings& settings, i
     return dsph_fft(x, bins, settings.points, settings.fraction, settings.window, flags);
 }
 
+/// The bins between two frequencies, and how long a transform with such bins would be.
+Spectrum measure_zoom(const Signal& x, const SpectrumSettings& settings, bool two_sided) {
+    const double first = settings.zoom[0], last = settings.zoom[1], top = 0.5 / x->delta;
+    if (first < (two_sided ? -top : 0) || last > top) {
+        throw DataError("there are frequencies from " + rounded(two_sided ? -top : 0) + " to " +
+                        rounded(top) + ", not from " + rounded(first) + " to " + rounded(last));
+    }
+    Spectrum spectrum{{}, x->points, 0, double(x->points), settings.window, two_sided, true, first};
+    check(dsph_zoom(x, spectrum.bins, settings.zoom_points, first, last, settings.window,
+                    two_sided ? DSP_SPECTRUM_TWO_SIDED : 0),
+          "computing the spectrum");
+    spectrum.bins.facts.start = first;
+    const double length = 1 / (x->delta * spectrum.bins->delta);
+    spectrum.length = int(std::min(std::round(length), 1e9));
+    return spectrum;
+}
+
 }  // namespace
 
 void check_spacing(double delta) {
@@ -69,6 +86,7 @@ Spectrum measure(const Signal& x, const SpectrumSettings& settings) {
     check_spacing(x->delta);
     auto used = settings;
     used.two_sided = settings.two_sided || x->complex;
+    if (!settings.zoom.empty()) return measure_zoom(x, settings, used.two_sided);
     const int length = transform_length(x, settings);
     const double wanted = std::min(double(x->points), length * settings.fraction);
     const int samples = std::min(x->points, int(std::ceil(wanted)));

@@ -135,8 +135,9 @@ void print_summary(std::FILE* to, const SpectrumReport& report) {
     const auto& spectrum = report.spectrum;
     const auto name = window_names()[std::size_t(spectrum.window)];
     if (spectrum.averaged > 1) std::fprintf(to, "%ld segments of ", spectrum.averaged);
-    std::fprintf(to, "%d samples through %s, transform of %d points, %s spectrum\n",
-                 spectrum.samples, name.c_str(), spectrum.length,
+    std::fprintf(to, "%d samples through %s, %s of %d points, %s spectrum\n", spectrum.samples,
+                 name.c_str(), spectrum.zoomed ? "zoom" : "transform",
+                 spectrum.zoomed ? spectrum.bins->points : spectrum.length,
                  spectrum.two_sided ? "two-sided" : "one-sided");
     const auto unit = printable(report.frequency_unit());
     std::fprintf(to, "bins every %s%s, from %s to %s; strongest peaks:\n\n",
@@ -151,7 +152,8 @@ void add_peaks(Page& page, const SpectrumReport& report) {
     const auto& options = report.options;
     auto& members = page.add_signal(report.complex, spectrum.samples, report.delta);
     members.emplace_back("window", json_text(window_names()[std::size_t(spectrum.window)]));
-    members.emplace_back("length", std::to_string(spectrum.length));
+    members.emplace_back("length",
+                         std::to_string(spectrum.zoomed ? spectrum.bins->points : spectrum.length));
     members.emplace_back("segments", std::to_string(spectrum.averaged));
     members.emplace_back("bin_width", json_number(spectrum.bins->delta));
     const std::string quantity = options.density ? "density" : "amplitude";
