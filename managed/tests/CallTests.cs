@@ -2,6 +2,7 @@ using System;
 using System.Collections.Generic;
 using System.Linq;
 using System.Reflection;
+using System.Reflection.Emit;
 using System.Runtime.InteropServices;
 using Xunit;
 
@@ -22,46 +23,19 @@ public unsafe class CallTests
         internal ulong Extra;
     }
 
-    private static int CallNative(string name, Record* r, object?[] arguments)
+    /// <summary>Calls a function with integers, numbers and records as they stand, those being pointers;
+    /// what it takes is what it is given.</summary>
+    private static int CallNative(string name, params object[] arguments)
     {
-        void* f = (void*)NativeLibrary.GetExport(Library, name);
-        return arguments switch
-        {
-            [_] => ((delegate* unmanaged[Cdecl]<Record*, int>)f)(r),
-            [_, int n] => ((delegate* unmanaged[Cdecl]<Record*, int, int>)f)(r, n),
-            [_, double v] => ((delegate* unmanaged[Cdecl]<Record*, double, int>)f)(r, v),
-            [_, int w, int s, double l] =>
-                ((delegate* unmanaged[Cdecl]<Record*, int, int, double, int>)f)(r, w, s, l),
-            [_, _] => ((delegate* unmanaged[Cdecl]<Record*, Record*, int>)f)(r, r + 1),
-            [_, _, double v, int n] =>
-                ((delegate* unmanaged[Cdecl]<Record*, Record*, double, int, int>)f)(r, r + 1, v, n),
-            [_, _, _, double v, int n, int w] =>
-                ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, double, int, int, int>)f)(
-                    r, r + 1, r + 2, v, n, w),
-            [_, _, double a, double b, double c, double d, double e, double g] =>
-                ((delegate* unmanaged[Cdecl]<Record*, Record*, double, double, double, double, double,
-                    double, int>)f)(r, r + 1, a, b, c, d, e, g),
-            [_, int design, int band, int order, double a, double b, double c, double d] =>
-                ((delegate* unmanaged[Cdecl]<Record*, int, int, int, double, double, double, double,
-                    int>)f)(r, design, band, order, a, b, c, d),
-            [_, _, _] => ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, int>)f)(r, r + 1, r + 2),
-            [_, _, _, int n] =>
-                ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, int, int>)f)(r, r + 1, r + 2, n),
-            [_, _, int n] => ((delegate* unmanaged[Cdecl]<Record*, Record*, int, int>)f)(r, r + 1, n),
-            [_, _, _, int l, int s, int w, int n] =>
-                ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, int, int, int, int, int>)f)(
-                    r, r + 1, r + 2, l, s, w, n),
-            [_, int n, double a, double b, double c] =>
-                ((delegate* unmanaged[Cdecl]<Record*, int, double, double, double, int>)f)(r, n, a, b, c),
-            [_, _, int n, double a, double b, int w, int m] =>
-                ((delegate* unmanaged[Cdecl]<Record*, Record*, int, double, double, int, int, int>)f)(
-                    r, r + 1, n, a, b, w, m),
-            [_, _, _, _, int n] =>
-                ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, Record*, int, int>)f)(
-                    r, r + 1, r + 2, r + 3, n),
-            _ => ((delegate* unmanaged[Cdecl]<Record*, Record*, Record*, Record*, int>)f)(
-                r, r + 1, r + 2, arguments[3] == null ? null : r + 3),
-        };
+        Type[] types = [.. arguments.Select(argument => argument.GetType())];
+        var call = new DynamicMethod(name, typeof(int), types, typeof(CallTests).Module);
+        ILGenerator code = call.GetILGenerator();
+        for (int i = 0; i < types.Length; ++i) code.Emit(OpCodes.Ldarg, i);
+        code.Emit(OpCodes.Ldc_I8, NativeLibrary.GetExport(Library, name));
+        code.Emit(OpCodes.Conv_I);
+        code.EmitCalli(OpCodes.Calli, CallingConvention.Cdecl, typeof(int), types);
+        code.Emit(OpCodes.Ret);
+        return (int)call.Invoke(null, arguments)!;
     }
 
     private static readonly List<double[]> Lent = [];
@@ -84,10 +58,13 @@ public unsafe class CallTests
         for (int i = 0; i < 8; ++i) Compare(name, 3 + i % 2, i / 2 % 2, i / 4);
     }
 
+    internal static bool IsOptional(ParameterInfo parameter) =>
+        new NullabilityInfoContext().Create(parameter).WriteState == NullabilityState.Nullable;
+
     private static void Compare(string name, int points, int complex, int flag)
     {
         MethodInfo function = typeof(DspApi).GetMethod(name)!;
-        Record* records = stackalloc Record[4];
+        Record* records = stackalloc Record[8];
         object?[] arguments = [.. function.GetParameters().Select(parameter =>
         {
             int place = parameter.Position;
@@ -102,13 +79,15 @@ public unsafe class CallTests
             int count = table ? 6 : points, kind = table ? 0 : complex;
             records[place] = new Record
                 { Delta = 0.5, Data = Samples(place), Alloc = 0, Points = count, Complex = kind, Extra = 7 };
-            // The filter's state, which may be missing.
-            if (place == 3 && flag == 0 && name == nameof(DspApi.dspd_fir)) return null;
+            // A state may be missing.
+            if (parameter.Name == "state" && flag == 0 && IsOptional(parameter)) return null;
             return new DspInput
                 { Delta = 0.5, Data = Samples(place), Points = count, Complex = kind, Extra = (void*)7 };
         })];
 
-        Assert.Equal(CallNative(name, records, arguments), function.Invoke(null, arguments));
+        object[] native = [.. arguments.Select((argument, place) =>
+            argument is null or DspInput ? argument is null ? 0 : (nint)(records + place) : argument)];
+        Assert.Equal(CallNative(name, native), function.Invoke(null, arguments));
         for (int place = 0; place < arguments.Length; ++place)
         {
             if (arguments[place] is not DspInput x) continue;
@@ -117,7 +96,7 @@ public unsafe class CallTests
                 (x.Delta, x.Alloc, x.Points, x.Complex, (ulong)x.Extra));
             int count = x.Points * (1 + x.Complex);
             Assert.Equal(new Span<double>(y->Data, count), new Span<double>(x.Data, count));
-            Assert.Equal(0, CallNative("dsp_destroy", y, [null]));
+            Assert.Equal(0, CallNative("dsp_destroy", (nint)y));
             Assert.Equal(0, DspApi.dsp_destroy(x));
             x.Dispose();
         }

@@ -49,8 +49,7 @@ public unsafe partial class LifeCycleTests
                 var refusal = Assert.Throws<ObjectDisposedException>(() => Call(place.Position, disposed));
                 Assert.Equal("DspInput", refusal.ObjectName);
                 ++places;
-                // The filter's state and the harmonics may be missing.
-                if (place is { Position: 3, Member.Name: "dspd_fir" } || place.Name == "harmonics") continue;
+                if (CallTests.IsOptional(place)) continue;
                 Assert.Throws<NullReferenceException>(() => Call(place.Position, null));
             }
         }
