@@ -141,10 +141,11 @@ WAVKIT_API int dspfh_zoom(const dspf *in, dspf *out, int points, double first, d
  *  @param out          F complex points, NaN where there are no samples yet, `delta` of the
  *                      frequencies; may be x or the frequencies
  *  @param state        of the stream, in double precision for both: empty at its start, 2 + 67 F
- * real points afterwards, the first of them N; it shares no memory with the others
+ *                      real points afterwards, the first of them N; it shares no memory with the
+ *                      others
  *  @param flags        DSP_SPECTRUM_TWO_SIDED, DSP_SPECTRUM_SUM
- *  @return 0; -1 for complex or infinite frequencies, or none, a state that was begun with others
- * or by something else (nothing is then touched), or when memory runs out */
+ *  @return 0; -1 for complex or infinite frequencies, or none, a state that was begun with
+ *          others or by something else (nothing is then touched), or when memory runs out */
 WAVKIT_API int dsph_goertzel(const dsp *x, const dsp *frequencies, dsp *out, dsp *state, int flags);
 WAVKIT_API int dspfh_goertzel(const dspf *x, const dsp *frequencies, dspf *out, dsp *state,
                               int flags);

@@ -104,7 +104,7 @@ WAVKIT_API int dspfi_irdft(dspf *x, int odd);
  *  With start 0, step 1/N and radius 1 that are the first M bins of dspi_dft(). All phases are
  *  reduced in whole numbers before they are rounded, so that long signals and small steps lose
  *  nothing: on the unit circle the relative error in the L2 norm stays below 20 epsilon log2(N +
- * M). With another radius the powers radius^(-n) must stay within the precision.
+ *  M). With another radius the powers radius^(-n) must stay within the precision.
  *
  *  The record becomes complex with M points; `delta` becomes |step| / delta, the spacing in
  *  frequency. The time is that of three transforms of N + M points.
