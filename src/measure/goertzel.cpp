@@ -38,14 +38,13 @@ void add_products(const T* x, const T* cosines, const T* sines, std::size_t firs
                   T* with_cosine, T* with_sine) {
     constexpr std::size_t V = std::min<std::size_t>(kernel::lanes<T>, lanes);
     using Vector = kernel::Vec<T, int(V)>;
-    std::size_t i = 0;
-    const auto add_one = [&] {
-        const std::size_t lane = (first + i) % lanes;
-        with_cosine[lane] += x[i] * cosines[i];
-        with_sine[lane] += x[i] * sines[i];
-        ++i;
+    const auto add_one = [=](std::size_t at) {
+        const std::size_t lane = (first + at) % lanes;
+        with_cosine[lane] += x[at] * cosines[at];
+        with_sine[lane] += x[at] * sines[at];
     };
-    while (i < n && (first + i) % lanes != 0) add_one();
+    std::size_t i = 0;
+    for (; i < n && (first + i) % lanes != 0; ++i) add_one(i);
     Vector c[lanes / V], s[lanes / V];
     for (std::size_t k = 0; k < lanes / V; ++k) {
         c[k] = kernel::load<T, int(V)>(with_cosine + k * V);
@@ -62,7 +61,7 @@ void add_products(const T* x, const T* cosines, const T* sines, std::size_t firs
         kernel::store<T, int(V)>(with_cosine + k * V, c[k]);
         kernel::store<T, int(V)>(with_sine + k * V, s[k]);
     }
-    while (i < n) add_one();
+    for (; i < n; ++i) add_one(i);
 }
 
 /// One frequency in a state, and the phasors of the stretch that it works with.

@@ -58,7 +58,8 @@ template <class T>
 template <Record R>
 bool keeps_failed_windows(const Case<R>& c) {
     return c.name.find("window") != c.name.npos || c.name == "dsph_fft" || c.name == "dsph_dft" ||
-           c.name == "dsph_distortion" || c.name == "dsph_stft" || c.name == "dsph_istft" ||
+           c.name == "dsph_distortion" || c.name == "dsph_cross" || c.name == "dsph_response" ||
+           c.name == "dsph_zoom" || c.name == "dsph_stft" || c.name == "dsph_istft" ||
            c.name == "dspc_fir";
 }
 
