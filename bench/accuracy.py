@@ -23,16 +23,21 @@ def array_file(samples):
             + struct.pack(f"<{len(samples)}d", *samples))
 
 
-def measured(samples, *arguments):
-    """The first signal of a report about these samples."""
+def told(samples, *arguments):
+    """What a command prints about these samples."""
     with tempfile.NamedTemporaryFile(suffix=".npy", delete=False) as file:
         file.write(array_file(samples))
+    name = file.name
     try:
-        report = subprocess.run([PROGRAM, arguments[0], file.name, *arguments[1:], "--json"],
-                                check=True, capture_output=True).stdout
+        return subprocess.run([PROGRAM, arguments[0], name, *arguments[1:]],
+                              check=True, capture_output=True).stdout
     finally:
-        os.unlink(file.name)
-    return json.loads(report)["signals"][0]
+        os.unlink(name)
+
+
+def measured(samples, *arguments):
+    """The first signal of a report about these samples."""
+    return json.loads(told(samples, *arguments, "--json"))["signals"][0]
 
 
 def tone(count, frequency, phase, amplitude=1.0):
@@ -265,7 +270,22 @@ def zooms(count=4096, runs=200):
         print(f"| {window} | {worst[0]:.1e} | {worst[1]:.1e} |")
 
 
+def sections(settled=60000, count=20000):
+    """Tones at the edge of Butterworth's low-pass, which passes the root of a half of them."""
+    print("| edge | order 2 | 4 | 8 | 12 | 20 |\n|---|---|---|---|---|---|")
+    for edge in (0.1, 0.01, 0.001):
+        row = [f"{edge:g} of the rate"]
+        for order in (2, 4, 8, 12, 20):
+            x = tone(settled + count, edge, 0.3)
+            out = told(x, "filter", "--iir", "butter", "--order", str(order), "--lowpass",
+                       repr(edge), "--to", "npy")
+            y = struct.unpack(f"<{len(x)}d", out[-8 * len(x):])[settled:]
+            fit = measured(y, "fit", "--sine", "--at", repr(edge))
+            row.append(f"{abs(fit['amplitude'] / math.sqrt(0.5) - 1):.0e}")
+        print("| " + " | ".join(row) + " |")
+
+
 for table in (sine_fits, distortion, converters, responses, zooms, weightings, orders, local_polynomials,
-              outliers, frames):
+              outliers, frames, sections):
     table()
     print()

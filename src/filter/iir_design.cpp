@@ -231,7 +231,9 @@ int design_sections(dsp* out, const Request& request) {
         const Real gain = (k == 0 ? design.gain : 1) / parts[k].gain_at(design.middle);
         const Section s = parts[k].section(gain);
         const std::array row{s.b0, s.b1, s.b2, 1.0, s.a1, s.a2};
-        std::ranges::copy(row, out->data + DSP_IIR_VALUES * k);
+        // (0 is added for its sign.)
+        std::ranges::transform(row, out->data + DSP_IIR_VALUES * k,
+                               [](double v) { return v + 0.0; });
     }
     return 0;
 }

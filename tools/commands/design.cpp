@@ -1,4 +1,4 @@
-// wavkit design: the taps of a FIR filter, and what it does to the frequencies.
+// wavkit design: taps or sections of a filter, and what it does to the frequencies.
 #include <wavkit/dsp.h>
 
 #include <cmath>
@@ -11,9 +11,11 @@
 #include "base/number.hpp"
 #include "base/options.hpp"
 #include "commands/commands.hpp"
+#include "commands/design_iir.hpp"
 #include "files/recording.hpp"
 #include "measure/response.hpp"
 #include "measure/taps.hpp"
+#include "show/bands.hpp"
 #include "show/plot.hpp"
 #include "show/report.hpp"
 
@@ -56,8 +58,11 @@ struct DesignOptions {
     std::optional<double> rate;
     bool json = false;
     Tapering tapering;
+    Recursion recursion;
     WriteOptions writing;
     PictureLook look;
+
+    bool recursive() const { return !recursion.name.empty() || single_frequency(name); }
 };
 
 /// What was asked for, with frequencies in cycles a sample.
@@ -160,50 +165,23 @@ class Report {
         std::fprintf(to, "delay        %s samples", number(delay()).c_str());
         if (options_.rate) std::fprintf(to, ", %.6g s", delay() / *options_.rate);
         std::fputs("\n", to);
-        const auto gain = relative_gain(response_, request_.design.ideal);
-        print_crossings(to, "-3 dB at", crossings(gain, std::sqrt(0.5)));
-        print_crossings(to, "-6 dB at", crossings(gain, 0.5));
-        for (const auto& band : shown_bands(gain)) {
-            std::fprintf(to, "%-12s %.6g to %.6g%s, ", band.passes ? "passes" : "stops",
-                         frequency(double(band.first)), frequency(double(band.last)), unit());
-            std::fprintf(to, band.passes ? "within %.3g dB\n" : "by %.4g dB\n",
-                         std::fabs(band.decibels));
-        }
+        print_bands(to, figures());
     }
 
     JsonMembers members() const {
         static const std::map<Symmetry, const char*> symmetries{
             {Symmetry::even, "even"}, {Symmetry::odd, "odd"}, {Symmetry::none, "none"}};
-        const auto gain = relative_gain(response_, request_.design.ideal);
-        const auto places = [&](double height) {
-            std::vector<double> frequencies;
-            for (const double at : crossings(gain, height)) frequencies.push_back(frequency(at));
-            return json_numbers(frequencies);
-        };
-        std::vector<std::string> bands;
-        for (const auto& band : shown_bands(gain)) {
-            bands.push_back(json_object({{"passes", band.passes ? "true" : "false"},
-                                         {"from", json_number(frequency(double(band.first)))},
-                                         {"to", json_number(frequency(double(band.last)))},
-                                         {"db", json_number(std::fabs(band.decibels))}}));
-        }
-        return {{"design", json_text(options_.name)},
-                {"parameters", json_numbers(options_.parameters)},
-                {"taps", std::to_string(taps_->points)},
-                {"symmetry", json_text(symmetries.at(symmetry_of(taps_)))},
-                {"delay", json_number(delay())},
-                {"at_3db", places(std::sqrt(0.5))},
-                {"at_6db", places(0.5)},
-                {"bands", json_list(bands)}};
+        JsonMembers all{{"design", json_text(options_.name)},
+                        {"parameters", json_numbers(options_.parameters)},
+                        {"taps", std::to_string(taps_->points)},
+                        {"symmetry", json_text(symmetries.at(symmetry_of(taps_)))},
+                        {"delay", json_number(delay())}};
+        for (auto& member : band_members(figures())) all.push_back(std::move(member));
+        return all;
     }
 
     void draw(const std::string& path) const {
-        Curve gain, phase;
-        gain.title = title();
-        gain.y_label = "gain";
-        gain.y_unit = "dB";
-        gain.decibels = true;
-        gain.depth = 120;
+        Curve gain = gain_curve(figures(), title()), phase;
         phase.title =
             "phase where it passes, without the delay of " + number(middle()) + " samples";
         phase.y_label = "phase";
@@ -211,16 +189,13 @@ class Report {
         phase.filled = false;
         phase.range = {-200, 200};
         phase.y_tics = 90;
-        gain.x_label = phase.x_label = "frequency";
-        gain.x_unit = phase.x_unit = options_.rate ? "Hz" : "cycles a sample";
-        gain.x_range = phase.x_range = {0, frequency(double(response_.magnitude.size() - 1))};
+        phase.x_label = gain.x_label;
+        phase.x_unit = gain.x_unit;
+        phase.x_range = gain.x_range;
         const double highest = *std::ranges::max_element(response_.magnitude);
         bool shown = false;
         for (std::size_t i = 0; i < response_.magnitude.size(); ++i) {
-            // A zero would have no place on the axis, and has no phase.
             const double magnitude = response_.magnitude[i];
-            gain.x.push_back(frequency(double(i)));
-            gain.y.push_back(20 * std::log10(std::max(magnitude, 1e-15)));
             // What next to nothing passes of turns from lobe to lobe.
             constexpr double silent = 0.01;
             if (!std::exchange(shown, magnitude >= silent * highest) && shown && !phase.x.empty()) {
@@ -237,19 +212,16 @@ class Report {
     double frequency(double position) const {
         return response_.frequency(position) * options_.rate.value_or(1);
     }
-    const char* unit() const { return options_.rate ? " Hz" : ""; }
     double middle() const { return (taps_->points - 1) / 2.0; }
     double delay() const {
         return middle() + (request_.design.type == DSP_FIR_DELAY ? request_.other : 0);
     }
 
-    std::vector<ResponseBand> shown_bands(const std::vector<double>& gain) const {
-        auto bands = bands_of(gain);
+    BandFigures figures() const {
         // A ramp's kink at 0 is beyond any filter, as a part of next to nothing.
-        if (request_.design.ideal == Ideal::ramp) {
-            std::erase_if(bands, [](const auto& band) { return band.passes; });
-        }
-        return bands;
+        const bool passes_told = request_.design.ideal != Ideal::ramp;
+        return {response_, relative_gain(response_, request_.design.ideal), options_.rate,
+                passes_told};
     }
 
     std::string title() const {
@@ -258,21 +230,32 @@ class Report {
         return text + ", " + std::to_string(taps_->points) + " taps";
     }
 
-    void print_crossings(std::FILE* to, const char* label,
-                         const std::vector<double>& positions) const {
-        if (positions.empty()) return;
-        std::fprintf(to, "%-12s", label);
-        for (std::size_t i = 0; i < positions.size(); ++i) {
-            std::fprintf(to, "%s %.6g", i ? "," : "", frequency(positions[i]));
-        }
-        std::fprintf(to, "%s\n", unit());
-    }
-
     const DesignOptions& options_;
     const Request& request_;
     const Signal& taps_;
     Response response_;
 };
+
+/// A recursive filter, whose edges the library refuses where they are none.
+RecursiveFilter recursive_filter(const DesignOptions& options) {
+    const auto& tapering = options.tapering;
+    if (tapering.window || tapering.length || tapering.transition) {
+        throw UsageError("--transition, --length and --window are for taps");
+    }
+    options.recursion.check(tapering.attenuation);
+    RecursiveFilter filter{
+        CLI::detail::to_lower(options.name), {}, options.recursion, tapering.attenuation};
+    const std::size_t edges = filter.band == "bandpass" || filter.band == "bandstop" ? 2 : 1;
+    if (options.parameters.size() != edges) {
+        throw UsageError(options.name +
+                         (edges == 1 ? " takes one frequency" : " takes two frequencies"));
+    }
+    const double rate = options.rate.value_or(1);
+    const auto problem = problem_with_edges(options.parameters, rate);
+    if (!problem.empty()) throw UsageError(problem);
+    for (const double edge : options.parameters) filter.edges.push_back(edge / rate);
+    return filter;
+}
 
 void run(DesignOptions& options) {
     if (!options.plot.empty()) picture_of_name(options.plot);
@@ -281,6 +264,12 @@ void run(DesignOptions& options) {
     }
     if (!options.out.empty()) options.writing.checked_format_for(options.out);
     check_apart(options.out, options.plot, options.json);
+    if (options.recursive()) {
+        return design_recursive({recursive_filter(options), options.parameters, options.rate,
+                                 options.out, options.plot, options.json, options.writing,
+                                 options.look});
+    }
+    options.recursion.check(std::nullopt);
     const auto request = request_of(options);
     if (options.tapering.transition && options.rate) *options.tapering.transition /= *options.rate;
     auto taps = taps_of(request, options.tapering);
@@ -312,11 +301,16 @@ constexpr const char* about =
   sinh-over-root [A]
   fixed20           low-pass of 39 taps, made to halve the sampling rate
   fixed12           23 taps
+  notch F, peak F   stops or passes F alone, F / Q wide with --q Q (30): a recursive filter
 
 At the edge F a filter passes half the amplitude, in the middle of the transition. The first eight
 are tapered by a Kaiser window unless --window names another one, and have as many taps as
 --transition and --attenuation take, or --length taps, an odd number of them for highpass and
 bandstop. gauss, sinh and sinh-over-root take --length, and a window only where one is named.
+
+With --iir lowpass, highpass, bandpass and bandstop are recursive filters, second-order sections of
+--order: butter is 3 dB down at its edges, and so is bessel, of even delay; cheby1 and elliptic are
+down by --ripple there, cheby2 by --attenuation. -o writes rows of b0 b1 b2 a0 a1 a2.
 
 Without -o or --plot a summary is printed: delay, where the gain is 3 and 6 dB down, and the bands
 with their ripple or the height of their highest lobe. For differentiator and ramp the gain is that
@@ -325,13 +319,14 @@ over the ideal one; the pass band of a ramp has no figure.
 Examples:
   wavkit design lowpass 1000 --rate 48000 --transition 200 --attenuation 80
   wavkit design bandpass 0.1 0.2 --plot response.png -o taps.dsp
+  wavkit design lowpass 1000 --rate 48000 --iir elliptic --order 6 --ripple 0.1 --attenuation 80
   wavkit design hilbert 0.45 --length 101 -o - | wavkit filter tone.wav --taps - -o turned.wav)";
 
 }  // namespace
 
 void add_design(CLI::App& program) {
     auto* const command = program.add_subcommand(
-        "design", "Designs a FIR filter: figures, taps, response in gain and phase.");
+        "design", "Designs a filter: figures, taps or sections, response in gain and phase.");
     const auto options = std::make_shared<DesignOptions>();
     command->add_option("DESIGN", options->name, "the design, see below")
         ->required()
@@ -342,12 +337,13 @@ void add_design(CLI::App& program) {
         ->check(positive_number())
         ->type_name("RATE");
     command->add_flag("--json", options->json, "print JSON");
-    command->add_option("-o,--output", options->out, "write the taps; - is standard output")
+    command->add_option("-o,--output", options->out, "write taps or sections; - is standard output")
         ->type_name("FILE");
     declare_plot(*command, options->plot, "gain and phase");
     options->look.declare(*command);
     options->writing.declare(*command);
     options->tapering.declare(*command);
+    options->recursion.declare(*command);
     command->footer(about);
     command->callback([options] { run(*options); });
 }

@@ -1,4 +1,4 @@
-// wavkit filter: signals of any length through FIR filters.
+// wavkit filter: signals of any length through filters.
 #include <wavkit/dsp.h>
 
 #include <algorithm>
@@ -16,6 +16,7 @@
 #include "measure/block_change.hpp"
 #include "measure/channel_filter.hpp"
 #include "measure/prepare.hpp"
+#include "measure/sections.hpp"
 #include "measure/spectrum.hpp"
 #include "measure/taps.hpp"
 #include "show/comparison.hpp"
@@ -29,34 +30,70 @@ struct BandOption {
     const char* name;
     int type, edges;
     const char* description;
+
+    std::string band() const { return name + 2; }
+    bool recursive() const { return single_frequency(band()); }
 };
 
-constexpr std::array<BandOption, 4> band_options{{
+constexpr std::array<BandOption, 6> band_options{{
     {"--lowpass", DSP_FIR_LOW_PASS, 1, "keep what is below F"},
     {"--highpass", DSP_FIR_HIGH_PASS, 1, "keep what is above F"},
     {"--bandpass", DSP_FIR_BAND_PASS, 2, "keep what is between F1 and F2"},
     {"--bandstop", DSP_FIR_BAND_STOP, 2, "remove what is between F1 and F2"},
+    {"--notch", DSP_IIR_NOTCH, 1, "remove F alone, F / Q wide"},
+    {"--peak", DSP_IIR_PEAK, 1, "keep F alone, F / Q wide"},
 }};
 
 struct FilterOptions {
-    std::string in, out, taps, plot;
+    std::string in, out, taps, sections, plot;
     std::array<std::vector<double>, band_options.size()> edges;
     std::vector<double> span;
     std::optional<int> delay;
-    bool hold = false;
+    bool hold = false, zero_phase = false;
     Tapering tapering;
+    Recursion recursion;
     ReadOptions reading;
     WriteOptions writing;
     PictureLook look;
 };
 
+bool is_recursive(const FilterOptions& options) {
+    const auto& edges = options.edges;
+    return !options.recursion.name.empty() || !options.sections.empty() || !edges[4].empty() ||
+           !edges[5].empty();
+}
+
+void check_recursion(const FilterOptions& options) {
+    const auto& tapering = options.tapering;
+    options.recursion.check(is_recursive(options) ? tapering.attenuation : std::nullopt);
+    if (!is_recursive(options)) {
+        if (options.zero_phase)
+            throw UsageError(
+                "--zero-phase is for --iir, --notch, --peak and --sections: taps are shifted back "
+                "by their delay");
+        return;
+    }
+    if (!options.taps.empty() || tapering.window || tapering.length || tapering.transition ||
+        options.delay) {
+        throw UsageError("--taps, --transition, --length, --window and --delay are for taps");
+    }
+    if (options.zero_phase && options.hold) {
+        throw UsageError("--zero-phase continues the ends in its own way, --hold in another");
+    }
+    const auto given = [&](std::size_t i) { return !options.edges[i].empty(); };
+    if (options.recursion.name.empty() && (given(0) || given(1) || given(2) || given(3))) {
+        throw UsageError("taps and sections do not go together: give --iir for the bands");
+    }
+}
+
 void check_usage(FilterOptions& options) {
     const bool bands = std::ranges::any_of(options.edges, [](auto& e) { return !e.empty(); });
-    if (bands == !options.taps.empty()) {
+    if (bands + !options.taps.empty() + !options.sections.empty() != 1) {
         throw UsageError(
-            "say what to filter by: bands (--lowpass, --highpass, --bandpass, --bandstop) or "
-            "--taps");
+            "say what to filter by: bands (--lowpass, --highpass, --bandpass, --bandstop, --notch, "
+            "--peak), --taps or --sections");
     }
+    check_recursion(options);
     const auto& tapering = options.tapering;
     if (!options.taps.empty() &&
         (tapering.window || tapering.length || tapering.transition || tapering.attenuation)) {
@@ -64,8 +101,8 @@ void check_usage(FilterOptions& options) {
             "--transition, --attenuation, --length and --window are for filters designed here, not "
             "for --taps");
     }
-    if (options.taps == "-" && options.in == "-") {
-        throw UsageError("standard input holds either the signal or the taps");
+    if ((options.taps == "-" || options.sections == "-") && options.in == "-") {
+        throw UsageError("standard input holds either the signal or the filter");
     }
     if (options.plot.empty()) {
         if (!options.span.empty()) throw UsageError("--span is for --plot");
@@ -108,6 +145,34 @@ Signal designed_taps(const FilterOptions& options, double delta) {
         taps = taps->points > 0 ? convolved(std::move(taps), band) : std::move(band);
     }
     return taps;
+}
+
+/// Sections for all bands that were asked for, one behind the other.
+Signal designed_sections(const FilterOptions& options, double delta) {
+    check_spacing(delta);
+    Signal all;
+    for (std::size_t i = 0; i < band_options.size(); ++i) {
+        const auto& edges = options.edges[i];
+        if (edges.empty()) continue;
+        const auto problem = problem_with_edges(edges, 1 / delta);
+        if (!problem.empty()) throw DataError(problem);
+        RecursiveFilter filter{
+            band_options[i].band(), {}, options.recursion, options.tapering.attenuation};
+        for (const double edge : edges) filter.edges.push_back(edge * delta);
+        all.append(filter.sections().values());
+    }
+    return all;
+}
+
+Signal given_sections(const FilterOptions& options) {
+    auto sections = first_signal(options.sections, {});
+    Signal gain;
+    with_data_of(options.sections, [&] {
+        if (sections->points < 1 || dspc_iir_response(gain, sections, Signal())) {
+            throw DataError("sections are rows of six values: b0 b1 b2 a0 a1 a2");
+        }
+    });
+    return sections;
 }
 
 Signal given_taps(const FilterOptions& options) {
@@ -161,7 +226,11 @@ class Filters {
 class FilterRun {
   public:
     explicit FilterRun(const FilterOptions& options)
-        : options_(options), input_(options.in), filters_(options) {}
+        : options_(options), input_(options.in), filters_(options) {
+        sections_.hold = options.hold;
+        sections_.zero_phase = options.zero_phase;
+        if (!options.sections.empty()) sections_.sections = given_sections(options);
+    }
 
     void run() {
         if (!options_.out.empty()) output_.emplace(options_.out, options_.writing);
@@ -173,10 +242,22 @@ class FilterRun {
 
   private:
     void filter(SampleStream& stream, bool sound) {
-        const auto& filtering = filters_.at(stream.delta);
-        ChannelFilter filter(filtering, stream);
+        if (is_recursive(options_)) {
+            if (options_.sections.empty())
+                sections_.sections = designed_sections(options_, stream.delta);
+            pass(stream, sound, stream.complex,
+                 [&](const auto& take) { filter_by_sections(sections_, stream, take); });
+            return;
+        }
+        ChannelFilter filter(filters_.at(stream.delta), stream);
+        pass(stream, sound, filter.complex_output(), [&](const auto& take) { filter.run(take); });
+    }
+
+    /// Hands on what `run` makes of a stream.
+    template <class Run>
+    void pass(SampleStream& stream, bool sound, bool complex, Run run) {
         const bool draws = !options_.plot.empty() && !comparison_;
-        if (draws && filter.complex_output()) throw DataError("--plot draws real signals only");
+        if (draws && complex) throw DataError("--plot draws real signals only");
         if (draws) {
             const auto facts = stream.facts_of(0);
             comparison_.emplace(ComparisonLabels{short_name(options_.in), "filtered",
@@ -186,11 +267,10 @@ class FilterRun {
         }
         auto* const writer = output_ ? &output_->writer() : nullptr;
         if (writer)
-            writer->begin({stream.delta, filter.complex_output(), stream.channels, stream.length,
-                           stream.facts});
+            writer->begin({stream.delta, complex, stream.channels, stream.length, stream.facts});
         {
             Progress progress("filtering " + input_.name());
-            filter.run([&](std::span<const double> in, std::span<const double> out) {
+            run([&](std::span<const double> in, std::span<const double> out) {
                 if (writer) writer->write(out);
                 if (draws) comparison_->add(in, out);
                 progress.done(stream.done());
@@ -202,6 +282,7 @@ class FilterRun {
     const FilterOptions& options_;
     InputFile input_;
     Filters filters_;
+    SectionFiltering sections_;
     std::optional<SignalOutput> output_;
     std::optional<Comparison> comparison_;
 };
@@ -218,6 +299,12 @@ and before and behind the signal there are zeros, or with --hold its first and l
 over, which spares a signal with an offset the jumps at its ends. Taps that are not their own mirror
 image have no such delay. --delay 0 leaves every output to the samples up to its own.
 
+With --iir the bands are recursive filters, second-order sections: --order 4 of butter, cheby1,
+cheby2, elliptic or bessel; --notch and --peak are such by themselves, and --sections takes rows of
+b0 b1 b2 a0 a1 a2 from a file. They delay, each frequency by its own time; --zero-phase runs them
+forwards and backwards over the whole signal, which must fit into memory: no delay, twice the
+decibels. --hold lets them begin as if the first sample had been there for ever.
+
 The recording may be longer than memory. All signals of a file are filtered, all channels of a sound
 file too; into another sound file, of several signals one must be chosen. Without -o the output goes
 to standard output, in binary unless --to says otherwise, or nowhere beside --plot, which draws the
@@ -227,13 +314,15 @@ Examples:
   wavkit filter hum.wav --bandstop 45 55 -o clean.wav
   wavkit filter log.csv --time --lowpass 2 --transition 1 --attenuation 80 -o smooth.csv --with-time
   wavkit filter ecg.txt --rate 360 --highpass 0.5 --bandstop 59 61 --hold --plot ecg.png --span 10 15
+  wavkit filter ecg.txt --rate 360 --iir butter --bandpass 0.5 40 --zero-phase -o clean.txt
+  wavkit filter hum.wav --notch 50 --q 20 -o clean.wav
   wavkit filter - --lowpass 100 <tone.wav | wavkit spectrum - --peaks 3)";
 
 }  // namespace
 
 void add_filter(CLI::App& program) {
     auto* const command = program.add_subcommand(
-        "filter", "Filters signals: low-pass, high-pass, band-pass, band-stop, any taps.");
+        "filter", "Filters signals: low-pass, high-pass, band-pass, band-stop, notch, any filter.");
     const auto options = std::make_shared<FilterOptions>();
     command->add_option("IN", options->in, "file to read; - is standard input")
         ->required()
@@ -246,6 +335,10 @@ void add_filter(CLI::App& program) {
     }
     command->add_option("--taps", options->taps, "filter by the taps of a signal file")
         ->type_name("FILE");
+    command->add_option("--sections", options->sections, "filter by the sections of a signal file")
+        ->type_name("FILE");
+    command->add_flag("--zero-phase", options->zero_phase,
+                      "run sections forwards and backwards: no delay");
     command
         ->add_option("-o,--output", options->out, "file to write; - is standard output (default)")
         ->type_name("FILE");
@@ -261,6 +354,7 @@ void add_filter(CLI::App& program) {
     command->add_flag("--hold", options->hold,
                       "continue the ends by their last sample, not by zeros");
     options->tapering.declare(*command);
+    options->recursion.declare(*command);
     options->reading.declare(*command);
     options->writing.declare(*command);
     options->look.declare(*command);

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 
+#include "measure/groups.hpp"
 #include "measure/prepare.hpp"
 #include "measure/taps.hpp"
 
@@ -11,15 +12,6 @@ namespace wavkit::tool {
 namespace {
 
 constexpr std::size_t block_points = 1 << 16;
-
-/// Copies every `from_step`-th group of `width` scalars.
-void copy_groups(const double* from, std::size_t from_step, double* to, std::size_t to_step,
-                 std::size_t width, std::size_t count) {
-    for (std::size_t i = 0; i < count; ++i) {
-        for (std::size_t part = 0; part < width; ++part)
-            to[i * to_step + part] = from[i * from_step + part];
-    }
-}
 
 }  // namespace
 

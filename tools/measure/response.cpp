@@ -73,6 +73,23 @@ Response response_of(const Signal& taps) {
     return response;
 }
 
+SectionResponse response_of_sections(const Signal& sections) {
+    constexpr int last = 1 << 16;
+    Signal at(0.5 / last), bins, delays;
+    at->points = last + 1;
+    check(dspc_line(at, 1, 0) || dspc_iir_response(bins, sections, at) ||
+              dspc_iir_delay(delays, sections, at),
+          "computing the response");
+    SectionResponse response{{{}, {}, at->delta}, {}};
+    for (std::size_t k = 0; k <= last; ++k) {
+        const double re = bins->data[2 * k], im = bins->data[2 * k + 1];
+        response.magnitude.push_back(std::hypot(re, im));
+        response.phase.push_back(degrees(std::atan2(im, re)));
+        response.delay.push_back(delays->data[k]);
+    }
+    return response;
+}
+
 std::vector<double> relative_gain(const Response& response, Ideal ideal) {
     auto gain = response.magnitude;
     if (ideal == Ideal::flat) return gain;

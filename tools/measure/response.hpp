@@ -20,6 +20,13 @@ struct Response {
 
 Response response_of(const Signal& taps);
 
+/// That of sections, and their delay in samples.
+struct SectionResponse : Response {
+    std::vector<double> delay;
+};
+
+SectionResponse response_of_sections(const Signal& sections);
+
 /// What a response is measured against: 1, or a gain that rises with the frequency.
 enum class Ideal { flat, derivative, ramp };
 
