@@ -2,7 +2,7 @@
 // liquid-dsp.
 #include <liquid/liquid.h>
 
-#include "peers.hpp"
+#include "rows.hpp"
 
 namespace wavkit::bench {
 namespace {

@@ -63,9 +63,8 @@ class Wavefront {
         constexpr std::int64_t filled = std::int64_t(behind) * (depth - 1);
         constexpr double zero[W] = {};
         const std::int64_t steps = n + filled;
-        std::int64_t t = 0;
         // Of the lanes that have a sample, where some have none yet or none any more.
-        const auto partial_step = [&] {
+        const auto partial_step = [&](std::int64_t t) {
             Lanes before = new_sample(t < n ? in + W * t : zero);
             for (int p = 0; p < P; ++p) {
                 Lanes& line = line_[t % behind][p];
@@ -79,9 +78,9 @@ class Wavefront {
                 line = y;
             }
             if (t >= filled) write(line_[t % behind][P - 1], out + W * (t - filled));
-            ++t;
         };
-        while (t < filled && t < steps) partial_step();
+        std::int64_t t = 0;
+        for (; t < std::min(filled, steps); ++t) partial_step(t);
         for (; t + behind <= n; t += behind) {
             unrolled<behind>([&](auto j) {
                 Lanes before = new_sample(in + W * (t + j));
@@ -96,7 +95,7 @@ class Wavefront {
                 write(line_[j][P - 1], out + W * (t + j - filled));
             });
         }
-        while (t < steps) partial_step();
+        for (; t < steps; ++t) partial_step(t);
     }
 
     /// What comes to be the history.
