@@ -79,6 +79,7 @@ class Report {
   private:
     static std::string complex_list(const double* parts, int count) {
         std::vector<std::string> values;
+        values.reserve(std::size_t(count));
         for (int k = 0; k < count; ++k) {
             values.push_back(json_value({parts[2 * k], parts[2 * k + 1]}));
         }

@@ -192,7 +192,8 @@ Signal RecursiveFilter::roots() const { return made_by(dspc_iir_zpk); }
 void filter_by_sections(
     const SectionFiltering& filtering, SampleStream& stream,
     const std::function<void(std::span<const double>, std::span<const double>)>& take) {
-    const std::size_t step = stream.width(), width = stream.complex ? 2 : 1;
+    const std::size_t width = stream.complex ? 2 : 1;
+    const std::size_t step = width * std::max<std::size_t>(stream.channels, 1);
     std::vector<Channel> channels;
     for (std::size_t c = 0; c < stream.channels; ++c)
         channels.emplace_back(filtering, stream.complex);
