@@ -307,8 +307,10 @@ void add_own_calls(Add add) {
                                                         0.1, 0, 0, 0);
     });
     add("dspc_iir_state", [](R*) {
-        Signal<dsp> state, rows = real<dsp>({1, 2, 1, 1, -0.5, 0.25});
-        return pick<R>(::dspc_iir_state, ::dspfc_iir_state)(state, rows);
+        std::array row{1.0, 2.0, 1.0, 1.0, -0.5, 0.25};
+        const dsp rows{1, row.data(), 0, int(row.size()), 0, 0};
+        Signal<dsp> state;
+        return pick<R>(::dspc_iir_state, ::dspfc_iir_state)(state, &rows);
     });
     add("dspc_seed", [](R* x) { return status(seed_random<R>(5) || dspc_rand(x, 0)); });
 }
