@@ -122,8 +122,8 @@ WAVKIT_API int dspfi_window_fir(dspf *h, int window, float bw);
  *  For samples `delta` apart, the taps are to be multiplied by delta^times.
  *
  *  A complex record stays complex, with imaginary parts 0.
- *  @param h      2 ceil(13.5 / low) + 1 taps, odd for one integral and even for two; a borrowed
- *                buffer is replaced
+ *  @param h      2 ceil(13.5 / min(low, 0.1)) + 1 taps, odd for one integral and even for two; a
+ *                borrowed buffer is replaced
  *  @param times  1 or 2
  *  @param low    in cycles a sample, above 0, no more than 0.4
  *  @return 0; -1 for other integrals, another edge or one too low for 2^30 points (nothing is then

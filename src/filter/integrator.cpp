@@ -1,5 +1,6 @@
 // Integrals without drift: filters of gain 1 / (2 pi i f) that stop what is too slow to be told
 // from an offset.
+#include <algorithm>
 #include <bit>
 #include <cmath>
 
@@ -9,10 +10,10 @@ namespace wavkit {
 namespace {
 
 /// The steps between what stops and what passes are those of a Gaussian's integral, this many of
-/// its deviations to either side: 100 dB. So the taps fall off as a Gaussian, too, and as far when
-/// the filter is so many periods of its lower edge long to either side.
+/// its deviations to either side: 100 dB. So the taps fall off as a Gaussian, too, and as far where
+/// they reach so many times the reciprocal of twice the shorter step.
 constexpr double deviations = 4.26, reach = 13.5;
-constexpr double highest = 0.45;  // that passes, in cycles a sample
+constexpr double last_step = 0.05;  // up to half the sampling rate
 
 /// From 0 to 1 about x = 0, half a width to either side.
 double step(double x, double width) {
@@ -22,7 +23,7 @@ double step(double x, double width) {
 template <Record R>
 int integrator(R* h, int times, double low) {
     if ((times != 1 && times != 2) || !(low > 0 && low <= 0.4)) return -1;
-    const double half = std::ceil(reach / low);
+    const double half = std::ceil(reach / std::min(low, 2 * last_step));
     if (8 * half > double(longest_transform)) return -1;
     const auto centre = std::int64_t(half);
     const auto count = std::int64_t(std::bit_ceil(std::uint64_t(8 * centre)));
@@ -34,7 +35,8 @@ int integrator(R* h, int times, double low) {
     gains[0] = {0, 0};
     for (std::size_t k = 1; k < gains.size(); ++k) {
         const double f = double(k) / double(count), w = two_pi<double> * f;
-        const double passed = step(f - 0.75 * low, 0.5 * low) * step(0.475 - f, 0.5 - highest);
+        const double passed =
+            step(f - 0.75 * low, 0.5 * low) * step(0.5 - last_step / 2 - f, last_step);
         gains[k] = times == 1 ? Bin<double>{0, -passed / w} : Bin<double>{-passed / (w * w), 0};
     }
     if (times == 1) gains.back() = {0, 0};

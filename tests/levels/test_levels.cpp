@@ -12,9 +12,10 @@ double gain_db(const dsp* sections, double f, double rate) {
     const auto back = std::polar(1.0L, -2 * pi<long double> * f / rate);
     long double gain = 0;
     for (const double* r = sections->data; r != sections->data + sections->points; r += 6) {
-        const auto b = r[0] + back * (r[1] + back * (long double)r[2]);
-        const auto a = r[3] + back * (r[4] + back * (long double)r[5]);
-        gain += 20 * std::log10(std::abs(b / a));
+        const auto value = [&](const double* c) {
+            return (long double)c[0] + back * ((long double)c[1] + back * (long double)c[2]);
+        };
+        gain += 20 * std::log10(std::abs(value(r) / value(r + 3)));
     }
     return double(gain);
 }

@@ -24,21 +24,21 @@ inline constexpr std::string_view plain =
     "dsp_version dsp_window_from_str dsp_window_to_str dspb_add dspb_avg_add dspb_conj_mul "
     "dspb_div dspb_inter dspb_max dspb_min dspb_mul dspb_pmul dspb_ritoc dspb_sub dspbs_dot "
     "dspc_cexp dspc_cos dspc_iir dspc_iir_delay dspc_iir_response dspc_iir_state dspc_iir_zpk "
-    "dspc_line dspc_rsmp_cos "
-    "dspc_seed dspd_fir dspd_iir dspf_fclose dspf_fopen "
-    "dspf_fwrite dspf_fwrite_ascii dspi_abs dspi_acos dspi_addcos dspi_analytic dspi_asin "
-    "dspi_atan dspi_besi0 dspi_besj0 dspi_besj1 dspi_besy0 dspi_besy1 dspi_bitrev "
-    "dspi_bitrev_scale dspi_conj dspi_cos dspi_cosh dspi_cscale dspi_db dspi_differ dspi_erf "
-    "dspi_erfc dspi_exp dspi_exp10 dspi_gamma dspi_hilbert dspi_hwfilt dspi_imag dspi_integ "
-    "dspi_irfft dspi_lgamma dspi_log dspi_log10 dspi_mag dspi_magsq dspi_neg dspi_offset "
-    "dspi_pdiffer dspi_phase dspi_proots dspi_ptor dspi_pztoc dspi_rdft dspi_real dspi_recip "
-    "dspi_recon dspi_rev dspi_rfft dspi_rtoc dspi_rtop dspi_scale dspi_shift dspi_shuffle dspi_sin "
-    "dspi_sinc dspi_sinh dspi_sort dspi_sqrt dspi_square dspi_swap_halves dspi_swap_halves2 "
-    "dspi_tan dspi_tanh dspi_timesi dspi_unwrap dspi_window_cos dspi_window_gauss dspi_window_sinc "
-    "dspi_zero dspi_zinter dsps_excess dsps_gmean dsps_hmean dsps_lin_regres dsps_lin_regres2 "
-    "dsps_magsq_sum dsps_max dsps_mean dsps_median dsps_min dsps_pcsolve dsps_peval "
-    "dsps_pop_stddev dsps_pop_var dsps_proots dsps_psolve dsps_rms dsps_samp_stddev dsps_samp_var "
-    "dsps_skew dsps_sum dspu_mag dspu_magsq dspu_sqrt";
+    "dspc_line dspc_octave dspc_octaves dspc_rsmp_cos dspc_seed dspc_weighting dspd_fir dspd_iir "
+    "dspf_fclose dspf_fopen dspf_fwrite dspf_fwrite_ascii dsph_levels dsph_rsmp_angle dspi_abs "
+    "dspi_acos dspi_addcos dspi_analytic dspi_asin dspi_atan dspi_besi0 dspi_besj0 dspi_besj1 "
+    "dspi_besy0 dspi_besy1 dspi_bitrev dspi_bitrev_scale dspi_conj dspi_cos dspi_cosh "
+    "dspi_cscale dspi_db dspi_differ dspi_erf dspi_erfc dspi_exp dspi_exp10 dspi_gamma "
+    "dspi_hilbert dspi_hwfilt dspi_imag dspi_integ dspi_irfft dspi_lgamma dspi_log dspi_log10 "
+    "dspi_mag dspi_magsq dspi_neg dspi_offset dspi_pdiffer dspi_phase dspi_proots dspi_ptor "
+    "dspi_pztoc dspi_rdft dspi_real dspi_recip dspi_recon dspi_rev dspi_rfft dspi_rtoc dspi_rtop "
+    "dspi_scale dspi_shift dspi_shuffle dspi_sin dspi_sinc dspi_sinh dspi_sort dspi_sqrt "
+    "dspi_square dspi_swap_halves dspi_swap_halves2 dspi_tan dspi_tanh dspi_timesi dspi_unwrap "
+    "dspi_window_cos dspi_window_gauss dspi_window_sinc dspi_zero dspi_zinter dsps_excess "
+    "dsps_gmean dsps_hmean dsps_lin_regres dsps_lin_regres2 dsps_magsq_sum dsps_max dsps_mean "
+    "dsps_median dsps_min dsps_pcsolve dsps_peval dsps_pop_stddev dsps_pop_var dsps_proots "
+    "dsps_psolve dsps_rms dsps_samp_stddev dsps_samp_var dsps_skew dsps_sum dspu_mag dspu_magsq "
+    "dspu_sqrt";
 
 using Cases = std::vector<std::vector<double>>;
 
@@ -73,12 +73,9 @@ inline const std::map<std::string, Cases> numbers = {
     {"dspc_fir", {{3}, {4, 0}, {7, 0.05}}},
     {"dspc_fir2", {{100}, {101}}},
     {"dspc_integrator", {{1, 0.3}, {2, 0.25}}},
-    {"dspc_octave", {{1000, 3, 48000}}},
-    {"dspc_octaves", {{3, 100, 5000}}},
     {"dspc_rand", {{0}, {1}, {3}}},
     {"dspc_rsmp", {{2, 0.2, 0.8, 40}}},
     {"dspc_rsmp_pcos", {{3, 0.4, 2}}},
-    {"dspc_weighting", {{1, 48000}, {2, 8000}}},
     {"dspd_deci", {{1}, {3}}},
     {"dspd_hampel", {{3, 1, 0, 0}, {18, 3, 2, 1}}},
     {"dspd_iir_zero_phase", {{-1}, {3}}},
@@ -285,16 +282,28 @@ void add_own_calls(Add add) {
         return status(dsph_cross(x, x, state, 4, 2, DSP_WINDOW_HANN, 0) ||
                       dsph_response(state, out, kind));
     });
+    add("dspc_octave", [](R*) {
+        Signal<dsp> rows;
+        return pick<R>(::dspc_octave, ::dspfc_octave)(rows, 1000, 3, 48000);
+    });
+    add("dspc_octaves", [](R*) {
+        Signal<dsp> centres;
+        return pick<R>(::dspc_octaves, ::dspfc_octaves)(centres, 3, 100, 5000);
+    });
+    add("dspc_weighting", [](R*) {
+        Signal<dsp> rows;
+        return pick<R>(::dspc_weighting, ::dspfc_weighting)(rows, DSP_WEIGHTING_A, 48000);
+    });
     add("dsph_levels", [](const R* x, R* out) {
-        Signal<dsp> state, weighting;
-        return status(
-            pick<R>(::dspc_weighting, ::dspfc_weighting)(weighting, DSP_WEIGHTING_C, 8000) ||
-            dsph_levels(x, out, weighting, 2, 1, state) ||
-            dsph_levels(x, out, weighting, 2, 1, state));
+        double row[] = {1, 0.5, 0.25, 1, -0.5, 0.25};
+        const dsp sections{1, row, 0, int(std::size(row)), 0, 0};
+        Signal<dsp> state;
+        return dsph_levels(x, out, &sections, 2, 1, state);
     });
     add("dsph_rsmp_angle", [](const R* x, R* out) {
-        const auto pulses = real<dsp>({0.25, 1, 2, 4.5, 7.5});
-        return dsph_rsmp_angle(x, out, pulses, 2, 0);
+        double at[] = {0.25, 1, 2, 4.5, 7.5};
+        const dsp pulses{1, at, 0, int(std::size(at)), 0, 0};
+        return dsph_rsmp_angle(x, out, &pulses, 2, 0);
     });
     add("dspc_iir", [](R*) {
         Signal<dsp> rows;

@@ -20,7 +20,7 @@ TEST_F(LevelsTest, OfTonesThroughWeightingsAndBands) {
     const auto json = printed("levels x.dsp --octaves 3 --json");
     EXPECT_NEAR(member(json, "leq"), -20, 0.01);
     EXPECT_NEAR(member(json, "max"), -20, 0.05);
-    EXPECT_NEAR(member(json, "peak"), -20 + 3.01, 0.1);
+    EXPECT_NEAR(member(json, "peak"), -20 + 3.01, 0.3);
     EXPECT_NEAR(member(json, "exposure"), -20 + 3.01, 0.01);
     EXPECT_NEAR(member(json, "l50"), -20, 0.05);
     EXPECT_EQ(member(json, "response_ms"), 125);
@@ -30,7 +30,8 @@ TEST_F(LevelsTest, OfTonesThroughWeightingsAndBands) {
     EXPECT_LT(member(json, "leq", 16), -20 - 16.6);
     const auto second = printed("levels x.dsp --signal 2 --weighting C --response slow --json");
     EXPECT_NEAR(member(second, "leq"), -10 - 0.8, 0.1);
-    EXPECT_TRUE(std::isnan(member(second, "min")));  // 2 s are no five time constants
+    // (2 s are no five time constants.)
+    EXPECT_NE(second.find("\"min\":null"), second.npos) << second;
     EXPECT_NEAR(member(printed("levels x.dsp --signal 2 --json"), "leq"), -10 - 26.2, 0.1);
     const auto text = printed("levels x.dsp --octaves 1 --weighting z");
     EXPECT_NE(text.find("Leq           -20.00 dB\n"), text.npos) << text;
@@ -54,8 +55,8 @@ TEST_F(LevelsTest, AreCalibrated) {
     for (const auto& [arguments, words] :
          {std::pair("x.dsp --calibrator calibrator.dsp --reference 2", "exclude each other"),
           {"x.dsp --rate 1500", "is too low for the weighting"},
-          {"x.dsp --weighting z --octaves 1 --to 30000", "out of reach"},
-          {"x.dsp --from 100", "go with --octaves"},
+          {"x.dsp --weighting z --octaves 1 --band 20 32000", "out of reach"},
+          {"x.dsp --band 100 200", "goes with --octaves"},
           {"x.dsp --response quick", "fast, slow or a number"},
           {"x.dsp --every 1e-9", "no useful number of samples"}}) {
         const auto done = shell(std::string("wavkit levels ") + arguments);
@@ -69,8 +70,9 @@ TEST_F(LevelsTest, IntegralsHaveNoDrift) {
     std::vector<long double> a;
     for (int n = 0; n < 20000; ++n) a.push_back(9.81 - w * w * std::sin(w * n * 1e-3));
     write("a.dsp", Signals{real<dsp>(a, 1e-3)});
-    printed("integrate a.dsp --highpass 5 --twice -o x.dsp && wavkit integrate a.dsp --highpass 5 "
-            "-o v.dsp");
+    printed(
+        "integrate a.dsp --highpass 5 --twice -o x.dsp && wavkit integrate a.dsp --highpass 5 "
+        "-o v.dsp");
     const auto x = read("x.dsp").at(0), v = read("v.dsp").at(0);
     ASSERT_EQ(x->points, 20000);
     for (int n = 3000; n < 17000; n += 7) {

@@ -21,6 +21,7 @@
 #include "show/labels.hpp"
 #include "show/plot.hpp"
 #include "show/report.hpp"
+#include "show/spectrum_report.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -32,7 +33,8 @@ struct LevelsOptions {
     std::optional<int> weighting;
     double response = DSP_TIME_FAST;  // in milliseconds
     double every = 0.1, calibrator_level = 94;
-    std::optional<double> reference, from, to;
+    std::optional<double> reference;
+    std::vector<double> band;  // of the lowest and the highest centre
     ReadOptions reading;
     PictureLook look;
 
@@ -106,14 +108,14 @@ struct Measured {
         }
         if (options.octaves == 0) return;
         Signal centres;
-        check(dspc_octaves(centres, options.octaves, options.from.value_or(19.5),
-                           options.to.value_or(20500)),
+        check(dspc_octaves(centres, options.octaves, options.band.empty() ? 19.5 : options.band[0],
+                           options.band.empty() ? 20500 : options.band[1]),
               "laying out the bands");
         for (const double centre : centres.values()) {
             BandMeter band{centre, band_name(centre, options.octaves), {}};
             if (dspc_octave(band.meter.sections, centre, options.octaves, rate) == 0) {
                 bands.push_back(std::move(band));
-            } else if (options.to || bands.empty()) {
+            } else if (!options.band.empty() || bands.empty()) {
                 throw DataError("the band of " + band.name + " is out of reach of a rate of " +
                                 rounded(rate));
             }
@@ -315,8 +317,9 @@ void run(const LevelsOptions& options) {
     if (!options.calibrator.empty() && options.reference) {
         throw UsageError("--calibrator and --reference exclude each other");
     }
-    if ((options.from || options.to) && options.octaves == 0) {
-        throw UsageError("--from and --to go with --octaves");
+    check_band_order(options.band);
+    if (!options.band.empty() && options.octaves == 0) {
+        throw UsageError("--band goes with --octaves");
     }
     report_files("levels", options.files,
                  [&](const std::string& file, Page& page) { tell(file, options, page); });
@@ -377,12 +380,10 @@ void add_levels(CLI::App& program) {
     command->add_option("--octaves", options->octaves, "bands in an octave: 1, 3, 6, 12, 24 ...")
         ->check(CLI::Range(1, 96))
         ->type_name("N");
-    command->add_option("--from", options->from, "lowest band (default: 20)")
+    command->add_option("--band", options->band, "lowest and highest band (default: 20 to 20000)")
+        ->expected(2)
         ->check(number_between(1e-3, 1e9))
-        ->type_name("F");
-    command->add_option("--to", options->to, "highest band (default: 20000, as far as there)")
-        ->check(number_between(1e-3, 1e9))
-        ->type_name("F");
+        ->type_name("LOW HIGH");
     command->add_option("--reference", options->reference, "value of 0 dB")
         ->check(positive_number())
         ->type_name("R");
