@@ -163,7 +163,7 @@ def frames(count=100000):
 
 
 def weightings():
-    """From the impulse responses, through the program."""
+    """By tones, without what their beginning excites: of the second half of each."""
     print("| rate | A: to | greatest error | bilinear transform |\n|---|---|---|---|")
     corners = (20.598997, 20.598997, 107.652648, 737.862230, 12194.217148, 12194.217148)
 
@@ -177,21 +177,19 @@ def weightings():
         highest, worst, plain = min(20000, 0.45 * rate), 0.0, 0.0
         for step in range(60):
             f = 10 * (highest / 10) ** (step / 59)
-            # Long enough for the start to count nothing, and whole periods.
-            count = int(rate * max(2, 40 / f))
-            f = max(1, round(f * count / rate)) * rate / count
-            x = tone(count, f / rate, -math.pi / 2)
-            found = levels_of(x, rate)
-            error = found["leq"] + 10 * math.log10(2) - analog(f) + analog(1000)
+            # Whole periods.
+            count = 2 * int(rate / 2)
+            f = max(2, round(f)) * rate / count
+            x = tone(2 * count, f / rate, -math.pi / 2)
+            held = [10 ** (measured(part, "levels", "--rate", str(rate))["exposure"] / 10)
+                    for part in (x[:count], x)]
+            mean_square = (held[1] - held[0]) * rate / count
+            error = 10 * math.log10(2 * mean_square) - analog(f) + analog(1000)
             worst = max(worst, abs(error))
             warped = rate / math.pi * math.tan(math.pi * f / rate)
             level = rate / math.pi * math.tan(math.pi * 1000 / rate)
             plain = max(plain, abs(analog(warped) - analog(level) - analog(f) + analog(1000)))
         print(f"| {rate / 1000:g} kHz | {highest / 1000:g} kHz | {worst:.2f} dB | {plain:.1f} dB |")
-
-
-def levels_of(samples, rate):
-    return measured(samples, "levels", "--rate", str(rate), "--every", "1")
 
 
 def orders(runs=20, rate=5000, seconds=10):

@@ -49,7 +49,7 @@ enum {
  *  for 20.6, 107.7, 737.9 and 12194 Hz, with the gain 1 at 1 kHz. Their poles go to e^(-w / rate)
  *  and their zeros to 1; four more zeros make up for what that lacks: their squared gain, a
  *  polynomial in cos w, goes through that of the analog filter at five Chebyshev nodes of the band
- *  up to 0.46 of the rate. A bilinear transform alone is 3 dB down at 12.5 kHz for 48 kHz; this
+ *  up to 0.46 of the rate. A bilinear transform alone is 2.6 dB off at 12.5 kHz for 48 kHz; this
  *  stays within 0.11 dB of the analog gain from 10 Hz to 20 kHz or 0.45 of the rate, at any rate.
  *
  *  @param sections   4 rows for A, 3 for C, none for Z

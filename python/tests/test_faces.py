@@ -626,7 +626,7 @@ def test_levels_of_weighted_noise():
     close(found.greatest, 10 * np.log10(course.max(-1) / 0.25))
     close(found.least, 10 * np.log10(course[:, 1999:].min(-1) / 0.25))
     centres, bands = wavkit.octave_bands(1, rate=rate)
-    assert found.bands.shape == (2, len(centres)) and len(bands) == 8
+    assert found.bands.shape == (2, len(centres)) and len(bands) == 7
     in_band = scipy.signal.sosfilt(bands[5], noise)
     close(found.bands[:, 5], 10 * np.log10((in_band**2).mean(-1) / 0.25), 1e-8)
     with pytest.raises(ValueError, match="a weighting is A, C or Z"):
@@ -639,7 +639,7 @@ def test_signals_over_the_angle():
     x = np.stack((np.cos(2 * np.pi * 3 * turned), np.sin(2 * np.pi * turned)))
     y = wavkit.over_angle(x, pulses, RATE, angles=64)
     angle = np.arange(y.shape[-1]) / 64
-    close(y[0, 64:-64], np.cos(2 * np.pi * 3 * angle)[64:-64], 1e-5)
+    close(y[0, 64:-64], np.cos(2 * np.pi * 3 * angle)[64:-64], 1e-4)
     assert wavkit.over_angle(x, pulses, RATE).shape == (2, 99 * 64 + 1)
     spectrum = wavkit.orders(x, pulses, RATE, angles=64)
     close(spectrum.peaks(1).frequency[:, 0], [3, 1], 1e-4)
