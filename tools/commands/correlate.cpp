@@ -87,8 +87,10 @@ Correlation correlated(const Signal& a, Signal b) {
     constexpr long longest = 1L << 30;
     if (b->points + 2L * shift > longest) throw Error("the signals are too long to correlate");
     b->delta = a->delta;
-    Correlation result{
-        {}, shift, energies > 0 ? a->points / std::sqrt(energies) : 0, later_start(a.facts, b.facts)};
+    Correlation result{{},
+                       shift,
+                       energies > 0 ? a->points / std::sqrt(energies) : 0,
+                       later_start(a.facts, b.facts)};
     result.values.facts.start = result.lag(0);
     check(dspi_zpad2(b, b->points + shift, DSP_PAD_UNSCALED | DSP_PAD_AT_END) ||
               dspi_zpad(b, b->points + shift) || dspb_corr(a, b, result.values, nullptr, a->points),
