@@ -24,10 +24,10 @@ struct Curve {
     std::vector<std::string> names;  // of the places 0, 1, 2 ... in place of numbers
     std::vector<Mark> line;          // a straight line's two ends, drawn across
     bool decibels = false;
-    double depth = 150;  // decibels worth showing below the highest value
-    bool filled = true;  // down to 0, unless in decibels
+    double depth = 150;        // decibels worth showing below the highest value
+    bool filled = true;        // down to 0, unless in decibels
     bool logarithmic = false;  // over the logarithm of x, which is above 0 then
-    double y_tics = 0;   // between the numbers at the height axis; 0: as it suits
+    double y_tics = 0;         // between the numbers at the height axis; 0: as it suits
     // Of the axes, where the points do not choose them.
     std::optional<std::pair<double, double>> range, x_range;
     std::vector<std::size_t> gaps;  // points that begin a line of their own
