@@ -63,16 +63,17 @@ def octave_bands(
     with Record() as places:
         lib.dspc_octaves(places, fraction, low, high)
         centres = places.take()
-    bands = []
-    for centre in centres if rate is not None else ():
+    bands: list[Array] = []
+    if rate is None:
+        return centres, bands
+    for centre in centres:
         with Record() as sections:
-            if 0.5 * rate > centre * 10 ** (0.15 / fraction):
-                try:
-                    lib.dspc_octave(sections, centre, fraction, rate)
-                except Error:
-                    break
-                bands.append(sections.take().reshape(-1, 6))
-    return (centres if rate is None else centres[: len(bands)]), bands
+            try:
+                lib.dspc_octave(sections, centre, fraction, rate)
+            except Error:  # beyond half the rate
+                break
+            bands.append(sections.take().reshape(-1, 6))
+    return centres[: len(bands)], bands
 
 
 def levels(
@@ -95,11 +96,11 @@ def levels(
     (93.98, 97.14, 94.0)
     """
     runs = Runs(x, rate, axis)
-    milliseconds = _RESPONSES.get(response, response)  # type: ignore[arg-type,call-overload]
-    if isinstance(milliseconds, str):
+    milliseconds = _RESPONSES.get(response) if isinstance(response, str) else response
+    if milliseconds is None:
         raise ValueError(f"a response is fast, slow or milliseconds, not {response!r}")
     sections = _sections(weighting, 1 / runs.delta)
-    centres, bands = np.empty(0), []
+    centres, bands = np.empty(0), list[Array]()
     if octaves:
         centres, bands = octave_bands(octaves, rate=1 / runs.delta)
 
@@ -111,5 +112,12 @@ def levels(
 
     table = measured(sections)
     in_bands = [measured(band)[..., lib.DSP_LEVEL_EQUIVALENT] for band in bands]
-    values = [runs.reduced(table[..., entry]) for entry in range(lib.DSP_LEVEL_EXPOSURE + 1)]
-    return Levels(*values, centres, np.stack(in_bands, -1) if bands else np.empty(0))
+    return Levels(
+        runs.reduced(table[..., lib.DSP_LEVEL_EQUIVALENT]),
+        runs.reduced(table[..., lib.DSP_LEVEL_GREATEST]),
+        runs.reduced(table[..., lib.DSP_LEVEL_LEAST]),
+        runs.reduced(table[..., lib.DSP_LEVEL_PEAK]),
+        runs.reduced(table[..., lib.DSP_LEVEL_EXPOSURE]),
+        centres,
+        np.stack(in_bands, -1) if bands else np.empty(0),
+    )
