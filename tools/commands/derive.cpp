@@ -38,8 +38,9 @@ std::vector<double> means_of(SampleStream& stream, Progress& progress) {
 void change_unit(std::vector<Facts>& all, const std::string& between,
                  const std::string& behind = "") {
     for (auto& facts : all) {
-        const auto axis = facts.axis_unit;
-        facts.unit = facts.unit.empty() || axis.empty() ? "" : facts.unit + between + axis + behind;
+        if (facts.axis_unit.empty()) facts.unit.clear();
+        if (facts.unit.empty()) continue;
+        facts.unit.append(between).append(facts.axis_unit).append(behind);
     }
 }
 
