@@ -26,8 +26,8 @@ struct Turns {
     }
 
     friend Turns operator+(Turns a, Turns b) {
-        const auto low = a.low + b.low;
-        return {a.high + b.high + (low < b.low ? 1 : 0), low};
+        const auto below = a.low + b.low;
+        return {a.high + b.high + (below < b.low ? 1 : 0), below};
     }
     friend Turns operator-(Turns a) { return Turns{~a.high, ~a.low} + Turns{0, 1}; }
     friend Turns operator*(Turns a, std::uint64_t n) {
