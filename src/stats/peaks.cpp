@@ -63,38 +63,112 @@ std::size_t keep_peaks(Peak<T>* peaks, std::size_t count, Keeps keeps) {
         std::remove_if(peaks, peaks + count, [=](const Peak<T>& p) { return !keeps(p); }) - peaks);
 }
 
-/// Has the highest peaks take away those that are too near; false when memory runs out.
+/// Keeps peaks that no higher one is near, beginning with the highest; of equally high ones the
+/// later comes first.
+template <class T>
+class Apart {
+  public:
+    Apart(std::span<const T> x, Peak<T>* peaks, std::size_t count, T distance)
+        : x_(x), peaks_(peaks), count_(count), least_(std::ceil(double(distance))) {}
+
+    /// False when memory runs out.
+    bool choose() {
+        state_ = block<State>(count_);
+        if (!state_) return false;
+        std::fill_n(state_.get(), count_, State::open);
+        // As many as there are near a peak are looked at again and again, or all are sorted.
+        constexpr double few = 24;
+        return least_ * double(count_) < few * double(x_.size()) ? climb() : descend();
+    }
+
+    /// How many are left.
+    std::size_t compact() {
+        std::size_t left = 0;
+        for (std::size_t i = 0; i < count_; ++i) {
+            if (state_[i] == State::kept) peaks_[left++] = peaks_[i];
+        }
+        return left;
+    }
+
+  private:
+    enum class State : unsigned char { open, kept, gone };
+
+    T height(std::size_t i) const { return x_[std::size_t(peaks_[i].index)]; }
+    bool before(std::size_t a, std::size_t b) const {
+        return height(a) > height(b) || (height(a) == height(b) && a > b);
+    }
+    bool near(std::size_t a, std::size_t b) const {
+        return double(peaks_[b].index) - peaks_[a].index < least_;
+    }
+
+    template <class Take>
+    void each_near(std::size_t i, Take take) const {
+        for (std::size_t k = i; k > 0 && near(k - 1, i); --k) take(k - 1);
+        for (std::size_t k = i + 1; k < count_ && near(i, k); ++k) take(k);
+    }
+    void keep(std::size_t i) {
+        each_near(i, [this](std::size_t k) { state_[k] = State::gone; });
+        state_[i] = State::kept;
+    }
+
+    /// From peak to the highest one near it, up to one that none is above: that stays, whatever is
+    /// decided elsewhere. Then on from the last that is still open on the way there.
+    bool climb() {
+        const auto way = block<std::uint32_t>(count_);
+        if (!way) return false;
+        for (std::size_t start = 0; start < count_; ++start) {
+            if (state_[start] != State::open) continue;
+            std::size_t steps = 0;
+            way[steps++] = std::uint32_t(start);
+            while (steps > 0) {
+                const std::size_t i = way[steps - 1];
+                if (state_[i] != State::open) {
+                    --steps;
+                    continue;
+                }
+                std::size_t top = i;
+                each_near(i, [&](std::size_t k) {
+                    if (state_[k] == State::open && before(k, top)) top = k;
+                });
+                if (top == i) {
+                    keep(i);
+                } else {
+                    way[steps++] = std::uint32_t(top);
+                }
+            }
+        }
+        return true;
+    }
+
+    bool descend() {
+        struct Ranked {
+            T height;
+            std::uint32_t peak;
+        };
+        const auto order = block<Ranked>(count_);
+        if (!order) return false;
+        for (std::size_t i = 0; i < count_; ++i) order[i] = {height(i), std::uint32_t(i)};
+        std::sort(order.get(), order.get() + count_, [](Ranked a, Ranked b) {
+            return a.height > b.height || (a.height == b.height && a.peak > b.peak);
+        });
+        for (std::size_t i = 0; i < count_; ++i) {
+            if (state_[order[i].peak] == State::open) keep(order[i].peak);
+        }
+        return true;
+    }
+
+    std::span<const T> x_;
+    Peak<T>* peaks_;
+    std::size_t count_;
+    double least_;
+    std::unique_ptr<State[]> state_;
+};
+
 template <class T>
 bool keep_apart(std::span<const T> x, Peak<T>* peaks, std::size_t& count, T distance) {
-    struct Ranked {
-        T height;
-        std::uint32_t peak;
-    };
-    const auto order = block<Ranked>(count);
-    const auto kept = block<bool>(count);
-    if (!order || !kept) return false;
-    for (std::size_t i = 0; i < count; ++i) {
-        order[i] = {x[std::size_t(peaks[i].index)], std::uint32_t(i)};
-    }
-    std::sort(order.get(), order.get() + count, [](Ranked a, Ranked b) {
-        return a.height > b.height || (a.height == b.height && a.peak > b.peak);
-    });
-    std::fill_n(kept.get(), count, true);
-    const double least = std::ceil(double(distance));
-    const auto near = [=](std::size_t a, std::size_t b) {
-        return double(peaks[b].index) - peaks[a].index < least;
-    };
-    for (std::size_t i = 0; i < count; ++i) {
-        const std::size_t j = order[i].peak;
-        if (!kept[j]) continue;
-        for (std::size_t k = j; k > 0 && near(k - 1, j); --k) kept[k - 1] = false;
-        for (std::size_t k = j + 1; k < count && near(j, k); ++k) kept[k] = false;
-    }
-    std::size_t left = 0;
-    for (std::size_t i = 0; i < count; ++i) {
-        if (kept[i]) peaks[left++] = peaks[i];
-    }
-    count = left;
+    Apart<T> apart(x, peaks, count, distance);
+    if (!apart.choose()) return false;
+    count = apart.compact();
     return true;
 }
 
