@@ -87,8 +87,9 @@ inline int dsph_dft(const dspf* in, dspf* out, int window, int flags) {
     return dspfh_dft(in, out, window, flags);
 }
 
-inline int dspc_rsmp(dspf* h, int phases, float pass, float stop, float attenuation) {
-    return dspfc_rsmp(h, phases, pass, stop, attenuation);
+inline int dspc_fir(dspf* h, int type, float f1, float f2) { return dspfc_fir(h, type, f1, f2); }
+inline int dspi_window_fir(dspf* h, int window, float bw) {
+    return dspfi_window_fir(h, window, bw);
 }
 inline int dspd_iir(const dspf* in, dspf* out, const dsp* sections, dsp* state) {
     return dspfd_iir(in, out, sections, state);

@@ -3,15 +3,25 @@
 #include <cmath>
 #include <limits>
 
-#include "record_view.hpp"
+#include "filter/design.hpp"
 
 namespace wavkit {
 namespace {
 
-/// Of the kernel that reads between samples: values a sample, edges in cycles a sample, and how far
-/// down all beyond is. More than what these phases keep to could not be seen.
+/// Of the kernel that reads between samples: values a sample, from pass to stop band in cycles a
+/// sample, and how far down all beyond is. More than what these phases keep to could not be seen.
 constexpr int phases = 128;
-constexpr double pass = 0.45, stop = 0.55, attenuation = 140;
+constexpr double transition = 0.1, attenuation = 140;
+
+/// Its window is among those that the thread made last, so that it costs next to nothing again.
+template <Record R>
+int make_kernel(R* kernel) {
+    const double width = transition / phases, half = kaiser_taps(attenuation, width) / 2;
+    kernel->points = 2 * int(half) + 1;
+    return status(dspc_fir(kernel, DSP_FIR_LOW_PASS, scalar<R>(0.5 / phases), scalar<R>(0)) ||
+                  dspi_window_fir(kernel, DSP_FIR_WINDOW_KAISER, scalar<R>(width)) ||
+                  dspi_scale(kernel, scalar<R>(phases)));
+}
 
 /// Whether pulses can tell an angle: enough for a spline, one after the other.
 bool can_tell(const dsp* pulses) {
@@ -56,8 +66,7 @@ int rsmp_angle(const R* x, R* out, const dsp* pulses, double per_revolution, int
     if (angles < 1) angles = angles_enough(pulses, per_revolution);
     Temporary<dsp> at;
     Temporary<R> kernel;
-    if (angles < 1 || positions(pulses, at, per_revolution, angles) ||
-        dspc_rsmp(kernel, phases, scalar<R>(pass), scalar<R>(stop), scalar<R>(attenuation))) {
+    if (angles < 1 || positions(pulses, at, per_revolution, angles) || make_kernel(kernel.get())) {
         return -1;
     }
     // The kernel delays by half its length.
