@@ -21,6 +21,11 @@ struct Facts {
     std::string label(const std::string& otherwise) const {
         return name.empty() ? otherwise : name;
     }
+    /// Makes the unit one of a slope, an area and the like, "V/s" or "V s²", where both are known.
+    void put_to_unit(const std::string& between, const std::string& power = "") {
+        if (axis_unit.empty()) unit.clear();
+        if (!unit.empty()) unit.append(between).append(axis_unit).append(power);
+    }
     bool placed() const { return start != 0 || !origin.empty(); }
 };
 

@@ -15,6 +15,7 @@
 #include "measure/calculus.hpp"
 #include "measure/channel_filter.hpp"
 #include "measure/prepare.hpp"
+#include "show/comparison.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -34,16 +35,6 @@ std::vector<double> means_of(SampleStream& stream, Progress& progress) {
     return sums;
 }
 
-/// The unit of a slope or of an area, where that of the values is known.
-void change_unit(std::vector<Facts>& all, const std::string& between,
-                 const std::string& behind = "") {
-    for (auto& facts : all) {
-        if (facts.axis_unit.empty()) facts.unit.clear();
-        if (facts.unit.empty()) continue;
-        facts.unit.append(between).append(facts.axis_unit).append(behind);
-    }
-}
-
 struct DeriveOptions {
     PassOptions files;
     bool from_zero = false;
@@ -54,7 +45,7 @@ void derive(const DeriveOptions& options) {
         options.files, "differentiating", [&](const SampleStream& stream, SignalShape& shape) {
             if (!(stream.delta > 0))
                 throw DataError("a spacing of " + number(stream.delta) + " has no slopes");
-            change_unit(shape.facts, "/");
+            for (auto& facts : shape.facts) facts.put_to_unit("/");
             return std::make_unique<Derivative>(stream.delta, stream.width(), options.from_zero);
         });
 }
@@ -84,25 +75,19 @@ Filtering integrator_for(const SampleStream& stream, const IntegrateOptions& opt
 }
 
 void integrate_without_drift(const IntegrateOptions& options) {
-    const auto& files = options.files;
-    InputFile input(files.in);
-    SignalOutput output(files.out, files.writing);
-    const auto source = open_channels(input, files.reading);
-    while (auto* const stream = source->next()) {
-        const auto filtering = integrator_for(*stream, options);
-        ChannelFilter filter(filtering, *stream);
-        auto facts = stream->facts;
-        change_unit(facts, " ", options.twice ? "²" : "");
-        output.writer().begin({stream->delta, filter.complex_output(), stream->channels,
-                               stream->length, std::move(facts)});
-        Progress progress("integrating " + input.name());
-        filter.run([&](std::span<const double>, std::span<const double> out) {
-            output.writer().write(out);
-            progress.done(stream->done());
+    const auto& [in, out, reading, writing] = options.files;
+    const ComparisonFiles files{in, out, "", {}, reading, writing, {}};
+    with_data_of(in, [&] {
+        ComparedPass pass(files, "integrating");
+        pass.run([&](SampleStream& stream) {
+            const auto filtering = integrator_for(stream, options);
+            ChannelFilter filter(filtering, stream);
+            SignalShape shape{stream.delta, filter.complex_output(), stream.channels, stream.length,
+                              stream.facts};
+            for (auto& facts : shape.facts) facts.put_to_unit(" ", options.twice ? "²" : "");
+            pass.pass(stream, {shape, "integrated"}, [&](const auto& take) { filter.run(take); });
         });
-        output.writer().end();
-    }
-    output.commit();
+    });
 }
 
 void integrate(const IntegrateOptions& options) {
@@ -118,7 +103,7 @@ void integrate(const IntegrateOptions& options) {
     };
     std::size_t signal = 0;
     const auto make = [&](const SampleStream& stream, SignalShape& shape) {
-        change_unit(shape.facts, " ");
+        for (auto& facts : shape.facts) facts.put_to_unit(" ");
         auto offsets = options.detrend ? means.at(signal++) : std::vector<double>(stream.width());
         return std::make_unique<Integral>(stream.delta, std::move(offsets));
     };

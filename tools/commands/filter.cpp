@@ -10,17 +10,14 @@
 
 #include "base/error.hpp"
 #include "base/number.hpp"
-#include "base/progress.hpp"
 #include "commands/commands.hpp"
 #include "files/recording.hpp"
-#include "measure/block_change.hpp"
 #include "measure/channel_filter.hpp"
 #include "measure/prepare.hpp"
 #include "measure/sections.hpp"
 #include "measure/spectrum.hpp"
 #include "measure/taps.hpp"
 #include "show/comparison.hpp"
-#include "show/labels.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -44,17 +41,13 @@ constexpr std::array<BandOption, 6> band_options{{
     {"--peak", DSP_IIR_PEAK, 1, "keep F alone, F / Q wide"},
 }};
 
-struct FilterOptions {
-    std::string in, out, taps, sections, plot;
+struct FilterOptions : ComparisonFiles {
+    std::string taps, sections;
     std::array<std::vector<double>, band_options.size()> edges;
-    std::vector<double> span;
     std::optional<int> delay;
     bool hold = false, zero_phase = false;
     Tapering tapering;
     Recursion recursion;
-    ReadOptions reading;
-    WriteOptions writing;
-    PictureLook look;
 };
 
 bool is_recursive(const FilterOptions& options) {
@@ -104,20 +97,7 @@ void check_usage(FilterOptions& options) {
     if ((options.taps == "-" || options.sections == "-") && options.in == "-") {
         throw UsageError("standard input holds either the signal or the filter");
     }
-    if (options.plot.empty()) {
-        if (!options.span.empty()) throw UsageError("--span is for --plot");
-        if (options.out.empty()) options.out = "-";
-    } else {
-        picture_of_name(options.plot);
-    }
-    if (!options.span.empty() && !(options.span[0] < options.span[1])) {
-        throw UsageError("--span goes from an earlier to a later time");
-    }
-    check_apart(options.out, options.plot);
-    if (!options.out.empty()) options.writing.checked_format_for(options.out);
-    if (options.out.empty() && options.writing.any()) {
-        throw UsageError("--to, --type, --bits and --with-time are for the output that -o names");
-    }
+    options.check();
 }
 
 /// One filter in place of two, one behind the other.
@@ -226,65 +206,37 @@ class Filters {
 class FilterRun {
   public:
     explicit FilterRun(const FilterOptions& options)
-        : options_(options), input_(options.in), filters_(options) {
+        : options_(options), pass_(options, "filtering"), filters_(options) {
         sections_.hold = options.hold;
         sections_.zero_phase = options.zero_phase;
         if (!options.sections.empty()) sections_.sections = given_sections(options);
     }
 
     void run() {
-        if (!options_.out.empty()) output_.emplace(options_.out, options_.writing);
-        const auto source = open_channels(input_, options_.reading);
-        while (auto* const stream = source->next()) filter(*stream, source->sound);
-        if (comparison_) comparison_->draw(options_.plot, options_.look);
-        if (output_) output_->commit();
+        pass_.run([this](SampleStream& stream) { filter(stream); });
     }
 
   private:
-    void filter(SampleStream& stream, bool sound) {
+    void filter(SampleStream& stream) {
+        ComparedPass::Changed changed{
+            {stream.delta, stream.complex, stream.channels, stream.length, stream.facts},
+            "filtered"};
         if (is_recursive(options_)) {
             if (options_.sections.empty())
                 sections_.sections = designed_sections(options_, stream.delta);
-            pass(stream, sound, stream.complex,
-                 [&](const auto& take) { filter_by_sections(sections_, stream, take); });
+            pass_.pass(stream, changed,
+                       [&](const auto& take) { filter_by_sections(sections_, stream, take); });
             return;
         }
         ChannelFilter filter(filters_.at(stream.delta), stream);
-        pass(stream, sound, filter.complex_output(), [&](const auto& take) { filter.run(take); });
-    }
-
-    /// Hands on what `run` makes of a stream.
-    template <class Run>
-    void pass(SampleStream& stream, bool sound, bool complex, Run run) {
-        const bool draws = !options_.plot.empty() && !comparison_;
-        if (draws && complex) throw DataError("--plot draws real signals only");
-        if (draws) {
-            const auto facts = stream.facts_of(0);
-            comparison_.emplace(ComparisonLabels{short_name(options_.in), "filtered",
-                                                 facts.axis(sound || options_.reading.rate),
-                                                 options_.reading.chosen(sound), facts},
-                                stream.delta, options_.span, stream.channels);
-        }
-        auto* const writer = output_ ? &output_->writer() : nullptr;
-        if (writer)
-            writer->begin({stream.delta, complex, stream.channels, stream.length, stream.facts});
-        {
-            Progress progress("filtering " + input_.name());
-            run([&](std::span<const double> in, std::span<const double> out) {
-                if (writer) writer->write(out);
-                if (draws) comparison_->add(in, out);
-                progress.done(stream.done());
-            });
-        }
-        if (writer) writer->end();
+        changed.shape.complex = filter.complex_output();
+        pass_.pass(stream, changed, [&](const auto& take) { filter.run(take); });
     }
 
     const FilterOptions& options_;
-    InputFile input_;
+    ComparedPass pass_;
     Filters filters_;
     SectionFiltering sections_;
-    std::optional<SignalOutput> output_;
-    std::optional<Comparison> comparison_;
 };
 
 constexpr const char* about =

@@ -23,6 +23,7 @@
 #include "show/labels.hpp"
 #include "show/plot.hpp"
 #include "show/report.hpp"
+#include "show/spectrum_report.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -62,9 +63,7 @@ void check_usage(const BodeOptions& options) {
     check_apart(options.out, options.plot, options.json);
     options.writing.check_without_sound(options.out, "a response");
     if (options.band.empty()) return;
-    if (!(options.band[0] < options.band[1])) {
-        throw UsageError("--band goes from a lower to a higher frequency");
-    }
+    check_band_order(options.band);
     if (!options.out.empty() && is_signal_file(options.writing.format_for(options.out))) {
         throw UsageError("a signal file holds the whole response; --band goes with CSV");
     }

@@ -1,6 +1,7 @@
 // wavkit smooth: local polynomials and their derivatives, medians, outliers replaced.
 #include <wavkit/dsp.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <memory>
 #include <optional>
@@ -8,13 +9,9 @@
 #include "base/error.hpp"
 #include "base/number.hpp"
 #include "base/options.hpp"
-#include "base/progress.hpp"
 #include "commands/commands.hpp"
-#include "files/recording.hpp"
-#include "measure/block_change.hpp"
 #include "measure/smoother.hpp"
 #include "show/comparison.hpp"
-#include "show/labels.hpp"
 #include "show/report.hpp"
 
 namespace wavkit::tool {
@@ -24,16 +21,11 @@ constexpr std::size_t block_points = 1 << 16;
 
 using Method = Smoothing::Method;
 
-struct SmoothOptions {
-    std::string in, out, plot;
+struct SmoothOptions : ComparisonFiles {
     std::optional<Method> method;
     std::optional<int> order, derivative, ends, window;
     std::optional<double> threshold;
-    std::vector<double> span;
     bool json = false;
-    ReadOptions reading;
-    WriteOptions writing;
-    PictureLook look;
     Smoothing smoothing;
 };
 
@@ -63,83 +55,40 @@ Smoothing smoothing_of(const SmoothOptions& options) {
     return s;
 }
 
-void check_usage(SmoothOptions& options) {
-    options.smoothing = smoothing_of(options);
-    if (!options.plot.empty()) picture_of_name(options.plot);
-    if (options.plot.empty() && !options.span.empty()) throw UsageError("--span is for --plot");
-    if (!options.span.empty() && !(options.span[0] < options.span[1])) {
-        throw UsageError("--span goes from an earlier to a later time");
-    }
-    if (options.out.empty() && options.plot.empty() && !options.json) options.out = "-";
-    check_apart(options.out, options.plot, options.json);
-    if (!options.out.empty()) options.writing.checked_format_for(options.out);
-    if (options.out.empty() && options.writing.any()) {
-        throw UsageError("--to, --type, --bits and --with-time are for the output that -o names");
-    }
-}
-
-/// The unit of a slope where that of the values is known.
-void change_unit(Facts& facts, int derivative) {
-    if (derivative == 0) return;
-    const bool known = !facts.unit.empty() && !facts.axis_unit.empty();
-    const auto power = derivative > 1 ? "^" + std::to_string(derivative) : "";
-    facts.unit = known ? facts.unit + "/" + facts.axis_unit + power : "";
-}
-
 /// One run of the program.
 class SmoothRun {
   public:
     SmoothRun(const SmoothOptions& options, Page& page)
-        : options_(options), page_(page), input_(options.in) {}
+        : options_(options), page_(page), pass_(options, "smoothing") {}
 
     void run() {
-        if (!options_.out.empty()) output_.emplace(options_.out, options_.writing);
-        const auto source = open_channels(input_, options_.reading);
-        while (auto* const stream = source->next()) smooth(*stream, source->sound);
-        if (comparison_) comparison_->draw(options_.plot, options_.look);
-        if (output_) output_->commit();
+        pass_.run([this](SampleStream& stream) { smooth(stream); });
     }
 
   private:
-    void smooth(SampleStream& stream, bool sound) {
+    void smooth(SampleStream& stream) {
+        const int derivative = options_.smoothing.derivative;
         Smoother smoother(options_.smoothing, stream);
-        const bool draws = !options_.plot.empty() && !comparison_;
-        if (draws) begin_picture(stream, sound);
-        auto* const writer = output_ ? &output_->writer() : nullptr;
-        if (writer) {
-            SignalShape shape{stream.delta, stream.complex, stream.channels, stream.length,
-                              stream.facts};
-            for (auto& facts : shape.facts) change_unit(facts, options_.smoothing.derivative);
-            writer->begin(shape);
+        ComparedPass::Changed changed{
+            {stream.delta, stream.complex, stream.channels, stream.length, stream.facts},
+            derivative == 0   ? "smoothed"
+            : derivative == 1 ? "slope"
+                              : "derivative " + std::to_string(derivative),
+            derivative == 0};
+        if (derivative > 0) {
+            const auto power = derivative > 1 ? "^" + std::to_string(derivative) : "";
+            for (auto& facts : changed.shape.facts) facts.put_to_unit("/", power);
         }
-        {
-            Progress progress("smoothing " + input_.name());
+        pass_.pass(stream, changed, [&](const ComparedPass::Take& take) {
             std::vector<double> block(block_points * stream.width());
             for (bool last = false; !last;) {
                 const auto count = stream.read(block);
                 last = count < block.size();
                 const auto in = std::span(block).first(count);
-                const auto out = smoother.pass(in, last);
-                if (writer) writer->write(out);
-                if (draws) comparison_->add(in, out);
-                progress.done(stream.done());
+                take(in, smoother.pass(in, last));
             }
-        }
-        if (writer) writer->end();
+        });
         tell(smoother, stream);
-    }
-
-    void begin_picture(const SampleStream& stream, bool sound) {
-        if (stream.complex) throw DataError("--plot draws real signals only");
-        const auto facts = stream.facts_of(0);
-        const int derivative = options_.smoothing.derivative;
-        const std::string after = derivative == 0   ? "smoothed"
-                                  : derivative == 1 ? "slope"
-                                                    : "derivative " + std::to_string(derivative);
-        comparison_.emplace(ComparisonLabels{short_name(options_.in), after,
-                                             facts.axis(sound || options_.reading.rate),
-                                             options_.reading.chosen(sound), facts},
-                            stream.delta, options_.span, stream.channels, derivative == 0);
     }
 
     void tell(const Smoother& smoother, const SampleStream& stream) {
@@ -166,9 +115,7 @@ class SmoothRun {
 
     const SmoothOptions& options_;
     Page& page_;
-    InputFile input_;
-    std::optional<SignalOutput> output_;
-    std::optional<Comparison> comparison_;
+    ComparedPass pass_;
 };
 
 constexpr const char* about =
@@ -238,7 +185,8 @@ void add_smooth(CLI::App& program) {
     options->look.declare(*command);
     command->footer(about);
     command->callback([options] {
-        check_usage(*options);
+        options->smoothing = smoothing_of(*options);
+        options->check(options->json);
         ReportFiles files;
         files.names = {options->in};
         files.json = options->json;

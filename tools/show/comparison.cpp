@@ -3,6 +3,10 @@
 #include <algorithm>
 #include <utility>
 
+#include "base/error.hpp"
+#include "base/progress.hpp"
+#include "show/labels.hpp"
+
 namespace wavkit::tool {
 namespace {
 
@@ -40,6 +44,56 @@ void Comparison::draw(const std::string& path, const PictureLook& look) const {
     if (!together_) panels[1].y_unit.clear();
     panels[0].caption = labels_.caption;
     tool::draw(panels, path, look);
+}
+
+void ComparisonFiles::check(bool json) {
+    if (!plot.empty()) picture_of_name(plot);
+    if (plot.empty() && !span.empty()) throw UsageError("--span is for --plot");
+    if (!span.empty() && !(span[0] < span[1])) {
+        throw UsageError("--span goes from an earlier to a later time");
+    }
+    if (out.empty() && plot.empty() && !json) out = "-";
+    check_apart(out, plot, json);
+    if (!out.empty()) writing.checked_format_for(out);
+    if (out.empty() && writing.any()) {
+        throw UsageError("--to, --type, --bits and --with-time are for the output that -o names");
+    }
+}
+
+ComparedPass::ComparedPass(const ComparisonFiles& files, std::string doing)
+    : files_(files), doing_(std::move(doing)), input_(files.in) {}
+
+void ComparedPass::run(const std::function<void(SampleStream&)>& change) {
+    if (!files_.out.empty()) output_.emplace(files_.out, files_.writing);
+    const auto source = open_channels(input_, files_.reading);
+    sound_ = source->sound;
+    while (auto* const stream = source->next()) change(*stream);
+    if (comparison_) comparison_->draw(files_.plot, files_.look);
+    if (output_) output_->commit();
+}
+
+void ComparedPass::pass(SampleStream& stream, const Changed& changed,
+                        const std::function<void(const Take&)>& change) {
+    const bool draws = !files_.plot.empty() && !comparison_;
+    if (draws && changed.shape.complex) throw DataError("--plot draws real signals only");
+    if (draws) {
+        const auto facts = stream.facts_of(0);
+        comparison_.emplace(ComparisonLabels{short_name(files_.in), changed.name,
+                                             facts.axis(sound_ || files_.reading.rate),
+                                             files_.reading.chosen(sound_), facts},
+                            stream.delta, files_.span, stream.channels, changed.comparable);
+    }
+    auto* const writer = output_ ? &output_->writer() : nullptr;
+    if (writer) writer->begin(changed.shape);
+    {
+        Progress progress(doing_ + " " + input_.name());
+        change([&](std::span<const double> in, std::span<const double> out) {
+            if (writer) writer->write(out);
+            if (draws) comparison_->add(in, out);
+            progress.done(stream.done());
+        });
+    }
+    if (writer) writer->end();
 }
 
 }  // namespace wavkit::tool
