@@ -25,13 +25,6 @@ std::unique_ptr<Value[]> block(std::size_t count) {
     return std::unique_ptr<Value[]>(new (std::nothrow) Value[std::max<std::size_t>(count, 1)]);
 }
 
-/// The lowest sample on the way from a sample to the next one above it; `low` at `at`.
-template <class T>
-struct Base {
-    T low;
-    int at;
-};
-
 template <class T>
 struct Peak {
     int index;
@@ -40,216 +33,159 @@ struct Peak {
     T left, right;  // where the signal has the height of the width
 };
 
-/// Lists the samples that are above their neighbours, of equal ones the middle.
+/// Lists the samples that are above their neighbours, of equal ones the middle. There must be room
+/// for one more than there can be.
 template <class T>
-std::size_t list_maxima(std::span<const T> x, Peak<T>* peaks) {
+std::size_t list_maxima(std::span<const T> x, int* maxima) {
     std::size_t count = 0;
     const std::size_t n = x.size();
     for (std::size_t i = 1; i + 1 < n; ++i) {
-        if (!(x[i - 1] < x[i])) continue;
-        std::size_t end = i + 1;
-        while (end + 1 < n && x[end] == x[i]) ++end;
-        if (x[end] < x[i]) {
-            peaks[count++].index = int((i + end - 1) / 2);
+        const bool rises = x[i - 1] < x[i];
+        maxima[count] = int(i);  // written in any case: in noise, no branch could be foreseen
+        count += std::size_t(rises & (x[i + 1] < x[i]));
+        if (rises & (x[i + 1] == x[i])) {
+            std::size_t end = i + 2;
+            while (end < n && x[end] == x[i]) ++end;
+            if (end < n && x[end] < x[i]) maxima[count++] = int((i + end - 1) / 2);
             i = end - 1;
         }
     }
     return count;
 }
 
-template <class T, class Keeps>
-std::size_t keep_peaks(Peak<T>* peaks, std::size_t count, Keeps keeps) {
-    return std::size_t(
-        std::remove_if(peaks, peaks + count, [=](const Peak<T>& p) { return !keeps(p); }) - peaks);
+/// Keeps some of a list, in their order.
+template <class Item, class Keeps>
+std::size_t keep_if(Item* items, std::size_t count, Keeps keeps) {
+    std::size_t left = 0;
+    for (std::size_t k = 0; k < count; ++k) {
+        const bool kept = keeps(items[k]);
+        items[left] = items[k];
+        left += std::size_t(kept);
+    }
+    return left;
 }
 
-/// Keeps peaks that no higher one is near, beginning with the highest; of equally high ones the
-/// later comes first.
+/// Keeps maxima that no higher one is near, beginning with the highest; of equally high ones the
+/// later comes first. False when memory runs out.
+///
+/// From one the way leads to the highest near it, and on, up to one that none near it is above:
+/// that stays, whatever is decided elsewhere, and those near it go. Then on from the last on the
+/// way that has not gone. A way leads in one direction, as far in two steps as the distance, so
+/// that all looks around together see each sample a few times.
 template <class T>
-class Apart {
-  public:
-    Apart(std::span<const T> x, Peak<T>* peaks, std::size_t count, T distance)
-        : x_(x), peaks_(peaks), count_(count), least_(std::ceil(double(distance))) {}
+bool keep_apart(std::span<const T> x, int* maxima, std::size_t& count, T distance) {
+    constexpr T gone = -std::numeric_limits<T>::infinity();  // which is above nothing
+    const auto height = block<T>(count);
+    const auto way = block<std::uint32_t>(count);
+    if (!height || !way) return false;
+    for (std::size_t k = 0; k < count; ++k) height[k] = x[std::size_t(maxima[k])];
+    const double least = std::ceil(double(distance));
+    const auto near = [&](std::size_t a, std::size_t b) { return maxima[b] - maxima[a] < least; };
 
-    /// False when memory runs out.
-    bool choose() {
-        state_ = block<State>(count_);
-        if (!state_) return false;
-        std::fill_n(state_.get(), count_, State::open);
-        // As many as there are near a peak are looked at again and again, or all are sorted.
-        constexpr double few = 24;
-        return least_ * double(count_) < few * double(x_.size()) ? climb() : descend();
-    }
-
-    /// How many are left.
-    std::size_t compact() {
-        std::size_t left = 0;
-        for (std::size_t i = 0; i < count_; ++i) {
-            if (state_[i] == State::kept) peaks_[left++] = peaks_[i];
-        }
-        return left;
-    }
-
-  private:
-    enum class State : unsigned char { open, kept, gone };
-
-    T height(std::size_t i) const { return x_[std::size_t(peaks_[i].index)]; }
-    bool before(std::size_t a, std::size_t b) const {
-        return height(a) > height(b) || (height(a) == height(b) && a > b);
-    }
-    bool near(std::size_t a, std::size_t b) const {
-        return double(peaks_[b].index) - peaks_[a].index < least_;
-    }
-
-    template <class Take>
-    void each_near(std::size_t i, Take take) const {
-        for (std::size_t k = i; k > 0 && near(k - 1, i); --k) take(k - 1);
-        for (std::size_t k = i + 1; k < count_ && near(i, k); ++k) take(k);
-    }
-    void keep(std::size_t i) {
-        each_near(i, [this](std::size_t k) { state_[k] = State::gone; });
-        state_[i] = State::kept;
-    }
-
-    /// From peak to the highest one near it, up to one that none is above: that stays, whatever is
-    /// decided elsewhere. Then on from the last that is still open on the way there.
-    bool climb() {
-        const auto way = block<std::uint32_t>(count_);
-        if (!way) return false;
-        for (std::size_t start = 0; start < count_; ++start) {
-            if (state_[start] != State::open) continue;
-            std::size_t steps = 0;
-            way[steps++] = std::uint32_t(start);
-            while (steps > 0) {
-                const std::size_t i = way[steps - 1];
-                if (state_[i] != State::open) {
-                    --steps;
-                    continue;
-                }
-                std::size_t top = i;
-                each_near(i, [&](std::size_t k) {
-                    if (state_[k] == State::open && before(k, top)) top = k;
-                });
-                if (top == i) {
-                    keep(i);
-                } else {
-                    way[steps++] = std::uint32_t(top);
-                }
+    for (std::size_t start = 0; start < count; ++start) {
+        std::size_t steps = 0;
+        way[steps++] = std::uint32_t(start);
+        while (steps > 0) {
+            const std::size_t i = way[steps - 1];
+            if (height[i] == gone) {
+                --steps;
+                continue;
             }
+            std::size_t first = i, end = i + 1, top = i;
+            while (first > 0 && near(first - 1, i)) --first;
+            while (end < count && near(i, end)) ++end;
+            for (std::size_t k = first; k < end; ++k) {
+                if (height[k] >= height[top]) top = k;
+            }
+            if (top != i) {
+                way[steps++] = std::uint32_t(top);
+                continue;
+            }
+            std::fill(&height[first], &height[i], gone);
+            std::fill(&height[i + 1], &height[0] + end, gone);
+            --steps;
         }
-        return true;
     }
-
-    bool descend() {
-        struct Ranked {
-            T height;
-            std::uint32_t peak;
-        };
-        const auto order = block<Ranked>(count_);
-        if (!order) return false;
-        for (std::size_t i = 0; i < count_; ++i) order[i] = {height(i), std::uint32_t(i)};
-        std::sort(order.get(), order.get() + count_, [](Ranked a, Ranked b) {
-            return a.height > b.height || (a.height == b.height && a.peak > b.peak);
-        });
-        for (std::size_t i = 0; i < count_; ++i) {
-            if (state_[order[i].peak] == State::open) keep(order[i].peak);
-        }
-        return true;
+    std::size_t left = 0;
+    for (std::size_t k = 0; k < count; ++k) {
+        maxima[left] = maxima[k];
+        left += std::size_t(height[k] != gone);
     }
+    count = left;
+    return true;
+}
 
-    std::span<const T> x_;
-    Peak<T>* peaks_;
-    std::size_t count_;
-    double least_;
-    std::unique_ptr<State[]> state_;
+/// The lowest of a run of samples; of equally low ones the first and the last.
+template <class T>
+struct Lowest {
+    T low;
+    int first, last;
+
+    /// Of this run and the next.
+    Lowest with(const Lowest& next) const {
+        if (low == next.low) return {low, first, next.last};
+        return low < next.low ? *this : next;
+    }
 };
 
+/// The prominences and bases of the peaks that are some of the maxima. The maxima that no later one
+/// has exceeded are on a stack, each with the lowest sample since the one before it there. False
+/// when memory runs out.
 template <class T>
-bool keep_apart(std::span<const T> x, Peak<T>* peaks, std::size_t& count, T distance) {
-    Apart<T> apart(x, peaks, count, distance);
-    if (!apart.choose()) return false;
-    count = apart.compact();
-    return true;
-}
-
-/// Walks from every peak to its bases, which is fast where most of them are near. False where it
-/// becomes long.
-template <class T>
-bool walk_to_bases(std::span<const T> x, Peak<T>* peaks, std::size_t count) {
-    const int n = int(x.size());
-    std::int64_t steps_left = 4 * std::int64_t(n);
-    for (std::size_t k = 0; k < count && steps_left >= 0; ++k) {
-        auto& peak = peaks[k];
-        const T top = x[std::size_t(peak.index)];
-        const auto base = [&](int step) {
-            Base<T> lowest{top, peak.index};
-            int i = peak.index;
-            for (; i >= 0 && i < n && x[std::size_t(i)] <= top; i += step) {
-                if (x[std::size_t(i)] < lowest.low) lowest = {x[std::size_t(i)], i};
-            }
-            steps_left -= std::abs(i - peak.index);
-            return lowest;
-        };
-        const auto left = base(-1), right = base(1);
-        peak.left_base = left.at;
-        peak.right_base = right.at;
-        peak.prominence = top - std::max(left.low, right.low);
-    }
-    return steps_left >= 0;
-}
-
-/// The bases of all peaks on one side. The samples that no later one has exceeded are on a stack,
-/// each with the lowest one between it and the one before it there. `at(i)` is the i-th sample on
-/// the way, and a NaN ends it.
-template <class T, class At, class Give>
-bool find_bases(std::size_t n, At at, std::size_t count, Give give) {
+bool find_prominences(std::span<const T> x, std::span<const int> maxima, std::span<Peak<T>> peaks) {
     struct Open {
-        T value;
-        Base<T> base;
+        T height;
+        std::size_t peak;
+        Lowest<T> since, left;  // the one before; the last that is higher, or the end
     };
-    const auto stack = block<Open>(n);
+    const auto stack = block<Open>(maxima.size());
     if (!stack) return false;
+    constexpr Lowest<T> none{std::numeric_limits<T>::infinity(), -1, -1};
+    Lowest<T> gap = none;  // since the top of the stack
     std::size_t open = 0, peak = 0;
-    for (std::size_t i = 0; i < n && peak < count; ++i) {
-        const T value = at(i);
-        if (std::isnan(value)) {
-            open = 0;
-            continue;
+    const auto close = [&](auto exceeded) {
+        for (; open > 0 && exceeded(stack[open - 1].height); --open) {
+            const Open& top = stack[open - 1];
+            if (top.peak < peaks.size()) {
+                auto& p = peaks[top.peak];
+                p.left_base = top.left.last;
+                p.right_base = gap.first;
+                p.prominence = top.height - std::max(top.left.low, gap.low);
+            }
+            gap = top.since.with(gap);
         }
-        Base<T> base{value, int(i)};
-        for (; open > 0 && stack[open - 1].value <= value; --open) {
-            if (stack[open - 1].base.low < base.low) base = stack[open - 1].base;
-        }
-        stack[open++] = {value, base};
-        if (give(peak, int(i), base)) ++peak;
-    }
-    return true;
-}
+    };
+    const auto close_all = [&] { close([](T) { return true; }); };
 
-template <class T>
-bool find_prominences(std::span<const T> x, Peak<T>* peaks, std::size_t count) {
-    const std::size_t n = x.size();
-    const int last = int(n) - 1;
-    const auto lows = block<T>(count);
-    if (!lows) return false;
-    const auto leftwards = [&](std::size_t k, int i, Base<T> base) {
-        if (peaks[k].index != i) return false;
-        peaks[k].left_base = base.at;
-        lows[k] = base.low;
-        return true;
+    int i = 0;
+    const auto look_until = [&](int end) {
+        for (; i < end; ++i) {
+            const T value = x[std::size_t(i)];
+            if (value < gap.low) {
+                gap = {value, i, i};
+            } else if (value == gap.low) {
+                gap.last = i;
+            } else if (std::isnan(value)) {  // as good as an end
+                close_all();
+                gap = none;
+            }
+        }
     };
-    const auto rightwards = [&](std::size_t k, int i, Base<T> base) {
-        auto& peak = peaks[count - 1 - k];
-        if (peak.index != last - i) return false;
-        peak.right_base = last - base.at;
-        const T higher = std::max(lows[count - 1 - k], base.low);
-        peak.prominence = x[std::size_t(peak.index)] - higher;
-        return true;
-    };
-    return find_bases<T>(
-               n, [=](std::size_t i) { return x[i]; }, count, leftwards) &&
-           find_bases<T>(
-               n, [=](std::size_t i) { return x[n - 1 - i]; }, count, rightwards);
+    for (const int maximum : maxima) {
+        look_until(maximum);
+        const T height = x[std::size_t(maximum)];
+        close([=](T other) { return other < height; });
+        const bool alike = open > 0 && stack[open - 1].height == height;
+        const bool wanted = peak < peaks.size() && peaks[peak].index == maximum;
+        stack[open] = {height, wanted ? peak++ : peaks.size(), gap,
+                       alike ? stack[open - 1].left.with(gap) : gap};
+        ++open;
+        gap = none;
+        i = maximum + 1;
+    }
+    look_until(int(x.size()));
+    close_all();
+    return true;
 }
 
 /// Minima of blocks of samples, of blocks of blocks, and so on: finds the next sample that is low
@@ -316,37 +252,39 @@ class Minima {
 /// Where the line between samples has the height of the width, between a peak and its bases:
 /// `next(i, end, step, h)` finds the first sample from i on that is not above h, or the end.
 template <class T, class Next>
-void find_widths(std::span<const T> x, Peak<T>* peaks, std::size_t count, T rel_height, Next next) {
-    for (std::size_t k = 0; k < count; ++k) {
-        auto& peak = peaks[k];
-        const T h = x[std::size_t(peak.index)] - peak.prominence * rel_height;
-        const auto crossing = [&](int base, int step) {
-            const int i = next(peak.index, base, step, h);
-            const T low = x[std::size_t(i)];
-            if (!(low < h)) return T(i);
-            const T share = (h - low) / (x[std::size_t(i - step)] - low);
-            return step < 0 ? T(i) + share : T(i) - share;
-        };
-        peak.left = crossing(peak.left_base, -1);
-        peak.right = crossing(peak.right_base, 1);
-    }
+void find_width(std::span<const T> x, Peak<T>& peak, T rel_height, Next next) {
+    const T h = x[std::size_t(peak.index)] - peak.prominence * rel_height;
+    const auto crossing = [&](int base, int step) {
+        const int i = next(peak.index, base, step, h);
+        const T low = x[std::size_t(i)];
+        if (!(low < h)) return T(i);
+        const T share = (h - low) / (x[std::size_t(i - step)] - low);
+        return step < 0 ? T(i) + share : T(i) - share;
+    };
+    peak.left = crossing(peak.left_base, -1);
+    peak.right = crossing(peak.right_base, 1);
 }
 
-/// The widths, walked to where the bases have been near, else by a tree. False when memory runs
-/// out.
+/// The widths, walked to as long as they are near, then by a tree. False when memory runs out.
 template <class T>
-bool find_widths(std::span<const T> x, Peak<T>* peaks, std::size_t count, T rel_height, bool near) {
-    if (near) {
-        find_widths(x, peaks, count, rel_height, [=](int i, int end, int step, T h) {
+bool find_widths(std::span<const T> x, std::span<Peak<T>> peaks, T rel_height) {
+    auto steps_left = 4 * std::int64_t(x.size());
+    std::size_t k = 0;
+    for (; k < peaks.size() && steps_left >= 0; ++k) {
+        find_width(x, peaks[k], rel_height, [&](int i, int end, int step, T h) {
+            const int from = i;
             while (i != end && !(x[std::size_t(i)] <= h)) i += step;
+            steps_left -= std::abs(i - from);
             return i;
         });
-        return true;
     }
+    if (k == peaks.size()) return true;
     Minima<T> minima;
     if (!minima.build(x)) return false;
-    find_widths(x, peaks, count, rel_height,
-                [&](int i, int end, int step, T h) { return minima.next(i, end, step, h); });
+    for (; k < peaks.size(); ++k) {
+        find_width(x, peaks[k], rel_height,
+                   [&](int i, int end, int step, T h) { return minima.next(i, end, step, h); });
+    }
     return true;
 }
 
@@ -379,24 +317,33 @@ int find_peaks(const R* signal, R* out, Conditions<scalar<R>> least) {
     using T = scalar<R>;
     if (signal->complex) return -1;
     const auto x = values(signal);
-    const auto peaks = block<Peak<T>>(x.size() / 2);
-    if (!peaks) return -1;
-    const auto at = [=](const Peak<T>& p, int aside) { return x.data()[p.index + aside]; };
-    std::size_t count = list_maxima<T>(x, peaks.get());
-    const auto keep = [&](auto keeps) { count = keep_peaks(peaks.get(), count, keeps); };
-    if (!std::isnan(least.height)) keep([=](auto& p) { return at(p, 0) >= least.height; });
+    const T* const at = x.data();
+    const auto maxima = block<int>(x.size() / 2 + 1);
+    if (!maxima) return -1;
+    const std::span<const int> all(maxima.get(), list_maxima<T>(x, maxima.get()));
+    const auto chosen = block<int>(all.size());
+    if (!chosen) return -1;
+    std::ranges::copy(all, chosen.get());
+    std::size_t count = all.size();
+    const auto choose = [&](auto keeps) { count = keep_if(chosen.get(), count, keeps); };
+    if (!std::isnan(least.height)) choose([=](int i) { return at[i] >= least.height; });
     if (!std::isnan(least.threshold)) {
-        keep([=](auto& p) {
-            return std::min(at(p, 0) - at(p, -1), at(p, 0) - at(p, 1)) >= least.threshold;
+        choose([=](int i) {
+            return std::min(at[i] - at[i - 1], at[i] - at[i + 1]) >= least.threshold;
         });
     }
-    if (least.distance > 1 && !keep_apart<T>(x, peaks.get(), count, least.distance)) return -1;
-    const bool near = walk_to_bases<T>(x, peaks.get(), count);
-    if (!near && !find_prominences<T>(x, peaks.get(), count)) return -1;
+    if (least.distance > 1 && !keep_apart<T>(x, chosen.get(), count, least.distance)) return -1;
+
+    const auto peaks = block<Peak<T>>(count);
+    if (!peaks) return -1;
+    for (std::size_t k = 0; k < count; ++k) peaks[k].index = chosen[k];
+    const auto found = [&] { return std::span(peaks.get(), count); };
+    const auto keep = [&](auto keeps) { count = keep_if(peaks.get(), count, keeps); };
+    if (!find_prominences<T>(x, all, found())) return -1;
     if (!std::isnan(least.prominence)) {
         keep([=](auto& p) { return p.prominence >= least.prominence; });
     }
-    if (!find_widths<T>(x, peaks.get(), count, least.rel_height, near)) return -1;
+    if (!find_widths<T>(x, found(), least.rel_height)) return -1;
     if (!std::isnan(least.width)) keep([=](auto& p) { return p.right - p.left >= least.width; });
 
     const std::size_t most = std::size_t(std::numeric_limits<int>::max()) / DSP_PEAKS_VALUES;

@@ -106,8 +106,13 @@ BOTH_PRECISIONS(Peaks, HaveThePropertiesOfTheirDefinitions) {
         for (auto& v : x) v = std::floor(noise() * levels);
         return real<R>(x);
     };
+    const auto with_gaps = [](Signal<R> x) {
+        for (int i = 9; i < x->points; i += 1 + i % 40) x[i] = NAN;
+        return x;
+    };
     for (const int n : {0, 1, 2, 3, 4, 5, 16, 17, 300, 2000}) {
-        for (const auto& x : {noise.real<R>(n), walk(n), steps(n, 3), steps(n, 1)}) {
+        for (const auto& x : {noise.real<R>(n), walk(n), steps(n, 3), steps(n, 1),
+                              with_gaps(walk(n)), with_gaps(steps(n, 3))}) {
             for (const auto& least : conditions) {
                 SCOPED_TRACE(::testing::Message() << n << " points, " << &least - conditions);
                 const auto want = peaks(scalars<R>(x), least);
