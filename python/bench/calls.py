@@ -132,6 +132,19 @@ def rfft(x: Any) -> Any:
         return out.take()
 
 
+def levels_by_scipy(x: Any, sections: Any) -> list[float]:
+    """What `wavkit.levels()` tells of a signal at 48 kHz, after its sections."""
+    share = 1 - np.exp(-1 / 6000)  # of an eighth of a second
+    passed = scipy.signal.sosfilt(sections, x)
+    square = passed * passed
+    course = scipy.signal.lfilter([share], [1, share - 1], square)
+    settled = course[30000:]
+    least = settled.min() if settled.size else np.nan
+    values = np.array([square.mean(), course.max(), least, square.max(), square.sum() / 48000])
+    decibels: list[float] = (10 * np.log10(values)).tolist()
+    return decibels
+
+
 def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
     rng = np.random.default_rng(1)
     x, y = rng.normal(size=(2, points))
@@ -145,6 +158,9 @@ def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
     record, out = lib.Record(x), lib.Record()
     kernel = wavkit.Resampler(48000, 44100).kernel / 147
     sections = wavkit.design_iir("lowpass", 0.1, order=8)
+    weighting = wavkit.weighting("A", 48000)
+    thirds = wavkit.octave_bands(3, rate=48000)[1]
+    every = {"prominence": 0, "width": 0}  # what wavkit's peaks always tell
     return [
         (
             "real transform",
@@ -237,6 +253,22 @@ def peers(points: int) -> list[tuple[str, Work, dict[str, Work]]]:
             "moving median, 101 samples",
             lambda: wavkit.smooth(x, window=101, method="median", ends="mirror"),
             {"SciPy": lambda: scipy.ndimage.median_filter(x, 101)},
+        ),
+        ("peaks", lambda: wavkit.peaks(x), {"SciPy": lambda: scipy.signal.find_peaks(x, **every)}),
+        (
+            "peaks 20 samples apart",
+            lambda: wavkit.peaks(x, distance=20),
+            {"SciPy": lambda: scipy.signal.find_peaks(x, distance=20, **every)},
+        ),
+        (
+            "levels, A, fast",
+            lambda: wavkit.levels(x, 48000),
+            {"SciPy": lambda: levels_by_scipy(x, weighting)},
+        ),
+        (
+            "levels in thirds of octaves",
+            lambda: wavkit.levels(x, 48000, octaves=3),
+            {"SciPy": lambda: [levels_by_scipy(x, s) for s in [weighting, *thirds]]},
         ),
         ("median", lambda: lib.dsps_median(record, out), {"NumPy": lambda: np.median(x)}),
         ("rms", lambda: lib.dsps_rms(record, out), {"NumPy": lambda: np.sqrt(np.mean(x * x))}),
