@@ -46,6 +46,10 @@ struct Column {
     const char *name, *words;
     int value;
 };
+struct Exceeded {
+    const char *name, *words;
+    double share;  // of the time
+};
 constexpr std::array columns{
     Column{"leq", "Leq", DSP_LEVEL_EQUIVALENT},
     Column{"max", "greatest", DSP_LEVEL_GREATEST},
@@ -53,6 +57,9 @@ constexpr std::array columns{
     Column{"peak", "peak", DSP_LEVEL_PEAK},
     Column{"exposure", "exposure", DSP_LEVEL_EXPOSURE},
 };
+
+constexpr std::array exceeded_levels{Exceeded{"l10", "L10", 0.1}, Exceeded{"l50", "L50", 0.5},
+                                     Exceeded{"l90", "L90", 0.9}};
 
 /// The levels of a signal through a filter.
 class Meter {
@@ -97,7 +104,7 @@ struct Measured {
     Meter whole;
     std::vector<BandMeter> bands;
     std::vector<double> times, course;  // of the time-weighted level
-    std::array<double, 3> exceeded{};   // L10, L50, L90
+    std::array<double, exceeded_levels.size()> exceeded{};
 
     Measured(const LevelsOptions& options, double delta) {
         const double rate = 1 / delta;
@@ -126,20 +133,15 @@ struct Measured {
         auto sorted = course;
         std::ranges::sort(sorted, std::greater());
         for (std::size_t i = 0; i < exceeded.size(); ++i) {
-            constexpr std::array shares{0.1, 0.5, 0.9};
-            const double at = shares[i] * double(sorted.size() - 1);
+            const double at = exceeded_levels[i].share * double(sorted.size() - 1);
             exceeded[i] = sorted.empty() ? std::numeric_limits<double>::quiet_NaN()
                                          : sorted[std::size_t(std::lround(at))];
         }
     }
 };
 
-constexpr std::array exceeded_names{"l10", "l50", "l90"};
-
-/// The value of 0 dB in the numbers of the recording.
-double reference_of(const LevelsOptions& options, const Facts& facts) {
-    const double usual = facts.unit == "Pa" ? 20e-6 : 1;
-    if (options.calibrator.empty()) return options.reference.value_or(usual);
+/// The value of 0 dB in the numbers of the calibrator's recording.
+double calibrated(const LevelsOptions& options) {
     InputFile input(options.calibrator);
     return with_data_of(options.calibrator, [&] {
         const auto source = open_signals(input, options.reading);
@@ -167,17 +169,19 @@ void measure(SampleStream& stream, const LevelsOptions& options, double referenc
     const double start = stream.facts_of(0).start;
     const double settled = 5 * options.response / 1000;
     Signal block(stream.delta);
-    std::vector<double> values(std::size_t(samples), 0.0);
+    const auto resize = [&](std::size_t points) {
+        block->points = int(points);
+        check(dsp_alloc(block), "measuring");
+    };
     Progress progress("measuring " + name);
     long position = 0;
-    for (std::size_t count = values.size(); count == values.size();) {
-        count = stream.read(values);
+    for (std::size_t wanted = std::size_t(samples), count = wanted; count == wanted;) {
+        resize(wanted);
+        count = stream.read(block.values());
         if (count == 0) break;
-        check_finite(std::span(values).first(count), 1, position);
+        resize(count);
+        check_finite(block.values(), 1, position);
         position += long(count);
-        block->points = int(count);
-        check(dsp_alloc(block), "measuring");
-        std::copy_n(values.begin(), count, block->data);
         measured.whole.take(block, options.response, reference);
         for (auto& band : measured.bands) band.meter.take(block, options.response, reference);
         if (const double end = double(position) * stream.delta; end >= settled) {
@@ -200,9 +204,8 @@ void print(std::FILE* to, const Measured& measured, const LevelsOptions& options
         std::fprintf(to, "%-10s %9.2f %s\n", name, value, unit_of(options, true).c_str());
     };
     for (const auto& column : columns) row(column.words, measured.whole[column.value]);
-    for (std::size_t i = 0; i < exceeded_names.size(); ++i) {
-        constexpr std::array names{"L10", "L50", "L90"};
-        if (!measured.course.empty()) row(names[i], measured.exceeded[i]);
+    for (std::size_t i = 0; i < exceeded_levels.size() && !measured.course.empty(); ++i) {
+        row(exceeded_levels[i].words, measured.exceeded[i]);
     }
     if (measured.bands.empty()) return;
     std::fprintf(to, "\n%10s %9s %9s %9s %9s\n", "band (Hz)", "Leq (dB)", "greatest", "least",
@@ -226,8 +229,8 @@ void add_json(JsonMembers& members, const Measured& measured, const LevelsOption
     for (const auto& column : columns) {
         members.emplace_back(column.name, json_number(measured.whole[column.value]));
     }
-    for (std::size_t i = 0; i < exceeded_names.size(); ++i) {
-        members.emplace_back(exceeded_names[i], json_number(measured.exceeded[i]));
+    for (std::size_t i = 0; i < exceeded_levels.size(); ++i) {
+        members.emplace_back(exceeded_levels[i].name, json_number(measured.exceeded[i]));
     }
     if (measured.bands.empty()) return;
     std::vector<std::string> list;
@@ -287,7 +290,8 @@ void tell(const std::string& file, const LevelsOptions& options, Page& page) {
             throw DataError("a spacing of " + number(stream->delta) + " has no levels");
         }
         const auto facts = stream->facts_of(0);
-        const double reference = reference_of(options, facts), delta = stream->delta;
+        const double reference = options.reference.value_or(facts.unit == "Pa" ? 20e-6 : 1);
+        const double delta = stream->delta;
         Measured measured(options, delta);
         measure(*stream, options, reference, file, measured);
         if (output) {
@@ -310,7 +314,7 @@ void tell(const std::string& file, const LevelsOptions& options, Page& page) {
     if (output) output->commit();
 }
 
-void run(const LevelsOptions& options) {
+void run(LevelsOptions& options) {
     if (!options.plot.empty()) picture_of_name(options.plot);
     options.files.check_single(options.out, options.plot);
     check_apart(options.out, options.plot, options.files.json);
@@ -321,6 +325,7 @@ void run(const LevelsOptions& options) {
     if (!options.band.empty() && options.octaves == 0) {
         throw UsageError("--band goes with --octaves");
     }
+    if (!options.calibrator.empty()) options.reference = calibrated(options);
     report_files("levels", options.files,
                  [&](const std::string& file, Page& page) { tell(file, options, page); });
 }

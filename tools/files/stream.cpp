@@ -68,6 +68,18 @@ std::unique_ptr<SignalSource> open(InputFile& input, const ReadOptions& options,
 
 }  // namespace
 
+std::vector<double> read_rest(SampleStream& stream, std::size_t most) {
+    std::vector<double> values((1 << 15) * stream.width());
+    for (std::size_t had = 0;;) {
+        had += stream.read(std::span(values).subspan(had));
+        if (had < values.size() || had > most) {
+            values.resize(had);
+            return values;
+        }
+        values.resize(2 * had);
+    }
+}
+
 void SampleStream::skip() {
     std::vector<double> passed(1 << 13);
     while (read(passed) == passed.size()) {

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstddef>
+#include <limits>
 #include <memory>
 #include <optional>
 #include <span>
@@ -42,6 +43,10 @@ class SampleStream {
         return channel < facts.size() ? facts[channel] : Facts();
     }
 };
+
+/// What is left of a stream; where that is more than `most` scalars, only some more than these.
+std::vector<double> read_rest(SampleStream& stream,
+                              std::size_t most = std::numeric_limits<std::size_t>::max());
 
 /// A stream that comes in blocks of its own size.
 class BlockStream : public SampleStream {

@@ -9,7 +9,17 @@
 
 namespace wavkit::tool {
 
-/// Has a signal made of the samples of every channel, `call(channel, in, out)`.
+/// Copies groups of `width` scalars, each so many scalars behind the one before.
+inline void copy_groups(const double* from, std::size_t from_step, double* to, std::size_t to_step,
+                        std::size_t width, std::size_t count) {
+    for (std::size_t i = 0; i < count; ++i) {
+        for (std::size_t part = 0; part < width; ++part)
+            to[i * to_step + part] = from[i * from_step + part];
+    }
+}
+
+/// Has a signal made of the samples of every channel by `call(channel, in, out)`, which
+/// may use `in` as it likes.
 class ByChannel {
   public:
     ByChannel(double delta, std::size_t channels, bool complex)
@@ -22,19 +32,20 @@ class ByChannel {
     /// call. All channels must give as many.
     template <class Call>
     std::span<const double> operator()(std::span<const double> values, Call call) {
+        const std::size_t width = complex_ ? 2 : 1;
         result_.clear();
         for (std::size_t c = 0; c < channels_; ++c) {
-            const std::size_t part = complex_ ? 2 : 1;
-            in_->points = int(values.size() / (part * channels_));
+            const std::size_t points = values.size() / (width * channels_);
+            in_->points = int(points);
             in_->complex = complex_;
             check(dsp_alloc(in_), "taking channels apart");
-            const auto in = in_.values();
-            for (std::size_t i = 0; i < in.size(); ++i) in[i] = values[place(i, c, part)];
+            copy_groups(values.data() + c * width, width * channels_, in_->data, width, width,
+                        points);
             check(call(c, in_, out_), "working on a channel");
-            const auto out = out_.values();
-            const std::size_t out_part = out_->complex ? 2 : 1;
-            result_.resize(out.size() * channels_);
-            for (std::size_t i = 0; i < out.size(); ++i) result_[place(i, c, out_part)] = out[i];
+            const std::size_t out_width = out_->complex ? 2 : 1;
+            result_.resize(std::size_t(out_->points) * out_width * channels_);
+            copy_groups(out_->data, out_width, result_.data() + c * out_width,
+                        out_width * channels_, out_width, std::size_t(out_->points));
         }
         return result_;
     }
@@ -43,11 +54,6 @@ class ByChannel {
     int given() const { return out_->points; }
 
   private:
-    /// Of a scalar of a channel among those of all.
-    std::size_t place(std::size_t i, std::size_t channel, std::size_t part) const {
-        return (i / part * channels_ + channel) * part + i % part;
-    }
-
     std::size_t channels_;
     bool complex_;
     Signal in_, out_;

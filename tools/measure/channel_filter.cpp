@@ -4,7 +4,6 @@
 
 #include <algorithm>
 
-#include "measure/groups.hpp"
 #include "measure/prepare.hpp"
 #include "measure/taps.hpp"
 
@@ -24,7 +23,7 @@ ChannelFilter::ChannelFilter(const Filtering& filtering, SampleStream& stream)
       stream_(stream),
       complex_(stream.complex),
       states_(stream.channels),
-      channel_(stream.delta) {}
+      each_(stream.delta, stream.channels, stream.complex) {}
 
 void ChannelFilter::run(
     const std::function<void(std::span<const double>, std::span<const double>)>& take) {
@@ -43,11 +42,11 @@ void ChannelFilter::run(
                         last_point.begin());
         }
         if (ended) extend(count, last_point);
-        filter_block();
+        const auto out = filter_block();
         const auto wanted = (count / width_in() + (ended ? delay : 0)) * width_out();
         const auto skipped = std::min(early, wanted);
         early -= skipped;
-        take(std::span(in_).first(count), std::span(out_).first(wanted).subspan(skipped));
+        take(std::span(in_).first(count), out.first(wanted).subspan(skipped));
         position_ += long(count / width_in());
     }
 }
@@ -75,20 +74,11 @@ void ChannelFilter::extend(std::size_t count, std::span<const double> last_point
     }
 }
 
-void ChannelFilter::filter_block() {
-    const std::size_t points = in_.size() / width_in();
-    out_.resize(points * width_out());
-    for (std::size_t c = 0; c < states_.size(); ++c) {
-        const std::size_t width = complex_ ? 2 : 1, out_width = complex_output() ? 2 : 1;
-        channel_->points = int(points);
-        channel_->complex = complex_;
-        check(dsp_alloc(channel_), "filtering");
-        copy_groups(in_.data() + c * width, width_in(), channel_->data, width, width, points);
-        check_finite(channel_.values(), width, position_);
-        check(dspd_fir(channel_, filtered_, filtering_.taps, states_[c]), "filtering");
-        copy_groups(filtered_->data, out_width, out_.data() + c * out_width, width_out(), out_width,
-                    points);
-    }
+std::span<const double> ChannelFilter::filter_block() {
+    return each_(in_, [&](std::size_t c, const Signal& in, Signal& out) {
+        check_finite(in.values(), complex_ ? 2 : 1, position_);
+        return dspd_fir(in, out, filtering_.taps, states_[c]);
+    });
 }
 
 }  // namespace wavkit::tool

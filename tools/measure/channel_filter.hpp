@@ -8,6 +8,7 @@
 
 #include "base/signal.hpp"
 #include "files/stream.hpp"
+#include "measure/by_channel.hpp"
 
 namespace wavkit::tool {
 
@@ -38,14 +39,14 @@ class ChannelFilter {
     std::size_t width_out() const { return states_.size() * (complex_output() ? 2 : 1); }
     void fill_histories(std::span<const double> point);
     void extend(std::size_t count, std::span<const double> last_point);
-    void filter_block();
+    std::span<const double> filter_block();
 
     const Filtering& filtering_;
     SampleStream& stream_;
     bool complex_;
     std::vector<Signal> states_;  // of every channel
-    std::vector<double> in_, out_;
-    Signal channel_, filtered_;
+    ByChannel each_;
+    std::vector<double> in_;
     long position_ = 0;
 };
 

@@ -2,13 +2,12 @@
 
 #include <wavkit/dsp.h>
 
-#include <algorithm>
 #include <map>
 
 #include "base/error.hpp"
 #include "base/number.hpp"
 #include "base/options.hpp"
-#include "measure/groups.hpp"
+#include "measure/by_channel.hpp"
 #include "measure/prepare.hpp"
 
 namespace wavkit::tool {
@@ -52,70 +51,45 @@ int band_of(const std::string& name) {
     return found->second;
 }
 
-/// One channel of a block through the sections.
-class Channel {
-  public:
-    Channel(const SectionFiltering& filtering, bool complex)
-        : filtering_(filtering), complex_(complex) {}
+void check_settling(int status) {
+    if (status) throw DataError("a filter with a pole at 1 has no state to start from");
+}
 
-    /// Takes the channel's scalars from `in`, of which `step` make a point, and writes them to the
-    /// same place of `out`.
-    void filter(const double* in, double* out, std::size_t step, std::size_t points) {
-        const std::size_t width = complex_ ? 2 : 1;
-        part_->points = int(points);
-        part_->complex = complex_;
-        check(dsp_alloc(part_), "filtering");
-        copy_groups(in, step, part_->data, width, width, points);
-        check_finite(part_.values(), width, position_);
-        if (filtering_.zero_phase) {
-            check_settling(dspd_iir_zero_phase(part_, part_, filtering_.sections, -1));
-        } else {
-            if (position_ == 0 && points > 0 && filtering_.hold) settle();
-            check(dspd_iir(part_, part_, filtering_.sections, state_), "filtering");
-        }
-        copy_groups(part_->data, width, out, step, width, points);
-        position_ += long(points);
+/// Sections at work on the channels of a stream.
+class SectionFilter {
+  public:
+    SectionFilter(const SectionFiltering& filtering, const SampleStream& stream)
+        : filtering_(filtering),
+          each_(stream.delta, stream.channels, stream.complex),
+          states_(stream.channels) {}
+
+    std::span<const double> operator()(std::span<const double> values) {
+        const auto filtered = each_(values, [&](std::size_t c, const Signal& in, Signal& out) {
+            check_finite(in.values(), each_.complex() ? 2 : 1, position_);
+            if (filtering_.zero_phase) {
+                check_settling(dspd_iir_zero_phase(in, out, filtering_.sections, -1));
+                return 0;
+            }
+            if (position_ == 0 && in->points > 0 && filtering_.hold) settle(states_[c], in->data);
+            return dspd_iir(in, out, filtering_.sections, states_[c]);
+        });
+        position_ += each_.given();
+        return filtered;
     }
 
   private:
-    static void check_settling(int status) {
-        if (status) throw DataError("a filter with a pole at 1 has no state to start from");
-    }
-
-    void settle() {
-        check_settling(dspc_iir_state(state_, filtering_.sections));
-        const double* const first = part_->data;
-        check(complex_ ? dspi_rtoc(state_) || dspi_cscale(state_, first[0], first[1])
-                       : dspi_scale(state_, first[0]),
+    void settle(Signal& state, const double* first) const {
+        check_settling(dspc_iir_state(state, filtering_.sections));
+        check(each_.complex() ? dspi_rtoc(state) || dspi_cscale(state, first[0], first[1])
+                              : dspi_scale(state, first[0]),
               "filtering");
     }
 
     const SectionFiltering& filtering_;
-    bool complex_;
-    Signal part_, state_;
+    ByChannel each_;
+    std::vector<Signal> states_;
     long position_ = 0;
 };
-
-/// The whole of a stream, as far as it is worth the memory.
-std::vector<double> whole(SampleStream& stream) {
-    constexpr std::size_t most = std::size_t(1) << 27;
-    std::vector<double> values;
-    for (std::size_t step = 1 << 16;; step = values.size()) {
-        const auto filled = values.size();
-        values.resize(filled + step * (filled ? 1 : stream.width()));
-        const auto count = stream.read(std::span(values).subspan(filled));
-        if (filled + count < values.size()) {
-            values.resize(filled + count);
-            return values;
-        }
-        if (values.size() > most) {
-            throw DataError(
-                "--zero-phase takes the whole signal into memory, and this one has "
-                "more than " +
-                std::to_string(most) + " values");
-        }
-    }
-}
 
 }  // namespace
 
@@ -192,27 +166,23 @@ Signal RecursiveFilter::roots() const { return made_by(dspc_iir_zpk); }
 void filter_by_sections(
     const SectionFiltering& filtering, SampleStream& stream,
     const std::function<void(std::span<const double>, std::span<const double>)>& take) {
-    const std::size_t width = stream.complex ? 2 : 1;
-    const std::size_t step = width * std::max<std::size_t>(stream.channels, 1);
-    std::vector<Channel> channels;
-    for (std::size_t c = 0; c < stream.channels; ++c)
-        channels.emplace_back(filtering, stream.complex);
-    std::vector<double> in((1 << 16) * step), out;
-    for (bool ended = false; !ended;) {
-        std::size_t count;
-        if (filtering.zero_phase) {
-            in = whole(stream);
-            count = in.size();
-            ended = true;
-        } else {
-            count = stream.read(in);
-            ended = count < in.size();
+    SectionFilter filter(filtering, stream);
+    if (filtering.zero_phase) {
+        constexpr std::size_t most = std::size_t(1) << 27;
+        const auto whole = read_rest(stream, most);
+        if (whole.size() > most) {
+            throw DataError(
+                "--zero-phase takes the whole signal into memory, and this one has more than " +
+                std::to_string(most) + " values");
         }
-        out.resize(count);
-        for (std::size_t c = 0; c < channels.size(); ++c) {
-            channels[c].filter(in.data() + c * width, out.data() + c * width, step, count / step);
-        }
-        take(std::span(in).first(count), out);
+        take(whole, filter(whole));
+        return;
+    }
+    std::vector<double> block((1 << 16) * stream.width());
+    for (std::size_t count = block.size(); count == block.size();) {
+        count = stream.read(block);
+        const auto in = std::span(block).first(count);
+        take(in, filter(in));
     }
 }
 

@@ -14,17 +14,6 @@ namespace {
 
 constexpr std::size_t block_points = 1 << 15;
 
-/// All that is left of a stream of one channel.
-std::vector<double> rest_of(SampleStream& stream) {
-    std::vector<double> values;
-    for (std::size_t had = 0, count = block_points; count == block_points; had += count) {
-        values.resize(had + block_points);
-        count = stream.read(std::span(values).subspan(had));
-        values.resize(had + count);
-    }
-    return values;
-}
-
 }  // namespace
 
 SignalPair::SignalPair(const std::string& first, const std::string& second,
@@ -40,7 +29,7 @@ SignalPair::SignalPair(const std::string& first, const std::string& second,
     facts_[1] = second.empty() ? streams_[0]->facts_of(1) : streams_[1]->facts_of(0);
     if (second.empty() && streams_[0]->channels < 2) {
         if (streams_[0]->complex) check();
-        whole_ = rest_of(*streams_[0]);
+        whole_ = read_rest(*streams_[0]);
         auto* const next = sources_[0]->next();
         if (!next) throw Error("there is one signal in " + first + "; name a second file");
         streams_[0] = next;
