@@ -451,6 +451,9 @@ def test_lines():
     close(ours(x), theirs.slope * x + theirs.intercept)
     drift = wavkit.fit(np.stack([T, 2 * T + 1]), rate=10)
     close(drift.slope, [0.01, 0.02]), close(drift([0.0, 1.0])[1], [1.0, 1.02])
+    assert wavkit.fit(np.empty((0, 5))).slope.shape == (0,)
+    with pytest.raises(ValueError, match=r"x has the shape \(2,\) and y \(3,\)"):
+        wavkit.fit([1.0, 2.0], [1.0, 2.0, 3.0])
 
 
 @pytest.mark.parametrize("dtype", ["f4", "f8"])

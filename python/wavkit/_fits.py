@@ -15,18 +15,26 @@ from ._runs import Runs
 
 def _pairs(
     x: ArrayLike | Any, y: ArrayLike | None, rate: float | None, axis: int | str
-) -> tuple[Runs, Array]:
-    """The signals of y, and a row of abscissae for each."""
+) -> tuple[Runs, list[tuple[Array, Array]]]:
+    """The signals of y, each behind its abscissae; where there is none, one that tells the shape of
+    what a fit makes."""
     runs = Runs(x if y is None else y, rate, axis)
     if y is None:
         x = runs.start() + np.arange(runs.points) * runs.delta
     abscissae = np.asarray(x, float)
     if abscissae.ndim > 1 and not isinstance(axis, str):
         abscissae = np.moveaxis(abscissae, axis, -1)
-    abscissae = np.broadcast_to(abscissae, runs.array.shape).reshape(-1, runs.points)
     if runs.is_complex:
         raise ValueError("a fit goes through real values")
-    return runs, abscissae
+    try:
+        places = np.broadcast_to(abscissae, runs.array.shape)
+    except ValueError:
+        raise ValueError(
+            f"x has the shape {abscissae.shape} and y {runs.array.shape}, samples last"
+        ) from None
+    if not runs.rows:
+        return runs, [(np.arange(float(runs.points)), np.zeros(runs.points))]
+    return runs, list(zip(places.reshape(len(runs.rows), runs.points), runs.rows))
 
 
 @dataclass(frozen=True)
@@ -64,11 +72,11 @@ def fit(
     >>> round(line.slope, 2), round(line.intercept, 2), round(line.slope_error, 3)
     (1.98, 1.03, 0.042)
     """
-    runs, abscissae = _pairs(x, y, rate, axis)
+    runs, pairs = _pairs(x, y, rate, axis)
     results = []
-    for places, row in zip(abscissae, runs.rows):
-        with lend(places + 1j * row.astype(float)) as pairs, Record() as out:
-            lib.dsps_lin_regres2(pairs, out)
+    for places, row in pairs:
+        with lend(places + 1j * row.astype(float)) as points, Record() as out:
+            lib.dsps_lin_regres2(points, out)
             results.append(out.take())
     v = runs.stack(results)
     take = [v[..., i][()] for i in (0, 1, 3, 4, 2, 19, 14, 15)]
@@ -129,8 +137,8 @@ def fit_polynomial(
     """
     if degree < 0:
         raise ValueError(f"a polynomial has a degree from 0 on, not {degree}")
-    runs, abscissae = _pairs(x, y, rate, axis)
-    found = [_polynomial(*pair, degree, centre) for pair in zip(abscissae, runs.rows)]
+    runs, pairs = _pairs(x, y, rate, axis)
+    found = [_polynomial(*pair, degree, centre) for pair in pairs]
     numbers, family = (runs.stack(list(parts)) for parts in zip(*found))
     coefficients, errors = numbers[..., : degree + 1], numbers[..., degree + 1 : -3]
     about, variance, r_squared = (numbers[..., i][()] for i in (-3, -2, -1))
