@@ -20,7 +20,7 @@ def strongest(signal: wavkit.Signal) -> float:
 
 
 def files_a_second(files: list[Path], workers: int) -> float:
-    with LocalCluster(workers, threads_per_worker=1, dashboard_address=":0") as cluster:
+    with LocalCluster(n_workers=workers, threads_per_worker=1, dashboard_address=":0") as cluster:
         with Client(cluster) as client:
             client.wait_for_workers(workers)
             wavkit.dask.measure(files[: 4 * workers], strongest, client)

@@ -49,6 +49,7 @@ def test_every_name_has_an_example():
         "Levels",
         "Line",
         "Peaks",
+        "Polynomial",
         "Response",
         "SectionResponse",
         "Signal",
@@ -56,6 +57,7 @@ def test_every_name_has_an_example():
         "Spectrum",
         "Stats",
         "Transfer",
+        "ZerosPoles",
         "Zoom",
         "lib",
     }

@@ -167,6 +167,30 @@ def test_windows():
         wavkit.window("han", 8)
 
 
+@pytest.mark.parametrize("points", [1, 2, 15, 64])
+@pytest.mark.parametrize(("dtype", "tolerance"), [("f4", 1e-6), ("f8", 1e-13)])
+def test_windows_by_formula(points, dtype, tolerance):
+    t = np.arange(points) - points // 2
+    u = 2 * 2.5 * t / points
+    cosines = 0.4 + 0.35 * np.cos(2 * np.pi * t / points) + 0.25 * np.cos(4 * np.pi * t / points)
+    shapes = {
+        ("kaiser", 8.6): np.i0(8.6 * np.sqrt(1 - (2 * t / points) ** 2)) / np.i0(8.6),
+        ("gauss", 0.15): np.exp(-((t / (0.15 * points)) ** 2) / 2),
+        ("sinc", 2.5, 1.5): np.sinc(u / np.pi) ** 1.5,
+        ("cosines", 0.4, 0.35, 0.25): cosines,
+    }
+    for name, expected in shapes.items():
+        found = wavkit.window(name, points, dtype=dtype)
+        assert found.dtype == dtype
+        np.testing.assert_allclose(found, expected, atol=tolerance)
+    symmetric = wavkit.window(("kaiser", 8.6), points, scale="mean", symmetric=True, dtype=dtype)
+    whole = scipy.signal.windows.kaiser(points, 8.6)
+    np.testing.assert_allclose(symmetric, whole / whole.mean(), rtol=10 * tolerance, atol=tolerance)
+    for wrong in (("kaiser",), ("welch", 1.0), ("sinc", 1.0)):
+        with pytest.raises(ValueError):
+            wavkit.window(wrong, points)
+
+
 @pytest.mark.parametrize(
     ("kind", "edges", "cutoff", "passes"),
     [
@@ -277,6 +301,45 @@ def test_filters_delay_nothing():
         wavkit.filter(TONES, RATE)
 
 
+@pytest.mark.parametrize("dtype", ["f4", "f8", "c8", "c16"])
+@pytest.mark.parametrize("recursive", [False, True], ids=["taps", "sections"])
+def test_streams_that_begin_at_rest(recursive, dtype):
+    x = (NOISE + 5 - (2j * TONES if dtype[0] == "c" else 0)).astype(dtype)
+    if recursive:
+        taps = wavkit.design_iir("highpass", 0.05, prototype="cheby1", order=5)
+        start = scipy.signal.sosfilt_zi(taps) * x[0]
+        expected, _ = scipy.signal.sosfilt(taps, x, zi=start)
+    else:
+        taps = wavkit.design("lowpass", 0.1, length=31)
+        start = scipy.signal.lfilter_zi(taps, [1.0]) * x[0]
+        expected, _ = scipy.signal.lfilter(taps, [1.0], x, zi=start)
+    stream = wavkit.Filter(taps, hold=True)
+    for _ in range(2):
+        blocks = [stream(block) for block in (x[:0], x[:7], x[7:7], x[7:100], x[100:])]
+        found = np.concatenate(blocks)
+        assert found.dtype == dtype
+        np.testing.assert_allclose(
+            found, expected, atol=1e-11 if x.itemsize > 8 or dtype == "f8" else 1e-5
+        )
+        stream.reset()
+
+
+@pytest.mark.parametrize("kind", ["lowpass", "bandstop", "notch"])
+def test_zeros_and_poles(kind):
+    edges = (100, 200) if kind == "bandstop" else (100,)
+    if kind == "notch":
+        theirs = scipy.signal.tf2zpk(*scipy.signal.iirnotch(100, 30, 1000))
+    else:
+        theirs = scipy.signal.ellip(5, 1, 60, edges, kind, fs=1000, output="zpk")
+    found = wavkit.design_zpk(kind, *edges, rate=1000, prototype="elliptic", order=5)
+    for ours, other in zip((found.zeros, found.poles), theirs):
+        close(
+            ours[np.lexsort((ours.imag, ours.real.round(9)))],
+            other[np.lexsort((other.imag, other.real.round(9)))],
+        )
+    assert found.gain == pytest.approx(theirs[2])
+
+
 @pytest.mark.parametrize("new_rate", [44100, 16000, 96000, 48000, 12345.678, 47999.9, 3000])
 @pytest.mark.parametrize("quality", ["fast", "best"])
 def test_resampling_is_exact_and_streams(new_rate, quality):
@@ -317,6 +380,18 @@ def test_envelope_and_slopes():
         (np.arange(1, 18, 2) * np.pi - 0.1) / (6 * np.pi),
         1e-4,
     )
+
+
+@pytest.mark.parametrize(("dtype", "tolerance"), [("f4", 1e-5), ("f8", 1e-12)])
+@pytest.mark.parametrize("points", [1, 2, 777, 1024])
+def test_analytic_signals(points, dtype, tolerance):
+    x = np.stack([NOISE, TONES])[:, :points].astype(dtype)
+    found = wavkit.analytic(x)
+    assert found.dtype == np.result_type(dtype, "F")
+    np.testing.assert_allclose(found, scipy.signal.hilbert(x), atol=tolerance)
+    ours = wavkit.analytic(x + 1, detrend=True)
+    mean = x.mean(axis=-1, keepdims=True, dtype=float)
+    np.testing.assert_allclose(ours, scipy.signal.hilbert(x - mean), atol=tolerance)
 
 
 @pytest.mark.parametrize("other", [NOISE[:777], COMPLEX[:777]], ids=["real", "complex"])
@@ -376,6 +451,41 @@ def test_lines():
     close(ours(x), theirs.slope * x + theirs.intercept)
     drift = wavkit.fit(np.stack([T, 2 * T + 1]), rate=10)
     close(drift.slope, [0.01, 0.02]), close(drift([0.0, 1.0])[1], [1.0, 1.02])
+    assert wavkit.fit(np.empty((0, 5))).slope.shape == (0,)
+    with pytest.raises(ValueError, match=r"x has the shape \(2,\) and y \(3,\)"):
+        wavkit.fit([1.0, 2.0], [1.0, 2.0, 3.0])
+
+
+@pytest.mark.parametrize("dtype", ["f4", "f8"])
+@pytest.mark.parametrize("degree", [0, 1, 3, 6])
+def test_polynomials(degree, dtype):
+    x = 2 + 3 * np.sort(np.random.default_rng(degree).random(200))
+    y = (np.sin(x) + 0.1 * NOISE[:200]).astype(dtype)
+    for centre, about in ((False, 0), (True, x.mean())):
+        found = wavkit.fit_polynomial(x, y, degree, centre=centre)
+        powers = np.vander(x - about, degree + 1, increasing=True)
+        inverse = np.linalg.pinv(powers)
+        theirs, rest = inverse @ y, y - powers @ (inverse @ y)
+        variance = np.sum(rest**2) / (199 - degree)
+        close(found.coefficients, theirs, 1e-7)
+        close(found.errors, np.sqrt(variance * np.sum(inverse**2, axis=1)), 1e-7)
+        assert found.residual_variance == pytest.approx(variance)
+        assert found.r_squared == pytest.approx(1 - rest.var() / np.var(y, dtype=float), abs=1e-9)
+        close(found(x), powers @ theirs, 1e-9)
+    two = wavkit.fit_polynomial(np.stack([y, 2 * y], 1), degree=degree, rate=10, axis=0)
+    close(two([[0.0, 1.0]])[1], 2 * wavkit.fit_polynomial(y, degree=degree, rate=10)([[0.0, 1.0]]))
+
+
+def test_polynomials_of_any_degree_and_place():
+    x = np.linspace(-1, 1, 1000)
+    theirs = np.polynomial.Chebyshev.fit(x, np.exp(3 * x) + NOISE[:1000], 60)
+    close(wavkit.fit_polynomial(x, np.exp(3 * x) + NOISE[:1000], 60)(x), theirs(x), 1e-10)
+    exact = wavkit.fit_polynomial(1e6 + np.arange(3), [1.0, 4.0, 9.0], centre=True)
+    close(exact.coefficients, [4, 4, 1], 1e-12)
+    assert exact.r_squared == 1 and np.isnan(exact.errors).all() and exact.about == 1e6 + 1
+    for places in ([1.0, 2.0, 1.0], [1.0, 2.0]):
+        with pytest.raises(ValueError, match="3 points with different x"):
+            wavkit.fit_polynomial(places, np.ones(len(places)), 2)
 
 
 @pytest.mark.parametrize(
@@ -402,6 +512,16 @@ def test_peaks_of_signals(conditions):
     for ours, name in pairs.items():
         close(getattr(found, ours), values[name])
     close(wavkit.peaks(NOISE, RATE).right, wavkit.peaks(NOISE).right / RATE)
+
+
+@pytest.mark.parametrize("dtype", ["f4", "f8"])
+def test_valleys_of_signals(dtype):
+    x = NOISE.astype(dtype)
+    found = wavkit.peaks(x, valleys=True, height=-0.5, prominence=1)
+    samples, values = scipy.signal.find_peaks(-x, height=0.5, prominence=1)
+    assert np.array_equal(found.sample, samples) and np.array_equal(found.height, x[samples])
+    close(found.prominence, values["prominences"], 1e-6)
+    assert (found.top <= found.height).all() and found.top.dtype == dtype
 
 
 def test_sines():
@@ -530,6 +650,25 @@ def test_interpolation(method, kind):
     close(wavkit.interp(None, T, [0.5, 0.25], rate=RATE), [0.5, 0.25])
     with pytest.raises(wavkit.Error):
         wavkit.interp([0.0, 1.0, 1.0, 2.0], [1.0, 2.0, 3.0, 4.0], [1.5])
+
+
+@pytest.mark.parametrize(("dtype", "tolerance"), [("f4", 1e-5), ("f8", 1e-11)])
+@pytest.mark.parametrize(
+    ("known", "theirs"),
+    [
+        ({"curvatures": (0, 0)}, "natural"),
+        ({"slopes": (0.5, -2)}, ((1, 0.5), (1, -2))),
+        ({"slopes": (None, 1), "curvatures": (3, None)}, ((2, 3), (1, 1))),
+    ],
+)
+def test_ends_of_splines(known, theirs, dtype, tolerance):
+    x, at = np.arange(30) + 0.3 * np.sin(np.arange(30)), np.linspace(-1, 31, 100)
+    y = NOISE[:30].astype(dtype)
+    found = wavkit.interp(x, y, at, "spline", extrapolate=True, **known)
+    expected = scipy.interpolate.CubicSpline(x.astype(dtype), y, bc_type=theirs)(at.astype(dtype))
+    np.testing.assert_allclose(found, expected, rtol=tolerance, atol=10 * tolerance)
+    with pytest.raises(ValueError, match="spline"):
+        wavkit.interp(x, y, at, "linear", **known)
 
 
 @pytest.mark.parametrize("suffix", [".dsp", ".txt", ".wav", ".csv"])

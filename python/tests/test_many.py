@@ -14,8 +14,9 @@ RNG = np.random.default_rng(11)
 
 @pytest.fixture(scope="module")
 def client():
-    with LocalCluster(2, threads_per_worker=1, dashboard_address=":0") as cluster:
+    with LocalCluster(n_workers=2, threads_per_worker=1, dashboard_address=":0") as cluster:
         with Client(cluster) as client:
+            client.wait_for_workers(2, timeout=60)
             yield client
 
 

@@ -67,6 +67,8 @@ def test_empty_and_senseless_input():
         with pytest.raises(ValueError):
             call(np.empty(0))
     assert wavkit.filter(np.empty(0), taps=[1.0]).size == 0 and wavkit.envelope([]).size == 0
+    with pytest.raises(ValueError, match="one axis"):
+        wavkit.Goertzel(0.1)(np.ones((2, 5)))
     for rate in (0, -1, np.nan, np.inf):
         with pytest.raises(ValueError, match="rate"):
             wavkit.spectrum([1.0, 2.0], rate)
@@ -92,6 +94,14 @@ def test_xarray_keeps_coordinates():
     half = wavkit.decimate(x, 2, axis="time")
     assert half.time.values.tolist() == TIME[::2].tolist() and half.name == "u"
     assert wavkit.fit(x[:, 0]).intercept == pytest.approx(np.polyfit(TIME, values[:, 0], 1)[1])
+    single = wavkit.goertzel(x, [1.0, 2.5], axis="time")
+    assert single.dims == ("frequency", "channel") and single.frequency[1] == 2.5
+    np.testing.assert_array_equal(single[:, 1], wavkit.goertzel(values[:, 1], [1.0, 2.5], 8))
+    between = wavkit.transfer(x, x[:, ::-1], points=16, axis="time")
+    assert between.h1.dims == ("frequency", "channel") and between.delay.dims == ("channel",)
+    plain = wavkit.transfer(values[:, 1], values[:, 0], 8, 16)
+    np.testing.assert_array_equal(between.h1[:, 1], plain.h1)
+    np.testing.assert_array_equal(between.db[:, 1], plain.db)
     uneven = x.assign_coords(time=TIME**2)
     with pytest.raises(ValueError, match="equally spaced"):
         wavkit.spectrum(uneven, axis="time")
@@ -106,6 +116,9 @@ def test_pandas_keeps_coordinates():
     assert wavkit.stats(table).mean["b"] == pytest.approx(table["b"].mean())
     assert wavkit.stats(table["a"]).median == table["a"].median()
     assert list(wavkit.average(table, points=16).density.columns) == ["a", "b"]
+    both = wavkit.transfer(table, table["a"].to_frame().to_numpy() * [[2, 3]], points=16, axis=0)
+    assert list(both.coherence.columns) == ["a", "b"] and both.frequency[-1] == 4
+    assert both.h1["a"].to_numpy() == pytest.approx(2)
     assert wavkit.edges(pandas.Series([0.0, 1.0], [3.0, 4.0]), 0.5).tolist() == [3.5]
 
 

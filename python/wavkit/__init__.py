@@ -15,12 +15,13 @@ from __future__ import annotations
 from . import lib as lib
 from ._files import Signal, read, signals, write
 from ._filters import Filter, Response, design, filter, response
+from ._fits import Line, Polynomial, fit, fit_polynomial
 from ._levels import Levels, levels, octave_bands, weighting
 from ._orders import orders, over_angle
 from ._rates import Resampler, decimate, resample
 from ._record import Error
-from ._sections import SectionResponse, design_iir, response_iir, zero_phase
-from ._signals import Correlation, correlate, derive, edges, envelope, integrate, interp
+from ._sections import SectionResponse, ZerosPoles, design_iir, design_zpk, response_iir, zero_phase
+from ._signals import Correlation, analytic, correlate, derive, edges, envelope, integrate, interp
 from ._smooth import replace_outliers, smooth
 from ._spectra import (
     Frames,
@@ -33,7 +34,7 @@ from ._spectra import (
     spectrum,
     stft,
 )
-from ._statistics import Histogram, Line, Stats, fit, from_roots, hist, roots, stats
+from ._statistics import Histogram, Stats, from_roots, hist, roots, stats
 from ._tones import Distortion, SignalPeaks, Sine, distortion, fit_sine, peaks
 from ._transfer import Transfer, TransferMeter, transfer
 from ._version import version as __version__
@@ -51,6 +52,7 @@ __all__ = [
     "Levels",
     "Line",
     "Peaks",
+    "Polynomial",
     "Resampler",
     "Response",
     "SectionResponse",
@@ -62,7 +64,9 @@ __all__ = [
     "Stats",
     "Transfer",
     "TransferMeter",
+    "ZerosPoles",
     "Zoom",
+    "analytic",
     "average",
     "coherent_gain",
     "correlate",
@@ -71,11 +75,13 @@ __all__ = [
     "derive",
     "design",
     "design_iir",
+    "design_zpk",
     "distortion",
     "edges",
     "envelope",
     "filter",
     "fit",
+    "fit_polynomial",
     "fit_sine",
     "from_roots",
     "goertzel",

@@ -174,49 +174,61 @@ class Filter:
     whole signal, and each output is made of the samples up to its own.
 
     Blocks may have any shape: signals lie along the last axis, and each has its own state. A table
-    of six columns is one of second-order sections, of which `delay` is 0.
+    of six columns is one of second-order sections, of which `delay` is 0. Before the first block
+    there are zeros, with `hold` its first sample for ever, so that no step from zero rings.
 
     >>> smooth = wavkit.Filter([0.5, 0.5])
     >>> smooth([1.0, 3.0]), smooth([5.0])
     (array([0.5, 2. ]), array([4.]))
     >>> [float(block[0]) for block in wavkit.Filter([0.0, 1.0]).blocks([[1.0], [2.0], [3.0]])]
     [0.0, 1.0, 2.0]
+    >>> wavkit.Filter(wavkit.design_iir("lowpass", 0.1), hold=True)([5.0, 5.0, 5.0]).round(9)
+    array([5., 5., 5.])
     """
 
-    def __init__(self, taps: ArrayLike) -> None:
+    def __init__(self, taps: ArrayLike, *, hold: bool = False) -> None:
         given = samples_of(taps)
         self._recursive = given.ndim == 2 and given.shape[1] == lib.DSP_IIR_VALUES
         self.taps = np.array(given, float) if self._recursive else _checked(taps)
         self.delay = 0 if self._recursive else delay_of(self.taps)
+        self.hold = hold
         self.reset()
 
     def reset(self) -> None:
-        """Forgets the signal so far: zeros come before the next block."""
+        """Forgets the signal so far: the next block is the first."""
         self._states: list[Record] = []
         self._of: tuple[Any, ...] | None = None
 
     def __call__(self, block: ArrayLike) -> Array:
         runs = Runs(block)
         letter = runs.array.dtype.char
-        self._begin(runs.shape, letter, len(runs.rows))
         taps = lend(self.taps.ravel() if self._recursive else in_precision_of(self.taps, letter))
-        states = iter(self._states or [self._state(letter)])
+        self._begin(runs, letter)
+        states = iter(self._states or [self._state(row) for row in runs.rows or [runs.array]])
         name = "dspd_iir" if self._recursive else "dspd_fir"
         return runs.map(lambda x, out: call(name, x, out, taps, next(states)))
 
-    def _state(self, letter: str) -> Record:
-        """Sections run in double precision, whatever that of the signals is."""
-        return Record(dtype="d" if self._recursive else letter.lower())
-
-    def _begin(self, shape: tuple[int, ...], letter: str, count: int) -> None:
-        signals = (shape, letter in "fF")
-        if self._of is None:
-            self._of = signals
-            self._states = [self._state(letter) for _ in range(count)]
-        elif self._of != signals:
+    def _begin(self, runs: Runs, letter: str) -> None:
+        signals = (runs.shape, letter in "fF")
+        if self._of not in (None, signals):
             raise ValueError(
                 "a block has the shape and the precision of the one before; or reset()"
             )
+        # A block without samples has none to hold.
+        if not self._states and (runs.points or not self.hold):
+            self._states = [self._state(row) for row in runs.rows]
+        self._of = signals
+
+    def _state(self, row: Array) -> Record:
+        """What has been before a signal. Sections run in double precision, whatever that of the
+        signals is."""
+        if not (self.hold and row.size):
+            return Record(dtype="d" if self._recursive else row.dtype.char.lower())
+        if not self._recursive:
+            return Record(np.full(len(self.taps) - 1, row[0], row.dtype))
+        with Record() as steady:
+            call("dspc_iir_state", steady, lend(self.taps.ravel()))
+            return Record(steady.take() * row[:1].astype("D" if row.dtype.kind == "c" else "d"))
 
     def blocks(self, source: Iterable[ArrayLike]) -> Iterator[Array]:
         """The filtered blocks of a source, one by one."""

@@ -8,7 +8,6 @@ from dataclasses import dataclass
 from functools import cached_property
 
 import numpy as np
-from numpy.lib.stride_tricks import sliding_window_view
 
 from . import _functions as lib
 from ._native import ffi
@@ -173,8 +172,12 @@ class _Leakage:
     def highest(self, count: int) -> Array:
         """The highest of so many values, from each of the table on."""
         if count not in self._highest:
-            padded = np.pad(self.lobes, (0, count - 1), mode="edge")
-            self._highest[count] = sliding_window_view(padded, count).max(axis=-1)
+            points, width = len(self.lobes), 1
+            highest: Array = np.pad(self.lobes, (0, count - 1), mode="edge")
+            while 2 * width <= count:
+                highest = np.maximum(highest[:-width], highest[width:])
+                width *= 2
+            self._highest[count] = np.maximum(highest[:points], highest[count - width :][:points])
         return self._highest[count]
 
     def near(self, bins: Array, blur: float) -> Array:

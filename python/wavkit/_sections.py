@@ -55,6 +55,23 @@ def design_iir(
     >>> sections.shape, round(float(abs(wavkit.response_iir(sections, 48000, 24).gain[1])), 4)
     ((3, 6), 0.8913)
     """
+    numbers = _design(kind, edges, rate, prototype, order, ripple, attenuation, q)
+    with Record() as rows:
+        call("dspc_iir", rows, *numbers)
+        return rows.take().reshape(-1, lib.DSP_IIR_VALUES)
+
+
+def _design(
+    kind: str,
+    edges: tuple[float, ...],
+    rate: float,
+    prototype: str,
+    order: int,
+    ripple: float,
+    attenuation: float,
+    q: float,
+) -> tuple[float, ...]:
+    """What the library's designs take."""
     if kind not in (*_BANDS, *_SINGLE):
         raise ValueError(
             f"no design is called {kind!r}; there are {', '.join([*_BANDS, *_SINGLE])}"
@@ -69,13 +86,43 @@ def design_iir(
     places = [f / rate for f in edges]
     check_edges(places, rate)
     if kind in _SINGLE:
-        numbers: tuple[float, ...] = (_SINGLE[kind], 0, 1, places[0], places[0] / q, 0, 0)
-    else:
-        numbers = (_DESIGNS[prototype], _BANDS[kind], order, places[0], places[-1])
-        numbers += (ripple, attenuation)
-    with Record() as rows:
-        call("dspc_iir", rows, *numbers)
-        return rows.take().reshape(-1, lib.DSP_IIR_VALUES)
+        return _SINGLE[kind], 0, 1, places[0], places[0] / q, 0, 0
+    band = _BANDS[kind]
+    return _DESIGNS[prototype], band, order, places[0], places[-1], ripple, attenuation
+
+
+@dataclass(frozen=True)
+class ZerosPoles:
+    """What `design_zpk()` returns: the filter is gain (z - zero) ... / ((z - pole) ...)."""
+
+    zeros: Array
+    poles: Array
+    gain: float
+
+
+def design_zpk(
+    kind: str,
+    *edges: float,
+    rate: float = 1.0,
+    prototype: str = "butter",
+    order: int = 4,
+    ripple: float = 1.0,
+    attenuation: float = 60.0,
+    q: float = 30.0,
+) -> ZerosPoles:
+    """The filter of `design_iir()` by its zeros and poles in the plane of z, for pictures of them
+    and for how near to the unit circle they come.
+
+    >>> found = wavkit.design_zpk("lowpass", 1000, rate=48000, order=2)
+    >>> found.zeros.real, found.poles.round(4)
+    (array([-1., -1.]), array([0.9077+0.0845j, 0.9077-0.0845j]))
+    """
+    numbers = _design(kind, edges, rate, prototype, order, ripple, attenuation, q)
+    with Record() as values:
+        call("dspc_iir_zpk", values, *numbers)
+        found = values.take()
+    zeros, poles = np.split(found[1:], 2)
+    return ZerosPoles(zeros, poles, float(found[0].real))
 
 
 def sections_of(sections: ArrayLike) -> Array:

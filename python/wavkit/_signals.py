@@ -26,6 +26,27 @@ _DIRECTIONS = {
 }
 
 
+def analytic(x: ArrayLike | Any, detrend: bool = False, axis: int | str = -1) -> Labelled:
+    """The complex signal z = x + i H(x), H being the Hilbert transform: a cos(p) becomes a e^(ip).
+    Its magnitude is the envelope, the slope of its phase the frequency at every moment.
+
+    >>> t = np.arange(1000) / 1000
+    >>> phase = np.unwrap(np.angle(wavkit.analytic(np.cos(2 * np.pi * 50 * t))))
+    >>> wavkit.derive(phase / (2 * np.pi), rate=1000)[[1, 500]].round(6)
+    array([50., 50.])
+    """
+    runs = Runs(x, 1.0, axis)
+    if detrend:
+        runs.rows = [without_mean(row) for row in runs.rows]
+
+    def step(x: Record, out: Record) -> None:
+        call("dsp_copy", out, x)
+        call("dspi_rtoc", out)
+        call("dspi_analytic", out)
+
+    return runs.same(runs.map(step))
+
+
 def envelope(x: ArrayLike | Any, detrend: bool = False, axis: int | str = -1) -> Labelled:
     """The magnitude of the analytic signal: of a tone, its amplitude over time.
 
@@ -119,14 +140,20 @@ def interp(
     *,
     rate: float | None = None,
     extrapolate: bool = False,
+    slopes: tuple[float | None, float | None] = (None, None),
+    curvatures: tuple[float | None, float | None] = (None, None),
     axis: int | str = -1,
 ) -> Labelled:
     """A table y over x at other places, in any order; without x, a signal at any times. Between the
     samples it is held (`hold`), a line (`linear`), a parabola (`quadratic`) or a cubic `spline`
     with not-a-knot ends; outside of the table its ends are held, or go on with `extrapolate`.
+    `slopes` and `curvatures` are the first and the second derivative of a spline at its first and
+    its last knot, None where they are unknown; curvatures (0, 0) make the natural spline.
 
     >>> wavkit.interp([0.0, 1.0, 2.0, 3.0, 4.0], [0.0, 1.0, 8.0, 27.0, 64.0], [1.5, 2.5], "spline")
     array([ 3.375, 15.625])
+    >>> wavkit.interp(None, [0, 1, 0, -1, 0], [0.5], "spline", rate=1, slopes=(1.5, 1.5)).round(4)
+    array([0.6875])
     """
     if method not in _METHODS:
         raise ValueError(f"a method is one of {', '.join(_METHODS)}, not {method!r}")
@@ -141,8 +168,18 @@ def interp(
     ascending = lend(np.ascontiguousarray(wanted.ravel()[order], letter))
     flags = _METHODS[method] | (0 if extrapolate else lib.DSP_INTERP_HOLD_ENDS)
 
+    ends = [_end(*known) for known in zip(slopes, curvatures)]
+    if method != "spline" and any(kind != lib.DSP_SPLINE_NOT_A_KNOT for kind, _ in ends):
+        raise ValueError(f"slopes and curvatures are those of a spline, not of {method!r}")
+    (start, first), (end, last) = ends
+
     def step(y: Record, out: Record) -> None:
-        call("dsp_interp", table, y, None, ascending, out, flags)
+        if start == end == lib.DSP_SPLINE_NOT_A_KNOT:
+            call("dsp_interp", table, y, None, ascending, out, flags)
+            return
+        with Record(dtype=letter) as moments:
+            call("dspb_cspline_2d", table, y, moments, first, last, start, end)
+            call("dsp_interp", table, y, moments, ascending, out, flags)
 
     values = runs.map(step)
     result = np.empty_like(values)
@@ -150,6 +187,17 @@ def interp(
     if wanted.ndim != 1:
         return result.reshape(*runs.shape, *wanted.shape)[()]
     return runs.along(result, "at", wanted)
+
+
+def _end(slope: float | None, curvature: float | None) -> tuple[int, float]:
+    """What is known at one end of a spline, and its value."""
+    if slope is not None and curvature is not None:
+        raise ValueError("an end of a spline has its slope or its curvature given, not both")
+    if slope is not None:
+        return lib.DSP_SPLINE_SLOPE, slope
+    if curvature is not None:
+        return lib.DSP_SPLINE_CURVATURE, curvature
+    return lib.DSP_SPLINE_NOT_A_KNOT, 0.0
 
 
 @dataclass(frozen=True)

@@ -1,4 +1,4 @@
-"""Signals reduced to numbers: statistics, histograms, straight lines."""
+"""Signals reduced to numbers: statistics, histograms; and the roots of polynomials."""
 
 from __future__ import annotations
 
@@ -158,61 +158,6 @@ def hist(
     below = (values < low).sum(axis=-1)
     above = runs.points - nan - below - counts.sum(axis=-1)
     return Histogram(counts, low + width * np.arange(bins + 1), below, above, nan)
-
-
-@dataclass(frozen=True)
-class Line:
-    """What `fit()` returns: y = slope x + intercept, and how well that is known. Called with
-    abscissae, it gives the values there."""
-
-    slope: Any
-    intercept: Any
-    slope_error: Any  #: standard error
-    intercept_error: Any
-    residual_variance: Any
-    correlation: Any
-    mean_x: Any
-    mean_y: Any
-
-    @property
-    def r_squared(self) -> Any:
-        """The share of the variance of y that the line explains."""
-        return self.correlation**2
-
-    def __call__(self, x: ArrayLike) -> Array:
-        result: Array = np.multiply.outer(self.slope, x) + np.expand_dims(
-            self.intercept, tuple(np.arange(-np.ndim(x), 0))
-        )
-        return result
-
-
-def fit(
-    x: ArrayLike | Any, y: ArrayLike | None = None, rate: float | None = None, axis: int | str = -1
-) -> Line:
-    """The least-squares line of y over x; of one signal alone, over the places of its samples.
-
-    >>> line = wavkit.fit([0.0, 1.0, 2.0, 3.0], [1.0, 3.1, 4.9, 7.0])
-    >>> round(line.slope, 2), round(line.intercept, 2), round(line.slope_error, 3)
-    (1.98, 1.03, 0.042)
-    """
-    runs = Runs(x if y is None else y, rate, axis)
-    if y is None:
-        x = runs.start() + np.arange(runs.points) * runs.delta
-    abscissae = np.asarray(x, float)
-    if abscissae.ndim > 1 and not isinstance(axis, str):
-        abscissae = np.moveaxis(abscissae, axis, -1)
-    abscissae = np.broadcast_to(abscissae, runs.array.shape).reshape(-1, runs.points)
-    if runs.is_complex:
-        raise ValueError("a line goes through real values")
-    results = []
-    for places, row in zip(abscissae, runs.rows):
-        with lend(places + 1j * row.astype(float)) as pairs, Record() as out:
-            lib.dsps_lin_regres2(pairs, out)
-            results.append(out.take())
-    v = runs.stack(results)
-    take = [v[..., i][()] for i in (0, 1, 3, 4, 2, 19, 14, 15)]
-    take[2:4] = [np.sqrt(variance) for variance in take[2:4]]
-    return Line(*take)
 
 
 def roots(coefficients: ArrayLike, descending: bool = False) -> Array:

@@ -153,19 +153,27 @@ def peaks(
     prominence: float = math.nan,
     width: float = math.nan,
     width_at: float = 50,
+    valleys: bool = False,
 ) -> SignalPeaks:
     """The samples of one signal that are above their neighbours and meet the conditions, which are
     those of `scipy.signal.find_peaks()`. Distances, widths and places are in seconds where `rate`
     is in samples a second; widths are measured where `width_at` percent of the prominence is lost.
+    `valleys` are the peaks of -x, given as they lie in x: `height` is then the greatest one.
 
     >>> beats = wavkit.peaks(np.cos(2 * np.pi * 1.25 * np.arange(400) / 100), 100, distance=0.5)
     >>> beats.at.round(6)
     array([0.8, 1.6, 2.4, 3.2])
+    >>> between = wavkit.peaks([3.0, 1.0, 2.0, -4.0, 5.0], valleys=True, height=0)
+    >>> between.sample, between.height, between.prominence
+    (array([3]), array([-4.]), array([7.]))
     """
     runs = Runs(x, rate)
     if runs.shape:
         raise ValueError("the peaks of several signals are of different number: pass one at a time")
-    limits = (height, threshold, distance / runs.delta, prominence, width / runs.delta)
+    sign = -1 if valleys else 1
+    limits = (sign * height, threshold, distance / runs.delta, prominence, width / runs.delta)
+    if valleys:
+        runs.rows = [np.negative(row) for row in runs.rows]
     found = runs.map(lambda x, out: call("dsps_peaks", x, out, *limits, width_at / 100))
     values = found.reshape(-1, lib.DSP_PEAKS_VALUES).T
 
@@ -175,9 +183,9 @@ def peaks(
 
     return SignalPeaks(
         at=places(lib.DSP_PEAKS_POSITION),
-        top=values[lib.DSP_PEAKS_TOP],
+        top=sign * values[lib.DSP_PEAKS_TOP],
         sample=values[lib.DSP_PEAKS_INDEX].astype(np.int64),
-        height=values[lib.DSP_PEAKS_HEIGHT],
+        height=sign * values[lib.DSP_PEAKS_HEIGHT],
         prominence=values[lib.DSP_PEAKS_PROMINENCE],
         width=values[lib.DSP_PEAKS_WIDTH] * runs.delta,
         left=places(lib.DSP_PEAKS_LEFT),

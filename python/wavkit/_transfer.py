@@ -10,7 +10,7 @@ from numpy.typing import ArrayLike
 
 from . import _functions as lib
 from ._record import Array, Record, lend, samples_of
-from ._runs import call
+from ._runs import Labelled, Runs, call
 from ._spectra import step_of
 from ._windows import window_number
 
@@ -20,21 +20,21 @@ class Transfer:
     """What `transfer()` returns: along the last axis a value of each frequency."""
 
     frequency: Array
-    h1: Array  #: complex, cross over input: noise in the output averages out
-    h2: Array  #: complex, output over cross: noise in the input does
-    coherence: Array  #: how much of the output the input explains, 0 to 1
-    phase: Array  #: in radians, without jumps
+    h1: Labelled  #: complex, cross over input: noise in the output averages out
+    h2: Labelled  #: complex, output over cross: noise in the input does
+    coherence: Labelled  #: how much of the output the input explains, 0 to 1
+    phase: Labelled  #: in radians, without jumps
     delay: Any  #: by how much the output comes later, in seconds, between samples
-    cross: Array  #: complex density, with the conjugate of the input
-    input: Array  #: power density
-    output: Array  #: power density
+    cross: Labelled  #: complex density, with the conjugate of the input
+    input: Labelled  #: power density
+    output: Labelled  #: power density
     segments: int
 
     @property
-    def db(self) -> Array:
+    def db(self) -> Labelled:
         """The gain `h1` in decibels."""
-        tiny = np.finfo(self.h1.dtype).tiny
-        result: Array = 20 * np.log10(np.maximum(np.abs(self.h1), tiny))
+        tiny = np.finfo(np.asarray(self.h1).dtype).tiny
+        result: Labelled = 20 * np.log10(np.maximum(np.abs(self.h1), tiny))
         return result
 
 
@@ -120,15 +120,15 @@ class TransferMeter:
 
 
 def transfer(
-    x: ArrayLike,
-    y: ArrayLike,
-    rate: float = 1.0,
+    x: ArrayLike | Any,
+    y: ArrayLike | Any,
+    rate: float | None = None,
     points: int = 1024,
     window: str = "hann",
     *,
     overlap: float = 50,
     detrend: bool = False,
-    axis: int = -1,
+    axis: int | str = -1,
 ) -> Transfer:
     """What lies between two real signals, the input `x` and the output `y`: response, coherence and
     delay over overlapping segments of `points` samples (Welch's method), of which `detrend` takes
@@ -139,23 +139,28 @@ def transfer(
     >>> float(found.delay.round(6)), found.db[100].round(1), found.coherence[100].round(1)
     (0.012, 6.0, 1.0)
     """
-    first, second = (np.moveaxis(samples_of(v), axis, -1) for v in (x, y))
-    first, second = np.broadcast_arrays(first, second)
-    meter = TransferMeter(rate, points, window, overlap=overlap, detrend=detrend)
+    given = [Runs(v, rate, axis) for v in (x, y)]
+    labelled = [runs for runs in given if runs.labels is not None]
+    delta = (labelled or given)[0].delta
+    first, second = np.broadcast_arrays(*(runs.array for runs in given))
+    meter = TransferMeter(1 / delta, points, window, overlap=overlap, detrend=detrend)
     shape = first.shape[:-1]
     found = []
     for index in np.ndindex(shape):
         meter.reset()
         meter(first[index], second[index])
         found.append(meter.result())
-    if not shape:
-        return found[0]
     if not found:
         raise ValueError("there is no signal")
-    values = {
-        name: np.stack([getattr(one, name) for one in found]).reshape(
-            *shape, *np.shape(getattr(found[0], name))
-        )
-        for name in _KINDS
-    }
-    return Transfer(frequency=found[0].frequency, segments=found[0].segments, **values)
+    frequency, values = found[0].frequency, {}
+    same = [runs for runs in labelled if runs.array.shape == first.shape]
+    for name in _KINDS:
+        told = np.stack([getattr(one, name) for one in found])
+        told = told.reshape((*shape, *told.shape[1:]))
+        if not same:
+            values[name] = told[()]
+        elif name == "delay":
+            values[name] = same[0].reduced(told)
+        else:
+            values[name] = same[0].along(told, "frequency", frequency)
+    return Transfer(frequency=frequency, segments=found[0].segments, **values)

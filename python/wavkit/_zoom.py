@@ -108,16 +108,27 @@ class Goertzel:
 
     def __call__(self, block: ArrayLike) -> Array:
         samples = np.ascontiguousarray(samples_of(block))
+        if samples.ndim != 1:
+            raise ValueError("a block has one axis")
         with lend(samples, self._delta) as x, Record(dtype=samples.dtype.char.lower()) as out:
             call("dsph_goertzel", x, Record(self.frequencies), out, self._state, 0)
             return out.take()
 
 
-def goertzel(x: ArrayLike, frequencies: ArrayLike, rate: float = 1.0) -> Array:
+def goertzel(
+    x: ArrayLike | Any, frequencies: ArrayLike, rate: float | None = None, *, axis: int | str = -1
+) -> Labelled:
     """The complex amplitudes of single frequencies of a whole signal.
 
     >>> x = 3 * np.cos(2 * np.pi * 60 * np.arange(1000) / 1000)
     >>> abs(wavkit.goertzel(x, 60, 1000)).round(6)
     array([3.])
     """
-    return Goertzel(frequencies, rate)(x)
+    runs = Runs(x, rate, axis)
+    meter = Goertzel(frequencies, 1 / runs.delta)
+
+    def measured(row: Array) -> Array:
+        meter.reset()
+        return meter(row)
+
+    return runs.along(runs.each(measured), "frequency", meter.frequencies)
