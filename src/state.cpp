@@ -8,6 +8,11 @@
 #include "record_view.hpp"
 #include "shared_table.hpp"
 
+#if defined(__MINGW32__)
+#define WIN32_LEAN_AND_MEAN
+#include <windows.h>
+#endif
+
 namespace wavkit {
 namespace {
 
@@ -45,28 +50,64 @@ void let_go_of_tables(ThreadState<R>& own) {
     let_go_of_all(own.quarter_turns, epoch);
 }
 
-/// The part of a thread that ends.
+/// The calling thread's part, which ends with it.
+template <Record R>
+void free_thread_part() {
+    auto& own = thread_state<R>;
+    free_tap_cache(own.tap_cache);
+    dsp_destroy(&own.expanded_taps);
+    let_go_of_tables(own);
+    free_scratch(own.filter_scratch);
+    free_workspace(own.workspace);
+    free_windows(own.windows);
+    std::free(std::exchange(own.conversion, nullptr));
+}
+
+#if defined(__MINGW32__)
+/// MinGW gives the memory of a thread's variables back before it runs their destructors. What the
+/// system calls at the end of a thread for a value in a slot (or at the end of a fiber, from any
+/// thread) comes before both.
+template <Record R>
+class ThreadEnd {
+  public:
+    ThreadEnd() : slot_(FlsAlloc(&reached)) {}
+    ~ThreadEnd() { FlsFree(slot_); }
+    ThreadEnd(const ThreadEnd&) = delete;
+    ThreadEnd& operator=(const ThreadEnd&) = delete;
+    void await() const { FlsSetValue(slot_, &thread_state<R>); }
+
+  private:
+    static void NTAPI reached(void*) {
+        free_thread_part<R>();
+        thread_state<R>.released_at_end = false;
+    }
+    DWORD slot_;
+};
+
+template <Record R>
+void await_thread_end() {
+    static const ThreadEnd<R> thread_end;
+    thread_end.await();
+}
+#else
 template <Record R>
 struct AtThreadEnd {
-    ~AtThreadEnd() {
-        auto& own = thread_state<R>;
-        free_tap_cache(own.tap_cache);
-        dsp_destroy(&own.expanded_taps);
-        let_go_of_tables(own);
-        free_scratch(own.filter_scratch);
-        free_workspace(own.workspace);
-        free_windows(own.windows);
-        std::free(std::exchange(own.conversion, nullptr));
-    }
+    ~AtThreadEnd() { free_thread_part<R>(); }
 };
+
+template <Record R>
+void await_thread_end() {
+    // Only the way past its definition, not a look at it, has its destructor run.
+    static thread_local AtThreadEnd<R> at_thread_end;
+}
+#endif
 
 }  // namespace
 
 template <Record R>
 void keep_until_thread_ends() {
     if (thread_state<R>.released_at_end) return;
-    // Only the way past its definition, not a look at it, has its destructor run.
-    static thread_local AtThreadEnd<R> at_thread_end;
+    await_thread_end<R>();
     thread_state<R>.released_at_end = true;
 }
 

@@ -52,10 +52,12 @@ BOTH_PRECISIONS(Record, BorrowedBufferIsNeverTouchedByGrowth) {
 
 BOTH_PRECISIONS(Record, BlocksBeginWithACacheLineAndKeepTheirContents) {
 #ifdef _WIN32
-    GTEST_SKIP() << "the platform's free() takes no aligned blocks";
+    constexpr std::uintptr_t stated = 16;  // as malloc() has them: free() takes no others
+#else
+    constexpr std::uintptr_t stated = 64;
 #endif
     const auto aligned = [](const R* x) {
-        return reinterpret_cast<std::uintptr_t>(x->data) % 64 == 0;
+        return reinterpret_cast<std::uintptr_t>(x->data) % stated == 0;
     };
     for (int size = 1; size < 1 << 20; size = size * 3 / 2 + 1) {
         Signal<R> x, between;  // which keeps x from growing in its place

@@ -12,6 +12,7 @@
 #include <span>
 #include <string_view>
 
+#include "files.hpp"
 #include "signals.hpp"
 
 namespace wavkit::test {
@@ -188,7 +189,7 @@ struct Arguments {
         } else if constexpr (std::same_as<P, scalar<R>*>) {
             return &number;
         } else if constexpr (std::same_as<P, FILE*>) {
-            stream.reset(std::tmpfile());
+            stream.reset(temporary_file());
             fill_stream(next<int>(), stream.get());
             return stream.get();
         } else if constexpr (std::same_as<P, const dsp*> && !std::same_as<R, dsp>) {

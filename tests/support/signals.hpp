@@ -12,13 +12,6 @@
 
 namespace wavkit::test {
 
-/// A file that is there and empty.
-#if defined(_WIN32)
-inline constexpr const char* null_device = "NUL";
-#else
-inline constexpr const char* null_device = "/dev/null";
-#endif
-
 /// A record that releases itself; use it wherever a pointer to a record is wanted.
 template <Record R>
 class Signal {
