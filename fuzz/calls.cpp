@@ -248,7 +248,7 @@ std::vector<Call<R>> calls_of_family() {
             add(twins.name, twins.of_single);
         }
     };
-    std::apply([&](const auto&... twins) { (add_twin(twins), ...); }, one_name::every_function);
+    one_name::each_function(add_twin);
     return calls;
 }
 

@@ -11,6 +11,7 @@
 #include <memory>
 #include <span>
 #include <string_view>
+#include <tuple>
 
 #include "files.hpp"
 #include "signals.hpp"
@@ -364,7 +365,7 @@ std::vector<Case<R>> every_case() {
             add(twins.name, twins.of_single);
         }
     };
-    std::apply([&](const auto&... twins) { (add_twin(twins), ...); }, every_function);
+    each_function(add_twin);
     add_own_calls<R>([&](const char* name, auto call) { add(name, +call); });
     return cases;
 }

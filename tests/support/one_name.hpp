@@ -1,8 +1,6 @@
 // The library through one set of names in both precisions, for templates over the record.
 #pragma once
 
-#include <tuple>
-
 #include "../../src/record_view.hpp"
 
 namespace wavkit::one_name {

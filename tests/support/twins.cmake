@@ -11,17 +11,20 @@ foreach(header IN LISTS WAVKIT_HEADERS)
   list(APPEND twins ${singles})
 endforeach()
 list(TRANSFORM twins REPLACE "(.+)" "TWINS(dsp\\1, dspf\\1)" OUTPUT_VARIABLE definitions)
-# In the list of them, those that begin and end what records and the library hold are left out.
+# Of those to be visited, those that begin and end what records and the library hold are left out.
 list(FILTER twins EXCLUDE REGEX "_(init|alloc|realloc|destroy|lib_.*)$")
-list(TRANSFORM twins PREPEND "dsp" OUTPUT_VARIABLE names)
+list(TRANSFORM twins REPLACE "(.+)" "    visit(dsp\\1)" OUTPUT_VARIABLE visits)
 list(JOIN definitions "\n" definitions)
-list(JOIN names ", " names)
+list(JOIN visits ";\n" visits)
 list(JOIN declared ", " declared)
 file(CONFIGURE OUTPUT ${CMAKE_CURRENT_BINARY_DIR}/support/twins.hpp CONTENT
 "#define TWINS(of_double, of_single) \\
     inline constexpr Twins of_double{#of_double, ::of_double, ::of_single};
 ${definitions}
-inline constexpr std::tuple every_function{${names}};
+template <class Visit>
+void each_function(Visit visit) {
+${visits};
+}
 inline constexpr const char* declared[] = {${declared}};
 ")
 set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${WAVKIT_HEADERS})
