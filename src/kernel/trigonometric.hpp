@@ -98,6 +98,25 @@ WAVKIT_LANES SineCosine<V> sine_cosine_of(Remainder<V> angle) {
             sum + cosine_tail(mul_add(-angle.r, angle.lost, lost), square)};
 }
 
+// Of angles beyond the range of the reduction.
+#if defined(__MINGW32__)
+// MinGW's sine and cosine are the x87's, which knows 66 bits of pi; its tangent is right for any
+// angle. That of half the angle has the sign of the sine.
+inline double sine_of_large(double x) {
+    const long double t = std::tan(x);
+    const long double size = std::fabs(t) / std::sqrt(1 + t * t);
+    return double(std::tan(x / 2) < 0 ? -size : size);
+}
+inline double cosine_of_large(double x) {
+    const long double t = std::tan(x);
+    const long double size = 1 / std::sqrt(1 + t * t);
+    return double((std::tan(x / 2) < 0) != (t < 0) ? -size : size);
+}
+#else
+inline double sine_of_large(double x) { return std::sin(x); }
+inline double cosine_of_large(double x) { return std::cos(x); }
+#endif
+
 /// `result`, but f(x) in the lanes where x is beyond the range of the reduction.
 template <class V, class Function>
 [[gnu::noinline, gnu::cold]] void large_angles(V& result, const V& x, Function f) {
@@ -129,7 +148,7 @@ WAVKIT_LANES V sin(V x) {
     const auto [s, c] = sine_cosine_of(angle);
     const V result = flip_by_sign_of(select_odd(angle.quadrant, c, s),
                                      quadrant_sign<V>(angle.quadrant) ^ bits(x));
-    return mend_large_angles(result, x, [](Lane<V> v) { return Lane<V>(std::sin(double(v))); });
+    return mend_large_angles(result, x, [](Lane<V> v) { return Lane<V>(sine_of_large(v)); });
 }
 
 template <class V>
@@ -138,7 +157,7 @@ WAVKIT_LANES V cos(V x) {
     const auto [s, c] = sine_cosine_of(angle);
     const V result =
         flip_by_sign_of(select_odd(angle.quadrant, s, c), quadrant_sign<V>(angle.quadrant + 1));
-    return mend_large_angles(result, x, [](Lane<V> v) { return Lane<V>(std::cos(double(v))); });
+    return mend_large_angles(result, x, [](Lane<V> v) { return Lane<V>(cosine_of_large(v)); });
 }
 
 /// Both for little more than the price of one.
@@ -150,8 +169,8 @@ WAVKIT_LANES SineCosine<V> sincos(V x) {
                                    quadrant_sign<V>(angle.quadrant) ^ bits(x));
     const V cosine =
         flip_by_sign_of(select_odd(angle.quadrant, s, c), quadrant_sign<V>(angle.quadrant + 1));
-    return {mend_large_angles(sine, x, [](Lane<V> v) { return Lane<V>(std::sin(double(v))); }),
-            mend_large_angles(cosine, x, [](Lane<V> v) { return Lane<V>(std::cos(double(v))); })};
+    return {mend_large_angles(sine, x, [](Lane<V> v) { return Lane<V>(sine_of_large(v)); }),
+            mend_large_angles(cosine, x, [](Lane<V> v) { return Lane<V>(cosine_of_large(v)); })};
 }
 
 /// The sine by the cosine, each to twice the precision; in odd quadrants the negative reciprocal.
