@@ -1,5 +1,7 @@
 """Every layout of arrays, and the coordinates of xarray and pandas."""
 
+import dataclasses
+
 import numpy as np
 import pandas
 import pytest
@@ -120,6 +122,119 @@ def test_pandas_keeps_coordinates():
     assert list(both.coherence.columns) == ["a", "b"] and both.frequency[-1] == 4
     assert both.h1["a"].to_numpy() == pytest.approx(2)
     assert wavkit.edges(pandas.Series([0.0, 1.0], [3.0, 4.0]), 0.5).tolist() == [3.5]
+
+
+# What is measured of signals x whose first sample is at `start`, and along which axes.
+MEASURED = {
+    "spectrogram": (
+        lambda x, start, **how: wavkit.spectrogram(x, points=16, **how).amplitude,
+        {"frequency": np.arange(9) / 2, "time": np.arange(6, 13)},
+    ),
+    "stft": (
+        lambda x, start, **how: wavkit.stft(x, size=16, **how).bins,
+        {"frequency": np.arange(9) / 2, "time": 5 + np.arange(17) / 2},
+    ),
+    "istft": (lambda x, start, **how: wavkit.istft(wavkit.stft(x, size=16, **how)), {"time": TIME}),
+    "peaks": (
+        lambda x, start, **how: wavkit.spectrum(x, **how).peaks(2).frequency,
+        {"peak": [0, 1]},
+    ),
+    "orders": (
+        lambda x, start, **how: wavkit.orders(
+            x, start + np.arange(8.0), revolutions=2, **how
+        ).amplitude,
+        {"frequency": np.arange(9) / 2},
+    ),
+    "correlate": (
+        lambda x, start, **how: wavkit.correlate(x, x, **how).coefficient,
+        {"lag": np.arange(-63, 64) / 8},
+    ),
+    "best": (lambda x, start, **how: wavkit.correlate(x, x, **how).best, {}),
+    "hist": (
+        lambda x, start, rate=None, axis=-1: wavkit.hist(x, 4, (-4, 4), axis).counts,
+        {"bin": [-3, -1, 1, 3]},
+    ),
+    "below": (lambda x, start, rate=None, axis=-1: wavkit.hist(x, 4, (-1, 1), axis).below, {}),
+    "fit": (lambda x, start, **how: wavkit.fit(x, **how).slope, {}),
+    "line": (lambda x, start, **how: wavkit.fit(x, **how)([start, start + 2]), {"at": [5, 7]}),
+    "fit_polynomial": (
+        lambda x, start, **how: wavkit.fit_polynomial(x, centre=True, **how).coefficients,
+        {"power": [0, 1, 2]},
+    ),
+    "polynomial": (lambda x, start, **how: wavkit.fit_polynomial(x, **how)(start), {}),
+    "sine": (lambda x, start, **how: wavkit.fit_sine(x, **how)([0.5, 1.0]), {"at": [0.5, 1]}),
+    "distortion": (
+        lambda x, start, **how: wavkit.distortion(x, harmonics=2, window="hann", **how).harmonics,
+        {"harmonic": [0, 1, 2]},
+    ),
+    "levels": (
+        lambda x, start, rate=None, axis=-1: wavkit.levels(x, 8000, octaves=1, axis=axis).bands,
+        {"centre": wavkit.octave_bands(1, rate=8000)[0]},
+    ),
+    "czt": (
+        lambda x, start, rate=None, axis=-1: wavkit.czt(x, 3, 0.25, 0.125, axis=axis),
+        {"frequency": [0.25, 0.375, 0.5]},
+    ),
+    "interp": (lambda x, start, **how: wavkit.interp(None, x, start + 1.3, **how), {}),
+    "outliers": (
+        lambda x, start, rate=None, axis=-1: wavkit.replace_outliers(x, 9, 1, axis=axis)[1],
+        {"time": TIME},
+    ),
+}
+TONES = np.sin(2 * np.pi * 1.3 * TIME[:, None]) * [1, 3] + 0.1 * RNG.normal(size=(64, 2))
+
+
+@pytest.mark.parametrize("name", MEASURED)
+def test_what_is_measured_has_coordinates(name):
+    function, axes = MEASURED[name]
+    plain = function(TONES[:, 1].copy(), 0.0, rate=8)
+    coords = {"time": TIME, "channel": ["a", "b"], "place": ("channel", ["bow", "stern"])}
+    found = function(xarray.DataArray(TONES, coords, ["time", "channel"]), 5.0, axis="time")
+    assert sorted(found.dims) == sorted(["channel", *axes])
+    assert found.place.values.tolist() == ["bow", "stern"]
+    for axis, places in axes.items():
+        np.testing.assert_allclose(found[axis], places)
+    np.testing.assert_allclose(found.sel(channel="b"), plain, 1e-9, 1e-9)
+
+    table = pandas.DataFrame(TONES, pandas.Index(TIME, name="time"), ["a", "b"])
+    for part in (function(table, 5.0)["b"], function(table["b"], 5.0)):
+        np.testing.assert_allclose(part, plain, 1e-9, 1e-9)
+        # A line that is called gives an array for one Series: its slope is a number.
+        labels = [getattr(part, side, None) for side in ("index", "columns")]
+        for index, (axis, places) in zip(labels, axes.items()):
+            if index is not None:
+                assert index.name == axis
+                np.testing.assert_allclose(index, places)
+
+
+def test_changed_frames_give_signals_of_what_is_left():
+    x = xarray.DataArray(TONES, {"time": TIME, "channel": ["a", "b"]}, ["time", "channel"])
+    frames = wavkit.stft(x, size=16, axis=0)
+    for bins in (frames.bins.sel(channel="b"), frames.bins.transpose("time", ...)):
+        again = wavkit.istft(dataclasses.replace(frames, bins=2 * bins))
+        xarray.testing.assert_allclose(again, 2 * x.sel(channel=bins.channel).T)
+    table = x.to_pandas()
+    frames = wavkit.stft(table, size=16)
+    again = wavkit.istft(dataclasses.replace(frames, bins=frames.bins["a"]))
+    pandas.testing.assert_series_equal(again, table["a"], check_names=False)
+    plain = wavkit.istft(dataclasses.replace(frames, bins=frames.bins["a"].to_numpy()))
+    assert type(plain) is np.ndarray and plain == pytest.approx(TONES[:, 0])
+
+
+def test_dates_stay_dates_in_blocks_too():
+    index = pandas.date_range("2026-03-01", periods=64, freq="125ms", tz="Europe/Berlin")
+    table = pandas.DataFrame(TONES, index, ["a", "b"])
+    half = wavkit.decimate(table, 2)
+    assert half.index.equals(index[::2])
+    assert wavkit.spectrogram(table["a"], points=16).amplitude.columns.equals(index[8:57:8])
+    assert wavkit.correlate(table["a"][8:], table["a"]).best == 0
+    assert wavkit.correlate(TONES[:8, 0], table["a"]).lag[1] == -6 / 8
+    assert wavkit.correlate(np.empty((0, 8)), TONES[:, 0]).best.size == 0
+    blocks = [table[:20], table[20:]]
+    again = pandas.concat(wavkit.Resampler(8, 4).blocks(blocks))
+    pandas.testing.assert_frame_equal(again, half, check_freq=False, check_names=False)
+    mean = pandas.concat(wavkit.Filter([0.5, 0.5]).blocks(blocks))
+    pandas.testing.assert_frame_equal(mean[1:], table.rolling(2).mean()[1:], check_freq=False)
 
 
 def test_plots(tmp_path):

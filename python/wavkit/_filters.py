@@ -10,8 +10,9 @@ import numpy as np
 from numpy.typing import ArrayLike, DTypeLike
 
 from . import _functions as lib
+from ._labels import Labelled
 from ._record import Array, Record, lend, samples_of
-from ._runs import Labelled, Runs, call
+from ._runs import Runs, call
 from ._windows import window_number
 
 _DESIGNS = {
@@ -199,14 +200,14 @@ class Filter:
         self._states: list[Record] = []
         self._of: tuple[Any, ...] | None = None
 
-    def __call__(self, block: ArrayLike) -> Array:
+    def __call__(self, block: ArrayLike | Any) -> Labelled:
         runs = Runs(block)
         letter = runs.array.dtype.char
         taps = lend(self.taps.ravel() if self._recursive else in_precision_of(self.taps, letter))
         self._begin(runs, letter)
         states = iter(self._states or [self._state(row) for row in runs.rows or [runs.array]])
         name = "dspd_iir" if self._recursive else "dspd_fir"
-        return runs.map(lambda x, out: call(name, x, out, taps, next(states)))
+        return runs.same(runs.map(lambda x, out: call(name, x, out, taps, next(states))))
 
     def _begin(self, runs: Runs, letter: str) -> None:
         signals = (runs.shape, letter in "fF")
@@ -230,7 +231,7 @@ class Filter:
             call("dspc_iir_state", steady, lend(self.taps.ravel()))
             return Record(steady.take() * row[:1].astype("D" if row.dtype.kind == "c" else "d"))
 
-    def blocks(self, source: Iterable[ArrayLike]) -> Iterator[Array]:
+    def blocks(self, source: Iterable[ArrayLike | Any]) -> Iterator[Labelled]:
         """The filtered blocks of a source, one by one."""
         for block in source:
             yield self(block)

@@ -9,7 +9,8 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
-from ._record import Array, Record, lend
+from ._labels import Labelled, values_at
+from ._record import Array, Record, lend, samples_of
 from ._runs import Runs
 
 
@@ -18,12 +19,10 @@ def _pairs(
 ) -> tuple[Runs, list[tuple[Array, Array]]]:
     """The signals of y, each behind its abscissae; where there is none, one that tells the shape of
     what a fit makes."""
-    runs = Runs(x if y is None else y, rate, axis)
+    runs = Runs(x, rate, axis) if y is None else Runs(y, rate or 1.0, axis)
     if y is None:
         x = runs.start() + np.arange(runs.points) * runs.delta
-    abscissae = np.asarray(x, float)
-    if abscissae.ndim > 1 and not isinstance(axis, str):
-        abscissae = np.moveaxis(abscissae, axis, -1)
+    abscissae = np.asarray(x if np.ndim(x) < 2 else Runs(x, 1.0, axis).array, float)
     if runs.is_complex:
         raise ValueError("a fit goes through real values")
     try:
@@ -42,25 +41,24 @@ class Line:
     """What `fit()` returns: y = slope x + intercept, and how well that is known. Called with
     abscissae, it gives the values there."""
 
-    slope: Any
-    intercept: Any
-    slope_error: Any  #: standard error
-    intercept_error: Any
-    residual_variance: Any
-    correlation: Any
-    mean_x: Any
-    mean_y: Any
+    slope: Labelled
+    intercept: Labelled
+    slope_error: Labelled  #: standard error
+    intercept_error: Labelled
+    residual_variance: Labelled
+    correlation: Labelled
+    mean_x: Labelled
+    mean_y: Labelled
 
     @property
-    def r_squared(self) -> Any:
+    def r_squared(self) -> Labelled:
         """The share of the variance of y that the line explains."""
         return self.correlation**2
 
-    def __call__(self, x: ArrayLike) -> Array:
-        result: Array = np.multiply.outer(self.slope, x) + np.expand_dims(
-            self.intercept, tuple(np.arange(-np.ndim(x), 0))
-        )
-        return result
+    def __call__(self, x: ArrayLike | Any) -> Labelled:
+        steps = tuple(range(-np.ndim(x), 0))
+        slope, intercept = (np.expand_dims(v, steps) for v in (self.slope, self.intercept))
+        return values_at(self.slope, slope * np.asarray(x) + intercept, x)
 
 
 def fit(
@@ -79,9 +77,9 @@ def fit(
             lib.dsps_lin_regres2(points, out)
             results.append(out.take())
     v = runs.stack(results)
-    take = [v[..., i][()] for i in (0, 1, 3, 4, 2, 19, 14, 15)]
+    take = [v[..., i] for i in (0, 1, 3, 4, 2, 19, 14, 15)]
     take[2:4] = [np.sqrt(variance) for variance in take[2:4]]
-    return Line(*take)
+    return Line(*map(runs.reduced, take))
 
 
 @dataclass(frozen=True)
@@ -90,27 +88,27 @@ class Polynomial:
     how well that is known. Called with abscissae, it gives the values there, by the family that it
     was fitted with: high degrees lose no digits to their powers."""
 
-    coefficients: Array  #: along the last axis, in ascending powers
-    errors: Array  #: their standard errors; NaN where no degrees of freedom remain
-    about: Any
-    residual_variance: Any
-    r_squared: Any  #: the share of the variance of y that the polynomial explains
+    coefficients: Labelled  #: along the last axis, in ascending powers
+    errors: Labelled  #: their standard errors; NaN where no degrees of freedom remain
+    about: Labelled
+    residual_variance: Labelled
+    r_squared: Labelled  #: the share of the variance of y that the polynomial explains
     _family: Array
+    _degree: int
 
-    def __call__(self, x: ArrayLike) -> Array:
-        places = np.asarray(x, float)
+    def __call__(self, x: ArrayLike | Any) -> Labelled:
+        places = np.asarray(samples_of(x), float)
 
         def of_each(values: Array) -> Array:
             return np.expand_dims(values, tuple(range(-places.ndim, 0)))
 
         t = (places - of_each(self._family[..., 0, 3])) / of_each(self._family[..., 1, 3])
         before, now, result = np.zeros_like(t), np.ones_like(t), np.zeros_like(t)
-        for k in range(self.coefficients.shape[-1]):
+        for k in range(self._degree + 1):
             alpha, beta, factor = (of_each(self._family[..., k, i]) for i in range(3))
             result = result + factor * now
             before, now = now, (t - alpha) * now - beta * before
-        values: Array = result.astype(float)[()]
-        return values
+        return values_at(self.about, result.astype(float)[()], x)
 
 
 def fit_polynomial(
@@ -141,8 +139,17 @@ def fit_polynomial(
     found = [_polynomial(*pair, degree, centre) for pair in pairs]
     numbers, family = (runs.stack(list(parts)) for parts in zip(*found))
     coefficients, errors = numbers[..., : degree + 1], numbers[..., degree + 1 : -3]
-    about, variance, r_squared = (numbers[..., i][()] for i in (-3, -2, -1))
-    return Polynomial(coefficients, errors, about, variance, r_squared, family)
+    powers = {"power": np.arange(degree + 1)}
+    about, variance, r_squared = (runs.reduced(numbers[..., i]) for i in (-3, -2, -1))
+    return Polynomial(
+        runs.reduced(coefficients, powers),
+        runs.reduced(errors, powers),
+        about,
+        variance,
+        r_squared,
+        family,
+        degree,
+    )
 
 
 def _polynomial(x: Array, y: Array, degree: int, centre: bool) -> tuple[Array, Array]:

@@ -9,8 +9,9 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
+from ._labels import Labelled
 from ._record import Array, Error, Record, lend
-from ._runs import Labelled, Runs, call
+from ._runs import Runs, call
 
 _WEIGHTINGS = {"z": lib.DSP_WEIGHTING_Z, "a": lib.DSP_WEIGHTING_A, "c": lib.DSP_WEIGHTING_C}
 _RESPONSES = {"fast": lib.DSP_TIME_FAST, "slow": lib.DSP_TIME_SLOW}
@@ -29,7 +30,7 @@ class Levels:
     peak: Labelled
     exposure: Labelled
     centres: Array
-    bands: Array
+    bands: Labelled
 
 
 def _sections(kind: str, rate: float) -> Array:
@@ -119,5 +120,5 @@ def levels(
         runs.reduced(table[..., lib.DSP_LEVEL_PEAK]),
         runs.reduced(table[..., lib.DSP_LEVEL_EXPOSURE]),
         centres,
-        np.stack(in_bands, -1) if bands else np.empty(0),
+        runs.reduced(np.stack(in_bands, -1), {"centre": centres}) if bands else np.empty(0),
     )

@@ -8,8 +8,9 @@ from typing import Any
 import numpy as np
 from numpy.typing import ArrayLike
 
+from ._labels import Labelled
 from ._record import Array, lend
-from ._runs import Labelled, Runs, call
+from ._runs import Runs, call
 from ._spectra import Spectrum, average
 
 
@@ -95,7 +96,7 @@ def orders(
         float(angles),
         revolutions * angles,
         window,
-        axis=axis,
+        axis=runs.axis,
         overlap=overlap,
         any_length=True,
     )

@@ -12,8 +12,9 @@ from numpy.typing import ArrayLike
 
 from . import _functions as lib
 from ._filters import in_precision_of
+from ._labels import Labelled
 from ._record import Array, Record, lend
-from ._runs import Labelled, Runs, call
+from ._runs import Runs, call
 
 # The share of half the lower rate that is kept, and by how much the rest is down, in decibels.
 _QUALITIES = {"fast": (0.85, 100.0), "normal": (0.92, 140.0), "best": (0.955, 190.0)}
@@ -105,6 +106,7 @@ class Resampler:
         self.up, self.down = self.ratio.numerator, self.ratio.denominator
         self.exact = self.up <= _MOST_PHASES and self.down < 2**31
         self.phases = self.up if self.exact else _PHASES
+        self._rate = float(new_rate)
         share, attenuation = _QUALITIES[quality]
         edge = 0.5 * min(float(self.ratio), 1.0)
         self.kernel = np.ones(1)
@@ -116,12 +118,22 @@ class Resampler:
         """Forgets the signal so far."""
         self._streams: list[_Stream] = []
         self._of: tuple[Any, ...] | None = None
+        self._first: Runs | None = None  # block, where it has coordinates
         self._taken = self._made = 0
 
-    def __call__(self, block: ArrayLike) -> Array:
-        made = self._pass(Runs(block))
-        self._made += made.shape[-1]
-        return made
+    def __call__(self, block: ArrayLike | Any) -> Labelled:
+        runs = Runs(block)
+        if self._of is None and runs.labels is not None:
+            self._first = runs
+        return self._placed(self._pass(runs))
+
+    def _placed(self, made: Array) -> Labelled:
+        """Outputs with the coordinates that those of the first block go on to."""
+        before, self._made = self._made, self._made + made.shape[-1]
+        if self._first is None:
+            return made
+        places = self._first.later(np.arange(before, self._made) / self._rate)
+        return self._first.along(made, self._first.name, places)
 
     def _pass(self, runs: Runs) -> Array:
         letter = runs.array.dtype.char
@@ -138,7 +150,7 @@ class Resampler:
             stream.early -= early
         return made[..., early:]
 
-    def finish(self) -> Array:
+    def finish(self) -> Labelled:
         """The outputs that are still due, with zeros behind the signal, and starts anew."""
         if self._of is None:
             return np.empty(0)
@@ -146,10 +158,11 @@ class Resampler:
         wanted = math.ceil(self._taken * self.ratio) - self._made
         behind = len(self.kernel) // self.phases // 2 + 2 + math.ceil(1 / self.ratio)
         rest = self._pass(Runs(np.zeros((*shape, behind), letter)))[..., :wanted]
+        result = self._placed(rest)
         self.reset()
-        return rest
+        return result
 
-    def blocks(self, source: Iterable[ArrayLike]) -> Iterator[Array]:
+    def blocks(self, source: Iterable[ArrayLike | Any]) -> Iterator[Labelled]:
         """The outputs for the blocks of a source, one by one, and the last of them."""
         for block in source:
             yield self(block)
@@ -178,8 +191,8 @@ def resample(
     old = 1 / runs.delta if rate is None else rate
     resampler = Resampler(old, new_rate, quality)
     values = runs.each(lambda row: np.concatenate((resampler(row), resampler.finish())))
-    places = runs.start() + np.arange(values.shape[-1]) / float(new_rate)
-    return runs.along(values, _name(runs), places)
+    places = runs.later(np.arange(values.shape[-1]) / float(new_rate))
+    return runs.along(values, runs.name, places)
 
 
 def decimate(
@@ -198,10 +211,3 @@ def decimate(
     """
     old = 1 / Runs(x, rate, axis).delta if rate is None else rate
     return resample(x, old, _as_written(old) / by, quality, axis=axis)
-
-
-def _name(runs: Runs) -> str:
-    name = None
-    if runs.labels is not None:
-        name = getattr(runs.labels, "dim", None) or getattr(runs.labels, "x").index.name
-    return str(name or "time")

@@ -1,23 +1,19 @@
-"""Arrays of any shape as signals along an axis, with the coordinates of xarray and pandas."""
+"""Arrays of any shape as signals along an axis."""
 
 from __future__ import annotations
 
 import math
-import sys
 from typing import Any, Callable, Iterator
 
 import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions
+from ._labels import Axes, Labelled, labels_of
 from ._record import Array, Record, lend, samples_of
 
 #: A step reads one record and leaves its result in another.
 Step = Callable[[Record, Record], object]
-
-#: Arrays come out as arrays; what came as an object of xarray or pandas comes out as one.
-Labelled = Any
-
 
 _double: dict[str, Callable[..., int]] = vars(_functions)
 _single = {
@@ -30,101 +26,6 @@ _single = {
 def call(name: str, x: Record, *arguments: Any) -> int:
     """Calls a function, by its name in double precision, in the precision of its first argument."""
     return (_single if x.single else _double)[name](x, *arguments)
-
-
-class _Labels:
-    """Coordinates of an object: those of the axis of the samples, and the others."""
-
-    values: Array
-    axis: int
-
-    def spacing(self) -> float | None:
-        """The step of the coordinate, in seconds where it is one of dates."""
-        found = self.places()
-        if found is None or len(found) < 2:
-            return None
-        places: Any = found
-        if places.dtype.kind in "mM":
-            places = (places - places[0]) / np.timedelta64(1, "s")
-        steps = np.diff(places.astype(float))
-        step = float((places[-1] - places[0]) / len(steps))
-        if not step > 0 or np.max(np.abs(steps - step)) > step / 20:
-            raise ValueError("the coordinate of the samples is not equally spaced")
-        return step
-
-    def places(self) -> Array | None:
-        raise NotImplementedError
-
-    def same(self, values: Array) -> Any:
-        """Values at the old coordinates."""
-        raise NotImplementedError
-
-    def reduced(self, values: Array) -> Any:
-        """A value of each signal."""
-        raise NotImplementedError
-
-    def along(self, values: Array, name: str, places: Array) -> Any:
-        """Values along another axis."""
-        raise NotImplementedError
-
-
-class _DataArray(_Labels):
-    def __init__(self, x: Any, axis: int | str) -> None:
-        self.x, self.values = x, np.asarray(x.values)
-        self.axis = x.dims.index(axis) if isinstance(axis, str) else range(x.ndim)[axis]
-        self.dim = x.dims[self.axis]
-
-    def places(self) -> Array | None:
-        return np.asarray(self.x[self.dim].values) if self.dim in self.x.coords else None
-
-    def _others(self) -> dict[Any, Any]:
-        return {name: c for name, c in self.x.coords.items() if self.dim not in c.dims}
-
-    def same(self, values: Array) -> Any:
-        return self.x.copy(data=values)
-
-    def reduced(self, values: Array) -> Any:
-        dims = [dim for dim in self.x.dims if dim != self.dim]
-        return type(self.x)(values, dims=dims, coords=self._others(), name=self.x.name)
-
-    def along(self, values: Array, name: str, places: Array) -> Any:
-        dims = [name if dim == self.dim else dim for dim in self.x.dims]
-        return type(self.x)(
-            values, dims=dims, coords={**self._others(), name: places}, name=self.x.name
-        )
-
-
-class _Frame(_Labels):
-    """A Series, or a DataFrame whose columns are the signals."""
-
-    def __init__(self, x: Any) -> None:
-        self.x, self.values, self.axis = x, x.to_numpy(), 0
-
-    def places(self) -> Array | None:
-        pandas = sys.modules["pandas"]
-        return None if isinstance(self.x.index, pandas.RangeIndex) else self.x.index.to_numpy()
-
-    def _made(self, values: Array, index: Any) -> Any:
-        if self.x.ndim == 1:
-            return type(self.x)(values, index=index, name=self.x.name)
-        return type(self.x)(values, index=index, columns=self.x.columns)
-
-    def same(self, values: Array) -> Any:
-        return self._made(values, self.x.index)
-
-    def reduced(self, values: Array) -> Any:
-        pandas = sys.modules["pandas"]
-        return values[()] if self.x.ndim == 1 else pandas.Series(values, index=self.x.columns)
-
-    def along(self, values: Array, name: str, places: Array) -> Any:
-        return self._made(values, sys.modules["pandas"].Index(places, name=name))
-
-
-def labels_of(x: Any, axis: int | str) -> _Labels | None:
-    package = type(x).__module__.partition(".")[0]
-    if package == "xarray":
-        return _DataArray(x, axis)
-    return _Frame(x) if package == "pandas" else None
 
 
 class Runs:
@@ -196,22 +97,37 @@ class Runs:
         return values if values.ndim == 1 else np.moveaxis(values, -1, self.axis)
 
     def same(self, values: Array) -> Labelled:
+        """Values at the old coordinates, from the last axis."""
         values = self.back(values)
         return values if self.labels is None else self.labels.same(values)
 
-    def along(self, values: Array, name: str, places: Array) -> Labelled:
+    def along(self, values: Array, name: str, places: Any) -> Labelled:
+        """Values along another axis, from the last one to where that of the samples was."""
         values = self.back(values)
         return values if self.labels is None else self.labels.along(values, name, places)
 
-    def reduced(self, values: Array) -> Labelled:
-        return values[()] if self.labels is None else self.labels.reduced(values)
+    def reduced(self, values: Array, axes: Axes = {}) -> Labelled:
+        """What was made of each signal: a value, or values along axes that stay the last ones."""
+        return values[()] if self.labels is None else self.labels.reduced(values, axes)
+
+    @property
+    def name(self) -> str:
+        """Of the axis of the samples."""
+        return (self.labels and self.labels.name) or "time"
 
     def start(self) -> float:
         """The place of the first sample, as far as coordinates that are numbers tell."""
-        places = None if self.labels is None else self.labels.places()
-        if places is None or len(places) == 0 or places.dtype.kind not in "iuf":
-            return 0.0
-        return float(places[0])
+        return 0.0 if self.labels is None else self.labels.start()
+
+    def later(self, seconds: Array) -> Any:
+        """The places so far behind the first sample, dates where the coordinates are dates."""
+        return seconds if self.labels is None else self.labels.later(seconds)
+
+    def behind(self, other: Runs) -> float:
+        """By how much the first sample comes later than that of other signals."""
+        if self.labels is None or other.labels is None:
+            return self.start() - other.start()
+        return self.labels.behind(other.labels)
 
 
 def same_length(name: str, *arguments: Any) -> Step:

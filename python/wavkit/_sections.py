@@ -11,8 +11,9 @@ from numpy.typing import ArrayLike
 
 from . import _functions as lib
 from ._filters import Response, check_edges
+from ._labels import Labelled
 from ._record import Array, Record, lend, samples_of
-from ._runs import Labelled, Runs, call
+from ._runs import Runs, call
 
 _DESIGNS = {
     "butter": lib.DSP_IIR_BUTTERWORTH,

@@ -10,8 +10,9 @@ from numpy.typing import ArrayLike
 
 from . import _functions as lib
 from ._filters import filter
+from ._labels import Labelled, values_at
 from ._record import Array, Record, lend, samples_of
-from ._runs import Labelled, Runs, call, same_length, without_mean
+from ._runs import Runs, call, same_length, without_mean
 
 _METHODS = {
     "hold": lib.DSP_INTERP_HOLD,
@@ -185,7 +186,8 @@ def interp(
     result = np.empty_like(values)
     result[..., order] = values
     if wanted.ndim != 1:
-        return result.reshape(*runs.shape, *wanted.shape)[()]
+        of_each = runs.reduced(np.zeros(runs.shape))
+        return values_at(of_each, result.reshape((*runs.shape, *wanted.shape))[()], at)
     return runs.along(result, "at", wanted)
 
 
@@ -205,13 +207,9 @@ class Correlation:
     """What `correlate()` returns: the values and the coefficients at every lag."""
 
     lag: Array
-    value: Array
-    coefficient: Array
-
-    @property
-    def best(self) -> Any:
-        """The lag at which the signals match best."""
-        return self.lag[np.abs(self.value).argmax(axis=-1)]
+    value: Labelled
+    coefficient: Labelled
+    best: Labelled  #: the lag at which the signals match best
 
 
 def correlate(
@@ -236,10 +234,11 @@ def correlate(
     dtype = np.result_type(first.array, second.array)
     shape = np.broadcast_shapes(first.shape, second.shape)
     shift = first.points - 1
+    delta = (first if first.labels or not second.labels else second).delta
 
     def rows(runs: Runs) -> list[Array]:
         every = np.broadcast_to(runs.array, (*shape, runs.points)).reshape(-1, runs.points)
-        return [without_mean(row) if detrend else row for row in every.astype(dtype)]
+        return [without_mean(row) if detrend else row for row in every.astype(dtype, order="C")]
 
     values, scales = [], []
     for row, other in zip(rows(first), rows(second)):
@@ -247,15 +246,17 @@ def correlate(
         scales.append(first.points / np.sqrt(energies) if energies > 0 else 0.0)
         padded = np.pad(other, shift)
         with Record(dtype=dtype.char.lower()) as out:
-            call(
-                "dspb_corr",
-                lend(row, first.delta),
-                lend(padded, first.delta),
-                out,
-                None,
-                first.points,
-            )
+            call("dspb_corr", lend(row, delta), lend(padded, delta), out, None, first.points)
             values.append(out.take())
-    value = np.reshape(values, (*shape, -1))
-    lag = (np.arange(value.shape[-1]) - shift) * first.delta + second.start() - first.start()
-    return Correlation(lag, value, value * np.reshape(scales, (*shape, 1)))
+    value = np.reshape(values, (*shape, second.points + shift))
+    lag = (np.arange(value.shape[-1]) - shift) * delta + second.behind(first)
+    coefficient = value * np.reshape(scales, (*shape, 1))
+    best = lag[np.abs(value).argmax(axis=-1)]
+    # Of the signals that are as many as the results.
+    like = next((runs for runs in (first, second) if runs.labels and runs.shape == shape), None)
+    if like is None:
+        return Correlation(lag, value, coefficient, best)
+    axes = {"lag": lag}
+    return Correlation(
+        lag, like.reduced(value, axes), like.reduced(coefficient, axes), like.reduced(best)
+    )

@@ -8,8 +8,9 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
+from ._labels import Labelled
 from ._record import Array, Record, lend
-from ._runs import Labelled, Runs, call
+from ._runs import Runs, call
 
 _ENDS = {
     "shorter": lib.DSP_ENDS_SHORTER,
@@ -81,8 +82,8 @@ def replace_outliers(
     *,
     ends: str = "shorter",
     axis: int | str = -1,
-) -> tuple[Labelled, Array]:
-    """A signal without its outliers, and where they were, as an array of truth values.
+) -> tuple[Labelled, Labelled]:
+    """A signal without its outliers, and where they were, as truth values.
 
     A sample further from the median of its window than `threshold` standard deviations, 1.4826
     times the median distance from the median, becomes the median; so does one that is no number
@@ -108,5 +109,4 @@ def replace_outliers(
 
     both = runs.each(cleaned)
     points = runs.points
-    mask: Array = runs.back(both[..., points:] != 0)
-    return runs.same(both[..., :points]), mask
+    return runs.same(both[..., :points]), runs.same(both[..., points:] != 0)

@@ -3,16 +3,17 @@
 from __future__ import annotations
 
 import math
-from dataclasses import dataclass
+from dataclasses import dataclass, field
 from typing import Any, Callable, Iterator
 
 import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
+from ._labels import PACKAGES, Axes, Labelled, Labels, package_of
 from ._peaks import Layout, find_peaks, noise_bandwidth_of
 from ._record import Array, Record, lend
-from ._runs import Labelled, Runs, call, without_mean
+from ._runs import Runs, call, without_mean
 from ._windows import takes_width, window_number
 
 _AVERAGES = {
@@ -32,14 +33,20 @@ class Peaks:
     """Components, the strongest first: two arrays, or pairs when it is iterated over. Those of
     several signals are along the last axis, NaN where a signal has fewer."""
 
-    frequency: Array
-    amplitude: Array
+    frequency: Labelled
+    amplitude: Labelled
 
     def __len__(self) -> int:
-        return int(self.frequency.shape[-1])
+        return len(_from_last(self.frequency))
 
     def __iter__(self) -> Iterator[tuple[Any, Any]]:
-        return zip(np.moveaxis(self.frequency, -1, 0), np.moveaxis(self.amplitude, -1, 0))
+        return zip(_from_last(self.frequency), _from_last(self.amplitude))
+
+
+def _from_last(values: Labelled) -> Array:
+    """Values with the last axis first, where a table of pandas has it."""
+    plain = np.asarray(values)
+    return plain if package_of(values) == "pandas" else np.moveaxis(plain, -1, 0)
 
 
 class Spectrum:
@@ -115,7 +122,8 @@ class Spectrum:
         for row, peaks in zip(values, found):
             row[: len(peaks)] = np.reshape(peaks, (-1, 2))
         values = values.reshape(*self._bins.shape[:-1], most, 2)
-        return Peaks(values[..., 0], values[..., 1])
+        axes = {"peak": np.arange(most)}
+        return Peaks(*(self._runs.reduced(values[..., i], axes) for i in (0, 1)))
 
     def plot(self, axes: Any = None, db: bool = False, **options: Any) -> Any:
         """Draws the amplitudes with matplotlib, and returns the axes."""
@@ -132,19 +140,19 @@ class Spectrum:
 class Spectrogram:
     """What `spectrogram()` returns: `amplitude[..., frequency, time]`."""
 
-    def __init__(self, frequency: Array, time: Array, amplitude: Array) -> None:
+    def __init__(self, frequency: Array, time: Array, amplitude: Labelled) -> None:
         self.frequency, self.time, self.amplitude = frequency, time, amplitude
 
     @property
-    def db(self) -> Array:
-        tiny = np.finfo(self.amplitude.dtype).tiny
-        result: Array = 20 * np.log10(np.maximum(self.amplitude, tiny))
-        return result
+    def db(self) -> Labelled:
+        """The amplitude in decibels from 1."""
+        tiny = np.finfo(np.asarray(self.amplitude).dtype).tiny
+        return 20 * np.log10(np.maximum(self.amplitude, tiny))
 
     def plot(self, axes: Any = None, span: float = 100, **options: Any) -> Any:
         """Draws the amplitudes of one signal in decibels, `span` of them, with matplotlib."""
         axes = axes or _new_axes()
-        heights = self.db
+        heights = np.asarray(self.db)
         options = {"vmin": heights.max() - span, "shading": "nearest", **options}
         mesh = axes.pcolormesh(self.time, self.frequency, heights, **options)
         axes.figure.colorbar(mesh, ax=axes, label="amplitude, dB")
@@ -385,8 +393,15 @@ def spectrogram(
         return amplitudes
 
     frequency = (np.arange(layout.bins) - layout.origin) * layout.delta
-    time = runs.start() + (np.arange(count) * segments.step + points / 2) * runs.delta
-    return Spectrogram(frequency, time, runs.each(course))
+    times = (np.arange(count) * segments.step + points / 2) * runs.delta
+    axes = _course_axes(runs, frequency, times)
+    return Spectrogram(frequency, runs.start() + times, runs.reduced(runs.each(course), axes))
+
+
+def _course_axes(runs: Runs, frequency: Array, times: Array) -> Axes:
+    """Those of spectra so far behind the first sample."""
+    course = "time" if runs.labels is None else runs.labels.course
+    return {"frequency": frequency, course: runs.later(times)}
 
 
 @dataclass(frozen=True)
@@ -395,13 +410,14 @@ class Frames:
 
     frequency: Array
     time: Array
-    bins: Array
+    bins: Labelled
     rate: float
     window: str
     size: int
     hop: int
     points: int  #: samples of the signal
     two_sided: bool
+    _labels: Labels | None = field(default=None, repr=False)
 
 
 def stft(
@@ -436,22 +452,34 @@ def stft(
     bins = np.swapaxes(rows.reshape(*rows.shape[:-1], -1, count), -1, -2)
     delta = 1 / (size * runs.delta)
     frequency = (np.arange(count) - (size // 2 if full else 0)) * delta
-    time = runs.start() + np.arange(bins.shape[-1]) * (step * runs.delta)
+    times = np.arange(bins.shape[-1]) * (step * runs.delta)
     return Frames(
-        frequency, time, bins, 1 / runs.delta, window, size, step, runs.points, two_sided=full
+        frequency,
+        runs.start() + times,
+        runs.reduced(bins, _course_axes(runs, frequency, times)),
+        1 / runs.delta,
+        window,
+        size,
+        step,
+        runs.points,
+        full,
+        runs.labels,
     )
 
 
-def istft(frames: Frames) -> Array:
+def istft(frames: Frames) -> Labelled:
     """The signal of frames, along the last axis: the one that was transformed, to rounding, or of
-    changed bins (`dataclasses.replace(frames, bins=...)`) the one that comes nearest to them.
+    changed bins (`dataclasses.replace(frames, bins=...)`) the one that comes nearest to them. Bins
+    of xarray and pandas give a signal at the coordinates that it was transformed from.
 
     >>> frames = wavkit.stft(np.arange(9.0), size=4, hop=2)
     >>> wavkit.istft(frames).round(12)
     array([0., 1., 2., 3., 4., 5., 6., 7., 8.])
     """
-    letter = "F" if frames.bins.dtype == np.complex64 else "D"
-    rows = np.ascontiguousarray(np.swapaxes(frames.bins, -1, -2), letter)
+    labels = frames._labels if package_of(frames.bins) in PACKAGES else None
+    bins = np.asarray(frames.bins) if labels is None else labels.planes(frames.bins)
+    letter = "F" if bins.dtype == np.complex64 else "D"
+    rows = np.ascontiguousarray(np.swapaxes(bins, -1, -2), letter)
     if rows.shape[-1] != len(frames.frequency):
         raise ValueError(f"frames have {len(frames.frequency)} bins, not {rows.shape[-1]}")
     runs = Runs(rows.reshape(*rows.shape[:-2], rows.shape[-2] * rows.shape[-1]))
@@ -462,4 +490,5 @@ def istft(frames: Frames) -> Array:
         lib.DSP_SPECTRUM_TWO_SIDED if frames.two_sided else 0,
     )
     samples = runs.map(lambda x, out: call("dsph_istft", x, out, *settings, None, 1))
-    return samples[..., : frames.points]
+    samples = samples[..., : frames.points]
+    return samples if labels is None else labels.restored(frames.bins, samples)

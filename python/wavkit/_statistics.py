@@ -10,8 +10,9 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
+from ._labels import Labelled
 from ._record import Array, Record, lend, samples_of
-from ._runs import Labelled, Runs, call
+from ._runs import Runs, call
 
 
 @dataclass(frozen=True)
@@ -119,11 +120,11 @@ def _geometric_mean(row: Array) -> Any:
 class Histogram:
     """What `hist()` returns. `below`, `above` and `nan` count what is in no bin."""
 
-    counts: Array
+    counts: Labelled
     edges: Array
-    below: Any
-    above: Any
-    nan: Any
+    below: Labelled
+    above: Labelled
+    nan: Labelled
 
 
 def hist(
@@ -157,7 +158,11 @@ def hist(
     nan = np.isnan(values).sum(axis=-1)
     below = (values < low).sum(axis=-1)
     above = runs.points - nan - below - counts.sum(axis=-1)
-    return Histogram(counts, low + width * np.arange(bins + 1), below, above, nan)
+    edges = low + width * np.arange(bins + 1)
+    centres = low + width * (np.arange(bins) + 0.5)
+    return Histogram(
+        runs.reduced(counts, {"bin": centres}), edges, *map(runs.reduced, (below, above, nan))
+    )
 
 
 def roots(coefficients: ArrayLike, descending: bool = False) -> Array:

@@ -10,8 +10,9 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
+from ._labels import Labelled, values_at
 from ._record import Array, Record
-from ._runs import Labelled, Runs, call
+from ._runs import Runs, call
 from ._windows import window_number
 
 
@@ -34,7 +35,7 @@ class Distortion:
     noise_density: Labelled  #: the same over the root of half the sampling rate
     spur_frequency: Labelled
     spur_amplitude: Labelled
-    harmonics: Array  #: complex, along the last axis: the offset, and amplitude e^(i phase) of each
+    harmonics: Labelled  #: complex, along the last axis: offset, then amplitude e^(i phase) of each
 
 
 def distortion(
@@ -70,7 +71,8 @@ def distortion(
 
     found = runs.each(measured)
     figures = [runs.reduced(found[..., i].real) for i in range(len(names))]
-    return Distortion(**dict(zip(names, figures)), harmonics=found[..., len(names) :])
+    lines = runs.reduced(found[..., len(names) :], {"harmonic": np.arange(count + 1)})
+    return Distortion(**dict(zip(names, figures)), harmonics=lines)
 
 
 @dataclass(frozen=True)
@@ -88,14 +90,14 @@ class Sine:
     phase_error: Labelled
     offset_error: Labelled
 
-    def __call__(self, t: ArrayLike) -> Array:
-        turns = 2 * np.pi * np.multiply.outer(self.frequency, t)
+    def __call__(self, t: ArrayLike | Any) -> Labelled:
         steps = tuple(range(-np.ndim(t), 0))
-        phase, amplitude, offset = (
-            np.expand_dims(v, steps) for v in (self.phase, self.amplitude, self.offset)
+        frequency, phase, amplitude, offset = (
+            np.expand_dims(v, steps)
+            for v in (self.frequency, self.phase, self.amplitude, self.offset)
         )
-        result: Array = offset + amplitude * np.cos(turns + phase)
-        return result
+        turns = 2 * np.pi * frequency * np.asarray(t)
+        return values_at(self.frequency, offset + amplitude * np.cos(turns + phase), t)
 
 
 def fit_sine(

@@ -9,8 +9,9 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
+from ._labels import Labelled
 from ._record import Array, Record, lend, samples_of
-from ._runs import Labelled, Runs, call
+from ._runs import Runs, call
 from ._spectra import step_of
 from ._windows import window_number
 

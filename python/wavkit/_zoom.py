@@ -9,8 +9,9 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
+from ._labels import Labelled
 from ._record import Array, Record, lend, samples_of
-from ._runs import Labelled, Runs, call
+from ._runs import Runs, call
 from ._windows import window_number
 
 
@@ -64,8 +65,8 @@ def czt(
     step: float,
     radius: float = 1.0,
     *,
-    axis: int = -1,
-) -> Array:
+    axis: int | str = -1,
+) -> Labelled:
     """The z-transform on an arc of a circle: the mean of x[n] z[k]^-n at
     z[k] = radius e^(2 pi i (start + k step)), `start` and `step` in cycles a sample. Times the
     number of samples that is `scipy.signal.czt()`.
@@ -80,7 +81,7 @@ def czt(
         call("dsp_copy", out, x)
         call("dspi_czt", out, points, start, step, radius)
 
-    return runs.back(runs.map(taken))
+    return runs.along(runs.map(taken), "frequency", start + np.arange(points) * step)
 
 
 class Goertzel:

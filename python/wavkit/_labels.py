@@ -1,0 +1,249 @@
+"""The coordinates of xarray and pandas: off the objects that come in, onto what goes out.
+
+Neither package is imported: whoever passes an object of theirs has done it.
+"""
+
+from __future__ import annotations
+
+import sys
+from typing import Any, Mapping
+
+import numpy as np
+
+from ._record import Array
+
+#: Arrays come out as arrays; what came as an object of xarray or pandas comes out as one.
+Labelled = Any
+
+#: Whose objects have coordinates.
+PACKAGES = ("xarray", "pandas")
+
+#: Axes of a result by their names, with their places.
+Axes = Mapping[str, Any]
+
+
+class Labels:
+    """Coordinates of an object: those of the axis of the samples, and the others."""
+
+    values: Array
+    axis: int
+    name: str | None  # of the axis of the samples
+
+    @property
+    def course(self) -> str:
+        """The name of the axis along which spectra of the samples follow one another."""
+        return "time" if self.name in (None, "frequency") else str(self.name)
+
+    def spacing(self) -> float | None:
+        """The step of the coordinate, in seconds where it is one of dates."""
+        found = self.places()
+        if found is None or len(found) < 2:
+            return None
+        places: Any = found
+        if places.dtype.kind in "mM":
+            places = (places - places[0]) / np.timedelta64(1, "s")
+        steps = np.diff(places.astype(float))
+        step = float((places[-1] - places[0]) / len(steps))
+        if not step > 0 or np.max(np.abs(steps - step)) > step / 20:
+            raise ValueError("the coordinate of the samples is not equally spaced")
+        return step
+
+    def places(self) -> Array | None:
+        raise NotImplementedError
+
+    def first(self) -> Any:
+        """The place of the first sample: a number, a date, or 0 where there is none."""
+        places = self.places()
+        known = places is not None and len(places) and places.dtype.kind in "iufmM"
+        return places[0] if places is not None and known else 0.0
+
+    def start(self) -> float:
+        """The same, as far as it is a number."""
+        first = self.first()
+        return 0.0 if _is_date(first) else float(first)
+
+    def later(self, seconds: Array) -> Any:
+        """The places so far behind the first sample, dates behind a date."""
+        first = self.first()
+        return first + (np.round(seconds * 1e9).astype("m8[ns]") if _is_date(first) else seconds)
+
+    def behind(self, other: Labels) -> float:
+        """By how much the first sample comes later than another one, in seconds between dates."""
+        mine, its = self.first(), other.first()
+        if _is_date(mine) and type(mine) is type(its):
+            return float((mine - its) / np.timedelta64(1, "s"))
+        return self.start() - other.start()
+
+    def same(self, values: Array) -> Labelled:
+        """Values at the old coordinates."""
+        raise NotImplementedError
+
+    def reduced(self, values: Array, axes: Axes) -> Labelled:
+        """What was made of each signal: a value, or values along axes behind those of the
+        signals."""
+        raise NotImplementedError
+
+    def along(self, values: Array, name: str, places: Any) -> Labelled:
+        """Values along another axis, where that of the samples was."""
+        raise NotImplementedError
+
+    def planes(self, made: Labelled) -> Array:
+        """The values of what `reduced()` made with two axes, or of a part or a change of it."""
+        raise NotImplementedError
+
+    def restored(self, made: Labelled, values: Array) -> Labelled:
+        """Signals at the old coordinates of the samples, of which there is one for each of
+        `planes()`."""
+        raise NotImplementedError
+
+
+def _is_date(place: Any) -> bool:
+    return isinstance(place, (np.datetime64, np.timedelta64))
+
+
+class _DataArray(Labels):
+    def __init__(self, x: Any, axis: int | str) -> None:
+        self.x, self.values = x, np.asarray(x.values)
+        self.axis = x.dims.index(axis) if isinstance(axis, str) else range(x.ndim)[axis]
+        self.dim = x.dims[self.axis]
+        self.name = str(self.dim)
+
+    def places(self) -> Array | None:
+        return np.asarray(self.x[self.dim].values) if self.dim in self.x.coords else None
+
+    def _made(self, values: Array, dims: list[Any], coords: Mapping[Any, Any]) -> Any:
+        return type(self.x)(values, dims=dims, coords=coords, name=self.x.name)
+
+    def same(self, values: Array) -> Labelled:
+        return self.x.copy(data=values)
+
+    def reduced(self, values: Array, axes: Axes) -> Labelled:
+        dims = [dim for dim in self.x.dims if dim != self.dim]
+        return self._made(values, [*dims, *axes], {**_apart(self.x, self.dim), **axes})
+
+    def along(self, values: Array, name: str, places: Any) -> Labelled:
+        dims = [name if dim == self.dim else dim for dim in self.x.dims]
+        return self._made(values, dims, {**_apart(self.x, self.dim), name: places})
+
+    def planes(self, made: Labelled) -> Array:
+        # Arithmetic of xarray may have changed the order of the dimensions.
+        return np.asarray(made.transpose(..., "frequency", self.course).values)
+
+    def restored(self, made: Labelled, values: Array) -> Labelled:
+        ends = ("frequency", self.course)
+        own = {name: c for name, c in self.x.coords.items() if c.dims == (self.dim,)}
+        dims = [dim for dim in made.dims if dim not in ends]
+        return self._made(values, [*dims, self.dim], {**_apart(made, *ends), **own})
+
+
+def _apart(x: Any, *dims: Any) -> dict[Any, Any]:
+    """The coordinates of what has nothing to do with some dimensions."""
+    return {name: c for name, c in x.coords.items() if not set(dims) & set(c.dims)}
+
+
+class _Frame(Labels):
+    """A Series, or a DataFrame whose columns are the signals."""
+
+    def __init__(self, x: Any) -> None:
+        self.x, self.values, self.axis = x, x.to_numpy(), 0
+        self.name = None if x.index.name is None else str(x.index.name)
+
+    def places(self) -> Array | None:
+        index = self.x.index
+        if isinstance(index, sys.modules["pandas"].RangeIndex):
+            return None
+        found: Array = (index if _zone(index) is None else index.tz_convert(None)).to_numpy()
+        return found
+
+    def later(self, seconds: Array) -> Any:
+        places, zone = super().later(seconds), _zone(self.x.index)
+        if zone is None or places.dtype.kind != "M":
+            return places
+        return _index(places).tz_localize("UTC").tz_convert(zone)
+
+    def _made(self, values: Array, index: Any) -> Any:
+        if self.x.ndim == 1:
+            return type(self.x)(values, index=index, name=self.x.name)
+        return type(self.x)(values, index=index, columns=self.x.columns)
+
+    def same(self, values: Array) -> Labelled:
+        return self._made(values, self.x.index)
+
+    def reduced(self, values: Array, axes: Axes) -> Labelled:
+        pandas, several = sys.modules["pandas"], self.x.ndim > 1
+        rows, columns = ([*(_index(p, name) for name, p in axes.items())] + [None, None])[:2]
+        if rows is None:
+            return pandas.Series(values, index=self.x.columns) if several else values[()]
+        if columns is None:
+            return self._made(values.T if several else values, rows)
+        if several:
+            # One signal beside the other, under its name.
+            values = np.moveaxis(values, 0, 1).reshape(len(rows), -1)
+            columns = _beneath(self.x.columns, columns)
+        return pandas.DataFrame(values, index=rows, columns=columns)
+
+    def along(self, values: Array, name: str, places: Any) -> Labelled:
+        return self._made(values, _index(places, name))
+
+    def planes(self, made: Labelled) -> Array:
+        values = made.to_numpy()
+        if made.columns.nlevels == 1:
+            return np.asarray(values)
+        count = len(made.columns.unique(-1))
+        return np.asarray(np.moveaxis(values.reshape(len(values), -1, count), 1, 0))
+
+    def restored(self, made: Labelled, values: Array) -> Labelled:
+        pandas, index = sys.modules["pandas"], self.x.index
+        if made.columns.nlevels == 1:
+            return pandas.Series(values, index, name=self.x.name if self.x.ndim == 1 else None)
+        count = len(made.columns.unique(-1))
+        return pandas.DataFrame(values.T, index, made.columns[::count].droplevel(-1))
+
+
+def _zone(index: Any) -> Any:
+    return getattr(index, "tz", None)
+
+
+def _index(places: Any, name: str | None = None) -> Any:
+    return sys.modules["pandas"].Index(places, name=name)
+
+
+def _beneath(signals: Any, places: Any) -> Any:
+    """Columns of every signal at every place."""
+    count = len(places)
+    levels = [signals.get_level_values(i).repeat(count) for i in range(signals.nlevels)]
+    levels.append(places.take(np.tile(np.arange(count), len(signals))))
+    return sys.modules["pandas"].MultiIndex.from_arrays(levels, names=[*signals.names, places.name])
+
+
+def package_of(x: Any) -> str:
+    return type(x).__module__.partition(".")[0]
+
+
+def labels_of(x: Any, axis: int | str) -> Labels | None:
+    package = package_of(x)
+    if package not in PACKAGES:
+        return None
+    return _DataArray(x, axis) if package == "xarray" else _Frame(x)
+
+
+def values_at(of_each: Labelled, values: Array, x: Any) -> Labelled:
+    """Values of every signal's function at x, with the coordinates of a figure `of_each` signal
+    and, behind them, of x."""
+    package, places = package_of(of_each), np.asarray(x)
+    if package == "xarray":
+        if package_of(x) == "xarray":
+            dims, coords = list(x.dims), dict(x.coords)
+        else:
+            dims = ["at"] if places.ndim == 1 else [f"at_{i}" for i in range(places.ndim)]
+            coords = {"at": places} if places.ndim == 1 else {}
+        return type(of_each)(
+            values, dims=[*of_each.dims, *dims], coords={**coords, **of_each.coords}
+        )
+    if package != "pandas" or places.ndim > 1:
+        return values
+    if places.ndim == 0:
+        return type(of_each)(values, index=of_each.index)
+    return sys.modules["pandas"].DataFrame(
+        values.T, index=_index(places, "at"), columns=of_each.index
+    )
