@@ -144,8 +144,8 @@ WAVKIT_API int dspfh_zoom(const dspf *in, dspf *out, int points, double first, d
  *                      real points afterwards, the first of them N; it shares no memory with the
  *                      others
  *  @param flags        DSP_SPECTRUM_TWO_SIDED, DSP_SPECTRUM_SUM
- *  @return 0; -1 for complex or infinite frequencies, or none, a state that was begun with
- *          others or by something else (nothing is then touched), or when memory runs out */
+ *  @return 0; -1 for complex frequencies, none, or ones that `delta` makes infinite, a state of
+ *          others or of something else (nothing is then touched), or when memory runs out */
 WAVKIT_API int dsph_goertzel(const dsp *x, const dsp *frequencies, dsp *out, dsp *state, int flags);
 WAVKIT_API int dspfh_goertzel(const dspf *x, const dsp *frequencies, dspf *out, dsp *state,
                               int flags);

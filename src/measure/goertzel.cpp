@@ -189,12 +189,12 @@ int goertzel(const R* in, const dsp* at, R* out, dsp* state, int flags) {
     using T = scalar<R>;
     const R x = *in;
     const dsp frequencies = *at;
+    const double delta = double(spacing(&x));
     const auto given = values(&frequencies);
     if (frequencies.complex || given.empty() ||
-        !std::ranges::all_of(given, [](double f) { return std::isfinite(f); })) {
+        !std::ranges::all_of(given, [=](double f) { return std::isfinite(f * delta); })) {
         return -1;
     }
-    const double delta = double(spacing(&x));
     Temporary<R> result;
     result->points = frequencies.points;
     result->complex = 1;

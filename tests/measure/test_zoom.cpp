@@ -201,6 +201,7 @@ BOTH_PRECISIONS(Goertzel, RefusesWhatDoesNotFit) {
     EXPECT_EQ(call(wrong, state), -1);
     EXPECT_EQ(call(none, state), -1);
     EXPECT_EQ(call(complex<dsp>({1}), state), -1);
+    EXPECT_EQ(dsph_goertzel(real<R>({1}, INFINITY), at, out, state, 0), -1);
     EXPECT_EQ(state->points, 0);
     EXPECT_TRUE(is_real<R>(out, {7}));
     ASSERT_EQ(call(at, state), 0);
