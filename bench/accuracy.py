@@ -208,6 +208,23 @@ def orders(runs=20, rate=5000, seconds=10):
         print(f"| {pulses} | {noise:g} | {worst[0]:.1e} | {worst[1]:.1e} |")
 
 
+def integrals(edge=0.002):
+    """Tones under an offset of ten times their size; of the middle, the errors of amplitude and phase."""
+    print("| frequency | velocity | displacement | phase |\n|---|---|---|---|")
+    count, ends = round(60 / edge), round(14 / edge)
+    for f in (edge, 2 * edge, 10 * edge, 0.1, 0.3, 0.45):
+        x = [10 + v for v in tone(count, f, 0)]
+        row, turns = [], []
+        for options in ((), ("--twice",)):
+            y = written(x, ("integrate", "--highpass", repr(edge), *options, "--delta", "1"))[ends:-ends]
+            fit = measured(y, "fit", "--sine", "--at", repr(f))
+            times = 1 + len(options)
+            row.append(f"{abs(fit['amplitude'] * (2 * math.pi * f) ** times - 1):.1e}")
+            turn = math.radians(fit["phase"]) - 2 * math.pi * f * ends + times * math.pi / 2
+            turns.append(abs(math.remainder(turn, 2 * math.pi)))
+        print(f"| {f / edge:g} F | {row[0]} | {row[1]} | {max(turns):.1e} |")
+
+
 def measured_pair(x, y, *arguments):
     """The same of two signals side by side."""
     with tempfile.NamedTemporaryFile("w", suffix=".csv", delete=False) as file:
@@ -283,7 +300,7 @@ def sections(settled=60000, count=20000):
         print("| " + " | ".join(row) + " |")
 
 
-for table in (sine_fits, distortion, converters, responses, zooms, weightings, orders, local_polynomials,
+for table in (sine_fits, distortion, converters, responses, zooms, weightings, orders, integrals, local_polynomials,
               outliers, frames, sections):
     table()
     print()

@@ -79,6 +79,9 @@ TEST_F(LevelsTest, IntegralsHaveNoDrift) {
         EXPECT_NEAR(x[n], std::sin(w * n * 1e-3), 1e-4);
         EXPECT_NEAR(v[n] / w, std::cos(w * n * 1e-3), 1e-4);
     }
+    EXPECT_EQ(printed("integrate a.dsp --highpass 5 --plot x.svg"), "");
+    EXPECT_NE(contents("x.svg").find("integrated"), std::string::npos);
+    EXPECT_EQ(shell("wavkit integrate a.dsp --plot x.svg").status, 2);
     EXPECT_EQ(shell("wavkit integrate a.dsp --twice").status, 2);
     EXPECT_EQ(shell("wavkit integrate a.dsp --highpass 2 --detrend").status, 2);
     EXPECT_EQ(shell("wavkit integrate a.dsp --highpass 450 -o y.dsp").status, 1);

@@ -54,6 +54,11 @@ struct IntegrateOptions {
     PassOptions files;
     bool detrend = false, twice = false;
     std::optional<double> highpass;
+    std::string plot;
+    std::vector<double> span;
+    PictureLook look;
+
+    IntegrateOptions() { files.out.clear(); }  // nowhere, beside a picture
 };
 
 /// The filter that integrates what a stream holds above the edge.
@@ -76,7 +81,8 @@ Filtering integrator_for(const SampleStream& stream, const IntegrateOptions& opt
 
 void integrate_without_drift(const IntegrateOptions& options) {
     const auto& [in, out, reading, writing] = options.files;
-    const ComparisonFiles files{in, out, "", {}, reading, writing, {}};
+    ComparisonFiles files{in, out, options.plot, options.span, reading, writing, options.look};
+    files.check();
     with_data_of(in, [&] {
         ComparedPass pass(files, "integrating");
         pass.run([&](SampleStream& stream) {
@@ -85,7 +91,8 @@ void integrate_without_drift(const IntegrateOptions& options) {
             SignalShape shape{stream.delta, filter.complex_output(), stream.channels, stream.length,
                               stream.facts};
             for (auto& facts : shape.facts) facts.put_to_unit(" ", options.twice ? "²" : "");
-            pass.pass(stream, {shape, "integrated"}, [&](const auto& take) { filter.run(take); });
+            const auto* const name = options.twice ? "integrated twice" : "integrated";
+            pass.pass(stream, {shape, name, false}, [&](const auto& take) { filter.run(take); });
         });
     });
 }
@@ -96,6 +103,11 @@ void integrate(const IntegrateOptions& options) {
         throw UsageError("--highpass takes the mean out by itself, without --detrend");
     }
     if (options.highpass) return integrate_without_drift(options);
+    if (!options.plot.empty() || !options.span.empty()) {
+        throw UsageError("--plot and --span go with --highpass");
+    }
+    auto files = options.files;
+    if (files.out.empty()) files.out = "-";
     std::vector<std::vector<double>> means;
     const auto look = [&](SignalSource& source) {
         Progress progress("reading " + source.name());
@@ -107,7 +119,7 @@ void integrate(const IntegrateOptions& options) {
         auto offsets = options.detrend ? means.at(signal++) : std::vector<double>(stream.width());
         return std::make_unique<Integral>(stream.delta, std::move(offsets));
     };
-    pass_through(options.files, "integrating", make,
+    pass_through(files, "integrating", make,
                  options.detrend ? look : std::function<void(SignalSource&)>());
 }
 
@@ -127,7 +139,8 @@ slope in the integral: --detrend takes the mean of the whole signal out first.
 
 --highpass F integrates what lies above F, up to 0.45 of the sampling rate, to 1e-5, and stops offsets
 and what is slower than half of F: velocity from acceleration, and with --twice displacement, without
-drift. Phases stay as they are; 13.5 periods of F at either end are not to be trusted.
+drift. Phases stay as they are; 13.5 periods of F at either end are not to be trusted. --plot draws the
+first signal before and after; the output is then written only where -o says.
 
 Every signal of a file is taken, and all channels. The recording may be longer than memory.
 
@@ -159,6 +172,11 @@ void add_integrate(CLI::App& program) {
         ->check(positive_number())
         ->type_name("F");
     command->add_flag("--twice", options->twice, "integrate twice (--highpass)");
+    declare_plot(*command, options->plot, "before and after (--highpass)");
+    command->add_option("--span", options->span, "times between which --plot draws")
+        ->expected(2)
+        ->type_name("FROM TO");
+    options->look.declare(*command);
     command->footer(about_integrate);
     command->callback([options] { integrate(*options); });
 }
