@@ -1,13 +1,17 @@
 // Calls of the library's functions, one after the other on records that they share: those of a
 // family, which WAVKIT_FUZZ names, or any. Whatever they are given, nothing undefined happens,
 // records hold together, and inputs stay as they were.
+#include <sanitizer/lsan_interface.h>
+
 #include <algorithm>
+#include <array>
 #include <cstdio>
 #include <functional>
 #include <list>
 #include <map>
 #include <string>
 #include <string_view>
+#include <tuple>
 #include <utility>
 #include <vector>
 
@@ -86,6 +90,21 @@ class Records {
             FUZZ_REQUIRE(dsp_alloc(&x) == 0);
         }
         fill(values(&x), in);
+    }
+
+    /// The blocks that records own, to be told to give_up() after a call that failed.
+    std::array<const void*, count> blocks() const {
+        std::array<const void*, count> owned{};
+        for (std::size_t i = 0; i < count; ++i) {
+            if (records_[i].alloc > 0) owned[i] = records_[i].data;
+        }
+        return owned;
+    }
+    /// A block that cannot grow is given up on purpose: that of a record without one is no leak.
+    void give_up(const std::array<const void*, count>& had) const {
+        for (std::size_t i = 0; i < count; ++i) {
+            if (had[i] && !records_[i].data) __lsan_ignore_object(had[i]);
+        }
     }
 
     /// After a call: what it left must hold together where it succeeded. Where it did not, a record
@@ -223,7 +242,9 @@ void call(std::string_view name, int (*function)(P...), Records<R>& records, Byt
     Arguments<R> arguments(name, records, in);
     const std::tuple<P...> given{arguments.template next<P>()...};
     arguments.note_sharing();
+    const auto blocks = records.blocks();
     const int result = std::apply(function, given);
+    if (result < 0) records.give_up(blocks);
     FUZZ_REQUIRE(result == 0 || result == -1);
     FUZZ_REQUIRE(arguments.inputs_kept());
     records.settle(result == 0);
