@@ -27,6 +27,20 @@ _DIRECTIONS = {
 }
 
 
+def _of_analytic(x: ArrayLike | Any, detrend: bool, axis: int | str, then: str) -> Labelled:
+    """What a function makes of the analytic signal."""
+    runs = Runs(x, 1.0, axis)
+    if detrend:
+        runs.rows = [without_mean(row) for row in runs.rows]
+
+    def step(x: Record, out: Record) -> None:
+        call("dsp_copy", out, x)
+        call("dspi_analytic", out)
+        call(then, out)
+
+    return runs.same(runs.map(step))
+
+
 def analytic(x: ArrayLike | Any, detrend: bool = False, axis: int | str = -1) -> Labelled:
     """The complex signal z = x + i H(x), H being the Hilbert transform: a cos(p) becomes a e^(ip).
     Its magnitude is the envelope, the slope of its phase the frequency at every moment.
@@ -36,16 +50,7 @@ def analytic(x: ArrayLike | Any, detrend: bool = False, axis: int | str = -1) ->
     >>> wavkit.derive(phase / (2 * np.pi), rate=1000)[[1, 500]].round(6)
     array([50., 50.])
     """
-    runs = Runs(x, 1.0, axis)
-    if detrend:
-        runs.rows = [without_mean(row) for row in runs.rows]
-
-    def step(x: Record, out: Record) -> None:
-        call("dsp_copy", out, x)
-        call("dspi_rtoc", out)
-        call("dspi_analytic", out)
-
-    return runs.same(runs.map(step))
+    return _of_analytic(x, detrend, axis, "dspi_rtoc")  # complex where there are no samples, too
 
 
 def envelope(x: ArrayLike | Any, detrend: bool = False, axis: int | str = -1) -> Labelled:
@@ -56,16 +61,7 @@ def envelope(x: ArrayLike | Any, detrend: bool = False, axis: int | str = -1) ->
     >>> wavkit.envelope(tone)[[0, 125]].round(3)
     array([1.5, 0.5])
     """
-    runs = Runs(x, 1.0, axis)
-    if detrend:
-        runs.rows = [without_mean(row) for row in runs.rows]
-
-    def step(x: Record, out: Record) -> None:
-        call("dsp_copy", out, x)
-        call("dspi_analytic", out)
-        call("dspi_mag", out)
-
-    return runs.same(runs.map(step))
+    return _of_analytic(x, detrend, axis, "dspi_mag")
 
 
 def derive(x: ArrayLike | Any, rate: float | None = None, axis: int | str = -1) -> Labelled:
