@@ -34,6 +34,12 @@ kernel::SineCosine<Doubles> phasors(Doubles turns) {
                                     kernel::quadrant_sign<Doubles>(quadrant + 1))};
 }
 
+/// cos and sin of any angle.
+Bin<double> phasor(double angle) {
+    const auto [s, c] = kernel::sincos(kernel::all<Doubles>(angle));
+    return {c[0], s[0]};
+}
+
 /// How far a cosine turns from sample to sample. The rounding error of the product is kept: left
 /// out, it would add up over the samples.
 class TurnRate {
@@ -64,7 +70,7 @@ class Oscillator {
 
   public:
     Oscillator(double freq, double delta, double phase, std::size_t points)
-        : rate_(freq, delta), start_{std::cos(phase), std::sin(phase)}, points_(points) {
+        : rate_(freq, delta), start_(phasor(phase)), points_(points) {
         for (std::size_t j = 0; j < block; j += vector) {
             const auto [s, c] = rate_.phasors_at(double(j), 1);
             for (std::size_t i = 0; i < vector; ++i) {

@@ -42,6 +42,15 @@ BOTH_PRECISIONS(Waveform, OscillatorsStayInPhase) {
     }
 }
 
+BOTH_PRECISIONS(Waveform, PhasesAreOfAnySize) {
+    auto x = blank<R>(1, false, 1), z = blank<R>(1, true, 1);
+    ASSERT_EQ(dspc_cos(x, 0, T(1e10)) || dspc_cexp(z, 0, T(-1e10)), 0);
+    const double c = 0.873119622676856, s = 0.4875060250875107;  // of 10^10
+    EXPECT_NEAR(x[0], c, 4 * epsilon<R>);
+    EXPECT_NEAR(z[0], c, 4 * epsilon<R>);
+    EXPECT_NEAR(z[1], s, 4 * epsilon<R>);
+}
+
 BOTH_PRECISIONS(Waveform, QuartersOfATurnAreExact) {
     auto x = blank<R>(1000, false, 0.5), z = blank<R>(1000, true, 0.5);
     ASSERT_EQ(dspc_cos(x, 1, 0) || dspc_cexp(z, T(-0.5), 0), 0);
