@@ -248,7 +248,7 @@ WAVKIT_LANES V bessel_i0(V signed_x) {
     const V square_low = product_minus(near, near, square) * T(0.25);
     const V inner = mul_add(rounded * square_low, slope * (T(2) - slope), rounded);
     // e^x / sqrt(2 pi x) (1 + Q(1 / x) / x); what rounding took from 2 pi x and from the root.
-    constexpr T two_pi = T(6.283185307179586476925L);
+    constexpr T two_pi = T(6.283185307179586476925);
     const V inverse = T(1) / far, scaled = far * two_pi, root = sqrt(scaled);
     const V rest = product_minus(root, root, scaled) - product_minus(far, all<V>(two_pi), scaled);
     const V tail = polynomial(mul_add(inverse, T(16), T(-1)), Table::far) * inverse;

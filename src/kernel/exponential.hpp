@@ -11,20 +11,23 @@
 namespace wavkit::kernel {
 namespace {
 
-/// ln 2, and log10 2, in two parts.
+/// ln 2, log10 2 and ln 10 in two parts each: written out, since long double is no wider than
+/// double everywhere.
 template <class V>
 inline constexpr Lane<V> ln2_high = is_double<V> ? 0x1.62e42fefap-1 : Lane<V>(0.693145751953125);
 template <class V>
-inline constexpr Lane<V> ln2_low = is_double<V>
-                                       ? Lane<V>(0.693147180559945309417232L - 0x1.62e42fefap-1L)
-                                       : Lane<V>(0.693147180559945309417232L - 0.693145751953125L);
+inline constexpr Lane<V> ln2_low = Lane<V>(is_double<V> ? 1.6465949582897082e-12
+                                                        : 1.428606765330187e-06);
 template <class V>
 inline constexpr Lane<V> log10_2_high = is_double<V> ? 0x1.34413509f8p-2 : Lane<V>(0.301025390625);
 template <class V>
-inline constexpr Lane<V> log10_2_low = is_double<V>
-                                           ? Lane<V>(0.301029995663981195213739L -
-                                                     0x1.34413509f8p-2L)
-                                           : Lane<V>(0.301029995663981195213739L - 0.301025390625L);
+inline constexpr Lane<V> log10_2_low = Lane<V>(is_double<V> ? -8.532344317057107e-14
+                                                            : 4.605039066518657e-06);
+template <class V>
+inline constexpr Lane<V> ln_10 = Lane<V>(2.302585092994045684018);
+template <class V>
+inline constexpr Lane<V> ln_10_low = Lane<V>(is_double<V> ? -2.1707562233822494e-16
+                                                          : -3.1975435632602967e-08);
 
 /// (e^r - 1 - r) / r^2
 template <class V>
@@ -46,7 +49,7 @@ WAVKIT_LANES V exp(V x) {
     // Beyond these the result is 0 or infinite, and the multiple of ln 2 still small.
     const V near = at_most(at_least(x, all<V>(is_double<V> ? T(-746) : T(-104))),
                            all<V>(is_double<V> ? T(710) : T(89)));
-    const V k = round_product(near, T(1.44269504088896340736L)).number;
+    const V k = round_product(near, T(1.44269504088896340736)).number;
     const V r = mul_add(k, -ln2_low<V>, mul_add(k, -ln2_high<V>, near));
     // 1 + r rounds; what it loses goes to the tail.
     const V sum = T(1) + r, lost = (T(1) - sum) + r;
@@ -71,14 +74,12 @@ WAVKIT_LANES V exp10_tail(V r) {
 template <class V>
 WAVKIT_LANES V exp10(V x) {
     using T = Lane<V>;
-    constexpr T ln_10 = T(2.302585092994045684018L);
-    constexpr T ln_10_low = T(2.302585092994045684018L - (long double)ln_10);
     const V near = at_most(at_least(x, all<V>(is_double<V> ? T(-324) : T(-46))),
                            all<V>(is_double<V> ? T(309) : T(39)));
-    const V k = round_product(near, T(3.321928094887362347870L)).number;
+    const V k = round_product(near, T(3.321928094887362347870)).number;
     const V r = mul_add(k, -log10_2_low<V>, mul_add(k, -log10_2_high<V>, near));
-    const auto [sum, lost] = product_sum(r, all<V>(ln_10), all<V>(T(1)));
-    return scale(sum + mul_add(r * r, exp10_tail(r), mul_add(r, ln_10_low, lost)), k);
+    const auto [sum, lost] = product_sum(r, all<V>(ln_10<V>), all<V>(T(1)));
+    return scale(sum + mul_add(r * r, exp10_tail(r), mul_add(r, ln_10_low<V>, lost)), k);
 }
 
 /// The hyperbolic functions of x = k ln 2 + r >= 0 are those of r mixed: with w = 4^-k,
@@ -111,7 +112,7 @@ struct Hyperbolic {
 template <class V>
 WAVKIT_LANES Hyperbolic<V> hyperbolic(V x) {
     using T = Lane<V>;
-    const V k = round_product(x, T(1.44269504088896340736L)).number;
+    const V k = round_product(x, T(1.44269504088896340736)).number;
     const V high = mul_add(k, -ln2_high<V>, x), low = k * ln2_low<V>;
     const V r = high - low, r_lost = (high - r) - low, square = r * r;
     V s, c;
@@ -182,7 +183,7 @@ WAVKIT_LANES V tanh(V x) {
         const V p = polynomial(square, {-0.333333313f, 0.133332565f, -0.0539574735f, 0.0217944086f,
                                         -0.00857224409f, 0.00293970713f, -0.000618205115f});
         const V small = mul_add(a * square, p, a);
-        const V k = round_product(a, T(2.88539008177792681472L)).number;
+        const V k = round_product(a, T(2.88539008177792681472)).number;
         const V r = mul_add(k, -ln2_low<V>, mul_add(k, -ln2_high<V>, a + a));
         const V power = power_of_two(k);
         const V rest = mul_add(r * r, exp_tail(r), r) * power, whole = power + T(1);

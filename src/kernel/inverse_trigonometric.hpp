@@ -13,11 +13,9 @@ namespace {
 
 /// pi in two parts.
 template <class T>
-inline constexpr T pi_high = T(3.141592653589793238462643L);
+inline constexpr T pi_high = T(3.141592653589793238462643);
 template <class T>
-inline constexpr T pi_low = T(3.141592653589793238462643L - (long double)pi_high<T>);
-template <>
-inline constexpr double pi_low<double> = 1.2246467991473532e-16;
+inline constexpr T pi_low = T(sizeof(T) == 8 ? 1.2246467991473532e-16 : -8.742277657347586e-08);
 
 /// atan(t) - t for |t| <= 1/2
 template <class V>

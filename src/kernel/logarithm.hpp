@@ -65,8 +65,8 @@ WAVKIT_LANES V natural_logarithm(V k, V f) {
 template <class V>
 WAVKIT_LANES V decimal_logarithm(V k, V f) {
     using T = Lane<V>;
-    constexpr T log10_e = T(0.4342944819032518276511L);
-    constexpr T log10_e_low = T(0.4342944819032518276511L - (long double)log10_e);
+    constexpr T log10_e = T(0.4342944819032518276511);
+    constexpr T log10_e_low = T(is_double<V> ? 1.098319650216765e-17 : -1.0103049952192578e-08);
     const V part = f * log10_e;
     const V part_lost = mul_add(f, log10_e_low, product_minus(f, all<V>(log10_e), part));
     const V whole = k * log10_2_high<V>;  // exact

@@ -43,7 +43,7 @@ template <class V>
 WAVKIT_LANES Remainder<V> reduce(V x) {
     using T = Lane<V>;
     using Part = HalfPi<T>;
-    const auto [k, quadrant] = round_product(x, T(0.636619772367581343075535L));
+    const auto [k, quadrant] = round_product(x, T(0.636619772367581343075535));
     V first;
     if constexpr (fused) {
         first = mul_add(k, -Part::high, x);  // exact: both are multiples of the same small number
