@@ -132,14 +132,16 @@ BOTH_PRECISIONS(File, ReadsNumbersAsScanfDoes) {
 }
 
 BOTH_PRECISIONS(File, RoundsNumbersOfAnyLengthCorrectly) {
+    constexpr T step = std::numeric_limits<T>::epsilon();
     char middle[100];  // exactly half way from 1 to its neighbour
-    std::snprintf(middle, sizeof middle, "%.60Lf", 1 + (long double)epsilon<R> / 2);
+    std::snprintf(middle, sizeof middle, "%.60f", double(step / 2));
+    middle[0] = '1';
     const std::string zeros(5000, '0');
     File file(middle + (" " + zeros) + middle + zeros + "\n" + middle + zeros + "1 " + "1" + zeros +
               "e-5000 0." + zeros + "25e5001 1" + zeros);
     Signal<R> x;
     ASSERT_EQ(dspf_fread(x, file), 1);
-    EXPECT_TRUE(is_real<R>(x, {1, 1, 1 + (long double)epsilon<R>, 1, 2.5L, INFINITY}));
+    EXPECT_TRUE(is_real<R>(x, {1, 1, 1 + step, 1, 2.5L, INFINITY}));
 }
 
 BOTH_PRECISIONS(File, FollowsTheHeaderLines) {

@@ -29,8 +29,17 @@ long double cosine(long double v) { return std::cos(v); }
 long double tangent(long double v) { return std::tan(v); }
 #endif
 
-/// long double has 11 bits more than a double: what it adds to the error is below 1/1000.
+/// Where long double is wider, what it adds to the error is below 1/1000.
 using Exact = long double (*)(long double, long double);
+template <class T>
+constexpr bool wider = std::numeric_limits<long double>::digits > std::numeric_limits<T>::digits;
+
+/// The modified Bessel function of order 0, whose terms are all positive.
+long double bessel_series(long double v) {
+    long double term = 1, sum = 1;
+    for (int k = 1; term > sum * 1e-22L; ++k) sum += term *= v * v / (4.0L * k * k);
+    return sum;
+}
 
 /// |value - exact| in units of the last place of the exact value.
 template <class T>
@@ -106,8 +115,8 @@ TYPED_TEST(ElementaryTest, AreWithinUnitsOfTheLastPlace) {
         {"cosh", WAVKIT_ONE(cosh), WAVKIT_EXACT(std::cosh(v))},
         {"tanh", WAVKIT_ONE(tanh), WAVKIT_EXACT(std::tanh(v))},
         {"sqrt", WAVKIT_ONE(sqrt), WAVKIT_EXACT(std::sqrt(v)), -inf, inf, 0.5L},
-        {"I0", WAVKIT_ONE(bessel_i0), WAVKIT_EXACT(std::cyl_bessel_i(0.0L, std::fabs(v))), -30, 30,
-         3.5L},
+        {"I0", WAVKIT_ONE(bessel_i0), WAVKIT_EXACT(bessel_series(v)), -30, 30,
+         wider<T> ? 3.5L : 16},
         {"atan2", WAVKIT_TWO(atan2), [](long double v, long double w) { return std::atan2(v, w); }},
         {"magnitude", WAVKIT_TWO(magnitude),
          [](long double v, long double w) { return std::hypot(v, w); }, -inf, inf, 1.2L},
@@ -121,7 +130,7 @@ TYPED_TEST(ElementaryTest, AreWithinUnitsOfTheLastPlace) {
         c.run(x.data(), other.data(), y.data(), x.size());
         for (std::size_t i = 0; i < x.size(); ++i) {
             const long double exact = c.exact(x[i], other[i]);
-            EXPECT_LE(units(y[i], exact), c.allowed)
+            EXPECT_LE(units(y[i], exact), wider<T> ? c.allowed : c.allowed + 1)
                 << c.name << " of " << x[i] << ", " << other[i] << ": " << y[i];
         }
     }

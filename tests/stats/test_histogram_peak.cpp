@@ -12,7 +12,7 @@ constexpr long double decay = 0.315563649157834L;
 
 BOTH_PRECISIONS(Histogram, CountsWhereTheEdgesSay) {
     const auto r = [](const std::vector<long double>& x) { return real<R>(x); };
-    const long double eps = epsilon<R>, B = limits<R>::big;
+    const long double eps = std::numeric_limits<T>::epsilon(), B = limits<R>::big;
     const auto pairs = complex<R>({{3, 4}, {-4, 3}, {0, -inf}, {nan, 0}, {0, 1}});
     const struct {
         Signal<R> in;

@@ -77,7 +77,7 @@ bool makes(int n, int window, int scale_type, double win_length) {
 
 BOTH_PRECISIONS(Windowing, KeepsSixteenByLengthIdentifierFlagsAndWidth) {
     free_internal<R>();
-    const double eps = epsilon<R>;
+    const double eps = std::numeric_limits<T>::epsilon();
     EXPECT_TRUE(makes<R>(8, 2, wide, 5));
     EXPECT_FALSE(makes<R>(8, 2, wide | 16 | 32 | 64, 5 * (1 + 8 * eps)));
     EXPECT_TRUE(makes<R>(8, 2, wide, 5 * (1 + 64 * eps)));

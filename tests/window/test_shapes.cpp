@@ -106,7 +106,8 @@ BOTH_PRECISIONS(WindowShapes, FormulaMeanMeanSquareAndBandwidth) {
 }
 
 BOTH_PRECISIONS(WindowShapes, WidthsInsideTheSignal) {
-    const long double eps = epsilon<R>, inf = std::numeric_limits<T>::infinity();
+    const long double eps = std::numeric_limits<T>::epsilon(),
+                      inf = std::numeric_limits<T>::infinity();
     for (int n : {1, 2, 9, 16}) {
         // Widths asked for, and those that result; at last a width just beyond the tolerance.
         const Values asked = {0,
