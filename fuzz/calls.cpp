@@ -16,6 +16,7 @@
 #include <vector>
 
 #include "bytes.hpp"
+#include "memory.hpp"
 #include "support/one_name.hpp"
 
 namespace wavkit::fuzz {
@@ -92,19 +93,23 @@ class Records {
         fill(values(&x), in);
     }
 
-    /// The blocks that records own, to be told to give_up() after a call that failed.
+    /// After a call that failed: a block that cannot grow is given up on purpose, be it one that a
+    /// record came with or had of the call. Of a record that has none any more it is no leak.
+    void give_up(const std::array<const void*, count>& had) const {
+        bool lost = false;
+        for (std::size_t i = 0; i < count; ++i) {
+            if (records_[i].data) continue;
+            lost = true;
+            if (had[i]) __lsan_ignore_object(had[i]);
+        }
+        if (lost) std::ranges::for_each(latest_blocks, __lsan_ignore_object);
+    }
     std::array<const void*, count> blocks() const {
         std::array<const void*, count> owned{};
         for (std::size_t i = 0; i < count; ++i) {
             if (records_[i].alloc > 0) owned[i] = records_[i].data;
         }
         return owned;
-    }
-    /// A block that cannot grow is given up on purpose: that of a record without one is no leak.
-    void give_up(const std::array<const void*, count>& had) const {
-        for (std::size_t i = 0; i < count; ++i) {
-            if (had[i] && !records_[i].data) __lsan_ignore_object(had[i]);
-        }
     }
 
     /// After a call: what it left must hold together where it succeeded. Where it did not, a record

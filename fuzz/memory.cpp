@@ -5,7 +5,13 @@
 #include <cstdlib>
 #include <new>
 
+#include "memory.hpp"
+
 constexpr std::size_t most_bytes = 1 << 20;
+
+namespace wavkit::fuzz {
+std::array<void*, 64> latest_blocks;
+}
 
 extern "C" {
 void* __real_malloc(std::size_t);
@@ -23,7 +29,11 @@ void* __wrap_realloc(void* block, std::size_t bytes) {
     return nullptr;
 }
 int __wrap_posix_memalign(void** block, std::size_t alignment, std::size_t bytes) {
-    return bytes > most_bytes ? ENOMEM : __real_posix_memalign(block, alignment, bytes);
+    static std::size_t count = 0;
+    if (bytes > most_bytes) return ENOMEM;
+    const int failed = __real_posix_memalign(block, alignment, bytes);
+    if (!failed) wavkit::fuzz::latest_blocks[count++ % wavkit::fuzz::latest_blocks.size()] = *block;
+    return failed;
 }
 void* __wrap__ZnwmSt11align_val_tRKSt9nothrow_t(std::size_t bytes, std::align_val_t alignment,
                                                 const std::nothrow_t& tag) {
