@@ -29,14 +29,14 @@ struct RateChange {
 template <Record R>
 RateChange<R> decimation(const Signal<R>& h, int factor) {
     const auto call = [=](const R* x, R* y, R* s) { return dspd_deci(x, y, h, factor, s); };
-    const auto taps = h->points ? samples_of<R>(h) : Samples{1};
+    const auto taps = h->points ? samples_of<R>(h) : Samples{Sample(1)};
     return {"deci " + std::to_string(factor), call, taps, 1, factor, taps.size() - 1, true};
 }
 
 template <Record R>
 RateChange<R> resampling(const Signal<R>& h, int up, int down) {
     const auto call = [=](const R* x, R* y, R* s) { return dspd_rsmp(x, y, h, up, down, s); };
-    const auto taps = h->points ? samples_of<R>(h) : Samples{1};
+    const auto taps = h->points ? samples_of<R>(h) : Samples{Sample(1)};
     return {"rsmp " + std::to_string(up) + ' ' + std::to_string(down),
             call,
             taps,
