@@ -1,6 +1,7 @@
 // Formats of other programs: files that NumPy and SciPy wrote (data/make_files.py) and others put
 // together by hand from the descriptions of their formats, as they are and damaged.
 #include <cctype>
+#include <regex>
 
 #include "tools/program.hpp"
 
@@ -99,6 +100,23 @@ TEST_F(FormatsTest, ArraysAreWrittenAsTheyAreRead) {
 }
 
 // A start is on the axis of whatever comes of a signal, or it is told that it is not.
+/// Side by side as they come, and from file to file.
+TEST_F(FormatsTest, ComplexChannelsStayComplex) {
+    write("a.txt", Signals{complex<dsp>({{1, 2}, {3, 4}, {5, 6}})});
+    write("b.txt", Signals{complex<dsp>({{7, 8}, {9, 0}, {-1, -2}})});
+    const std::string want = "re,im\n1,2\n3,4\n5,6\n\nre,im\n7,8\n9,0\n-1,-2\n";
+    for (const std::string format : {"dsp", "csv", "npy", "mat", "txt"}) {
+        printed("join a.txt b.txt --channels -o c." + format);
+        const auto told = [&](const std::string& from) {
+            const auto text = printed("convert " + from + "." + format + " - --to csv");
+            return std::regex_replace(text, std::regex("#.*\n"), "");
+        };
+        EXPECT_EQ(told("c"), want) << format;
+        printed("convert c.dsp d." + format);
+        EXPECT_EQ(told("d"), want) << format;
+    }
+}
+
 TEST_F(FormatsTest, TheStartTravels) {
     write("x.csv", "Time (s),u\n10,1\n10.5,4\n11,1\n11.5,1\n12,1\n");
     write("one.txt", "1");

@@ -10,6 +10,7 @@
 #include "base/number.hpp"
 #include "base/scratch.hpp"
 #include "files/facts_text.hpp"
+#include "files/in_turn.hpp"
 #include "files/mat.hpp"
 #include "files/npy.hpp"
 #include "files/sound.hpp"
@@ -164,7 +165,9 @@ class CsvWriter : public BlockWriter {
 std::unique_ptr<BlockWriter> block_writer(std::FILE* to, Format format,
                                           const WriteOptions& options) {
     if (is_sound(format)) return sound_writer(to, format, options.samples);
-    if (format == Format::csv) return std::make_unique<CsvWriter>(to, options.time);
+    if (format == Format::csv) {  // where one complex signal has two columns
+        return in_turn(std::make_unique<CsvWriter>(to, options.time), Apart::complex);
+    }
     if (format == Format::npy) return npy_writer(to, options.single.value_or(false));
     if (format == Format::mat) {
         return mat_writer(to, options.single.value_or(false), options.compressed);

@@ -42,6 +42,10 @@ class BlockWriter {
     virtual void end() = 0;
 };
 
+/// What to say where a format wants all signals of a kind.
+inline constexpr const char* real_beside_complex =
+    "real and complex signals do not fit one such file; choose one with --signal";
+
 /// A writer into a file that can go back. Sound takes one signal; more than one channel is for
 /// the formats of takes_channels().
 std::unique_ptr<BlockWriter> block_writer(std::FILE* to, Format format,

@@ -14,12 +14,14 @@ constexpr std::size_t buffered_scalars = 1 << 20;
 /// Blocks are turned around before they wait, so that each channel is read back in runs.
 class InTurnWriter : public BlockWriter {
   public:
-    explicit InTurnWriter(std::unique_ptr<BlockWriter> writer) : writer_(std::move(writer)) {}
+    InTurnWriter(std::unique_ptr<BlockWriter> writer, Apart apart)
+        : writer_(std::move(writer)), apart_(apart) {}
 
     void begin(const SignalShape& shape) override {
         shape_ = shape;
         waiting_.reset();
-        if (shape.channels == 1) return writer_->begin(shape);
+        const bool fits = apart_ == Apart::complex && !shape.complex;
+        if (shape.channels == 1 || fits) return writer_->begin(shape);
         waiting_ = scratch();
         buffer_.clear();
         runs_.clear();
@@ -83,6 +85,7 @@ class InTurnWriter : public BlockWriter {
     }
 
     std::unique_ptr<BlockWriter> writer_;
+    Apart apart_;
     SignalShape shape_;
     Stream waiting_{nullptr, std::fclose};
     std::vector<double> buffer_, run_;
@@ -91,8 +94,8 @@ class InTurnWriter : public BlockWriter {
 
 }  // namespace
 
-std::unique_ptr<BlockWriter> in_turn(std::unique_ptr<BlockWriter> writer) {
-    return std::make_unique<InTurnWriter>(std::move(writer));
+std::unique_ptr<BlockWriter> in_turn(std::unique_ptr<BlockWriter> writer, Apart apart) {
+    return std::make_unique<InTurnWriter>(std::move(writer), apart);
 }
 
 }  // namespace wavkit::tool

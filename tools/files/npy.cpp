@@ -193,7 +193,7 @@ class NpyWriter : public BlockWriter {
     void put_header() {
         const char* const type =
             shape_.complex ? (single_ ? "<c8" : "<c16") : (single_ ? "<f4" : "<f8");
-        const auto points = scalars_ / (shape_.complex ? 2 : shape_.channels);
+        const auto points = scalars_ / shape_.width();
         std::string text = "{'descr': '" + std::string(type) +
                            "', 'fortran_order': False, 'shape': (" + std::to_string(points) + ",";
         if (shape_.channels > 1) text += " " + std::to_string(shape_.channels);

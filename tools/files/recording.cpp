@@ -37,8 +37,9 @@ SignalShape shape_of(const Signal& x) {
     return {x->delta, bool(x->complex), 1, std::size_t(x->points), {x.facts}};
 }
 
-/// Signals of one length and spacing side by side, the parts of a complex one too.
-void write_as_channels(BlockWriter& writer, std::span<const Signal> signals) {
+/// Signals of one length and spacing side by side; the parts of complex ones, too, where a format
+/// has none of these.
+void write_as_channels(BlockWriter& writer, std::span<const Signal> signals, bool parts_apart) {
     struct Channel {
         const double* first;
         std::size_t step;
@@ -52,16 +53,16 @@ void write_as_channels(BlockWriter& writer, std::span<const Signal> signals) {
                 "signals of different lengths or spacings do not fit one such file; choose "
                 "one with --signal");
         }
+        if (!parts_apart && x->complex != signals[0]->complex) throw Error(real_beside_complex);
         const std::size_t width = x->complex ? 2 : 1;
-        for (std::size_t i = 0; i < width; ++i) {
-            channels.push_back({x->data + i, width});
-            facts.push_back(x.facts);
-        }
+        for (std::size_t i = 0; i < width; ++i) channels.push_back({x->data + i, width});
+        facts.insert(facts.end(), parts_apart ? width : 1, x.facts);
     }
 
     Progress progress("writing");
     const auto points = std::size_t(signals[0]->points);
-    writer.begin({signals[0]->delta, false, channels.size(), points, facts});
+    const bool complex = !parts_apart && signals[0]->complex;
+    writer.begin({signals[0]->delta, complex, facts.size(), points, facts});
     std::vector<double> frames;
     for (std::size_t start = 0; start < points; start += block_points) {
         frames.clear();
@@ -88,7 +89,7 @@ void write_in_turn(BlockWriter& writer, std::span<const Signal> signals, bool be
         count = 1;
         while (beside && count < rest.size() && side_by_side(rest[0], rest[count])) ++count;
         if (count > 1) {
-            write_as_channels(writer, rest.first(count));
+            write_as_channels(writer, rest.first(count), false);
             continue;
         }
         const auto& x = signals[first];
@@ -136,7 +137,7 @@ void write_recording(const std::string& path, std::span<const Signal> signals,
     const bool only_side_by_side =
         is_sound(format) || (format == Format::npy && signals.size() > 1);
     if (only_side_by_side) {
-        write_as_channels(*writer, signals);
+        write_as_channels(*writer, signals, is_sound(format));
     } else {
         write_in_turn(*writer, signals, takes_channels(format));
     }

@@ -64,14 +64,15 @@ class Waiting {
         }
     }
 
-    /// Writes what belongs together side by side, or everything.
-    void write(BlockWriter& writer, bool everything, Progress& progress) {
+    /// Writes what belongs together side by side, or everything; the parts of complex signals, too,
+    /// where a format has none of these.
+    void write(BlockWriter& writer, bool everything, bool parts_apart, Progress& progress) {
         if (signals_.empty()) throw Error("there is no signal to write");
         for (std::size_t first = 0, count = 1; first < signals_.size(); first += count) {
             const auto rest = std::span(signals_).subspan(first);
             count = everything ? rest.size() : 1;
             while (count < rest.size() && side_by_side(rest[0], rest[count])) ++count;
-            write_together(writer, rest.first(count), everything || count > 1, progress);
+            write_together(writer, rest.first(count), parts_apart, progress);
         }
     }
 
@@ -94,7 +95,7 @@ class Waiting {
                a.delta == b.delta && a.facts.start == b.facts.start;
     }
 
-    void write_together(BlockWriter& writer, std::span<const Held> held, bool as_channels,
+    void write_together(BlockWriter& writer, std::span<const Held> held, bool parts_apart,
                         Progress& progress) {
         const auto points = held[0].points();
         std::vector<Run> runs;
@@ -105,13 +106,12 @@ class Waiting {
                     "signals of different lengths or spacings do not fit one such file; choose "
                     "one with --signal");
             }
-            for (const auto& run : signal.runs) {
-                runs.push_back(run);
-                facts.push_back(signal.facts);
-            }
+            if (!parts_apart && signal.complex != held[0].complex) throw Error(real_beside_complex);
+            runs.insert(runs.end(), signal.runs.begin(), signal.runs.end());
+            facts.insert(facts.end(), parts_apart ? signal.runs.size() : 1, signal.facts);
         }
-        const bool complex = !as_channels && held[0].complex;
-        writer.begin({held[0].delta, complex, as_channels ? runs.size() : 1, points, facts});
+        const bool complex = !parts_apart && held[0].complex;
+        writer.begin({held[0].delta, complex, facts.size(), points, facts});
         const auto most = frames_at_once(runs.size());
         std::vector<double> values, frames;
         for (std::size_t start = 0; start < points; start += most) {
@@ -169,7 +169,7 @@ void transfer(const std::string& in, const ReadOptions& reading, const std::stri
             Waiting signals;
             while (auto* const stream = source->next()) signals.add(*stream, progress);
             const bool one_table = format == Format::npy && signals.size() > 1;
-            signals.write(*writer, is_sound(format) || one_table, progress);
+            signals.write(*writer, is_sound(format) || one_table, is_sound(format), progress);
         }
     }
     output.commit();
