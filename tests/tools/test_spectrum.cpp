@@ -151,8 +151,14 @@ TEST_F(SpectrumTest, ZoomsBetweenTwoFrequencies) {
     EXPECT_NEAR(table[0][0], 49, 1e-9);
     EXPECT_NEAR(table[1013][0], 50.013, 1e-9);
     EXPECT_NEAR(table[1013][1], 3, 1e-3);
-    printed(zoom + "-o z.txt");
-    EXPECT_NE(contents("z.txt").find("# start = 49\n"), std::string::npos);
+    for (const std::string options : {"", "--average 2000 "}) {
+        printed(zoom + options + "-o z.txt");
+        EXPECT_NE(contents("z.txt").find("# start = 49\n"), std::string::npos) << options;
+    }
+    // Side lobes of what lies beyond are no components; a step over a lobe is told.
+    EXPECT_TRUE(rows(printed("spectrum x.dsp --zoom 20 40 --peaks 5")).empty());
+    const auto coarse = shell("wavkit spectrum x.dsp --zoom 0 500 --zoom-points 10");
+    EXPECT_NE(coarse.err.find("--zoom-points 2001 shows all"), std::string::npos) << coarse.err;
     EXPECT_NE(printed(zoom + "--density").find("zoom of 2001 points"), std::string::npos);
     // The density of noise is the same through a zoom.
     write("n.dsp", Signals{Noise(1).real<dsp>(1 << 14)});

@@ -147,6 +147,16 @@ void suggest_average(const Signal& x, const SpectrumOptions& options) {
                  x->points, bytes_a_sample * x->points / 1e9, suggested_segment);
 }
 
+/// Tells of a zoom that leaves out what lies between its frequencies.
+void tell_of_gaps(const Spectrum& spectrum) {
+    if (!spectrum.zoomed || spectrum.padding() >= 1) return;
+    const double needed = std::ceil((spectrum.bins->points - 1) / spectrum.padding() - 1e-6) + 1;
+    std::fprintf(stderr,
+                 "wavkit: components between the frequencies of the zoom, %s apart, do not show; "
+                 "--zoom-points %.0f shows all\n",
+                 rounded(spectrum.bins->delta).c_str(), needed);
+}
+
 SpectrumReport measured_whole(const SpectrumOptions& options) {
     InputFile input(options.report.in);
     const auto source = open_signals(input, options.reading);
@@ -159,6 +169,7 @@ SpectrumReport measured_whole(const SpectrumOptions& options) {
     auto report = report_of(options, measure(x, options.settings), x.facts, source->sound,
                             x->complex, x->delta);
     report.caption = caption_of(options, report.spectrum, source->sound);
+    tell_of_gaps(report.spectrum);
     check_band(report);
     return report;
 }
@@ -186,6 +197,7 @@ SpectrumReport measured_in_segments(const SpectrumOptions& options) {
     tell_of_others(*source);
     report.spectrum = average.result();
     report.caption = caption_of(options, report.spectrum, source->sound);
+    tell_of_gaps(report.spectrum);
     check_band(report);
     if (waterfall) {
         waterfall->draw(

@@ -24,6 +24,9 @@ class Leakage {
     /// How many there are: the strongest ones suffice.
     std::size_t components() const { return components_.size(); }
 
+    /// The window's response so many of its bins aside, 1 on the bin itself.
+    double response(double bins) const;
+
   private:
     struct Component {
         double place;   // in bins of the spectrum, from that of frequency 0 on
@@ -32,8 +35,6 @@ class Leakage {
         bool mirrored;
     };
 
-    /// The window's response so many of its bins aside, 1 on the bin itself.
-    double response(double bins) const;
     /// The greatest response within `blur` of a place.
     double response_near(double bins, double blur) const;
     double from(const Component& component, double place, int bin) const;

@@ -124,6 +124,19 @@ Refined refine(const Spectrum& spectrum, const Signal& magnitudes, int index) {
     return std::isfinite(peak.height) && std::isfinite(peak.bin) ? peak : plain;
 }
 
+/// Whether about a maximum of a zoom there is a main lobe. A component beyond the zoom shows side
+/// lobes in it, which half a bin of the window aside have fallen to nothing.
+bool has_main_lobe(const Spectrum& spectrum, const Leakage& leakage, std::span<const double> m,
+                   int i) {
+    const int half = int(std::lround(spectrum.padding() / 2));
+    if (spectrum.padding() < 1.5) return true;  // of which this shows nothing
+    const double least = 0.4 * leakage.response(half / spectrum.padding()) * m[std::size_t(i)];
+    const auto holds = [&](int k) {
+        return k < 0 || k >= int(m.size()) || m[std::size_t(k)] >= least;
+    };
+    return holds(i - half) && holds(i + half);
+}
+
 /// Of all maxima the strongest in the band that are components: neither within the main lobe of a
 /// stronger one nor what stronger ones leak, wherever these are.
 std::vector<int> without_leakage(const Spectrum& spectrum, std::span<const double> m,
@@ -141,6 +154,7 @@ std::vector<int> without_leakage(const Spectrum& spectrum, std::span<const doubl
     for (const int i : maxima) {
         if (kept.size() == count || height(i) < noise_floor * height(maxima.front())) break;
         if (in_lobe[std::size_t(i)]) continue;
+        if (spectrum.zoomed && !has_main_lobe(spectrum, leakage, m, i)) continue;
         const bool wanted = band.contains(spectrum.frequency(i));
         const bool leaks = leakage.components() < most_leaking;
         if ((wanted || leaks) && height(i) <= leakage_margin * leakage.at(i)) continue;

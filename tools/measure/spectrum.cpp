@@ -94,12 +94,14 @@ Spectrum measure(const Signal& x, const SpectrumSettings& settings) {
 
     Spectrum spectrum{{}, samples, length, width, settings.window, used.two_sided};
     check(transform(x, spectrum.bins, used, length, samples), "computing the spectrum");
+    spectrum.bins.facts.start = spectrum.frequency(0);
     return spectrum;
 }
 
 Signal magnitudes(const Spectrum& spectrum) {
     Signal result;
     check(dspu_mag(spectrum.bins, result), "computing amplitudes");
+    result.facts.start = spectrum.frequency(0);
     return result;
 }
 
