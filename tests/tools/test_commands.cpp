@@ -54,6 +54,24 @@ TEST_F(CommandsTest, CorrelateFindsOneInTheOther) {
     EXPECT_EQ(figures(printed("correlate b.txt a.txt --delta 1")).at("samples"), -3);
 }
 
+TEST_F(CommandsTest, OptionsOfSeveralValuesStandBeforeTheFileToo) {
+    write("x.dsp", Signals{Noise(3).real<dsp>(2000)});
+    const std::string_view cases[][3] = {{"filter", "--lowpass 0.1", "--to csv -o -"},
+                                         {"filter", "--bandpass 0.1 0.2", "--to csv -o -"},
+                                         {"spectrum", "--band 0.1 0.2", "--peaks 3"},
+                                         {"spectrum", "--zoom 0.1 0.2", "--peaks 3"},
+                                         {"hist", "--range 0 1", "--bins 4"},
+                                         {"correlate", "--lags 0 5", "x.dsp --json"},
+                                         {"scale", "--calibrate 0=1 1=3", "-o - --to csv"}};
+    for (const auto& [command, option, rest] : cases) {
+        const auto line = [&](auto first, auto second) {
+            return std::string(command) + " " + std::string(first) + " " + std::string(second) +
+                   " " + std::string(rest);
+        };
+        EXPECT_EQ(printed(line(option, "x.dsp")), printed(line("x.dsp", option))) << option;
+    }
+}
+
 TEST_F(CommandsTest, TheEnvelopeOfAModulatedToneIsItsModulation) {
     // Whole numbers of cycles in a length with a large prime factor, and a constant that must go.
     const int n = 3 * 337;

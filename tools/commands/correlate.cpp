@@ -203,6 +203,7 @@ void add_correlate(CLI::App& program) {
     options->writing.declare_without_sound(*command);
     command->add_option("--lags", options->lags, "lags to look at")
         ->expected(2)
+        ->allow_extra_args(false)
         ->type_name("LOW HIGH");
     command->add_flag("--json", options->json, "print JSON");
     command->add_flag("--detrend", options->detrend, "remove the means first");

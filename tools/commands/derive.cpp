@@ -175,6 +175,7 @@ void add_integrate(CLI::App& program) {
     declare_plot(*command, options->plot, "before and after (--highpass)");
     command->add_option("--span", options->span, "times between which --plot draws")
         ->expected(2)
+        ->allow_extra_args(false)
         ->type_name("FROM TO");
     options->look.declare(*command);
     command->footer(about_integrate);

@@ -283,6 +283,7 @@ void add_filter(CLI::App& program) {
         const auto& band = band_options[i];
         command->add_option(band.name, options->edges[i], band.description)
             ->expected(band.edges)
+            ->allow_extra_args(false)
             ->type_name(band.edges == 2 ? "F1 F2" : "F");
     }
     command->add_option("--taps", options->taps, "filter by the taps of a signal file")
@@ -297,6 +298,7 @@ void add_filter(CLI::App& program) {
     declare_plot(*command, options->plot, "before and after");
     command->add_option("--span", options->span, "times between which --plot draws")
         ->expected(2)
+        ->allow_extra_args(false)
         ->type_name("FROM TO");
     command
         ->add_option("--delay", options->delay,

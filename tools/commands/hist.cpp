@@ -186,6 +186,7 @@ void add_hist(CLI::App& program) {
         ->type_name("N");
     command->add_option("--range", options->range, "values to count")
         ->expected(2)
+        ->allow_extra_args(false)
         ->type_name("LOW HIGH");
     command->add_option("-o,--output", options->out, "write the counts; - is standard output")
         ->type_name("FILE");

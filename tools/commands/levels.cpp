@@ -387,6 +387,7 @@ void add_levels(CLI::App& program) {
         ->type_name("N");
     command->add_option("--band", options->band, "lowest and highest band (default: 20 to 20000)")
         ->expected(2)
+        ->allow_extra_args(false)
         ->check(number_between(1e-3, 1e9))
         ->type_name("LOW HIGH");
     command->add_option("--reference", options->reference, "value of 0 dB")

@@ -321,6 +321,7 @@ void add_orders(CLI::App& program) {
         ->type_name("N");
     command->add_option("--band", report.band, "orders to look at")
         ->expected(2)
+        ->allow_extra_args(false)
         ->type_name("LOW HIGH");
     command->add_flag("--db", report.decibels, "heights in dB: 20 log10");
     command->add_option("-o,--output", report.out, "write the spectrum; - is standard output")

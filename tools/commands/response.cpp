@@ -298,6 +298,7 @@ void add_response(CLI::App& program) {
     command->add_flag("--align", options->align, "take the delay out of the phases");
     command->add_option("--band", options->band, "frequencies to look at")
         ->expected(2)
+        ->allow_extra_args(false)
         ->type_name("LOW HIGH");
     command->add_flag("--json", options->json, "print JSON");
     declare_plot(*command, options->plot, "gain, phase and coherence");

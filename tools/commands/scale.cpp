@@ -115,6 +115,7 @@ void add_scale(CLI::App& program) {
         ->type_name("OFFSET");
     command->add_option("--calibrate", options->points, "two values and what they stand for")
         ->expected(2)
+        ->allow_extra_args(false)
         ->type_name("X1=Y1 X2=Y2");
     command->add_option("--unit", options->unit, "unit of the new values")->type_name("UNIT");
     command->footer(about);

@@ -178,6 +178,7 @@ void add_smooth(CLI::App& program) {
     declare_plot(*command, options->plot, "before and after");
     command->add_option("--span", options->span, "times between which --plot draws")
         ->expected(2)
+        ->allow_extra_args(false)
         ->type_name("FROM TO");
     command->add_flag("--json", options->json, "print JSON");
     options->reading.declare(*command);

@@ -349,6 +349,7 @@ void add_spectrum(CLI::App& program) {
                            ->add_option("--zoom", settings.zoom,
                                         "measure between two frequencies, as closely as wanted")
                            ->expected(2)
+                           ->allow_extra_args(false)
                            ->type_name("LOW HIGH");
     command
         ->add_option("--zoom-points", settings.zoom_points, "frequencies of a zoom (default: 1000)")
@@ -368,6 +369,7 @@ void add_spectrum(CLI::App& program) {
         ->excludes(density);
     command->add_option("--band", report.band, "frequencies to look at")
         ->expected(2)
+        ->allow_extra_args(false)
         ->type_name("LOW HIGH");
     command->add_option("--unit", report.unit, "unit of the spacing, for labels: s gives Hz")
         ->type_name("UNIT");
