@@ -47,6 +47,10 @@ TEST_F(SmoothTest, FramesGoForthAndBack) {
     write("x.dsp", Signals{sine(100000, 1234, 0.5, 1e-3), sine(1000, 7, 2, 1e-3)});
     printed("stft x.dsp --length 500 --hop 125 --window P601 -o s.dsp");
     printed("stft s.dsp --inverse --length 500 --hop 125 --window P601 -o y.dsp");
+    const auto more = shell(
+        "wavkit stft s.dsp --signal 2 --inverse --length 500 --hop 125 "
+        "--window P601 --points 1002 -o y.dsp");
+    EXPECT_NE(more.err.find("no more than 1001 samples, not 1002"), std::string::npos) << more.err;
     const auto x = read("x.dsp"), s = read("s.dsp"), y = read("y.dsp");
     ASSERT_EQ(s.size(), 2u);
     EXPECT_EQ(s[0]->points, 251 * (99999 / 125 + 2));

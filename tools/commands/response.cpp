@@ -268,7 +268,7 @@ go on without jumps; --align takes out what the delay turns, and leaves the syst
 Examples:
   wavkit response sweep.wav microphone.wav --segment 8192 --plot bode.png
   wavkit response stereo.wav --align -o response.csv
-  wavkit response shaker.csv --time --columns force,acceleration --h2 --band 5 2000)";
+  wavkit response shaker.csv --time --column force,acceleration --h2 --band 5 2000)";
 
 }  // namespace
 

@@ -83,6 +83,10 @@ class Stft : public BlockChange {
         if (!options_.inverse) return result;
         const double known = std::min(left_, double(each_.given()));
         left_ -= known;
+        if (last && options_.points && left_ > 0) {
+            throw DataError("the spectra hold no more than " + number(*options_.points - left_) +
+                            " samples, not " + number(*options_.points));
+        }
         return result.first(std::size_t(known) * each_.channels() * (two_sided_ ? 2 : 1));
     }
 
@@ -153,9 +157,9 @@ memory. Every signal of a file is taken, and all channels. For a picture, see 'w
 --waterfall'.
 
 Examples:
-  wavkit stft speech.wav --length 512 -o frames.npy
-  wavkit stft frames.npy --inverse --length 512 -o again.wav
-  wavkit stft run.dsp --length 4096 --hop 2048 --window P601 -o frames.mat)";
+  wavkit stft speech.wav --length 512 -o frames.mat
+  wavkit stft frames.mat --inverse --length 512 -o again.wav
+  wavkit stft run.dsp --length 4096 --hop 2048 --window P601 -o frames.npy)";
 
 }  // namespace
 
@@ -173,7 +177,7 @@ void add_stft(CLI::App& program) {
     command->add_option("--window", options->window, "window (default: Hann)")->type_name("NAME");
     command->add_flag("--inverse", options->inverse, "from spectra to the signal");
     command->add_option("--points", options->points, "--inverse: samples that the signal had")
-        ->check(number_between(0, 1e15))
+        ->check(number_between(1, 1e15))
         ->type_name("N");
     command->add_flag("--two-sided", options->two_sided,
                       "all bins, as spectra of complex signals have them");
