@@ -99,7 +99,6 @@ TEST_F(FormatsTest, ArraysAreWrittenAsTheyAreRead) {
     }
 }
 
-// A start is on the axis of whatever comes of a signal, or it is told that it is not.
 /// Side by side as they come, and from file to file.
 TEST_F(FormatsTest, ComplexChannelsStayComplex) {
     write("a.txt", Signals{complex<dsp>({{1, 2}, {3, 4}, {5, 6}})});
@@ -117,6 +116,7 @@ TEST_F(FormatsTest, ComplexChannelsStayComplex) {
     }
 }
 
+// A start is on the axis of whatever comes of a signal, or it is told that it is not.
 TEST_F(FormatsTest, TheStartTravels) {
     write("x.csv", "Time (s),u\n10,1\n10.5,4\n11,1\n11.5,1\n12,1\n");
     write("one.txt", "1");
