@@ -247,3 +247,31 @@ def test_plots(tmp_path):
     assert len(wavkit.average(np.stack([x, x]), 512, 64).plot().get_lines()) == 2
     assert wavkit.spectrogram(x, 512, 64).plot().get_ylabel() == "frequency"
     axes.figure.savefig(tmp_path / "spectrum.png")
+
+
+@pytest.mark.parametrize("zone", [None, "Europe/Berlin"])
+def test_dates_are_places(zone):
+    index = pandas.date_range("2026-03-01", periods=64, freq="125ms", tz=zone)
+    x, plain = pandas.Series(TONES[:, 0], index), TONES[:, 0].copy()
+    some, seconds = index[[9, 4]], [9 / 8, 4 / 8]
+    found = wavkit.interp(None, x, some)
+    assert found.index.equals(some) and found.tolist() == plain[[9, 4]].tolist()
+    assert wavkit.interp(index, plain, list(some)).tolist() == plain[[9, 4]].tolist()
+    fits = [
+        (wavkit.fit(x), wavkit.fit(plain, rate=8)),
+        (wavkit.fit(index, plain), wavkit.fit(plain, rate=8)),
+        (wavkit.fit_polynomial(index, plain), wavkit.fit_polynomial(plain, rate=8)),
+        (wavkit.fit_sine(x), wavkit.fit_sine(plain, 8)),
+    ]
+    for ours, theirs in fits:
+        np.testing.assert_allclose(ours(some), theirs(seconds), 1e-9)
+    turned = wavkit.over_angle(x, index[::8] + pandas.Timedelta("10ms"), angles=8)
+    expected = wavkit.over_angle(plain, np.arange(8) + 0.01, 8, angles=8)
+    np.testing.assert_allclose(turned, expected, 1e-9)
+    for refused in (
+        lambda: wavkit.interp(None, plain, some, rate=8),
+        lambda: wavkit.over_angle(plain, index[::8], 8),
+        lambda: wavkit.fit(plain)(some),
+    ):
+        with pytest.raises(ValueError, match="the places are"):
+            refused()

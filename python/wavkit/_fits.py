@@ -2,27 +2,32 @@
 
 from __future__ import annotations
 
-from dataclasses import dataclass
+from dataclasses import dataclass, field
 from typing import Any
 
 import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
-from ._labels import Labelled, values_at
-from ._record import Array, Record, lend, samples_of
+from ._labels import Labelled, numbers_of, places_of, values_at
+from ._record import Array, Record, lend
 from ._runs import Runs
 
 
 def _pairs(
     x: ArrayLike | Any, y: ArrayLike | None, rate: float | None, axis: int | str
-) -> tuple[Runs, list[tuple[Array, Array]]]:
-    """The signals of y, each behind its abscissae; where there is none, one that tells the shape of
-    what a fit makes."""
+) -> tuple[Runs, Any, list[tuple[Array, Array]]]:
+    """The signals of y, the date that abscissae count from where they are dates, and each signal
+    behind its abscissae; where there is none, one that tells the shape of what a fit makes."""
     runs = Runs(x, rate, axis) if y is None else Runs(y, rate or 1.0, axis)
     if y is None:
-        x = runs.start() + np.arange(runs.points) * runs.delta
-    abscissae = np.asarray(x if np.ndim(x) < 2 else Runs(x, 1.0, axis).array, float)
+        first, abscissae = runs.first(), runs.start() + np.arange(runs.points) * runs.delta
+    else:
+        places = places_of(x)
+        if places.ndim > 1:
+            places = np.moveaxis(places, runs.axis, -1)
+        first = places.flat[0] if places.size else 0.0
+        abscissae = numbers_of(places, first)
     if runs.is_complex:
         raise ValueError("a fit goes through real values")
     try:
@@ -32,8 +37,8 @@ def _pairs(
             f"x has the shape {abscissae.shape} and y {runs.array.shape}, samples last"
         ) from None
     if not runs.rows:
-        return runs, [(np.arange(float(runs.points)), np.zeros(runs.points))]
-    return runs, list(zip(places.reshape(len(runs.rows), runs.points), runs.rows))
+        return runs, first, [(np.arange(float(runs.points)), np.zeros(runs.points))]
+    return runs, first, list(zip(places.reshape(len(runs.rows), runs.points), runs.rows))
 
 
 @dataclass(frozen=True)
@@ -49,6 +54,7 @@ class Line:
     correlation: Labelled
     mean_x: Labelled
     mean_y: Labelled
+    _first: Any = field(default=0.0, repr=False)
 
     @property
     def r_squared(self) -> Labelled:
@@ -58,19 +64,20 @@ class Line:
     def __call__(self, x: ArrayLike | Any) -> Labelled:
         steps = tuple(range(-np.ndim(x), 0))
         slope, intercept = (np.expand_dims(v, steps) for v in (self.slope, self.intercept))
-        return values_at(self.slope, slope * np.asarray(x) + intercept, x)
+        return values_at(self.slope, slope * numbers_of(x, self._first) + intercept, x)
 
 
 def fit(
     x: ArrayLike | Any, y: ArrayLike | None = None, rate: float | None = None, axis: int | str = -1
 ) -> Line:
     """The least-squares line of y over x; of one signal alone, over the places of its samples.
+    Dates count in seconds from the first one.
 
     >>> line = wavkit.fit([0.0, 1.0, 2.0, 3.0], [1.0, 3.1, 4.9, 7.0])
     >>> round(line.slope, 2), round(line.intercept, 2), round(line.slope_error, 3)
     (1.98, 1.03, 0.042)
     """
-    runs, pairs = _pairs(x, y, rate, axis)
+    runs, first, pairs = _pairs(x, y, rate, axis)
     results = []
     for places, row in pairs:
         with lend(places + 1j * row.astype(float)) as points, Record() as out:
@@ -79,7 +86,8 @@ def fit(
     v = runs.stack(results)
     take = [v[..., i] for i in (0, 1, 3, 4, 2, 19, 14, 15)]
     take[2:4] = [np.sqrt(variance) for variance in take[2:4]]
-    return Line(*map(runs.reduced, take))
+    figures: list[Any] = [*map(runs.reduced, take), first]
+    return Line(*figures)
 
 
 @dataclass(frozen=True)
@@ -95,9 +103,10 @@ class Polynomial:
     r_squared: Labelled  #: the share of the variance of y that the polynomial explains
     _family: Array
     _degree: int
+    _first: Any = field(default=0.0, repr=False)
 
     def __call__(self, x: ArrayLike | Any) -> Labelled:
-        places = np.asarray(samples_of(x), float)
+        places = numbers_of(x, self._first)
 
         def of_each(values: Array) -> Array:
             return np.expand_dims(values, tuple(range(-places.ndim, 0)))
@@ -122,7 +131,7 @@ def fit_polynomial(
 ) -> Polynomial:
     """The polynomial of a degree that leaves the least squares of y over x; of one signal alone,
     over the places of its samples. Its powers are those of x, with `centre` of x less its mean,
-    for abscissae far from 0.
+    for abscissae far from 0. Dates count in seconds from the first one.
 
     Polynomials that are orthogonal over the abscissae make it, so that its degree costs no digits
     (G. E. Forsythe, "Generation and use of orthogonal polynomials for data-fitting with a digital
@@ -135,7 +144,7 @@ def fit_polynomial(
     """
     if degree < 0:
         raise ValueError(f"a polynomial has a degree from 0 on, not {degree}")
-    runs, pairs = _pairs(x, y, rate, axis)
+    runs, first, pairs = _pairs(x, y, rate, axis)
     found = [_polynomial(*pair, degree, centre) for pair in pairs]
     numbers, family = (runs.stack(list(parts)) for parts in zip(*found))
     coefficients, errors = numbers[..., : degree + 1], numbers[..., degree + 1 : -3]
@@ -149,6 +158,7 @@ def fit_polynomial(
         r_squared,
         family,
         degree,
+        first,
     )
 
 

@@ -6,6 +6,7 @@ Neither package is imported: whoever passes an object of theirs has done it.
 from __future__ import annotations
 
 import sys
+from datetime import datetime, timezone
 from typing import Any, Mapping
 
 import numpy as np
@@ -101,6 +102,29 @@ def _is_date(place: Any) -> bool:
     return isinstance(place, (np.datetime64, np.timedelta64))
 
 
+def places_of(given: Any) -> Array:
+    """Places as an array of numbers or dates: of a zone they are dates of UTC."""
+    places = np.asarray(given)
+    if places.dtype.kind == "O" and places.size and isinstance(places.flat[0], datetime):
+        plain = [d if d.tzinfo is None else d.astimezone(timezone.utc) for d in places.flat]
+        dates = [d.replace(tzinfo=None) for d in plain]
+        places = np.array(dates, "M8[ns]").reshape(places.shape)
+    return places
+
+
+def numbers_of(given: Any, first: Any) -> Array:
+    """Places as numbers: dates in seconds behind a first one."""
+    places = places_of(given)
+    if places.dtype.kind in "mM":
+        if not _is_date(first) or places.dtype.kind != first.dtype.kind:
+            raise ValueError(f"the places are {places.dtype.name}, those of the signal are not")
+        seconds: Array = (places - first) / np.timedelta64(1, "s")
+        return seconds
+    if places.dtype.kind == "c":
+        raise ValueError("places are real numbers or dates")
+    return places.astype(float)
+
+
 class _DataArray(Labels):
     def __init__(self, x: Any, axis: int | str) -> None:
         self.x, self.values = x, np.asarray(x.values)
@@ -123,7 +147,7 @@ class _DataArray(Labels):
 
     def along(self, values: Array, name: str, places: Any) -> Labelled:
         dims = [name if dim == self.dim else dim for dim in self.x.dims]
-        return self._made(values, dims, {**_apart(self.x, self.dim), name: places})
+        return self._made(values, dims, {**_apart(self.x, self.dim), name: np.asarray(places)})
 
     def planes(self, made: Labelled) -> Array:
         # Arithmetic of xarray may have changed the order of the dimensions.

@@ -8,7 +8,7 @@ from typing import Any
 import numpy as np
 from numpy.typing import ArrayLike
 
-from ._labels import Labelled
+from ._labels import Labelled, numbers_of
 from ._record import Array, lend
 from ._runs import Runs, call
 from ._spectra import Spectrum, average
@@ -21,14 +21,14 @@ def _angles_of(angles: int, longest: float) -> int:
 
 def _over_angle(
     x: ArrayLike | Any,
-    pulses: ArrayLike,
+    pulses: ArrayLike | Any,
     rate: float | None,
     per_revolution: float,
     angles: int,
     axis: int | str,
 ) -> tuple[Runs, Array, int]:
     runs = Runs(x, rate, axis)
-    places = (np.asarray(pulses, dtype=np.float64) - runs.start()) / runs.delta
+    places = (numbers_of(pulses, runs.first()) - runs.start()) / runs.delta
     if places.ndim != 1 or len(places) < 5 or not np.all(np.diff(places) > 0):
         raise ValueError("the pulses are 5 times or more, in ascending order")
     angles = _angles_of(angles, float(np.diff(places).max()) * per_revolution)
@@ -42,7 +42,7 @@ def _over_angle(
 
 def over_angle(
     x: ArrayLike | Any,
-    pulses: ArrayLike,
+    pulses: ArrayLike | Any,
     rate: float | None = None,
     *,
     per_revolution: float = 1.0,
@@ -50,8 +50,8 @@ def over_angle(
     axis: int | str = -1,
 ) -> Labelled:
     """A signal at equal angles of a shaft, so many a revolution, from the first pulse of its
-    tachometer to the last: `pulses` are their times, on the axis of the samples, and `per_revolution`
-    of them make a revolution. Without `angles` it is the power of two that the longest revolution has
+    tachometer to the last: `pulses` are their times, on the axis of the samples, or dates where that
+    has dates, and `per_revolution` of them make a revolution. Without `angles` it is the power of two that the longest revolution has
     no more samples than, so that nothing folds. The angle runs along a spline through the pulses.
 
     >>> t = np.arange(20_000) / 1000
@@ -68,7 +68,7 @@ def over_angle(
 
 def orders(
     x: ArrayLike | Any,
-    pulses: ArrayLike,
+    pulses: ArrayLike | Any,
     rate: float | None = None,
     *,
     per_revolution: float = 1.0,

@@ -123,6 +123,10 @@ class Runs:
         """The places so far behind the first sample, dates where the coordinates are dates."""
         return seconds if self.labels is None else self.labels.later(seconds)
 
+    def first(self) -> Any:
+        """The place of the first sample, a date where the coordinates are dates."""
+        return 0.0 if self.labels is None else self.labels.first()
+
     def behind(self, other: Runs) -> float:
         """By how much the first sample comes later than that of other signals."""
         if self.labels is None or other.labels is None:

@@ -10,8 +10,8 @@ from numpy.typing import ArrayLike
 
 from . import _functions as lib
 from ._filters import filter
-from ._labels import Labelled, values_at
-from ._record import Array, Record, lend, samples_of
+from ._labels import Labelled, numbers_of, places_of, values_at
+from ._record import Array, Record, lend
 from ._runs import Runs, call, same_length, without_mean
 
 _METHODS = {
@@ -130,9 +130,9 @@ def edges(
 
 
 def interp(
-    x: ArrayLike | None,
+    x: ArrayLike | Any | None,
     y: ArrayLike | Any,
-    at: ArrayLike,
+    at: ArrayLike | Any,
     method: str = "linear",
     *,
     rate: float | None = None,
@@ -141,11 +141,12 @@ def interp(
     curvatures: tuple[float | None, float | None] = (None, None),
     axis: int | str = -1,
 ) -> Labelled:
-    """A table y over x at other places, in any order; without x, a signal at any times. Between the
-    samples it is held (`hold`), a line (`linear`), a parabola (`quadratic`) or a cubic `spline`
-    with not-a-knot ends; outside of the table its ends are held, or go on with `extrapolate`.
-    `slopes` and `curvatures` are the first and the second derivative of a spline at its first and
-    its last knot, None where they are unknown; curvatures (0, 0) make the natural spline.
+    """A table y over x at other places, in any order; without x, a signal at any times, or dates
+    where its coordinates are dates. Between the samples it is held (`hold`), a line (`linear`), a
+    parabola (`quadratic`) or a cubic `spline` with not-a-knot ends; outside of the table its ends
+    are held, or go on with `extrapolate`. `slopes` and `curvatures` are the first and the second
+    derivative of a spline at its first and its last knot, None where they are unknown; curvatures
+    (0, 0) make the natural spline.
 
     >>> wavkit.interp([0.0, 1.0, 2.0, 3.0, 4.0], [0.0, 1.0, 8.0, 27.0, 64.0], [1.5, 2.5], "spline")
     array([ 3.375, 15.625])
@@ -158,9 +159,14 @@ def interp(
     letter = runs.array.dtype.char
     if runs.is_complex:
         raise ValueError("tables hold real values")
-    places = runs.start() + np.arange(runs.points) * runs.delta if x is None else samples_of(x)
+    if x is None:
+        first, places = runs.first(), runs.start() + np.arange(runs.points) * runs.delta
+    else:
+        dates_or_numbers = places_of(x)
+        first = dates_or_numbers.flat[0] if dates_or_numbers.size else 0.0
+        places = numbers_of(dates_or_numbers, first)
     table = lend(np.ascontiguousarray(places, letter))
-    wanted = np.asarray(at, float)
+    wanted = numbers_of(at, first)
     order = np.argsort(wanted, axis=None, kind="stable")
     ascending = lend(np.ascontiguousarray(wanted.ravel()[order], letter))
     flags = _METHODS[method] | (0 if extrapolate else lib.DSP_INTERP_HOLD_ENDS)
@@ -184,7 +190,7 @@ def interp(
     if wanted.ndim != 1:
         of_each = runs.reduced(np.zeros(runs.shape))
         return values_at(of_each, result.reshape((*runs.shape, *wanted.shape))[()], at)
-    return runs.along(result, "at", wanted)
+    return runs.along(result, "at", at if places_of(at).dtype.kind in "mM" else wanted)
 
 
 def _end(slope: float | None, curvature: float | None) -> tuple[int, float]:

@@ -3,14 +3,14 @@
 from __future__ import annotations
 
 import math
-from dataclasses import dataclass, fields
+from dataclasses import dataclass, field, fields
 from typing import Any
 
 import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
-from ._labels import Labelled, values_at
+from ._labels import Labelled, numbers_of, values_at
 from ._record import Array, Record
 from ._runs import Runs, call
 from ._windows import window_number
@@ -89,6 +89,7 @@ class Sine:
     amplitude_error: Labelled
     phase_error: Labelled
     offset_error: Labelled
+    _first: Any = field(default=0.0, repr=False)
 
     def __call__(self, t: ArrayLike | Any) -> Labelled:
         steps = tuple(range(-np.ndim(t), 0))
@@ -96,7 +97,7 @@ class Sine:
             np.expand_dims(v, steps)
             for v in (self.frequency, self.phase, self.amplitude, self.offset)
         )
-        turns = 2 * np.pi * frequency * np.asarray(t)
+        turns = 2 * np.pi * frequency * numbers_of(t, self._first)
         return values_at(self.frequency, offset + amplitude * np.cos(turns + phase), t)
 
 
@@ -121,8 +122,9 @@ def fit_sine(
     flags = lib.DSP_SINE_FREE if at is None else lib.DSP_SINE_FIXED
     frequency = near if at is None else at
     found = runs.map(lambda x, out: call("dsps_sine_fit", x, out, frequency, flags))
-    names = [field.name for field in fields(Sine)]
-    return Sine(**{name: runs.reduced(found[..., i]) for i, name in enumerate(names)})
+    names = [field.name for field in fields(Sine)][:-1]
+    figures = {name: runs.reduced(found[..., i]) for i, name in enumerate(names)}
+    return Sine(**figures, _first=runs.first())
 
 
 @dataclass(frozen=True)
