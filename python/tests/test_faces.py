@@ -648,8 +648,29 @@ def test_interpolation(method, kind):
     close(wavkit.interp(x, y, at, method), scipy.interpolate.interp1d(x, y, kind)(at), 1e-9)
     assert wavkit.interp(x, y[0], [[0.0], [99.0]], method).tolist() == [[y[0, 0]], [y[0, -1]]]
     close(wavkit.interp(None, T, [0.5, 0.25], rate=RATE), [0.5, 0.25])
-    with pytest.raises(wavkit.Error):
-        wavkit.interp([0.0, 1.0, 1.0, 2.0], [1.0, 2.0, 3.0, 4.0], [1.5])
+    for wrong in ([0.0, 1.0, 1.0], [0.0, 2.0, 1.0], [0.0, np.nan, 2.0], [0.0, 1.0], [0, 1, 2j], []):
+        with pytest.raises(ValueError, match="plac"):
+            wavkit.interp(wrong, np.arange(3.0) if wrong else [], [1.5], method)
+    found = wavkit.interp(x, y, [[np.nan, x[5]], [x[7], np.nan]], method)
+    np.testing.assert_array_equal(np.isnan(found), [[[True, False], [False, True]]] * 2)
+    close(found[:, [0, 1], [1, 0]], y[:, [5, 7]])
+
+
+def test_places_in_single_precision():
+    """Beyond 2^24 samples float32 has no number for each of them."""
+    x, last = np.zeros((1 << 24) + 4, "f4"), (1 << 24) + 1
+    x[last] = 7
+    figures = wavkit.stats(x)
+    assert figures.max_sample == wavkit.peaks(x, height=7).sample[0] == last
+    assert figures.max.dtype == wavkit.peaks(x[-99:]).height.dtype == np.float32
+    clean, outlier = wavkit.replace_outliers(x, 3)
+    assert np.flatnonzero(outlier).tolist() == [last] and clean.dtype == np.float32
+    ramp = np.arange(2_000_000, dtype="f4") % 2
+    close(wavkit.edges(ramp, 0.25)[-1], 1_999_998.25, 1e-15)
+    assert wavkit.interp(None, ramp, [1_900_000.25 / 48000], rate=48000)[0] == pytest.approx(0.25)
+    assert wavkit.interp(np.arange(4) + 1.7e9, ramp[:4], [1.7e9 + 0.5]).tolist() == [0.5]
+    assert wavkit.peaks(np.float32([0, 0.7, 0]), height=0.7).sample.tolist() == [1]
+    assert wavkit.hist(np.float32([0.1]), 2, (0.1, 1.0)).below == 0
 
 
 @pytest.mark.parametrize(("dtype", "tolerance"), [("f4", 1e-5), ("f8", 1e-11)])

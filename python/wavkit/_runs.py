@@ -63,6 +63,15 @@ class Runs:
     def is_complex(self) -> bool:
         return self.array.dtype.kind == "c"
 
+    def become(self, letter: str) -> None:
+        """Goes on with samples of another type."""
+        self.array = self.array.astype(letter, copy=False)
+        self.rows = [row.astype(letter, copy=False) for row in self.rows]
+
+    def widen(self) -> None:
+        """Goes on in double precision, in which places between samples have room."""
+        self.become("D" if self.is_complex else "d")
+
     def records(self) -> Iterator[Record]:
         for row in self.rows:
             yield lend(row, self.delta)
@@ -132,6 +141,13 @@ class Runs:
         if self.labels is None or other.labels is None:
             return self.start() - other.start()
         return self.labels.behind(other.labels)
+
+
+def countable(row: Array) -> Array:
+    """A row whose samples its precision can number: single precision counts to 2^24."""
+    if len(row) <= 1 << 24:
+        return row
+    return row.astype("D" if row.dtype.kind == "c" else "d", copy=False)
 
 
 def same_length(name: str, *arguments: Any) -> Step:

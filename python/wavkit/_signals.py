@@ -124,6 +124,7 @@ def edges(
     runs = Runs(x, rate)
     if runs.shape:
         raise ValueError("the edges of several signals are of different number: pass one at a time")
+    runs.widen()
     places = runs.map(same_length("dspi_edge", _DIRECTIONS[direction], level))
     result: Array = runs.start() + places * runs.delta
     return result
@@ -146,7 +147,7 @@ def interp(
     parabola (`quadratic`) or a cubic `spline` with not-a-knot ends; outside of the table its ends
     are held, or go on with `extrapolate`. `slopes` and `curvatures` are the first and the second
     derivative of a spline at its first and its last knot, None where they are unknown; curvatures
-    (0, 0) make the natural spline.
+    (0, 0) make the natural spline. Where a place is NaN, so is the value.
 
     >>> wavkit.interp([0.0, 1.0, 2.0, 3.0, 4.0], [0.0, 1.0, 8.0, 27.0, 64.0], [1.5, 2.5], "spline")
     array([ 3.375, 15.625])
@@ -156,22 +157,25 @@ def interp(
     if method not in _METHODS:
         raise ValueError(f"a method is one of {', '.join(_METHODS)}, not {method!r}")
     runs = Runs(y, rate, axis)
-    letter = runs.array.dtype.char
     if runs.is_complex:
         raise ValueError("tables hold real values")
+    letter = runs.array.dtype.char
+    runs.widen()
     if x is None:
         first, places = runs.first(), runs.start() + np.arange(runs.points) * runs.delta
     else:
         dates_or_numbers = places_of(x)
         first = dates_or_numbers.flat[0] if dates_or_numbers.size else 0.0
         places = numbers_of(dates_or_numbers, first)
-    table = lend(np.ascontiguousarray(places, letter))
-    wanted = numbers_of(at, first)
-    order = np.argsort(wanted, axis=None, kind="stable")
-    ascending = lend(np.ascontiguousarray(wanted.ravel()[order], letter))
+    if places.shape != (runs.points,) or not (runs.points and np.all(np.diff(places) > 0)):
+        raise ValueError("a table has as many places as values, one at least, in ascending order")
+    table, wanted = lend(places), numbers_of(at, first)
+    order = np.argsort(wanted, axis=None, kind="stable")  # places that are no numbers last
+    known = order[: wanted.size - np.count_nonzero(np.isnan(wanted))]
+    ascending = lend(wanted.ravel()[known])
     flags = _METHODS[method] | (0 if extrapolate else lib.DSP_INTERP_HOLD_ENDS)
 
-    ends = [_end(*known) for known in zip(slopes, curvatures)]
+    ends = [_end(*told) for told in zip(slopes, curvatures)]
     if method != "spline" and any(kind != lib.DSP_SPLINE_NOT_A_KNOT for kind, _ in ends):
         raise ValueError(f"slopes and curvatures are those of a spline, not of {method!r}")
     (start, first), (end, last) = ends
@@ -180,13 +184,12 @@ def interp(
         if start == end == lib.DSP_SPLINE_NOT_A_KNOT:
             call("dsp_interp", table, y, None, ascending, out, flags)
             return
-        with Record(dtype=letter) as moments:
+        with Record() as moments:
             call("dspb_cspline_2d", table, y, moments, first, last, start, end)
             call("dsp_interp", table, y, moments, ascending, out, flags)
 
-    values = runs.map(step)
-    result = np.empty_like(values)
-    result[..., order] = values
+    result = np.full((*runs.shape, wanted.size), np.nan, letter)
+    result[..., known] = runs.map(step)
     if wanted.ndim != 1:
         of_each = runs.reduced(np.zeros(runs.shape))
         return values_at(of_each, result.reshape((*runs.shape, *wanted.shape))[()], at)

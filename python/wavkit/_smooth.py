@@ -10,7 +10,7 @@ from numpy.typing import ArrayLike
 from . import _functions as lib
 from ._labels import Labelled
 from ._record import Array, Record, lend
-from ._runs import Runs, call
+from ._runs import Runs, call, countable
 
 _ENDS = {
     "shorter": lib.DSP_ENDS_SHORTER,
@@ -101,11 +101,13 @@ def replace_outliers(
 
     def cleaned(row: Array) -> Array:
         """The signal and, behind it, what was replaced."""
-        with lend(row) as x, Record(dtype=row.dtype) as out, Record(dtype=row.dtype) as found:
+        with lend(countable(row)) as x, Record(dtype=x.dtype) as out, Record(
+            dtype=x.dtype
+        ) as found:
             call("dspd_hampel", x, out, found, window, threshold, number, None, 1)
             replaced = np.zeros(len(row), row.dtype)
             replaced[found.take().astype(np.intp)] = 1
-            return np.concatenate((out.take(), replaced))
+            return np.concatenate((out.take(), replaced), dtype=row.dtype)
 
     both = runs.each(cleaned)
     points = runs.points

@@ -12,7 +12,7 @@ from numpy.typing import ArrayLike
 from . import _functions as lib
 from ._labels import Labelled
 from ._record import Array, Record, lend, samples_of
-from ._runs import Runs, call
+from ._runs import Runs, call, countable
 
 
 @dataclass(frozen=True)
@@ -73,7 +73,9 @@ def stats(x: ArrayLike | Any, axis: int | str = -1) -> Stats:
     for name in values:
         if name.endswith("_sample"):
             values[name] = values[name].real.astype(np.int64)
-        elif name not in _OF_THE_KIND:
+            continue
+        values[name] = values[name].astype(runs.array.dtype)
+        if name not in _OF_THE_KIND:
             values[name] = values[name].real
     if runs.is_complex:
         values.update(dict.fromkeys(_OF_REAL_SIGNALS))
@@ -83,7 +85,8 @@ def stats(x: ArrayLike | Any, axis: int | str = -1) -> Stats:
 
 
 def _figures(row: Array) -> Array:
-    """The figures of one signal in the order of Stats."""
+    """The figures of one signal in the order of Stats, in double precision for the numbers of
+    samples."""
     is_complex = row.dtype.kind == "c"
     values: dict[str, Any] = dict.fromkeys(_OF_REAL_SIGNALS, math.nan)
     with lend(row) as x, Record(dtype=row.dtype.char.lower()) as out:
@@ -91,6 +94,7 @@ def _figures(row: Array) -> Array:
             if not is_complex or name not in _OF_REAL_SIGNALS:
                 call(function, x, out)
                 values[name] = out.first()
+    with lend(countable(row)) as x, Record(dtype=x.dtype.char.lower()) as out:
         for name, flags in (
             ("min_sample", lib.DSP_PEAK_SMALLEST),
             ("max_sample", lib.DSP_PEAK_SAMPLE),
@@ -102,7 +106,7 @@ def _figures(row: Array) -> Array:
         values[f"{kind}_variance"] = max(values[f"{kind}_variance"], 0.0)
         values[f"{kind}_deviation"] = math.sqrt(values[f"{kind}_variance"])
     values["geometric_mean"] = _geometric_mean(row)
-    return np.array([values[field.name] for field in fields(Stats)], row.dtype)
+    return np.array([values[field.name] for field in fields(Stats)], "D" if is_complex else "d")
 
 
 def _geometric_mean(row: Array) -> Any:
@@ -140,6 +144,7 @@ def hist(
     array([2, 2])
     """
     runs = Runs(x, 1.0, axis)
+    runs.widen()  # the width of a bin has room beside its place
     bins = min(max(math.isqrt(runs.points), 1), 64) if bins is None else bins
     values = np.abs(runs.array) if runs.is_complex else runs.array
     if range is None:
@@ -150,9 +155,6 @@ def hist(
         raise ValueError(f"there are no bins from {low:g} to {high:g}")
     if low == high:
         low, high = low - 0.5, high + 0.5
-    # Counted in double precision, where the width of a bin has room beside its place.
-    runs.rows = [row.astype("D" if runs.is_complex else "d", copy=False) for row in runs.rows]
-    runs.array = runs.array.astype("D" if runs.is_complex else "d", copy=False)
     width = (high - low) / bins
     counts = runs.map(lambda x, out: call("dsps_hist", x, out, low, width, bins)).astype(np.int64)
     nan = np.isnan(values).sum(axis=-1)

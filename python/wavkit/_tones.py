@@ -174,7 +174,9 @@ def peaks(
     runs = Runs(x, rate)
     if runs.shape:
         raise ValueError("the peaks of several signals are of different number: pass one at a time")
-    sign = -1 if valleys else 1
+    letter, sign = runs.array.dtype.char, -1 if valleys else 1
+    height = float(np.array(height, letter.lower()))  # as the samples are rounded
+    runs.widen()
     limits = (sign * height, threshold, distance / runs.delta, prominence, width / runs.delta)
     if valleys:
         runs.rows = [np.negative(row) for row in runs.rows]
@@ -185,12 +187,16 @@ def peaks(
         result: Array = runs.start() + values[which] * runs.delta
         return result
 
+    def heights(which: int, sign: int = sign) -> Array:
+        result: Array = sign * values[which].astype(letter)
+        return result
+
     return SignalPeaks(
         at=places(lib.DSP_PEAKS_POSITION),
-        top=sign * values[lib.DSP_PEAKS_TOP],
+        top=heights(lib.DSP_PEAKS_TOP),
         sample=values[lib.DSP_PEAKS_INDEX].astype(np.int64),
-        height=sign * values[lib.DSP_PEAKS_HEIGHT],
-        prominence=values[lib.DSP_PEAKS_PROMINENCE],
+        height=heights(lib.DSP_PEAKS_HEIGHT),
+        prominence=heights(lib.DSP_PEAKS_PROMINENCE, 1),
         width=values[lib.DSP_PEAKS_WIDTH] * runs.delta,
         left=places(lib.DSP_PEAKS_LEFT),
         right=places(lib.DSP_PEAKS_RIGHT),
