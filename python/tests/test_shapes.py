@@ -104,6 +104,13 @@ def test_xarray_keeps_coordinates():
     plain = wavkit.transfer(values[:, 1], values[:, 0], 8, 16)
     np.testing.assert_array_equal(between.h1[:, 1], plain.h1)
     np.testing.assert_array_equal(between.db[:, 1], plain.db)
+    # 1 / (1 / 98) is more than 98, and the steps of such places are no thousandths.
+    long = xarray.DataArray(np.ones(4000), {"time": 5 + np.arange(4000) / 1000}, ["time"])
+    assert len(wavkit.resample(long, None, 500)) == 2000
+    assert wavkit.filter(long, bandpass=(100, 500)).shape == (4000,)
+    assert wavkit.filter(np.ones(2000), 98, bandpass=(5, 49)).shape == (2000,)
+    daily = pandas.Series(np.arange(30.0), np.arange(30) * 49.0)
+    assert wavkit.edges(daily, 28.0).tolist() == [28 * 49]
     uneven = x.assign_coords(time=TIME**2)
     with pytest.raises(ValueError, match="equally spaced"):
         wavkit.spectrum(uneven, axis="time")

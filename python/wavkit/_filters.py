@@ -12,7 +12,7 @@ from numpy.typing import ArrayLike, DTypeLike
 from . import _functions as lib
 from ._labels import Labelled
 from ._record import Array, Record, lend, samples_of
-from ._runs import Runs, call
+from ._runs import Runs, call, checked_rate
 from ._windows import window_number
 
 _DESIGNS = {
@@ -102,11 +102,10 @@ def design(
     wanted = 2 if kind in (*_BANDS, "delay") else 1
     if len(parameters) != wanted and not (kind.startswith("sinh") and not parameters):
         raise ValueError(f"{kind} takes {wanted} parameter{'s' if wanted > 1 else ''}")
-    if not 0 < rate < math.inf:
-        raise ValueError(f"a sampling rate is a number above 0, not {rate}")
+    checked_rate(rate)
     edges = [f / rate for f in (parameters[:1] if kind == "delay" else parameters)]
     if not kind.startswith("sinh"):
-        check_edges(edges, rate)
+        edges = checked_edges(edges, rate)
     if kind in _TAPERED:
         width = None if transition is None else transition / rate
         points, width = _size(edges, width, attenuation, length)
@@ -136,12 +135,14 @@ def design(
     return result
 
 
-def check_edges(edges: Sequence[float], rate: float) -> None:
+def checked_edges(edges: Sequence[float], rate: float) -> list[float]:
+    """Edges in cycles a sample, of which the last may be half the rate to rounding."""
     for edge in edges:
-        if not 0 < edge <= 0.5:
+        if not 0 < edge <= 0.5 + 4 * np.finfo(float).eps:
             raise ValueError(f"{edge * rate:g} does not lie between 0 and half the sampling rate")
     if list(edges) != sorted(set(edges)):
         raise ValueError("a band goes from a lower to a higher frequency")
+    return [min(edge, 0.5) for edge in edges]
 
 
 def _fixed(kind: str, letter: str) -> Array:
@@ -270,7 +271,7 @@ def filter(
     runs = Runs(x, rate, axis)
     bands = {"lowpass": lowpass, "highpass": highpass, "bandpass": bandpass, "bandstop": bandstop}
     shape = {"attenuation": attenuation, "length": length, "window": window}
-    for each in chain(1 / runs.delta, taps, bands, transition=transition, **shape):
+    for each in chain(runs.rate, taps, bands, transition=transition, **shape):
         back = delay_of(each) if delay is None else delay
         runs.rows = [_aligned(row, each, back, hold) for row in runs.rows]
     return runs.same(runs.each(lambda row: row))

@@ -35,19 +35,23 @@ class Labels:
         """The name of the axis along which spectra of the samples follow one another."""
         return "time" if self.name in (None, "frequency") else str(self.name)
 
-    def spacing(self) -> float | None:
-        """The step of the coordinate, in seconds where it is one of dates."""
+    def rate(self) -> float | None:
+        """That of the coordinate, of samples a second where it is one of dates."""
         found = self.places()
         if found is None or len(found) < 2:
             return None
         places: Any = found
+        rounding = 1e-9  # of dates, in seconds
         if places.dtype.kind in "mM":
             places = (places - places[0]) / np.timedelta64(1, "s")
-        steps = np.diff(places.astype(float))
-        step = float((places[-1] - places[0]) / len(steps))
+        else:
+            places = places.astype(float)
+            rounding = 2 * float(np.spacing(np.max(np.abs(places[[0, -1]]))))
+        steps, reach = np.diff(places), float(places[-1] - places[0])
+        step = reach / len(steps)
         if not step > 0 or np.max(np.abs(steps - step)) > step / 20:
             raise ValueError("the coordinate of the samples is not equally spaced")
-        return step
+        return inverse(step, min(rounding / reach, 1e-6))
 
     def places(self) -> Array | None:
         raise NotImplementedError
@@ -96,6 +100,17 @@ class Labels:
         """Signals at the old coordinates of the samples, of which there is one for each of
         `planes()`."""
         raise NotImplementedError
+
+
+def inverse(step: float, rounding: float = 0.0) -> float:
+    """The rate of a spacing, or the spacing of a rate, that is known to a share of it: a simple
+    number where one is as near."""
+    exact = 1 / step
+    for decimals in range(4):
+        simple = round(exact, decimals)
+        if abs(simple - exact) <= max(rounding, 2**-51) * exact:
+            return simple
+    return exact
 
 
 def _is_date(place: Any) -> bool:

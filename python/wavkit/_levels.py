@@ -100,10 +100,10 @@ def levels(
     milliseconds = _RESPONSES.get(response) if isinstance(response, str) else response
     if milliseconds is None:
         raise ValueError(f"a response is fast, slow or milliseconds, not {response!r}")
-    sections = _sections(weighting, 1 / runs.delta)
+    sections = _sections(weighting, runs.rate)
     centres, bands = np.empty(0), list[Array]()
     if octaves:
-        centres, bands = octave_bands(octaves, rate=1 / runs.delta)
+        centres, bands = octave_bands(octaves, rate=runs.rate)
 
     def measured(rows: Array) -> Array:
         lent = lend(np.ascontiguousarray(rows.ravel()))

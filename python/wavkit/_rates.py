@@ -188,8 +188,7 @@ def resample(
     (48000, True)
     """
     runs = Runs(x, rate, axis)
-    old = 1 / runs.delta if rate is None else rate
-    resampler = Resampler(old, new_rate, quality)
+    resampler = Resampler(runs.rate, new_rate, quality)
     values = runs.each(lambda row: np.concatenate((resampler(row), resampler.finish())))
     places = runs.later(np.arange(values.shape[-1]) / float(new_rate))
     return runs.along(values, runs.name, places)
@@ -209,5 +208,7 @@ def decimate(
     >>> len(slow), float(slow[1000].round(6)), round(math.cos(4), 6)
     (2000, -0.653644, -0.653644)
     """
-    old = 1 / Runs(x, rate, axis).delta if rate is None else rate
+    if not by >= 1:
+        raise ValueError(f"every {by}-th sample is none")
+    old = Runs(x, rate, axis).rate
     return resample(x, old, _as_written(old) / by, quality, axis=axis)

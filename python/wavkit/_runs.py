@@ -9,7 +9,7 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions
-from ._labels import Axes, Labelled, labels_of
+from ._labels import Axes, Labelled, inverse, labels_of
 from ._record import Array, Record, lend, samples_of
 
 #: A step reads one record and leaves its result in another.
@@ -28,10 +28,17 @@ def call(name: str, x: Record, *arguments: Any) -> int:
     return (_single if x.single else _double)[name](x, *arguments)
 
 
+def checked_rate(rate: float) -> float:
+    """A sampling rate, as it was given: the inverse of its inverse may be another one."""
+    if not 0 < rate < np.inf:
+        raise ValueError(f"a sampling rate is a number above 0, not {rate}")
+    return rate
+
+
 class Runs:
     """The signals along one axis of an array, and the way back."""
 
-    __slots__ = ("array", "axis", "delta", "labels", "rows", "shape")
+    __slots__ = ("array", "axis", "delta", "labels", "rate", "rows", "shape")
 
     def __init__(self, x: ArrayLike | Any, rate: float | None = None, axis: int | str = -1) -> None:
         self.labels = None if type(x) is np.ndarray else labels_of(x, axis)
@@ -42,10 +49,9 @@ class Runs:
         if isinstance(number, str):
             raise ValueError("only dimensions of xarray have names")
         self.axis = number if array.ndim > 1 or number not in (0, -1) else -1
-        spacing = self.labels.spacing() if self.labels is not None and rate is None else None
-        if rate is not None and not 0 < rate < np.inf:
-            raise ValueError(f"a sampling rate is a number above 0, not {rate}")
-        self.delta = spacing or 1.0 / (rate or 1.0)
+        own = self.labels.rate() if self.labels is not None and rate is None else None
+        self.rate = own or checked_rate(1.0 if rate is None else rate)
+        self.delta = inverse(own) if own else 1.0 / float(self.rate)
         self.array = array if array.ndim == 1 else np.moveaxis(array, self.axis, -1)
         self.shape = self.array.shape[:-1]
         contiguous = np.ascontiguousarray(self.array)

@@ -10,10 +10,10 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
-from ._filters import Response, check_edges
+from ._filters import Response, checked_edges
 from ._labels import Labelled
 from ._record import Array, Record, lend, samples_of
-from ._runs import Runs, call
+from ._runs import Runs, call, checked_rate
 
 _DESIGNS = {
     "butter": lib.DSP_IIR_BUTTERWORTH,
@@ -82,10 +82,8 @@ def _design(
     wanted = 2 if kind in ("bandpass", "bandstop") else 1
     if len(edges) != wanted:
         raise ValueError(f"{kind} takes {wanted} frequenc{'ies' if wanted > 1 else 'y'}")
-    if not 0 < rate < math.inf:
-        raise ValueError(f"a sampling rate is a number above 0, not {rate}")
-    places = [f / rate for f in edges]
-    check_edges(places, rate)
+    checked_rate(rate)
+    places = checked_edges([f / rate for f in edges], rate)
     if kind in _SINGLE:
         return _SINGLE[kind], 0, 1, places[0], places[0] / q, 0, 0
     band = _BANDS[kind]

@@ -457,7 +457,7 @@ def stft(
         frequency,
         runs.start() + times,
         runs.reduced(bins, _course_axes(runs, frequency, times)),
-        1 / runs.delta,
+        runs.rate,
         window,
         size,
         step,

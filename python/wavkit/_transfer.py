@@ -11,7 +11,7 @@ from numpy.typing import ArrayLike
 from . import _functions as lib
 from ._labels import Labelled
 from ._record import Array, Record, lend, samples_of
-from ._runs import Runs, call
+from ._runs import Runs, call, checked_rate
 from ._spectra import step_of
 from ._windows import window_number
 
@@ -72,13 +72,11 @@ class TransferMeter:
         overlap: float = 50,
         detrend: bool = False,
     ) -> None:
-        if not 0 < rate < np.inf:
-            raise ValueError(f"a sampling rate is a number above 0, not {rate}")
         if not 0 <= overlap < 100:
             raise ValueError(f"segments overlap by 0 to less than 100 percent, not {overlap}")
         if points < 2:
             raise ValueError(f"a segment has 2 samples or more, not {points}")
-        self._delta, self._points = 1.0 / rate, points
+        self._delta, self._points = 1.0 / checked_rate(rate), points
         flags = lib.DSP_CROSS_MEAN if detrend else 0
         self._numbers = (points, step_of(points, overlap), window_number(window), flags)
         self.reset()
@@ -142,9 +140,10 @@ def transfer(
     """
     given = [Runs(v, rate, axis) for v in (x, y)]
     labelled = [runs for runs in given if runs.labels is not None]
-    delta = (labelled or given)[0].delta
     first, second = np.broadcast_arrays(*(runs.array for runs in given))
-    meter = TransferMeter(1 / delta, points, window, overlap=overlap, detrend=detrend)
+    meter = TransferMeter(
+        (labelled or given)[0].rate, points, window, overlap=overlap, detrend=detrend
+    )
     shape = first.shape[:-1]
     found = []
     for index in np.ndindex(shape):

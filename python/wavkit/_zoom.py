@@ -11,7 +11,7 @@ from numpy.typing import ArrayLike
 from . import _functions as lib
 from ._labels import Labelled
 from ._record import Array, Record, lend, samples_of
-from ._runs import Runs, call
+from ._runs import Runs, call, checked_rate
 from ._windows import window_number
 
 
@@ -97,10 +97,8 @@ class Goertzel:
     """
 
     def __init__(self, frequencies: ArrayLike, rate: float = 1.0) -> None:
-        if not 0 < rate < np.inf:
-            raise ValueError(f"a sampling rate is a number above 0, not {rate}")
         self.frequencies = np.atleast_1d(np.asarray(frequencies, float)).ravel()
-        self._delta = 1.0 / rate
+        self._delta = 1.0 / checked_rate(rate)
         self.reset()
 
     def reset(self) -> None:
@@ -126,7 +124,7 @@ def goertzel(
     array([3.])
     """
     runs = Runs(x, rate, axis)
-    meter = Goertzel(frequencies, 1 / runs.delta)
+    meter = Goertzel(frequencies, runs.rate)
 
     def measured(row: Array) -> Array:
         meter.reset()
