@@ -703,6 +703,33 @@ def test_files(tmp_path, suffix):
     assert np.array_equal(wavkit.read(tmp_path / "two.dsp").samples, np.stack([COMPLEX, -COMPLEX]))
 
 
+@pytest.mark.parametrize("suffix", [".dsp", ".txt", ".mat", ".csv"])
+@pytest.mark.parametrize("dtype", ["f4", "f8", "c8"])
+def test_files_keep_rates(tmp_path, suffix, dtype):
+    for rate in (48000, 98, 12345.678, 1 / 3600):
+        wavkit.write(tmp_path / f"x{suffix}", np.array([0.5, 0.1], dtype), rate)
+        samples, again = wavkit.read(tmp_path / f"x{suffix}")
+        assert again == rate and samples.tolist() == pytest.approx([0.5, 0.1], rel=1e-7)
+
+
+def test_what_files_do_not_hold_is_told(tmp_path, monkeypatch):
+    monkeypatch.chdir(tmp_path)
+    with pytest.warns(UserWarning, match="10 samples beyond -1 to 1 clipped"):
+        wavkit.write("x.flac", np.arange(12.0).reshape(4, 3), 8000)
+    with pytest.warns(UserWarning, match="holds no rate"):
+        wavkit.write("x.npy", np.float32([[0, 1], [2, 3], [4, 5]]), 8000)
+    assert (
+        wavkit.read("x.npy").samples.tolist()
+        == np.load("x.npy").tolist()
+        == [[0, 1], [2, 3], [4, 5]]
+    )
+    wavkit.write("-x.wav", [0.5, 0.25], 8000)
+    assert wavkit.read("-x.wav").samples.tolist() == [0.5, 0.25]
+    for name in ("none/x.dsp", "none/x.npy", "none/x.csv"):
+        with pytest.raises(OSError, match=name):
+            wavkit.write(name, [1.0])
+
+
 def test_files_that_cannot_be_read(tmp_path):
     (tmp_path / "bad.dsp").write_bytes(b"\xbe\x30\x03\xeb" + bytes(12))
     (tmp_path / "bad.wav").write_text("no sound")
