@@ -427,6 +427,8 @@ def test_statistics(x):
     for ours, theirs in pairs:
         assert ours == pytest.approx(theirs, rel=1e-9, abs=1e-12)
     assert wavkit.stats(np.full(9, 0.1)).sample_deviation < 1e-15
+    nothing = wavkit.stats([x[:2], x[:2] * np.nan])
+    assert np.isnan([nothing.min[1], nothing.max[1]]).all() and nothing.max[0] in x[:2]
 
 
 def test_histograms():
@@ -454,6 +456,9 @@ def test_lines():
     assert wavkit.fit(np.empty((0, 5))).slope.shape == (0,)
     with pytest.raises(ValueError, match=r"x has the shape \(2,\) and y \(3,\)"):
         wavkit.fit([1.0, 2.0], [1.0, 2.0, 3.0])
+    for places in ([], [2.0], [1.0, 1.0, 1.0]):
+        with pytest.raises(ValueError, match="2 points with different x"):
+            wavkit.fit(places, np.arange(len(places)))
 
 
 @pytest.mark.parametrize("dtype", ["f4", "f8"])

@@ -80,6 +80,8 @@ def fit(
     runs, first, pairs = _pairs(x, y, rate, axis)
     results = []
     for places, row in pairs:
+        if len(places) < 2 or np.min(places) == np.max(places):
+            raise ValueError("a line takes 2 points with different x")
         with lend(places + 1j * row.astype(float)) as points, Record() as out:
             lib.dsps_lin_regres2(points, out)
             results.append(out.take())

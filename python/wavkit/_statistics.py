@@ -59,7 +59,8 @@ _OF_THE_KIND = ("mean", "median", "sum", "min", "max", "geometric_mean", "harmon
 
 
 def stats(x: ArrayLike | Any, axis: int | str = -1) -> Stats:
-    """Every statistic of a signal, by the names that `wavkit stats` prints.
+    """Every statistic of a signal, by the names that `wavkit stats` prints. Samples that are no
+    numbers are no extremes; where there are no others, these are NaN, too.
 
     >>> figures = wavkit.stats([1.0, 2.0, 3.0, 6.0])
     >>> figures.mean, figures.median, figures.sample_variance.round(3), figures.max_sample
@@ -101,6 +102,8 @@ def _figures(row: Array) -> Array:
         ):
             call("dsps_peak", x, out, flags, 0)
             values[name] = out.pointer.data[1]
+    if math.isnan(abs(row[0])) and np.isnan(row).all():
+        values["min"] = values["max"] = math.nan  # where the search begins is no sample
     # Rounding takes the variance of a constant a little below 0.
     for kind in ("population", "sample"):
         values[f"{kind}_variance"] = max(values[f"{kind}_variance"], 0.0)
