@@ -517,6 +517,8 @@ def test_peaks_of_signals(conditions):
     for ours, name in pairs.items():
         close(getattr(found, ours), values[name])
     close(wavkit.peaks(NOISE, RATE).right, wavkit.peaks(NOISE).right / RATE)
+    fifth = np.arange(30) % 5 == 2
+    assert len(wavkit.peaks(fifth, 48000, distance=5 / 48000)) == len(wavkit.peaks(fifth)) == 6
 
 
 @pytest.mark.parametrize("dtype", ["f4", "f8"])

@@ -177,7 +177,8 @@ def peaks(
     letter, sign = runs.array.dtype.char, -1 if valleys else 1
     height = float(np.array(height, letter.lower()))  # as the samples are rounded
     runs.widen()
-    limits = (sign * height, threshold, distance / runs.delta, prominence, width / runs.delta)
+    apart, wide = (_in_samples(limit, runs.delta) for limit in (distance, width))
+    limits = (sign * height, threshold, apart, prominence, wide)
     if valleys:
         runs.rows = [np.negative(row) for row in runs.rows]
     found = runs.map(lambda x, out: call("dsps_peaks", x, out, *limits, width_at / 100))
@@ -203,3 +204,10 @@ def peaks(
         left_base=places(lib.DSP_PEAKS_LEFT_BASE),
         right_base=places(lib.DSP_PEAKS_RIGHT_BASE),
     )
+
+
+def _in_samples(limit: float, delta: float) -> float:
+    """A limit in units of the axis, whole where only rounding is between."""
+    samples = limit / delta
+    whole = round(samples) if math.isfinite(samples) else samples
+    return whole if abs(samples - whole) <= 1e-9 * abs(whole) else samples
