@@ -606,8 +606,9 @@ def test_transfer(window, points, overlap, detrend):
     single = wavkit.transfer(x.astype("f4"), y.astype("f4"), RATE, points, window, overlap=overlap)
     assert single.h1.dtype == np.complex64
     close(single.h1, several.h1[0], 1e-3)
-    with pytest.raises(ValueError):
-        wavkit.transfer(x[:50], y[:50], RATE, points)
+    for inputs, outputs in ((50, 50), (1, 5000)):
+        with pytest.raises(ValueError, match="samples"):
+            wavkit.transfer(x[:inputs], y[:outputs], RATE, points)
 
 
 @pytest.mark.parametrize("x", [NOISE, COMPLEX], ids=["real", "complex"])

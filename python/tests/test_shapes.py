@@ -111,6 +111,9 @@ def test_xarray_keeps_coordinates():
     assert wavkit.filter(np.ones(2000), 98, bandpass=(5, 49)).shape == (2000,)
     daily = pandas.Series(np.arange(30.0), np.arange(30) * 49.0)
     assert wavkit.edges(daily, 28.0).tolist() == [28 * 49]
+    for function in (wavkit.correlate, wavkit.transfer):
+        with pytest.raises(ValueError, match="different rates: 8 and 4"):
+            function(x[:, 0], x[:, 1].assign_coords(time=2 * TIME))
     uneven = x.assign_coords(time=TIME**2)
     with pytest.raises(ValueError, match="equally spaced"):
         wavkit.spectrum(uneven, axis="time")

@@ -156,6 +156,14 @@ def countable(row: Array) -> Array:
     return row.astype("D" if row.dtype.kind == "c" else "d", copy=False)
 
 
+def common_rate(first: Runs, second: Runs) -> float:
+    """That of two signals, which coordinates of either tell."""
+    known = [runs.rate for runs in (first, second) if runs.labels is not None] or [first.rate]
+    if abs(known[0] - known[-1]) > 1e-6 * known[0]:
+        raise ValueError(f"the signals have different rates: {known[0]:g} and {known[-1]:g}")
+    return known[0]
+
+
 def same_length(name: str, *arguments: Any) -> Step:
     """The step that copies a signal and calls a function on it in place."""
 

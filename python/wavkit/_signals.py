@@ -12,7 +12,7 @@ from . import _functions as lib
 from ._filters import filter
 from ._labels import Labelled, numbers_of, places_of, values_at
 from ._record import Array, Record, lend
-from ._runs import Runs, call, same_length, without_mean
+from ._runs import Runs, call, common_rate, same_length, without_mean
 
 _METHODS = {
     "hold": lib.DSP_INTERP_HOLD,
@@ -239,7 +239,7 @@ def correlate(
     dtype = np.result_type(first.array, second.array)
     shape = np.broadcast_shapes(first.shape, second.shape)
     shift = first.points - 1
-    delta = (first if first.labels or not second.labels else second).delta
+    delta = 1 / common_rate(first, second)
 
     def rows(runs: Runs) -> list[Array]:
         every = np.broadcast_to(runs.array, (*shape, runs.points)).reshape(-1, runs.points)

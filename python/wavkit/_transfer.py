@@ -11,7 +11,7 @@ from numpy.typing import ArrayLike
 from . import _functions as lib
 from ._labels import Labelled
 from ._record import Array, Record, lend, samples_of
-from ._runs import Runs, call, checked_rate
+from ._runs import Runs, call, checked_rate, common_rate
 from ._spectra import step_of
 from ._windows import window_number
 
@@ -140,10 +140,10 @@ def transfer(
     """
     given = [Runs(v, rate, axis) for v in (x, y)]
     labelled = [runs for runs in given if runs.labels is not None]
+    if given[0].points != given[1].points:
+        raise ValueError(f"x has {given[0].points} samples and y {given[1].points}")
     first, second = np.broadcast_arrays(*(runs.array for runs in given))
-    meter = TransferMeter(
-        (labelled or given)[0].rate, points, window, overlap=overlap, detrend=detrend
-    )
+    meter = TransferMeter(common_rate(*given), points, window, overlap=overlap, detrend=detrend)
     shape = first.shape[:-1]
     found = []
     for index in np.ndindex(shape):
