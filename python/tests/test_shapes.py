@@ -119,6 +119,16 @@ def test_xarray_keeps_coordinates():
         wavkit.spectrum(uneven, axis="time")
 
 
+def test_new_axes_have_names_of_their_own():
+    course = xarray.DataArray(TONES.T, {"time": TIME}, ["frequency", "time"])
+    assert wavkit.spectrum(course).amplitude.dims == ("frequency", "frequency_2")
+    frames = wavkit.stft(course, size=16)
+    assert frames.bins.dims == ("frequency", "frequency_2", "time")
+    xarray.testing.assert_allclose(wavkit.istft(frames), course)
+    line = wavkit.fit(course.rename(frequency="at"))
+    assert line([1.0]).dims == line(xarray.DataArray([1.0], dims=["at"])).dims == ("at", "at_2")
+
+
 def test_pandas_keeps_coordinates():
     index = pandas.date_range("2026-03-01", periods=64, freq="125ms", name="when")
     table = pandas.DataFrame(RNG.normal(size=(64, 2)), index, ["a", "b"])

@@ -7,7 +7,7 @@ from __future__ import annotations
 
 import sys
 from datetime import datetime, timezone
-from typing import Any, Mapping
+from typing import Any, Iterable, Mapping
 
 import numpy as np
 
@@ -156,23 +156,42 @@ class _DataArray(Labels):
     def same(self, values: Array) -> Labelled:
         return self.x.copy(data=values)
 
+    @property
+    def _others(self) -> list[Any]:
+        """The dimensions of the signals."""
+        return [dim for dim in self.x.dims if dim != self.dim]
+
     def reduced(self, values: Array, axes: Axes) -> Labelled:
-        dims = [dim for dim in self.x.dims if dim != self.dim]
-        return self._made(values, [*dims, *axes], {**_apart(self.x, self.dim), **axes})
+        named = {_beside(self._others, name): places for name, places in axes.items()}
+        return self._made(values, [*self._others, *named], {**_apart(self.x, self.dim), **named})
 
     def along(self, values: Array, name: str, places: Any) -> Labelled:
+        name = _beside(self._others, name)
         dims = [name if dim == self.dim else dim for dim in self.x.dims]
         return self._made(values, dims, {**_apart(self.x, self.dim), name: np.asarray(places)})
 
+    @property
+    def _plane(self) -> list[Any]:
+        """The dimensions of spectra that follow one another."""
+        return [_beside(self._others, name) for name in ("frequency", self.course)]
+
     def planes(self, made: Labelled) -> Array:
         # Arithmetic of xarray may have changed the order of the dimensions.
-        return np.asarray(made.transpose(..., "frequency", self.course).values)
+        return np.asarray(made.transpose(..., *self._plane).values)
 
     def restored(self, made: Labelled, values: Array) -> Labelled:
-        ends = ("frequency", self.course)
+        ends = self._plane
         own = {name: c for name, c in self.x.coords.items() if c.dims == (self.dim,)}
         dims = [dim for dim in made.dims if dim not in ends]
         return self._made(values, [*dims, self.dim], {**_apart(made, *ends), **own})
+
+
+def _beside(others: Iterable[Any], name: str) -> str:
+    """The name of a new dimension, numbered where another one has it."""
+    taken, number, free = set(others), 2, name
+    while free in taken:
+        free, number = f"{name}_{number}", number + 1
+    return free
 
 
 def _apart(x: Any, *dims: Any) -> dict[Any, Any]:
@@ -272,10 +291,12 @@ def values_at(of_each: Labelled, values: Array, x: Any) -> Labelled:
     package, places = package_of(of_each), np.asarray(x)
     if package == "xarray":
         if package_of(x) == "xarray":
+            x = x.rename({dim: _beside(of_each.dims, dim) for dim in x.dims})
             dims, coords = list(x.dims), dict(x.coords)
         else:
-            dims = ["at"] if places.ndim == 1 else [f"at_{i}" for i in range(places.ndim)]
-            coords = {"at": places} if places.ndim == 1 else {}
+            names = ["at"] if places.ndim == 1 else [f"at_{i}" for i in range(places.ndim)]
+            dims = [_beside(of_each.dims, name) for name in names]
+            coords = {dims[0]: places} if places.ndim == 1 else {}
         return type(of_each)(
             values, dims=[*of_each.dims, *dims], coords={**coords, **of_each.coords}
         )
