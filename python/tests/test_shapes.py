@@ -79,6 +79,20 @@ def test_empty_and_senseless_input():
             wavkit.average(np.ones(50), **{"points": 10, **wrong})
 
 
+def test_senseless_axes():
+    x, table = np.ones((20, 2)), pandas.DataFrame(np.ones((20, 2)))
+    room = xarray.DataArray(x, dims=["time", "room"])
+    for given, axis in ((x, 2), (x[:, 0], 7), (x[:, 0], -2), (room, 2), (table, 2)):
+        with pytest.raises(IndexError):  # NumPy's AxisError
+            wavkit.envelope(given, axis=axis)
+    for given, axis in ((table, 1), (table, "index"), (x, "time"), (room, "channel")):
+        with pytest.raises(ValueError, match="columns|dimension"):
+            wavkit.envelope(given, axis=axis)
+    for axis in (None, 1.5, 0.0):
+        with pytest.raises(TypeError):
+            wavkit.envelope(x[:, 0], axis=axis)
+
+
 TIME = 5 + np.arange(64) / 8
 
 

@@ -5,6 +5,7 @@ Neither package is imported: whoever passes an object of theirs has done it.
 
 from __future__ import annotations
 
+import operator
 import sys
 from datetime import datetime, timezone
 from typing import Any, Iterable, Mapping
@@ -15,6 +16,8 @@ from ._record import Array
 
 #: Arrays come out as arrays; what came as an object of xarray or pandas comes out as one.
 Labelled = Any
+
+_AxisError = getattr(np, "exceptions", np).AxisError
 
 #: Whose objects have coordinates.
 PACKAGES = ("xarray", "pandas")
@@ -143,7 +146,11 @@ def numbers_of(given: Any, first: Any) -> Array:
 class _DataArray(Labels):
     def __init__(self, x: Any, axis: int | str) -> None:
         self.x, self.values = x, np.asarray(x.values)
-        self.axis = x.dims.index(axis) if isinstance(axis, str) else range(x.ndim)[axis]
+        if isinstance(axis, str) and axis not in x.dims:
+            raise ValueError(
+                f"there is no dimension {axis!r}; there are {', '.join(map(str, x.dims))}"
+            )
+        self.axis = x.dims.index(axis) if isinstance(axis, str) else axis_of(axis, x.ndim)
         self.dim = x.dims[self.axis]
         self.name = str(self.dim)
 
@@ -202,7 +209,9 @@ def _apart(x: Any, *dims: Any) -> dict[Any, Any]:
 class _Frame(Labels):
     """A Series, or a DataFrame whose columns are the signals."""
 
-    def __init__(self, x: Any) -> None:
+    def __init__(self, x: Any, axis: int | str) -> None:
+        if axis != -1 and axis_of(axis, x.ndim) != 0:
+            raise ValueError("the signals of a table are its columns: pass its transpose for rows")
         self.x, self.values, self.axis = x, x.to_numpy(), 0
         self.name = None if x.index.name is None else str(x.index.name)
 
@@ -278,11 +287,21 @@ def package_of(x: Any) -> str:
     return type(x).__module__.partition(".")[0]
 
 
+def axis_of(axis: Any, dimensions: int) -> int:
+    """The number of an axis, from 0 on."""
+    if isinstance(axis, str):
+        raise ValueError("only dimensions of xarray have names")
+    number = operator.index(axis)
+    if not -dimensions <= number < dimensions:
+        raise _AxisError(number, dimensions)
+    return number % dimensions
+
+
 def labels_of(x: Any, axis: int | str) -> Labels | None:
     package = package_of(x)
     if package not in PACKAGES:
         return None
-    return _DataArray(x, axis) if package == "xarray" else _Frame(x)
+    return _DataArray(x, axis) if package == "xarray" else _Frame(x, axis)
 
 
 def values_at(of_each: Labelled, values: Array, x: Any) -> Labelled:

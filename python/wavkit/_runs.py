@@ -9,7 +9,7 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions
-from ._labels import Axes, Labelled, inverse, labels_of
+from ._labels import Axes, Labelled, axis_of, inverse, labels_of
 from ._record import Array, Record, lend, samples_of
 
 #: A step reads one record and leaves its result in another.
@@ -46,9 +46,8 @@ class Runs:
         if array.ndim == 0:
             raise ValueError("a signal has samples along an axis, not a single value")
         number = axis if self.labels is None else self.labels.axis
-        if isinstance(number, str):
-            raise ValueError("only dimensions of xarray have names")
-        self.axis = number if array.ndim > 1 or number not in (0, -1) else -1
+        number = axis_of(number, array.ndim)
+        self.axis = number if number < array.ndim - 1 else -1
         own = self.labels.rate() if self.labels is not None and rate is None else None
         self.rate = own or checked_rate(1.0 if rate is None else rate)
         self.delta = inverse(own) if own else 1.0 / float(self.rate)
