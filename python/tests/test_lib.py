@@ -176,6 +176,8 @@ def test_failures_say_which_call_and_why():
     assert caught.value.function == "dspfi_window"
     again = pickle.loads(pickle.dumps(caught.value))
     assert str(again) == str(caught.value) and again.reason == caught.value.reason
+    with pytest.raises(wavkit.Error, match=r"see help\(wavkit.lib.dspc_iir_zpk\)"):
+        wavkit.design_zpk("lowpass", 0.1, order=0)
     for wrong in (lib.Record(np.ones(3, "f4")), None, np.ones(3)):
         with pytest.raises((TypeError, AttributeError)):
             lib.dspi_neg(wrong)

@@ -33,13 +33,13 @@ class Error(Exception):
 
 
 def failed(function: Callable[..., Any], *arguments: object) -> Error:
-    """The error of a call, with its arguments and the reasons that the headers give."""
+    """The error of a call, with its arguments and the reasons that the headers give, if any."""
     name, text = function.__name__, " ".join((function.__doc__ or "").split())
     returns = re.search(r"Returns .*?-1\b[,:]? *(.*)", text)
     reason = (
         returns[1]
         if returns
-        else "the record is complex where a real one is wanted, or memory ran out"
+        else f"the library refused it or ran out of memory: see help(wavkit.lib.{name})"
     )
     return Error(name, f"{name}({', '.join(map(repr, arguments))})", reason)
 
