@@ -255,6 +255,28 @@ def test_changed_frames_give_signals_of_what_is_left():
     assert type(plain) is np.ndarray and plain == pytest.approx(TONES[:, 0])
 
 
+@pytest.mark.parametrize("dtype", ["Int64", "Float32", "boolean"])
+def test_other_types_of_pandas(dtype):
+    values = TONES[:, 0] > 0 if dtype == "boolean" else TONES[:, 0].round()
+    x = pandas.Series(values, TIME).astype(dtype)
+    plain = x.to_numpy("f4" if dtype == "Float32" else "f8")
+    expected = wavkit.spectrum(plain, 8).amplitude
+    table = pandas.DataFrame({"a": x, "b": x})
+    named = x.set_axis([f"sample {i}" for i in range(64)])
+    for found in (
+        wavkit.spectrum(x).amplitude,
+        wavkit.spectrum(table).amplitude["b"],
+        wavkit.spectrum(x.array, 8).amplitude,
+        wavkit.spectrum(pandas.Index(x), 8).amplitude,
+        wavkit.spectrum(named).amplitude,
+    ):
+        np.testing.assert_array_equal(found, expected)
+    assert wavkit.spectrum(named).frequency[-1] == 0.5  # names tell no rate
+    x.iloc[3] = pandas.NA
+    assert wavkit.hist(x, 2, (-1, 1)).nan == 1
+    assert wavkit.fit(x.index.astype("float"), plain).slope == wavkit.fit(TIME, plain).slope
+
+
 def test_dates_stay_dates_in_blocks_too():
     index = pandas.date_range("2026-03-01", periods=64, freq="125ms", tz="Europe/Berlin")
     table = pandas.DataFrame(TONES, index, ["a", "b"])

@@ -12,7 +12,7 @@ from typing import Any, Iterable, Mapping
 
 import numpy as np
 
-from ._record import Array
+from ._record import Array, as_array
 
 #: Arrays come out as arrays; what came as an object of xarray or pandas comes out as one.
 Labelled = Any
@@ -57,13 +57,13 @@ class Labels:
         return inverse(step, min(rounding / reach, 1e-6))
 
     def places(self) -> Array | None:
+        """The coordinate of the samples, where it is one of numbers or dates."""
         raise NotImplementedError
 
     def first(self) -> Any:
         """The place of the first sample: a number, a date, or 0 where there is none."""
         places = self.places()
-        known = places is not None and len(places) and places.dtype.kind in "iufmM"
-        return places[0] if places is not None and known else 0.0
+        return places[0] if places is not None and len(places) else 0.0
 
     def start(self) -> float:
         """The same, as far as it is a number."""
@@ -116,13 +116,18 @@ def inverse(step: float, rounding: float = 0.0) -> float:
     return exact
 
 
+def _measures(places: Array) -> Array | None:
+    """Places, if they are numbers or dates: names are no axis."""
+    return places if places.dtype.kind in "iufmM" else None
+
+
 def _is_date(place: Any) -> bool:
     return isinstance(place, (np.datetime64, np.timedelta64))
 
 
 def places_of(given: Any) -> Array:
     """Places as an array of numbers or dates: of a zone they are dates of UTC."""
-    places = np.asarray(given)
+    places = as_array(given)
     if places.dtype.kind == "O" and places.size and isinstance(places.flat[0], datetime):
         plain = [d if d.tzinfo is None else d.astimezone(timezone.utc) for d in places.flat]
         dates = [d.replace(tzinfo=None) for d in plain]
@@ -155,7 +160,7 @@ class _DataArray(Labels):
         self.name = str(self.dim)
 
     def places(self) -> Array | None:
-        return np.asarray(self.x[self.dim].values) if self.dim in self.x.coords else None
+        return _measures(self.x[self.dim].values) if self.dim in self.x.coords else None
 
     def _made(self, values: Array, dims: list[Any], coords: Mapping[Any, Any]) -> Any:
         return type(self.x)(values, dims=dims, coords=coords, name=self.x.name)
@@ -212,15 +217,14 @@ class _Frame(Labels):
     def __init__(self, x: Any, axis: int | str) -> None:
         if axis != -1 and axis_of(axis, x.ndim) != 0:
             raise ValueError("the signals of a table are its columns: pass its transpose for rows")
-        self.x, self.values, self.axis = x, x.to_numpy(), 0
+        self.x, self.values, self.axis = x, as_array(x), 0
         self.name = None if x.index.name is None else str(x.index.name)
 
     def places(self) -> Array | None:
         index = self.x.index
         if isinstance(index, sys.modules["pandas"].RangeIndex):
             return None
-        found: Array = (index if _zone(index) is None else index.tz_convert(None)).to_numpy()
-        return found
+        return _measures(as_array(index if _zone(index) is None else index.tz_convert(None)))
 
     def later(self, seconds: Array) -> Any:
         places, zone = super().later(seconds), _zone(self.x.index)
@@ -299,7 +303,7 @@ def axis_of(axis: Any, dimensions: int) -> int:
 
 def labels_of(x: Any, axis: int | str) -> Labels | None:
     package = package_of(x)
-    if package not in PACKAGES:
+    if package not in PACKAGES or not hasattr(x, "coords" if package == "xarray" else "index"):
         return None
     return _DataArray(x, axis) if package == "xarray" else _Frame(x, axis)
 

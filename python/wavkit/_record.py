@@ -79,6 +79,18 @@ def _kind_of(dtype: DTypeLike) -> _Kind:
     return found or _kinds[letter_of(np.dtype(dtype))]
 
 
+def as_array(values: Any) -> Array:
+    """An array of values; those of pandas that may be missing as numbers, NaN where they are."""
+    if not hasattr(values, "to_numpy"):
+        return np.asarray(values)
+    kinds = list(values.dtypes) if hasattr(values, "columns") else [values.dtype]
+    if not any(hasattr(kind, "numpy_dtype") for kind in kinds):
+        return np.asarray(values)
+    common = np.result_type(*(getattr(kind, "numpy_dtype", kind) for kind in kinds))
+    result: Array = values.to_numpy(letter_of(common), na_value=np.nan)
+    return result
+
+
 def samples_of(values: ArrayLike, dtype: DTypeLike = None) -> Array:
     """An array of one of the four types that records are made of, copied only if it was another."""
     if type(values) is np.ndarray and dtype is None:
@@ -86,7 +98,7 @@ def samples_of(values: ArrayLike, dtype: DTypeLike = None) -> Array:
     elif isinstance(values, np.ma.MaskedArray) and np.any(values.mask):
         raise ValueError("samples are missing: the array is masked")
     else:
-        array = np.asarray(values, dtype)
+        array = np.asarray(as_array(values), dtype)
     if array.dtype.char not in _kinds or not array.dtype.isnative:
         array = array.astype(letter_of(array.dtype))
     return array
