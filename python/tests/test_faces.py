@@ -324,6 +324,16 @@ def test_streams_that_begin_at_rest(recursive, dtype):
         stream.reset()
 
 
+@pytest.mark.parametrize("taps", [RNG.normal(size=9), wavkit.design_iir("lowpass", 0.1)])
+@pytest.mark.parametrize("hold", [False, True])
+def test_real_and_complex_blocks(taps, hold):
+    parts = [NOISE[:50], COMPLEX[50:90], NOISE[90:130], NOISE[130:]]
+    streams = wavkit.Filter(taps, hold=hold), wavkit.Filter(taps, hold=hold)
+    close(np.concatenate([streams[0](p) for p in parts]), streams[1](np.concatenate(parts)))
+    streams[0].reset()
+    assert streams[0](parts[0]).dtype == float
+
+
 @pytest.mark.parametrize("kind", ["lowpass", "bandstop", "notch"])
 def test_zeros_and_poles(kind):
     edges = (100, 200) if kind == "bandstop" else (100,)

@@ -177,7 +177,8 @@ class Filter:
 
     Blocks may have any shape: signals lie along the last axis, and each has its own state. A table
     of six columns is one of second-order sections, of which `delay` is 0. Before the first block
-    there are zeros, with `hold` its first sample for ever, so that no step from zero rings.
+    there are zeros, with `hold` its first sample for ever, so that no step from zero rings. From the
+    first complex block on all outputs are complex.
 
     >>> smooth = wavkit.Filter([0.5, 0.5])
     >>> smooth([1.0, 3.0]), smooth([5.0])
@@ -200,9 +201,13 @@ class Filter:
         """Forgets the signal so far: the next block is the first."""
         self._states: list[Record] = []
         self._of: tuple[Any, ...] | None = None
+        self._complex = False
 
     def __call__(self, block: ArrayLike | Any) -> Labelled:
         runs = Runs(block)
+        self._complex = self._complex or runs.is_complex
+        if self._complex:
+            runs.become(runs.array.dtype.char.upper())  # the state goes on with imaginary parts
         letter = runs.array.dtype.char
         taps = lend(self.taps.ravel() if self._recursive else in_precision_of(self.taps, letter))
         self._begin(runs, letter)
