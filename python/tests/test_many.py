@@ -4,6 +4,7 @@ import os
 
 import dask.array as da
 import numpy as np
+import pandas
 import pytest
 import wavkit
 import wavkit.dask
@@ -77,6 +78,12 @@ def test_merged_averages_are_those_of_one_pass(client, type):
         assert np.array_equal(merged.frequency, once.frequency)
 
 
+def test_merged_averages_keep_coordinates():
+    x = pandas.Series(RNG.normal(size=5000), 3 + np.arange(5000) / 98)
+    once, merged = (f(x, points=500).density for f in (wavkit.average, wavkit.dask.average))
+    pandas.testing.assert_series_equal(merged, once)
+
+
 @pytest.mark.parametrize("options", [{"type": "every"}, {"forget": 5}, {"type": "mean"}])
 def test_averages_that_cannot_be_merged_are_refused(options):
     with pytest.raises(ValueError, match="merged"):
@@ -104,6 +111,13 @@ def test_filtered_chunks_are_those_of_one_pass(client, options):
     expected = wavkit.filter(x, 100, **options)
     assert found.dtype == chunks.dtype == expected.dtype and chunks.shape == expected.shape
     np.testing.assert_allclose(found, expected, atol=1e-12)
+
+
+@pytest.mark.parametrize("hold", [False, True])
+def test_arrays_shorter_than_the_taps_are_filtered(hold):
+    x = RNG.normal(size=(3, 9))
+    found = wavkit.dask.filter(da.from_array(x, chunks=(2, 4)), 100, lowpass=5, hold=hold)
+    np.testing.assert_allclose(found.compute(), wavkit.filter(x, 100, lowpass=5, hold=hold))
 
 
 @pytest.mark.parametrize(("rate", "new_rate"), [(3, 2), (2, 3), (44100, 48000), (10, 1), (1, 1)])

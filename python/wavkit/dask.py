@@ -19,8 +19,9 @@ from numpy.typing import ArrayLike
 
 from . import _filters, _rates, _spectra
 from ._files import Signal, read
+from ._labels import labels_of
 from ._record import Array, Error, letter_of
-from ._runs import Runs
+from ._runs import Runs, checked_rate
 from ._spectra import Spectrum
 
 Path = str | os.PathLike[str]
@@ -96,7 +97,7 @@ _MERGES: Mapping[str, Callable[[Array, Array, float], Array]] = {
 
 def average(
     recording: ArrayLike | Any,
-    rate: float = 1.0,
+    rate: float | None = None,
     points: int = 1024,
     window: str = "hann",
     *,
@@ -108,7 +109,8 @@ def average(
     """`wavkit.average()` of one long signal, whose pieces are averaged apart, on the workers where
     there is a client, and merged: the same to rounding. The signal is an array of one dimension, of
     NumPy or of Dask; pieces overlap as segments do. Averages that go from segment to segment cannot
-    be merged: `every` and `forget` are refused.
+    be merged: `every` and `forget` are refused. Coordinates of xarray and pandas tell the rate, and
+    the spectrum has them.
 
     >>> noise = np.random.default_rng(1).normal(size=100_000)
     >>> once, merged = wavkit.average(noise, 1000), wavkit.dask.average(noise, 1000)
@@ -119,7 +121,12 @@ def average(
         raise ValueError(f"an average of type {type!r} cannot be merged; {', '.join(_MERGES)} can")
     if options.get("forget"):
         raise ValueError("an average that forgets goes from segment to segment: it is not merged")
-    signal = recording if isinstance(recording, da.Array) else np.asarray(recording)
+    runs = None if labels_of(recording, -1) is None else Runs(recording, rate)
+    if runs is None:
+        signal = recording if isinstance(recording, da.Array) else np.asarray(recording)
+        rate = checked_rate(1.0 if rate is None else rate)
+    else:
+        signal, rate = runs.array, runs.rate
     if signal.ndim != 1:
         raise ValueError("a long recording is one signal: pass them one at a time")
     options = {**options, "window": window, "overlap": overlap, "type": type}
@@ -136,7 +143,7 @@ def average(
         total = merge(total, power, float(now - before) / float(now))
     whole = _spectra.average(np.asarray(signal[:points]), rate, points, **options)
     title = f"{count} segments of {points}"
-    return Spectrum(whole._runs, whole._layout, np.sqrt(total).astype(total.dtype), title)
+    return Spectrum(runs or whole._runs, whole._layout, np.sqrt(total).astype(total.dtype), title)
 
 
 def _averaged(piece: Array, rate: float, points: int, options: dict[str, Any]) -> Array:
@@ -162,19 +169,18 @@ def filter(x: da.Array, rate: float = 1.0, *, axis: int = -1, **options: Any) ->
     for taps in _filters.chain(rate, options.pop("taps", None), bands, **options):
         back = _filters.delay_of(taps) if delay is None else delay
         depth = max(len(taps) - 1 - back, back, 0)
-        x = da.map_overlap(
-            _filters.filter,
-            x,
-            depth={axis: depth},
-            boundary={axis: "nearest" if hold else 0},
-            taps=taps,
-            delay=back,
-            axis=axis,
-            meta=np.empty(
-                (0,) * x.ndim,
-                np.result_type(letter_of(x.dtype), "F" if taps.dtype.kind == "c" else "f"),
-            ),
-        )
+        kind = np.result_type(letter_of(x.dtype), "F" if taps.dtype.kind == "c" else "f")
+        settings = {
+            "taps": taps,
+            "delay": back,
+            "axis": axis,
+            "meta": np.empty((0,) * x.ndim, kind),
+        }
+        if depth < x.shape[axis]:
+            edges = {axis: "nearest" if hold else 0}
+            x = da.map_overlap(_filters.filter, x, depth={axis: depth}, boundary=edges, **settings)
+        else:  # no chunk has so many neighbours
+            x = x.rechunk({axis: -1}).map_blocks(_filters.filter, hold=hold, **settings)
     return x
 
 
