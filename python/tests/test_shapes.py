@@ -74,6 +74,16 @@ def test_empty_and_senseless_input():
     for rate in (0, -1, np.nan, np.inf):
         with pytest.raises(ValueError, match="rate"):
             wavkit.spectrum([1.0, 2.0], rate)
+    for senseless in (
+        lambda: wavkit.design("lowpass", 0.1, transition=0),
+        lambda: wavkit.design_iir("notch", 0.1, q=0),
+        lambda: wavkit.decimate([1.0, 2.0], 0),
+        lambda: wavkit.over_angle(np.ones(99), np.arange(5) * 20.0, per_revolution=np.inf),
+        lambda: wavkit.response([1.0], rate=0),
+        lambda: wavkit.response_iir([[1.0, 0, 0, 1, 0, 0]], rate=0),
+    ):
+        with pytest.raises(ValueError):
+            senseless()
     for wrong in ({"points": 0}, {"overlap": 100}, {"type": "mean"}, {"points": 99}):
         with pytest.raises(ValueError):
             wavkit.average(np.ones(50), **{"points": 10, **wrong})

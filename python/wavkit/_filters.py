@@ -47,6 +47,8 @@ def _size(
 ) -> tuple[int, float]:
     """Number of taps and transition by J. F. Kaiser's estimate (1974): a filter of N taps
     attenuates by 7.95 dB and 14.36 dB more for every cycle of (N - 1) transition."""
+    if transition is not None and not transition > 0:
+        raise ValueError("a transition is wider than 0")
     cycles = ((60 if attenuation is None else attenuation) - 7.95) / 14.36
     if length is not None:
         if transition is not None and attenuation is not None:
@@ -338,7 +340,7 @@ def response(taps: ArrayLike, rate: float = 1.0, points: int = 1024) -> Response
     h = samples_of(taps).astype("D" if np.iscomplexobj(taps) else "d")
     if len(h) > 2 * points:
         raise ValueError(f"{len(h)} taps take at least {len(h) // 2 + 1} points")
-    with Record(h, 1 / rate) as x:
+    with Record(h, 1 / checked_rate(rate)) as x:
         lib.dspi_rtoc(x)
         lib.dspi_zpad(x, 2 * points)
         lib.dspi_dft(x, lib.DSP_TRANSFORM_FORWARD)

@@ -29,8 +29,11 @@ def _over_angle(
 ) -> tuple[Runs, Array, int]:
     runs = Runs(x, rate, axis)
     places = (numbers_of(pulses, runs.first()) - runs.start()) / runs.delta
-    if places.ndim != 1 or len(places) < 5 or not np.all(np.diff(places) > 0):
+    rising = places.ndim == 1 and np.isfinite(places).all() and np.all(np.diff(places) > 0)
+    if not rising or len(places) < 5:
         raise ValueError("the pulses are 5 times or more, in ascending order")
+    if not 0 < per_revolution < math.inf:
+        raise ValueError(f"a revolution has pulses, not {per_revolution}")
     angles = _angles_of(angles, float(np.diff(places).max()) * per_revolution)
     lent = lend(np.ascontiguousarray(places))
     return (

@@ -85,6 +85,8 @@ def _design(
     checked_rate(rate)
     places = checked_edges([f / rate for f in edges], rate)
     if kind in _SINGLE:
+        if not q > 0:
+            raise ValueError(f"the quality of a resonance is above 0, not {q}")
         return _SINGLE[kind], 0, 1, places[0], places[0] / q, 0, 0
     band = _BANDS[kind]
     return _DESIGNS[prototype], band, order, places[0], places[-1], ripple, attenuation
@@ -165,6 +167,7 @@ def response_iir(sections: ArrayLike, rate: float = 1.0, points: int = 1024) -> 
     >>> abs(answer.gain[[0, 45, 50]]).round(3), float(answer.delay[0].round(2))
     (array([1.   , 0.725, 0.   ]), 0.64)
     """
+    checked_rate(rate)
     at, rows = np.linspace(0, 0.5, points + 1), lend(sections_of(sections))
     with Record() as gain, Record() as delay:
         call("dspc_iir_response", gain, rows, lend(at))
