@@ -331,6 +331,9 @@ def test_dates_are_places(zone):
     ]
     for ours, theirs in fits:
         np.testing.assert_allclose(ours(some), theirs(seconds), 1e-9)
+        np.testing.assert_allclose(ours(some[1]), theirs(seconds[1]), 1e-9)
+    later = pandas.Series(plain, index - index[0])
+    assert wavkit.interp(None, later, [pandas.Timedelta("500ms")]).iloc[0] == plain[4]
     turned = wavkit.over_angle(x, index[::8] + pandas.Timedelta("10ms"), angles=8)
     expected = wavkit.over_angle(plain, np.arange(8) + 0.01, 8, angles=8)
     np.testing.assert_allclose(turned, expected, 1e-9)

@@ -9,7 +9,7 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
-from ._labels import Labelled, numbers_of, places_of, values_at
+from ._labels import Labelled, from_first, numbers_of, values_at
 from ._record import Array, Record, lend
 from ._runs import Runs
 
@@ -23,11 +23,9 @@ def _pairs(
     if y is None:
         first, abscissae = runs.first(), runs.start() + np.arange(runs.points) * runs.delta
     else:
-        places = places_of(x)
-        if places.ndim > 1:
-            places = np.moveaxis(places, runs.axis, -1)
-        first = places.flat[0] if places.size else 0.0
-        abscissae = numbers_of(places, first)
+        first, abscissae = from_first(x)
+        if abscissae.ndim > 1:
+            abscissae = np.moveaxis(abscissae, runs.axis, -1)
     if runs.is_complex:
         raise ValueError("a fit goes through real values")
     try:

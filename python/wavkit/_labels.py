@@ -7,7 +7,7 @@ from __future__ import annotations
 
 import operator
 import sys
-from datetime import datetime, timezone
+from datetime import datetime, timedelta, timezone
 from typing import Any, Iterable, Mapping
 
 import numpy as np
@@ -116,6 +116,13 @@ def inverse(step: float, rounding: float = 0.0) -> float:
     return exact
 
 
+def from_first(given: Any) -> tuple[Any, Array]:
+    """The first of places, and them as numbers that count from it where they are dates."""
+    places = places_of(given)
+    first = places.flat[0] if places.size else 0.0
+    return first, numbers_of(places, first)
+
+
 def _measures(places: Array) -> Array | None:
     """Places, if they are numbers or dates: names are no axis."""
     return places if places.dtype.kind in "iufmM" else None
@@ -128,11 +135,23 @@ def _is_date(place: Any) -> bool:
 def places_of(given: Any) -> Array:
     """Places as an array of numbers or dates: of a zone they are dates of UTC."""
     places = as_array(given)
-    if places.dtype.kind == "O" and places.size and isinstance(places.flat[0], datetime):
-        plain = [d if d.tzinfo is None else d.astimezone(timezone.utc) for d in places.flat]
-        dates = [d.replace(tzinfo=None) for d in plain]
-        places = np.array(dates, "M8[ns]").reshape(places.shape)
+    objects = places.dtype.kind == "O" and places.size > 0
+    if objects and isinstance(places.flat[0], (datetime, timedelta)):
+        places = np.array([_exact(place) for place in places.flat]).reshape(places.shape)
     return places
+
+
+def _exact(place: Any) -> Any:
+    """A date or a duration of Python or pandas, whose have nanoseconds, as one of NumPy."""
+    if hasattr(place, "to_datetime64"):
+        return place.to_datetime64()
+    if hasattr(place, "to_timedelta64"):
+        return place.to_timedelta64()
+    if isinstance(place, timedelta):
+        return np.timedelta64(place)
+    if place.tzinfo is not None:
+        place = place.astimezone(timezone.utc).replace(tzinfo=None)
+    return np.datetime64(place)
 
 
 def numbers_of(given: Any, first: Any) -> Array:
@@ -314,7 +333,8 @@ def values_at(of_each: Labelled, values: Array, x: Any) -> Labelled:
     package, places = package_of(of_each), np.asarray(x)
     if package == "xarray":
         if package_of(x) == "xarray":
-            x = x.rename({dim: _beside(of_each.dims, dim) for dim in x.dims})
+            taken = set(x.dims) & set(of_each.dims)
+            x = x.rename({dim: _beside(of_each.dims, dim) for dim in taken}) if taken else x
             dims, coords = list(x.dims), dict(x.coords)
         else:
             names = ["at"] if places.ndim == 1 else [f"at_{i}" for i in range(places.ndim)]

@@ -83,7 +83,7 @@ def as_array(values: Any) -> Array:
     """An array of values; those of pandas that may be missing as numbers, NaN where they are."""
     if not hasattr(values, "to_numpy"):
         return np.asarray(values)
-    kinds = list(values.dtypes) if hasattr(values, "columns") else [values.dtype]
+    kinds = list(values.dtypes) if hasattr(values, "columns") else [getattr(values, "dtype", None)]
     if not any(hasattr(kind, "numpy_dtype") for kind in kinds):
         return np.asarray(values)
     common = np.result_type(*(getattr(kind, "numpy_dtype", kind) for kind in kinds))

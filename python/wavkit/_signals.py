@@ -10,7 +10,7 @@ from numpy.typing import ArrayLike
 
 from . import _functions as lib
 from ._filters import filter
-from ._labels import Labelled, numbers_of, places_of, values_at
+from ._labels import Labelled, from_first, numbers_of, places_of, values_at
 from ._record import Array, Record, lend
 from ._runs import Runs, call, common_rate, same_length, without_mean
 
@@ -164,9 +164,7 @@ def interp(
     if x is None:
         first, places = runs.first(), runs.start() + np.arange(runs.points) * runs.delta
     else:
-        dates_or_numbers = places_of(x)
-        first = dates_or_numbers.flat[0] if dates_or_numbers.size else 0.0
-        places = numbers_of(dates_or_numbers, first)
+        first, places = from_first(x)
     if places.shape != (runs.points,) or not (runs.points and np.all(np.diff(places) > 0)):
         raise ValueError("a table has as many places as values, one at least, in ascending order")
     table, wanted = lend(places), numbers_of(at, first)
