@@ -751,12 +751,14 @@ def test_what_files_do_not_hold_is_told(tmp_path, monkeypatch):
 def test_files_that_cannot_be_read(tmp_path):
     (tmp_path / "bad.dsp").write_bytes(b"\xbe\x30\x03\xeb" + bytes(12))
     (tmp_path / "bad.wav").write_text("no sound")
-    (tmp_path / "empty.txt").write_text("")
+    for name in ("empty.txt", "empty.npy"):
+        (tmp_path / name).write_text("")
     for name, error in (
         ("bad.dsp", wavkit.Error),
         ("bad.wav", OSError),
         ("none.dsp", OSError),
         ("empty.txt", OSError),
+        ("empty.npy", OSError),
     ):
         with pytest.raises(error):
             wavkit.read(tmp_path / name)

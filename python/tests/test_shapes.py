@@ -131,6 +131,7 @@ def test_xarray_keeps_coordinates():
     # 1 / (1 / 98) is more than 98, and the steps of such places are no thousandths.
     long = xarray.DataArray(np.ones(4000), {"time": 5 + np.arange(4000) / 1000}, ["time"])
     assert len(wavkit.resample(long, None, 500)) == 2000
+    assert wavkit.stft(long.assign_coords(time=long.time.astype("f4"))).rate == 1000
     assert wavkit.filter(long, bandpass=(100, 500)).shape == (4000,)
     assert wavkit.filter(np.ones(2000), 98, bandpass=(5, 49)).shape == (2000,)
     daily = pandas.Series(np.arange(30.0), np.arange(30) * 49.0)

@@ -40,7 +40,7 @@ def signals(path: str | os.PathLike[str]) -> Iterator[Signal]:
         yield from _signals(os.fspath(path))
         return
     if suffix == _NUMPY:
-        array = np.atleast_2d(samples_of(np.load(path)))
+        array = np.atleast_2d(_loaded(os.fspath(path)))
         for row in np.ndindex(array.shape[:-1]):
             yield Signal(array[row], 1.0)
         return
@@ -68,6 +68,13 @@ def _signals(path: str) -> Iterator[Signal]:
 def _rate_of(delta: float) -> float:
     """By a spacing from a file, which may have been written in single precision."""
     return inverse(delta, 2.0**-24 if np.float32(delta) == delta else 0.0)
+
+
+def _loaded(path: str) -> Array:
+    try:
+        return samples_of(np.load(path))
+    except (EOFError, TypeError, ValueError) as error:
+        raise OSError(f"{path} holds no samples: {error}") from None
 
 
 def _opened(path: str, mode: str) -> Any:
@@ -132,7 +139,7 @@ def write(
         with open(path, "wb") as stream:
             np.save(stream, runs.array)
         if runs.rate != 1:
-            warnings.warn(f"{path} holds no rate: {runs.rate:g} is lost", stacklevel=2)
+            warnings.warn(f"{path} holds no rate: {float(runs.rate):g} is lost", stacklevel=2)
         return
     if suffix not in _BINARY | _TEXT:
         runs.widen()  # a spacing in single precision is another rate

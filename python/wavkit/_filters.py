@@ -179,8 +179,8 @@ class Filter:
 
     Blocks may have any shape: signals lie along the last axis, and each has its own state. A table
     of six columns is one of second-order sections, of which `delay` is 0. Before the first block
-    there are zeros, with `hold` its first sample for ever, so that no step from zero rings. From the
-    first complex block on all outputs are complex.
+    there are zeros, with `hold` its first sample for ever, so that no step from zero rings. From
+    the first complex block on all outputs are complex.
 
     >>> smooth = wavkit.Filter([0.5, 0.5])
     >>> smooth([1.0, 3.0]), smooth([5.0])

@@ -9,7 +9,7 @@ import numpy as np
 from numpy.typing import ArrayLike
 
 from . import _functions as lib
-from ._labels import Labelled, from_first, numbers_of, values_at
+from ._labels import Labelled, axis_of, from_first, labels_of, numbers_of, values_at
 from ._record import Array, Record, lend
 from ._runs import Runs
 
@@ -25,7 +25,9 @@ def _pairs(
     else:
         first, abscissae = from_first(x)
         if abscissae.ndim > 1:
-            abscissae = np.moveaxis(abscissae, runs.axis, -1)
+            own = labels_of(x, axis)
+            number = axis_of(axis, abscissae.ndim) if own is None else own.axis
+            abscissae = np.moveaxis(abscissae, number, -1)
     if runs.is_complex:
         raise ValueError("a fit goes through real values")
     try:

@@ -44,12 +44,13 @@ class Labels:
         if found is None or len(found) < 2:
             return None
         places: Any = found
-        rounding = 1e-9  # of dates, in seconds
+        rounding = 0.0
         if places.dtype.kind in "mM":
+            rounding = 1e-9  # of dates, in seconds
             places = (places - places[0]) / np.timedelta64(1, "s")
-        else:
-            places = places.astype(float)
+        elif places.dtype.kind == "f":
             rounding = 2 * float(np.spacing(np.max(np.abs(places[[0, -1]]))))
+        places = places.astype(float, copy=False)
         steps, reach = np.diff(places), float(places[-1] - places[0])
         step = reach / len(steps)
         if not step > 0 or np.max(np.abs(steps - step)) > step / 20:

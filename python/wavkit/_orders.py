@@ -53,9 +53,10 @@ def over_angle(
     axis: int | str = -1,
 ) -> Labelled:
     """A signal at equal angles of a shaft, so many a revolution, from the first pulse of its
-    tachometer to the last: `pulses` are their times, on the axis of the samples, or dates where that
-    has dates, and `per_revolution` of them make a revolution. Without `angles` it is the power of two that the longest revolution has
-    no more samples than, so that nothing folds. The angle runs along a spline through the pulses.
+    tachometer to the last: `pulses` are their times, on the axis of the samples, or dates where
+    that has dates, and `per_revolution` of them make a revolution. Without `angles` it is the power
+    of two that the longest revolution has no more samples than, so that nothing folds. The angle
+    runs along a spline through the pulses.
 
     >>> t = np.arange(20_000) / 1000
     >>> turned = 5 * t + t**2 / 8  # speeds up from 5 to 10 revolutions a second

@@ -158,9 +158,10 @@ def countable(row: Array) -> Array:
 def common_rate(first: Runs, second: Runs) -> float:
     """That of two signals, which coordinates of either tell."""
     known = [runs.rate for runs in (first, second) if runs.labels is not None] or [first.rate]
-    if abs(known[0] - known[-1]) > 1e-6 * known[0]:
-        raise ValueError(f"the signals have different rates: {known[0]:g} and {known[-1]:g}")
-    return known[0]
+    one, other = float(known[0]), float(known[-1])
+    if abs(one - other) > 1e-6 * one:
+        raise ValueError(f"the signals have different rates: {one:g} and {other:g}")
+    return one
 
 
 def same_length(name: str, *arguments: Any) -> Step:
