@@ -1,4 +1,7 @@
 // Recursive filters from the command line, beside the library's on the whole signal.
+#include <numbers>
+#include <sstream>
+
 #include "support/oracles.hpp"
 #include "tools/program.hpp"
 
@@ -63,6 +66,50 @@ TEST_F(SectionTest, ReportsWhatTheFilterDoes) {
     EXPECT_NE(json.find("\"zeros\":[[-1,0]]"), std::string::npos) << json;
     printed("design notch 50 --rate 1000 --q 5 --plot notch.svg");
     EXPECT_GT(contents("notch.svg").size(), 1000u);
+}
+
+TEST_F(SectionTest, ReportsNarrowAndLowFilters) {
+    const auto numbers = [](const std::string& json, const std::string& name) {
+        std::vector<double> values;
+        std::istringstream list(json.substr(json.find("\"" + name + "\":[") + name.size() + 4));
+        for (double v; list >> v; list.get()) values.push_back(v);
+        return values;
+    };
+    // With W = tan(pi f), a peak has the power 1 / (1 + ((W^2 - W0^2) / (B W))^2).
+    const auto edge = [](double f, double width, double power, int sign) {
+        constexpr double pi = std::numbers::pi;
+        const double w = std::tan(pi * f), b = std::tan(pi * width) * (1 + w * w);
+        const double half = b / 2 * std::sqrt(1 / power - 1);
+        return std::atan(sign * half + std::hypot(half, w)) / pi;
+    };
+    for (const auto& [call, rate, f, q] :
+         {std::tuple("notch 50 --rate 96000 --q 100", 96e3, 50.0, 100.0),
+          {"peak 0.1 --q 1e6", 1.0, 0.1, 1e6}}) {
+        const auto json = printed("design " + std::string(call) + " --json");
+        const bool notch = *call == 'n';
+        for (const auto& [name, power] : {std::pair("at_3db", 0.5), {"at_6db", 0.25}}) {
+            const auto found = numbers(json, name);
+            ASSERT_EQ(found.size(), 2u) << json;
+            for (const int i : {0, 1}) {
+                const double want =
+                    edge(f / rate, f / q / rate, notch ? 1 - power : power, 2 * i - 1);
+                EXPECT_NEAR(found[std::size_t(i)], want * rate, 1e-5 * f / q) << json;
+            }
+        }
+        EXPECT_NE(json.find("\"bands\":[]"), std::string::npos) << json;
+        EXPECT_EQ(json.find("null"), std::string::npos) << json;
+    }
+    EXPECT_NE(printed("design peak 0.1 --q 1e6").find(" 0.09999995, 0.10000005\n"),
+              std::string::npos);
+    for (const auto& [band, f, order] :
+         {std::tuple("lowpass", 1e-6, 8), {"lowpass", 1e-5, 4}, {"highpass", 1e-5, 2}}) {
+        const auto json = printed("design " + std::string(band) + " " + std::to_string(f) +
+                                  " --iir butter --json --order " + std::to_string(order));
+        // The power is 1 / (1 + (f / edge)^(2 order)), and that of the high-pass the other way.
+        const double ratio = std::pow(3, (*band == 'l' ? 1 : -1) / (2.0 * order));
+        EXPECT_NEAR(numbers(json, "at_3db").at(0), f, 1e-4 * f) << json;
+        EXPECT_NEAR(numbers(json, "at_6db").at(0), f * ratio, 1e-4 * f) << json;
+    }
 }
 
 TEST_F(SectionTest, RefusesWhatDoesNotGoTogether) {

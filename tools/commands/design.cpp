@@ -202,16 +202,13 @@ class Report {
                 phase.gaps.push_back(phase.x.size());
             }
             if (!shown) continue;
-            phase.x.push_back(frequency(double(i)));
+            phase.x.push_back(gain.x[i]);
             phase.y.push_back(response_.phase[i]);
         }
         tool::draw(std::vector{gain, phase}, path, options_.look);
     }
 
   private:
-    double frequency(double position) const {
-        return response_.frequency(position) * options_.rate.value_or(1);
-    }
     double middle() const { return (taps_->points - 1) / 2.0; }
     double delay() const {
         return middle() + (request_.design.type == DSP_FIR_DELAY ? request_.other : 0);

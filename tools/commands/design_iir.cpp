@@ -17,7 +17,10 @@ namespace {
 class Report {
   public:
     Report(const RecursiveDesign& asked, const Signal& sections)
-        : asked_(asked), sections_(sections), response_(response_of_sections(sections)) {}
+        : asked_(asked),
+          sections_(sections),
+          roots_(asked.filter.roots()),
+          response_(response_of_sections(sections, roots_)) {}
 
     void print(std::FILE* to) const {
         std::fprintf(to, "design       %s\n", title().c_str());
@@ -37,18 +40,18 @@ class Report {
         for (int k = 0; k < sections_->points; k += DSP_IIR_VALUES) {
             rows.push_back(json_numbers({sections_->data + k, DSP_IIR_VALUES}));
         }
-        const auto roots = asked_.filter.roots();
-        const int count = (roots->points - 1) / 2;
+        const int count = (roots_->points - 1) / 2;
         const auto [least, most] = delays();
-        JsonMembers all{{"design", json_text(asked_.filter.band)},
-                        {"iir", json_text(asked_.filter.shape.name)},
-                        {"order", std::to_string(asked_.filter.order())},
-                        {"parameters", json_numbers(asked_.parameters)},
-                        {"sections", json_list(rows)},
-                        {"gain", json_number(roots->data[0])},
-                        {"zeros", complex_list(roots->data + 2, count)},
-                        {"poles", complex_list(roots->data + 2 + 2 * std::ptrdiff_t(count), count)},
-                        {"delay", json_numbers(std::vector{least, most})}};
+        JsonMembers all{
+            {"design", json_text(asked_.filter.band)},
+            {"iir", json_text(asked_.filter.shape.name)},
+            {"order", std::to_string(asked_.filter.order())},
+            {"parameters", json_numbers(asked_.parameters)},
+            {"sections", json_list(rows)},
+            {"gain", json_number(roots_->data[0])},
+            {"zeros", complex_list(roots_->data + 2, count)},
+            {"poles", complex_list(roots_->data + 2 + 2 * std::ptrdiff_t(count), count)},
+            {"delay", json_numbers(std::vector{least, most})}};
         for (auto& member : band_members(figures())) all.push_back(std::move(member));
         return all;
     }
@@ -70,10 +73,7 @@ class Report {
             delay.x.push_back(gain.x[i]);
             delay.y.push_back(response_.delay[i]);
         }
-        // (One of a single frequency may pass between two values.)
-        std::vector panels{gain};
-        if (!delay.x.empty()) panels.push_back(delay);
-        tool::draw(panels, path, asked_.look);
+        tool::draw(std::vector{gain, delay}, path, asked_.look);
     }
 
   private:
@@ -88,13 +88,18 @@ class Report {
 
     bool passes(std::size_t i) const { return response_.magnitude[i] >= std::sqrt(0.5); }
 
-    /// The least and the greatest where it passes.
+    /// The least and the greatest where it passes, up to the edges.
     std::pair<double, double> delays() const {
         double least = INFINITY, most = -INFINITY;
+        const auto add = [&](double delay) {
+            least = std::min(least, delay);
+            most = std::max(most, delay);
+        };
         for (std::size_t i = 0; i < response_.delay.size(); ++i) {
-            if (!passes(i)) continue;
-            least = std::min(least, response_.delay[i]);
-            most = std::max(most, response_.delay[i]);
+            if (passes(i)) add(response_.delay[i]);
+        }
+        for (const double edge : crossings(response_, response_.magnitude, std::sqrt(0.5))) {
+            add(delay_of_sections(sections_, edge));
         }
         return {least, most};
     }
@@ -111,6 +116,7 @@ class Report {
 
     const RecursiveDesign& asked_;
     const Signal& sections_;
+    Signal roots_;
     SectionResponse response_;
 };
 

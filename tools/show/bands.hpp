@@ -19,9 +19,8 @@ struct BandFigures {
     std::optional<double> rate;
     bool passes_told = true;  // whether bands that pass have figures
 
-    double frequency(double position) const {
-        return response.frequency(position) * rate.value_or(1);
-    }
+    double frequency(std::size_t i) const { return response.frequency[i] * rate.value_or(1); }
+    std::vector<double> frequencies_at(double level) const;
     const char* unit() const { return rate ? " Hz" : ""; }
     std::vector<ResponseBand> bands() const;
 };
