@@ -40,7 +40,7 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {1, "correlate x.txt nan.txt", "nan.txt: sample 2"},
         {1, "spectrum x.txt --band 0.6 0.7", "goes from 0 to 0.5"},
         {1, "correlate x.txt slow.txt -o c.csv", "spacings differ, 1 and 0.5"},
-        {1, "spectrum still.txt", "gives no frequencies"},
+        {1, "spectrum still.txt", "still.txt: a sample spacing of 0"},
         {1, "spectrum x.txt --average 4 -o y.csv", "fewer than one segment of 4"},
         {1, "filter z.csv --lowpass 0.1 --plot y.png", "real signals"},
         {1, "interp back.csv --table --rate 1", "sample 2 does not lie behind"},
@@ -106,6 +106,37 @@ TEST_F(RefusalsTest, OneOfAKind) {
         EXPECT_EQ(std::count(done.err.begin(), done.err.end(), '\n'), 1) << done.err;
         EXPECT_EQ(done.out, "") << line;
         EXPECT_EQ(files(), before) << line;
+    }
+}
+
+TEST_F(RefusalsTest, SpacingsWithoutPlaces) {
+    const auto samples = "\n1\n3\n2\n5\n4\n6\n1\n2\n3\n";
+    const std::string spacings[] = {"0", "-1", "nan", "inf", "1e-320"};
+    for (const auto& delta : spacings) write(delta + ".txt", "#DSP delta = " + delta + samples);
+    const auto before = files();
+    for (const char* line :
+         {"fit F", "fit F --sine", "fit F --degree 2",
+          "smooth F --derivative 1 --window 5 -o y.csv", "derive F -o y.csv",
+          "integrate F -o y.csv", "integrate F --highpass 0.1 -o y.csv",
+          "stft F --length 4 -o y.dsp", "spectrum F", "spectrum F --average 4", "response F F",
+          "filter F --lowpass 0.1 -o y.csv", "filter F --iir butter --lowpass 0.1 -o y.csv",
+          "distortion F", "levels F", "resample F --rate 2 -o y.csv", "edges F",
+          "cut F --begin 1 -o y.csv"}) {
+        for (const auto& delta : spacings) {
+            const auto file = delta + ".txt";
+            auto call = "wavkit " + std::string(line);
+            for (std::size_t at; (at = call.find('F')) != std::string::npos;) {
+                call.replace(at, 1, file);
+            }
+            const auto done = shell(call);
+            EXPECT_EQ(done.status, 1) << call;
+            EXPECT_NE(done.err.find(file + ": a sample spacing of "), std::string::npos)
+                << call << "\n"
+                << done.err;
+            EXPECT_EQ(std::count(done.err.begin(), done.err.end(), '\n'), 1) << done.err;
+            EXPECT_EQ(done.out, "") << call;
+            EXPECT_EQ(files(), before) << call;
+        }
     }
 }
 

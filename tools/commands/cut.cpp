@@ -11,6 +11,7 @@
 #include "base/options.hpp"
 #include "commands/commands.hpp"
 #include "measure/block_change.hpp"
+#include "measure/prepare.hpp"
 
 namespace wavkit::tool {
 namespace {
@@ -50,9 +51,7 @@ struct Extent {
 };
 
 Extent extent_of(const CutOptions& options, double delta, double start) {
-    if (!options.samples && !(delta > 0)) {
-        throw DataError("a spacing of " + number(delta) + " gives no times; cut by --samples");
-    }
+    if (!options.samples) check_axis(delta, "set --delta or --rate, or cut by --samples");
     const double step = options.samples ? 1 : delta, origin = options.samples ? 0 : start;
     const double from = options.from ? *options.from - origin : 0;
     Extent extent{sample_from(from / step), endless};

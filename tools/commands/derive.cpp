@@ -43,8 +43,7 @@ struct DeriveOptions {
 void derive(const DeriveOptions& options) {
     pass_through(
         options.files, "differentiating", [&](const SampleStream& stream, SignalShape& shape) {
-            if (!(stream.delta > 0))
-                throw DataError("a spacing of " + number(stream.delta) + " has no slopes");
+            check_axis(stream.delta);
             for (auto& facts : shape.facts) facts.put_to_unit("/");
             return std::make_unique<Derivative>(stream.delta, stream.width(), options.from_zero);
         });
@@ -63,9 +62,7 @@ struct IntegrateOptions {
 
 /// The filter that integrates what a stream holds above the edge.
 Filtering integrator_for(const SampleStream& stream, const IntegrateOptions& options) {
-    if (!(std::isnormal(stream.delta) && stream.delta > 0)) {
-        throw DataError("a spacing of " + number(stream.delta) + " has no frequencies");
-    }
+    check_axis(stream.delta);
     const int times = options.twice ? 2 : 1;
     Filtering filtering;
     filtering.hold = true;
@@ -115,6 +112,7 @@ void integrate(const IntegrateOptions& options) {
     };
     std::size_t signal = 0;
     const auto make = [&](const SampleStream& stream, SignalShape& shape) {
+        check_axis(stream.delta);
         for (auto& facts : shape.facts) facts.put_to_unit(" ");
         auto offsets = options.detrend ? means.at(signal++) : std::vector<double>(stream.width());
         return std::make_unique<Integral>(stream.delta, std::move(offsets));

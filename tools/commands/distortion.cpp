@@ -81,7 +81,7 @@ struct Measured {
 }
 
 Measured measured(const Signal& x, const DistortionOptions& options, int window) {
-    check_spacing(x->delta);
+    check_axis(x->delta);
     check_finite(x);
     Measured result{{}, {}, x.facts, 1 / x->delta, options.full_scale};
     Progress progress("measuring");

@@ -92,6 +92,7 @@ class EdgesOfFile {
     static SampleStream* next_of(SignalSource& source) {
         auto* const stream = source.next();
         if (stream && stream->complex) throw DataError("a complex signal has no edges");
+        if (stream) check_axis(stream->delta);
         return stream;
     }
 

@@ -15,7 +15,6 @@
 #include "measure/channel_filter.hpp"
 #include "measure/prepare.hpp"
 #include "measure/sections.hpp"
-#include "measure/spectrum.hpp"
 #include "measure/taps.hpp"
 #include "show/comparison.hpp"
 
@@ -110,7 +109,7 @@ Signal convolved(Signal a, const Signal& b) {
 
 /// A filter for all bands that were asked for.
 Signal designed_taps(const FilterOptions& options, double delta) {
-    check_spacing(delta);
+    check_axis(delta);
     auto tapering = options.tapering;
     if (tapering.transition) *tapering.transition *= delta;
     Signal taps;
@@ -129,7 +128,7 @@ Signal designed_taps(const FilterOptions& options, double delta) {
 
 /// Sections for all bands that were asked for, one behind the other.
 Signal designed_sections(const FilterOptions& options, double delta) {
-    check_spacing(delta);
+    check_axis(delta);
     Signal all;
     for (std::size_t i = 0; i < band_options.size(); ++i) {
         const auto& edges = options.edges[i];

@@ -57,14 +57,13 @@ enum : std::size_t { mean_x = 14, variance_x = 16, covariance = 18 };
 /// do not begin anew within.
 Signal pairs_of(Signal x) {
     if (x->complex) return x;
-    const double step = x->delta == 0 ? 1 : x->delta;
     Signal pairs;
     pairs.facts = x.facts;
     pairs->points = x->points;
     pairs->complex = 1;
     check(dsp_alloc(pairs), "fitting a line");
     for (int i = 0; i < x->points; ++i) {
-        pairs->data[2 * i] = x.facts.start + i * step;
+        pairs->data[2 * i] = x.place(i);
         pairs->data[2 * i + 1] = x->data[i];
     }
     return pairs;
@@ -303,6 +302,7 @@ void tell(const std::string& file, const FitOptions& options, Page& page) {
     auto x = first_signal(*source);
     if (x->points < 1) throw DataError("the signal has no samples");
     check_finite(x);
+    if (!x->complex) check_axis(x->delta);
     page.add_signal(x);
     if (options.sine) {
         return fit_sine(std::move(x), file, options, source->sound || reading.rate, page);

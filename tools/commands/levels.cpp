@@ -286,9 +286,7 @@ void tell(const std::string& file, const LevelsOptions& options, Page& page) {
     std::optional<OutputFile> output;
     if (!options.out.empty()) output.emplace(options.out);
     for (bool first = true; auto* const stream = source->next(); first = false) {
-        if (!(std::isnormal(stream->delta) && stream->delta > 0)) {
-            throw DataError("a spacing of " + number(stream->delta) + " has no levels");
-        }
+        check_axis(stream->delta);
         const auto facts = stream->facts_of(0);
         const double reference = options.reference.value_or(facts.unit == "Pa" ? 20e-6 : 1);
         const double delta = stream->delta;

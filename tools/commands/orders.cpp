@@ -89,9 +89,7 @@ class OrdersOfFile {
         const bool chosen = options_.reading.channel || options_.reading.signal;
         if (stream && !chosen && options_.tacho == 1) stream = source.next();
         if (!stream) throw DataError("there is no signal beside the tachometer");
-        if (!(std::isnormal(stream->delta) && stream->delta > 0)) {
-            throw DataError("a spacing of " + number(stream->delta) + " has no speeds");
-        }
+        check_axis(stream->delta);
         return *stream;
     }
 

@@ -71,8 +71,8 @@ class Peaks {
         auto heights = heights_of(x);
         if (valleys_) check(dspi_neg(heights), "finding peaks");
         const double unit = options.samples ? 1 : std::fabs(delta_);
-        if (unit == 0 && (options.distance || options.width)) {
-            throw DataError("a spacing of 0 has no distances; set --delta, or give --samples");
+        if (options.distance || options.width) {
+            check_axis(unit, "set --delta or --rate, or give --samples");
         }
         const double none = std::numeric_limits<double>::quiet_NaN();
         double height = options.height.value_or(none);

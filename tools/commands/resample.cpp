@@ -78,9 +78,7 @@ struct Target {
 };
 
 Target target_for(const ResampleOptions& options, double delta) {
-    if (!(std::isnormal(delta) && delta > 0)) {
-        throw DataError("a signal with a spacing of " + number(delta) + " has no sampling rate");
-    }
+    check_axis(delta);
     Target target{{1, 1, 1}, delta};
     if (options.by) {
         target = {ratio_of(1, *options.by), delta * *options.by};

@@ -17,6 +17,7 @@
 #include "files/output.hpp"
 #include "files/recording.hpp"
 #include "measure/peaks.hpp"
+#include "measure/prepare.hpp"
 #include "measure/segments.hpp"
 #include "measure/signal_pair.hpp"
 #include "measure/windows.hpp"
@@ -78,7 +79,7 @@ Signal told(const Signal& state, int kind) {
 /// Reads both signals block by block.
 Bode measured(const BodeOptions& options, int window) {
     SignalPair pair(options.in, options.response, options.reading);
-    check_spacing(pair.delta());
+    with_data_of(options.in, [&] { check_axis(pair.delta()); });
     Signal state;
     std::size_t samples = 0;
     {

@@ -10,6 +10,7 @@
 #include "base/number.hpp"
 #include "base/options.hpp"
 #include "commands/commands.hpp"
+#include "measure/prepare.hpp"
 #include "measure/smoother.hpp"
 #include "show/comparison.hpp"
 #include "show/report.hpp"
@@ -76,6 +77,7 @@ class SmoothRun {
                               : "derivative " + std::to_string(derivative),
             derivative == 0};
         if (derivative > 0) {
+            check_axis(stream.delta);
             const auto power = derivative > 1 ? "^" + std::to_string(derivative) : "";
             for (auto& facts : changed.shape.facts) facts.put_to_unit("/", power);
         }

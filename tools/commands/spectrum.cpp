@@ -161,6 +161,7 @@ SpectrumReport measured_whole(const SpectrumOptions& options) {
     InputFile input(options.report.in);
     const auto source = open_signals(input, options.reading);
     auto x = first_signal(*source);
+    check_axis(x->delta);
     suggest_average(x, options);
     Progress progress("transforming");
     if (options.segments.slope) take_slope(x);
@@ -178,6 +179,7 @@ SpectrumReport measured_in_segments(const SpectrumOptions& options) {
     InputFile input(options.report.in);
     const auto source = open_signals(input, options.reading);
     auto* const stream = source->next();
+    check_axis(stream->delta);
     SpectrumAverage average(options.averaging);
     auto report =
         report_of(options, {}, stream->facts_of(0), source->sound, stream->complex, stream->delta);

@@ -12,6 +12,7 @@
 #include "commands/commands.hpp"
 #include "measure/block_change.hpp"
 #include "measure/by_channel.hpp"
+#include "measure/prepare.hpp"
 #include "measure/windows.hpp"
 
 namespace wavkit::tool {
@@ -104,9 +105,7 @@ void change_shape(const StftOptions& options, SignalShape& shape) {
     if (options.inverse && !shape.complex) {
         throw DataError("spectra are complex; this signal is real");
     }
-    if (!(shape.delta > 0)) {
-        throw DataError("a spacing of " + number(shape.delta) + " has no spectra");
-    }
+    check_axis(shape.delta);
     const bool full = options.two_sided || (shape.complex && !options.inverse);
     shape.delta = 1 / (options.size * shape.delta);
     if (shape.points) {

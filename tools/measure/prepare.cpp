@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "base/error.hpp"
+#include "base/number.hpp"
 
 namespace wavkit::tool {
 
@@ -15,6 +16,12 @@ void check_finite(std::span<const double> values, std::size_t width, long first)
     if (bad == values.end()) return;
     const auto sample = first + (bad - values.begin()) / std::ptrdiff_t(width);
     throw DataError("sample " + std::to_string(sample) + " is not a finite number");
+}
+
+void check_axis(double delta, const std::string& remedy) {
+    if (delta > 0 && std::isnormal(delta) && std::isnormal(1 / delta)) return;
+    throw DataError("a sample spacing of " + number(delta) +
+                    " gives no times and no frequencies; " + remedy);
 }
 
 void check_finite(const Signal& x) { check_finite(x.values(), x->complex ? 2 : 1); }

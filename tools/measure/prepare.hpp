@@ -3,6 +3,7 @@
 
 #include <functional>
 #include <span>
+#include <string>
 
 #include "base/progress.hpp"
 #include "base/signal.hpp"
@@ -14,6 +15,10 @@ namespace wavkit::tool {
 /// first one belongs to.
 void check_finite(std::span<const double> values, std::size_t width, long first = 0);
 void check_finite(const Signal& x);
+
+/// Refuses a spacing of samples that gives no places on an axis and no sampling rate: one that is
+/// not above 0, or so far from 1 that it has no reciprocal. `remedy` says what to do.
+void check_axis(double delta, const std::string& remedy = "set --delta or --rate");
 
 /// Hands a stream on in blocks of whole points, whose values are finite, or it throws; how many
 /// points there were.

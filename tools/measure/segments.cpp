@@ -76,7 +76,6 @@ int Segmentation::step() const {
 void measure_segments(SampleStream& source, const Segmentation& segmentation,
                       const SpectrumSettings& settings,
                       const std::function<void(Spectrum&)>& take) {
-    check_spacing(source.delta);
     const auto wanted = std::size_t(segmentation.length);
     if (source.length && *source.length < wanted) fail_with_too_few(*source.length, wanted);
     std::unique_ptr<SlopeStream> slopes;
