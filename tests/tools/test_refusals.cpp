@@ -17,6 +17,7 @@ TEST_F(RefusalsTest, OneOfAKind) {
     write("z.csv", "re,im\n1,2\n3,4\n");
     write("cut.dsp", "\xBE\x30\x03\xEB\x08\x04");
     write("word.txt", "1 2 3 four");
+    write("five.txt", "1\n4\n2\n3\n5\n");
     write("many.csv", "1\n2\n\n3\n");
     write("many.txt", "#DSP points = 9223372036854775807\n#DSP complex = 1\n1 2 3 4");
     const struct {
@@ -39,6 +40,11 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {1, "filter x.txt --taps none.txt", "none.txt: there are no taps"},
         {1, "correlate x.txt nan.txt", "nan.txt: sample 2"},
         {1, "spectrum x.txt --band 0.6 0.7", "goes from 0 to 0.5"},
+        {1, "response five.txt five.txt --segment 4 --band 0.3 0.4",
+         "five.txt: no frequency of the spectrum lies from 0.3 to 0.4; it goes from 0 to 0.5"},
+        {1, "response five.txt five.txt --segment 4 --band 7 9 --json", "from 7 to 9"},
+        {1, "levels five.txt --rate 48000 --octaves 3 --band 101 102",
+         "five.txt: no centre of a band lies from 101 to 102"},
         {1, "correlate x.txt slow.txt -o c.csv", "spacings differ, 1 and 0.5"},
         {1, "spectrum still.txt", "still.txt: a sample spacing of 0"},
         {1, "spectrum x.txt --average 4 -o y.csv", "fewer than one segment of 4"},

@@ -118,6 +118,10 @@ struct Measured {
         check(dspc_octaves(centres, options.octaves, options.band.empty() ? 19.5 : options.band[0],
                            options.band.empty() ? 20500 : options.band[1]),
               "laying out the bands");
+        if (centres->points == 0) {
+            throw DataError("no centre of a band lies from " + rounded(options.band[0]) + " to " +
+                            rounded(options.band[1]));
+        }
         for (const double centre : centres.values()) {
             BandMeter band{centre, band_name(centre, options.octaves), {}};
             if (dspc_octave(band.meter.sections, centre, options.octaves, rate) == 0) {

@@ -113,6 +113,10 @@ Bode measured(const BodeOptions& options, int window) {
               {},
               pair.facts(0).axis(pair.sound() || options.reading.rate),
               {}};
+    with_data_of(options.in, [&] {
+        check_band(options.frequencies(), bode.bins->points, bode.bins->delta,
+                   [&](int k) { return bode.frequency(k); });
+    });
     const auto power = told(state, DSP_RESPONSE_OUTPUT);
     double all = 0;
     for (int k = 0; k < power->points; ++k) {
@@ -143,11 +147,13 @@ void write_table(std::FILE* to, const Bode& bode, const BodeOptions& options) {
     }
 }
 
-/// The bins that a summary shows: from the lowest one on, or half the rate down, by octaves.
+/// The bins that a summary shows: from the highest one of the band down, by octaves.
 std::vector<int> octaves(const Bode& bode, const Band& band) {
-    std::vector<int> shown;
-    for (int k = bode.bins->points - 1; k > 0; k = k / 2) {
-        if (band.contains(bode.frequency(k))) shown.insert(shown.begin(), k);
+    int highest = bode.bins->points - 1;
+    while (highest > 0 && !band.contains(bode.frequency(highest))) --highest;
+    std::vector<int> shown{highest};
+    for (int k = highest / 2; k > 0 && band.contains(bode.frequency(k)); k = k / 2) {
+        shown.insert(shown.begin(), k);
     }
     return shown;
 }

@@ -92,13 +92,18 @@ void check_band_order(const std::vector<double>& band) {
 
 void check_band(const SpectrumReport& report) {
     const auto& spectrum = report.spectrum;
-    for (int i = 0; i < spectrum.bins->points; ++i) {
-        if (report.band.contains(spectrum.frequency(i))) return;
+    check_band(report.band, spectrum.bins->points, spectrum.bins->delta,
+               [&](int i) { return spectrum.frequency(i); });
+}
+
+void check_band(const Band& band, int count, double step,
+                const std::function<double(int)>& frequency) {
+    for (int i = 0; i < count; ++i) {
+        if (band.contains(frequency(i))) return;
     }
-    throw DataError("no frequency of the spectrum lies from " + rounded(report.band.low) + " to " +
-                    rounded(report.band.high) + "; it goes from " + rounded(spectrum.frequency(0)) +
-                    " to " + rounded(spectrum.frequency(spectrum.bins->points - 1)) +
-                    " in steps of " + rounded(spectrum.bins->delta));
+    throw DataError("no frequency of the spectrum lies from " + rounded(band.low) + " to " +
+                    rounded(band.high) + "; it goes from " + rounded(frequency(0)) + " to " +
+                    rounded(frequency(count - 1)) + " in steps of " + rounded(step));
 }
 
 void write_output(const SpectrumReport& report) {

@@ -1,6 +1,7 @@
 // A measured spectrum as a file, a table, a picture.
 #pragma once
 
+#include <functional>
 #include <string>
 
 #include "files/writing.hpp"
@@ -39,8 +40,11 @@ struct SpectrumReport {
 /// Throws where a picture of spectra over time goes to a terminal, or a band upwards from above.
 void check_waterfall(const std::string& picture);
 void check_band_order(const std::vector<double>& band);
-/// Refuses a band without frequencies, which would look like one without peaks.
+/// Refuses a band without frequencies, which would look like one without peaks. The second is of
+/// `count` frequencies, `step` apart.
 void check_band(const SpectrumReport& report);
+void check_band(const Band& band, int count, double step,
+                const std::function<double(int)>& frequency);
 
 /// Writes the file that the options name.
 void write_output(const SpectrumReport& report);
