@@ -292,7 +292,7 @@ enum {
  *  variance 6 s^2 / (pi^2 A^2 N^3 delta^2) for long records (D. C. Rife and R. R. Boorstyn,
  *  "Single-tone parameter estimation from discrete-time observations", 1974). A parameter that the
  *  samples cannot tell from the others stays 0: the amplitude at a frequency of 0, the sine part at
- *  half the sampling rate. The squares of the samples must not overflow.
+ *  half the sampling rate. Samples may be of any size, squares neither overflow nor vanish.
  *  @param x          real signal of 4 points or more, or 3 with DSP_SINE_FIXED; a `delta` of 0
  *                    counts as 1
  *  @param out        its `delta` is kept; may be x

@@ -326,15 +326,51 @@ Table table_of(int n, const Fitted& fitted, double delta, bool free) {
 }
 
 template <Record R>
-int sine_fit(const R* x, R* out, scalar<R> frequency, int flags) {
-    const bool free = !(flags & DSP_SINE_FIXED);
-    const int n = int(length(x));
-    if (x->complex || n < (free ? 4 : 3)) return -1;
-    const double delta = double(spacing(x));
-    double start = double(frequency) * delta;
+int make_table(const R* x, double start, bool free, Table& table) {
     if (free && !(start > 0)) start = strongest_frequency(x);
     if (free && start == 0) return -1;
-    return store(out, table_of(n, fit(values(x), start, free), delta, free));
+    const int n = int(length(x));
+    table = table_of(n, fit(values(x), start, free), double(spacing(x)), free);
+    return 0;
+}
+
+/// Whether products of four samples of such a size are neither infinite nor 0.
+template <Record R>
+bool has_room(const Table& table) {
+    using Limits = std::numeric_limits<scalar<R>>;
+    const double size = table[1] + std::fabs(table[3]) + table[4];
+    return size > std::pow(double(Limits::min()), 0.25) &&
+           size < std::pow(double(Limits::max()), 0.25);
+}
+
+/// The power of two that is as great as the greatest sample; 0 where a sample is not finite, or all
+/// are 0.
+template <class T>
+int greatest_power(std::span<const T> x) {
+    T greatest = 0;
+    for (const T v : x) {
+        if (!std::isfinite(v)) return 0;
+        greatest = std::max(greatest, std::fabs(v));
+    }
+    return greatest > 0 ? std::ilogb(greatest) : 0;
+}
+
+template <Record R>
+int sine_fit(const R* x, R* out, scalar<R> frequency, int flags) {
+    const bool free = !(flags & DSP_SINE_FIXED);
+    if (x->complex || length(x) < (free ? 4 : 3)) return -1;
+    const double start = double(frequency) * double(spacing(x));
+    Table table;
+    if (make_table(x, start, free, table)) return -1;
+    const int power = has_room<R>(table) ? 0 : greatest_power(values(x));
+    if (power != 0) {
+        Temporary<R> scaled;
+        if (dsp_copy(scaled, x)) return -1;
+        for (auto& v : std::span(scaled->data, length(x))) v = std::ldexp(v, -power);
+        if (make_table<R>(scaled, start, free, table)) return -1;
+        for (const std::size_t i : {1, 3, 4, 6, 8}) table[i] = std::ldexp(table[i], power);
+    }
+    return store(out, table);
 }
 
 }  // namespace

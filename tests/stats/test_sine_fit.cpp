@@ -134,6 +134,27 @@ BOTH_PRECISIONS(SineFit, FindsTonesExactly) {
     }
 }
 
+BOTH_PRECISIONS(SineFit, SamplesOfAnySize) {
+    Noise noise(5);
+    List x;
+    for (int i = 0; i < 64; ++i) x.push_back(T(0.7L + std::cos(0.7L * i) + noise() / 10));
+    Signal<R> want, out;
+    const int most = std::numeric_limits<T>::max_exponent;
+    for (const T frequency : {T(0), T(0.11)}) {
+        ASSERT_EQ(dsps_sine_fit(real<R>(x), want, frequency, DSP_SINE_FREE), 0);
+        for (const int power : {most - 3, most / 2 + 20, -most / 2 - 20, 30 - most}) {
+            auto y = x;
+            for (auto& v : y) v = std::ldexp(v, power);
+            ASSERT_EQ(dsps_sine_fit(real<R>(y), out, frequency, DSP_SINE_FREE), 0);
+            for (const int i : {0, 1, 2, 3, 4, 5, 6, 7, 8}) {
+                const bool size = i == 1 || i == 3 || i == 4 || i == 6 || i == 8;
+                const T same = std::ldexp(want[i], size ? power : 0);
+                EXPECT_NEAR(out[i], same, 100 * epsilon<R> * std::fabs(same)) << i << ' ' << power;
+            }
+        }
+    }
+}
+
 BOTH_PRECISIONS(SineFit, WhatSamplesCannotTell) {
     Signal<R> out;
     // At frequency 0 a cosine is an offset; at half the rate there is no sine; no tone, no step.
