@@ -17,6 +17,8 @@ TEST_F(RefusalsTest, OneOfAKind) {
     write("z.csv", "re,im\n1,2\n3,4\n");
     write("cut.dsp", "\xBE\x30\x03\xEB\x08\x04");
     write("word.txt", "1 2 3 four");
+    write("zero.txt", "0\n0\n0\n0\n0\n");
+    write("great.txt", "1e300\n-1e300\n2\n");
     write("five.txt", "1\n4\n2\n3\n5\n");
     write("many.csv", "1\n2\n\n3\n");
     write("many.txt", "#DSP points = 9223372036854775807\n#DSP complex = 1\n1 2 3 4");
@@ -56,6 +58,9 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {1, "mix x.txt slow.txt -o y.csv", "differ, 1 in x.txt and 0.5 in slow.txt"},
         {1, "join x.txt many.csv -o y.csv", "many.csv holds more signals than x.txt"},
         {1, "fit x.txt --degree 3", "4 points with different x"},
+        {1, "response zero.txt five.txt --segment 4", "zero.txt: the signal is 0"},
+        {1, "response five.txt zero.txt --segment 4", "zero.txt: the signal is 0"},
+        {1, "levels great.txt --rate 48000", "great.txt: the values are too great"},
         // Places and sizes
         {1, "filter x.txt --lowpass nan -o y.csv", "half the sampling rate"},
         {1, "filter x.txt --bandpass 0.3 0.2 -o y.csv", "lower to a higher"},

@@ -195,6 +195,9 @@ void measure(SampleStream& stream, const LevelsOptions& options, double referenc
         progress.done(stream.done());
     }
     if (position == 0) throw DataError("the signal has no samples");
+    if (!(measured.whole[DSP_LEVEL_EXPOSURE] < HUGE_VAL)) {
+        throw DataError("the values are too great for their squares, of which levels are made");
+    }
     measured.exceed();
 }
 

@@ -38,6 +38,7 @@ struct BodeOptions {
     WriteOptions writing;
     PictureLook look;
 
+    const std::string& second() const { return response.empty() ? in : response; }
     Band frequencies() const { return band.empty() ? Band() : Band{band[0], band[1]}; }
 };
 
@@ -74,6 +75,16 @@ Signal told(const Signal& state, int kind) {
     Signal result;
     check(dsph_response(state, result, kind), "computing the response");
     return result;
+}
+
+/// The sum of a density; throws where there is none to divide by.
+double check_power(const Signal& density, const std::string& file) {
+    double sum = 0;
+    for (const double power : density.values()) sum += power;
+    if (sum > 0 && std::isfinite(sum)) return sum;
+    return with_data_of(file, []() -> double {
+        throw DataError("the signal is 0, or of values that have no squares: so small or so great");
+    });
 }
 
 /// Reads both signals block by block.
@@ -118,9 +129,9 @@ Bode measured(const BodeOptions& options, int window) {
                    [&](int k) { return bode.frequency(k); });
     });
     const auto power = told(state, DSP_RESPONSE_OUTPUT);
-    double all = 0;
+    check_power(told(state, DSP_RESPONSE_INPUT), options.in);
+    const double all = check_power(power, options.second());
     for (int k = 0; k < power->points; ++k) {
-        all += power->data[k];
         if (power->data[k] > 0 && !std::isnan(bode.coherence->data[k])) {
             bode.explained += power->data[k] * bode.coherence->data[k];
         }
@@ -163,8 +174,12 @@ void print(std::FILE* to, const Bode& bode, const BodeOptions& options) {
     std::fprintf(to, "%zu segments of %d samples through %s\n", bode.segments,
                  options.segments.length,
                  window_names()[std::size_t(window_of_name(options.window))].c_str());
-    std::fprintf(to, "delay      %.9g%s, %.6g samples\n", bode.delay, unit.c_str(),
-                 bode.delay / bode.delta);
+    if (std::isfinite(bode.delay)) {
+        std::fprintf(to, "delay      %.9g%s, %.6g samples\n", bode.delay, unit.c_str(),
+                     bode.delay / bode.delta);
+    } else {
+        std::fputs("delay      none to be told\n", to);
+    }
     std::fprintf(to, "explained  %.6g %% of the output's power\n\n", 100 * bode.explained);
     std::fprintf(to, "%16s %12s %10s %10s %10s\n", with_unit("frequency", bode.hertz).c_str(),
                  with_unit("gain", printable(bode.gain_unit)).c_str(), "dB", "degrees",
@@ -176,7 +191,6 @@ void print(std::FILE* to, const Bode& bode, const BodeOptions& options) {
 }
 
 JsonMembers members_of(const Bode& bode, const BodeOptions& options) {
-    const auto second = options.response.empty() ? options.in : options.response;
     std::vector<std::string> list;
     for (const int k : octaves(bode, options.frequencies())) {
         list.push_back(json_object({{"frequency", json_number(bode.frequency(k))},
@@ -185,7 +199,7 @@ JsonMembers members_of(const Bode& bode, const BodeOptions& options) {
                                     {"phase", json_number(bode.angle(k, options.align))},
                                     {"coherence", json_number(bode.coherence->data[k])}}));
     }
-    return {{"files", json_list(std::vector{json_text(options.in), json_text(second)})},
+    return {{"files", json_list(std::vector{json_text(options.in), json_text(options.second())})},
             {"samples", std::to_string(bode.samples)},
             {"delta", json_number(bode.delta)},
             {"window", json_text(window_names()[std::size_t(window_of_name(options.window))])},
