@@ -32,6 +32,16 @@ TEST_F(LevelsTest, OfTonesThroughWeightingsAndBands) {
     EXPECT_NEAR(member(second, "leq"), -10 - 0.8, 0.1);
     // (2 s are no five time constants.)
     EXPECT_NE(second.find("\"min\":null"), second.npos) << second;
+    const auto brief = printed("levels x.dsp --signal 2 --response slow --octaves 1");
+    EXPECT_NE(brief.find("no least, L10, L50, L90: they begin after five time constants, 5 s"),
+              brief.npos)
+        << brief;
+    EXPECT_EQ(brief.find("nan"), brief.npos) << brief;
+    for (const std::string way : {"-o l.csv", "--plot l.svg"}) {
+        const auto done = shell("wavkit levels x.dsp --signal 2 --response slow " + way);
+        EXPECT_EQ(done.status, 1) << way;
+        EXPECT_NE(done.err.find("five time constants, 5 s"), done.err.npos) << done.err;
+    }
     EXPECT_NEAR(member(printed("levels x.dsp --signal 2 --json"), "leq"), -10 - 26.2, 0.1);
     const auto text = printed("levels x.dsp --octaves 1 --weighting z");
     EXPECT_NE(text.find("Leq           -20.00 dB\n"), text.npos) << text;

@@ -144,6 +144,9 @@ struct Measured {
     }
 };
 
+/// From when on the followed level is one of the signal alone, not of the silence before it.
+double settling_time(const LevelsOptions& options) { return 5 * options.response / 1000; }
+
 /// The value of 0 dB in the numbers of the calibrator's recording.
 double calibrated(const LevelsOptions& options) {
     InputFile input(options.calibrator);
@@ -171,7 +174,7 @@ void measure(SampleStream& stream, const LevelsOptions& options, double referenc
         throw DataError("--every " + rounded(options.every) + " is no useful number of samples");
     }
     const double start = stream.facts_of(0).start;
-    const double settled = 5 * options.response / 1000;
+    const double settled = settling_time(options);
     Signal block(stream.delta);
     const auto resize = [&](std::size_t points) {
         block->points = int(points);
@@ -206,21 +209,37 @@ std::string unit_of(const LevelsOptions& options, bool weighted) {
     return names[std::size_t(weighted ? options.weighted() : DSP_WEIGHTING_Z)];
 }
 
+std::string too_short(const LevelsOptions& options) {
+    return "they begin after five time constants, " + rounded(settling_time(options)) +
+           " s, and the signal ends before";
+}
+
 void print(std::FILE* to, const Measured& measured, const LevelsOptions& options) {
     const auto row = [&](const char* name, double value) {
         std::fprintf(to, "%-10s %9.2f %s\n", name, value, unit_of(options, true).c_str());
     };
-    for (const auto& column : columns) row(column.words, measured.whole[column.value]);
-    for (std::size_t i = 0; i < exceeded_levels.size() && !measured.course.empty(); ++i) {
+    const bool settled = !measured.course.empty();
+    for (const auto& column : columns) {
+        if (settled || column.value != DSP_LEVEL_LEAST) {
+            row(column.words, measured.whole[column.value]);
+        }
+    }
+    for (std::size_t i = 0; i < exceeded_levels.size() && settled; ++i) {
         row(exceeded_levels[i].words, measured.exceeded[i]);
     }
+    if (!settled) std::fprintf(to, "no least, L10, L50, L90: %s\n", too_short(options).c_str());
     if (measured.bands.empty()) return;
     std::fprintf(to, "\n%10s %9s %9s %9s %9s\n", "band (Hz)", "Leq (dB)", "greatest", "least",
                  "peak");
     for (const auto& band : measured.bands) {
         std::fprintf(to, "%10s", band.name.c_str());
         for (std::size_t i = 0; i < 4; ++i) {
-            std::fprintf(to, " %9.2f", band.meter[columns[i].value]);
+            const double level = band.meter[columns[i].value];
+            if (std::isnan(level)) {
+                std::fprintf(to, " %9s", "-");
+            } else {
+                std::fprintf(to, " %9.2f", level);
+            }
         }
         std::fputc('\n', to);
     }
@@ -266,7 +285,6 @@ Curve curve_of(const Measured& measured, const LevelsOptions& options, const std
         curve.x_unit = facts.axis(true);
         curve.y_label = "level";
         curve.y_unit = unit_of(options, true);
-        if (curve.x.empty()) throw DataError("the signal is too short for a picture of its level");
     } else {
         curve.style = Style::boxes;
         curve.box_width = 0.8;
@@ -299,6 +317,10 @@ void tell(const std::string& file, const LevelsOptions& options, Page& page) {
         const double delta = stream->delta;
         Measured measured(options, delta);
         measure(*stream, options, reference, file, measured);
+        const bool drawn = !options.plot.empty() && measured.bands.empty();
+        if ((drawn || output) && measured.course.empty()) {
+            throw DataError("there are no levels over time: " + too_short(options));
+        }
         if (output) {
             std::fprintf(output->stream(), "%stime,level\n", first ? "" : "\n");
             for (std::size_t i = 0; i < measured.times.size(); ++i) {
@@ -340,10 +362,11 @@ constexpr const char* about =
 
   Leq        level of the mean square
   greatest,  of the mean square that follows with the time constant of --response, at its
-  least      greatest and its least, the latter from five time constants on
+  least      greatest and, from five time constants on, its least
   peak       level of the greatest value
   exposure   level of a second that holds as much
-  L10 ...    the followed level exceeded for 10, 50 and 90 percent of the time
+  L10 ...    the followed level exceeded for 10, 50 and 90 percent of the time, from five time
+             constants on
 
 A level is 20 log10(value / reference). 0 dB is 20e-6 where the values are in Pa and otherwise 1: the
 levels of a sound file are then those below a constant of full scale. --reference names another value,
@@ -353,8 +376,8 @@ levels of a sound file are then those below a constant of full scale. --referenc
 weighting. Bands and weightings hold the limits of class 1 (IEC 61260-1, IEC 61672-1) up to 20 kHz at 48
 kHz; see docs/program.md. Bands that do not end below half the sampling rate are left out.
 
---plot draws the bands, or without them the followed level over time; -o writes the latter, a row
---every 0.1 seconds. Every signal of a file is measured, and all channels. The recording may be longer
+--plot draws the bands, or without them the followed level over time; -o writes the latter as CSV, a
+row --every 0.1 seconds. Both begin after five time constants. Every signal of a file is measured, and all channels. The recording may be longer
 than memory.
 
 Examples:
