@@ -89,6 +89,12 @@ TEST_F(RefusalsTest, OneOfAKind) {
         // Options that do not go together, or not with the output
         {2, "convert x.txt o.csv --rate 1 --delta 1", "--delta"},
         {2, "convert x.txt o.csv --missing no", "--missing"},
+        {2, "peaks x.txt -o p.mat", "a list of peaks cannot be written as a "},
+        {2, "peaks x.txt -o p.dsp", "only as CSV"},
+        {2, "levels x.txt -o l.wav", "levels over time cannot be written as a "},
+        {2, "levels x.txt --calibrator-level 100", "goes with --calibrator"},
+        {2, "filter x.txt --q 3 --lowpass 0.1 -o y.csv", "--q is for --notch and --peak"},
+        {2, "design lowpass 0.1 --q 3", "--q is for notch and peak"},
         {2, "convert x.txt o.txt --with-time", "--with-time is for CSV"},
         {2, "convert x.txt o.flac --bits float", "FLAC"},
         {2, "correlate x.txt x.txt -o c.dsp --lags 0 1", "--lags goes with CSV"},

@@ -261,6 +261,9 @@ void run(DesignOptions& options) {
     }
     if (!options.out.empty()) options.writing.checked_format_for(options.out);
     check_apart(options.out, options.plot, options.json);
+    if (options.recursion.quality && !single_frequency(CLI::detail::to_lower(options.name))) {
+        throw UsageError("--q is for notch and peak");
+    }
     if (options.recursive()) {
         return design_recursive({recursive_filter(options), options.parameters, options.rate,
                                  options.out, options.plot, options.json, options.writing,

@@ -86,6 +86,9 @@ void check_usage(FilterOptions& options) {
             "--peak), --taps or --sections");
     }
     check_recursion(options);
+    if (options.recursion.quality && options.edges[4].empty() && options.edges[5].empty()) {
+        throw UsageError("--q is for --notch and --peak");
+    }
     const auto& tapering = options.tapering;
     if (!options.taps.empty() &&
         (tapering.window || tapering.length || tapering.transition || tapering.attenuation)) {

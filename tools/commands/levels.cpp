@@ -32,8 +32,8 @@ struct LevelsOptions {
     int octaves = 0;
     std::optional<int> weighting;
     double response = DSP_TIME_FAST;  // in milliseconds
-    double every = 0.1, calibrator_level = 94;
-    std::optional<double> reference;
+    double every = 0.1;
+    std::optional<double> reference, calibrator_level;
     std::vector<double> band;  // of the lowest and the highest centre
     ReadOptions reading;
     PictureLook look;
@@ -162,7 +162,7 @@ double calibrated(const LevelsOptions& options) {
             });
         const double rms = std::sqrt(squares / double(points));
         if (!(rms > 0)) throw DataError("there is no tone of a calibrator");
-        return rms / std::pow(10, options.calibrator_level / 20);
+        return rms / std::pow(10, options.calibrator_level.value_or(94) / 20);
     });
 }
 
@@ -345,8 +345,12 @@ void run(LevelsOptions& options) {
     if (!options.plot.empty()) picture_of_name(options.plot);
     options.files.check_single(options.out, options.plot);
     check_apart(options.out, options.plot, options.files.json);
+    check_table_name(options.out, "levels over time");
     if (!options.calibrator.empty() && options.reference) {
         throw UsageError("--calibrator and --reference exclude each other");
+    }
+    if (options.calibrator.empty() && options.calibrator_level) {
+        throw UsageError("--calibrator-level goes with --calibrator");
     }
     check_band_order(options.band);
     if (!options.band.empty() && options.octaves == 0) {

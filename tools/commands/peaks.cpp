@@ -196,6 +196,7 @@ void tell(const std::string& file, const PeaksOptions& options, Page& page) {
 void run(const PeaksOptions& options) {
     if (!options.plot.empty()) picture_of_name(options.plot);
     options.files.check_single(options.out, options.plot);
+    check_table_name(options.out, "a list of peaks");
     report_files("peaks", options.files,
                  [&](const std::string& file, Page& page) { tell(file, options, page); });
 }

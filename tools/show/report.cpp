@@ -13,6 +13,7 @@
 #include "base/error.hpp"
 #include "base/progress.hpp"
 #include "base/text.hpp"
+#include "files/format.hpp"
 #include "files/stream.hpp"
 #include "show/plot.hpp"
 
@@ -178,6 +179,12 @@ void ReportFiles::check_single(const std::string& out, const std::string& pictur
     if (names.size() < 2) return;
     if (!out.empty()) throw UsageError("-o is for the result of one file");
     if (!picture.empty()) throw UsageError("a picture is for one file");
+}
+
+void check_table_name(const std::string& out, const std::string& what) {
+    const auto format = out == "-" ? std::nullopt : format_of_name(out);
+    if (format.value_or(Format::csv) == Format::csv) return;
+    throw UsageError(what + " cannot be written as a " + description(*format) + ", only as CSV");
 }
 
 void report(const std::string& command, bool json, const std::function<void(Page&)>& tell) {

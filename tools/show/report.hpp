@@ -55,6 +55,9 @@ struct ReportFiles {
     void check_single(const std::string& out, const std::string& picture) const;
 };
 
+/// Refuses the name of another format for what is written as CSV alone.
+void check_table_name(const std::string& out, const std::string& what);
+
 /// Tells of something that is no file, on standard output.
 void report(const std::string& command, bool json, const std::function<void(Page&)>& tell);
 
