@@ -73,7 +73,10 @@ class Report {
             delay.x.push_back(gain.x[i]);
             delay.y.push_back(response_.delay[i]);
         }
-        tool::draw(std::vector{gain, delay}, path, asked_.look);
+        // (Rounding may leave a filter with edges near 0 that passes nowhere.)
+        std::vector panels{gain};
+        if (!delay.x.empty()) panels.push_back(delay);
+        tool::draw(panels, path, asked_.look);
     }
 
   private:

@@ -381,8 +381,8 @@ weighting. Bands and weightings hold the limits of class 1 (IEC 61260-1, IEC 616
 kHz; see docs/program.md. Bands that do not end below half the sampling rate are left out.
 
 --plot draws the bands, or without them the followed level over time; -o writes the latter as CSV, a
-row --every 0.1 seconds. Both begin after five time constants. Every signal of a file is measured, and all channels. The recording may be longer
-than memory.
+row --every 0.1 seconds. Both begin after five time constants. Every signal of a file is measured, and
+all channels. The recording may be longer than memory.
 
 Examples:
   wavkit levels street.wav --calibrator calibration.wav

@@ -50,7 +50,7 @@ std::vector<Root> seen_from_circle(const Signal& roots) {
     for (int k = 0; k < 2 * count; ++k) {
         const double re = roots->data[2 * k + 2], im = roots->data[2 * k + 3];
         if (im < 0) continue;
-        const double turns = std::atan2(im, re) / (2 * pi);
+        const double turns = std::atan2(std::fabs(im), re) / (2 * pi);
         const double distance = std::fabs(1 - std::hypot(re, im)) / (2 * pi);
         seen.push_back({turns, distance});
         if (k >= count) nearest = std::min(nearest, distance);
