@@ -75,15 +75,8 @@ Spectrum measure_zoom(const Signal& x, const SpectrumSettings& settings, bool tw
 
 }  // namespace
 
-void check_spacing(double delta) {
-    if (delta > 0) return;
-    throw DataError("a sample spacing of " + rounded(delta) +
-                    " gives no frequencies; set --delta or --rate");
-}
-
 Spectrum measure(const Signal& x, const SpectrumSettings& settings) {
     if (x->points < 1) throw DataError("the signal has no samples");
-    check_spacing(x->delta);
     auto used = settings;
     used.two_sided = settings.two_sided || x->complex;
     if (!settings.zoom.empty()) return measure_zoom(x, settings, used.two_sided);

@@ -49,9 +49,6 @@ struct Spectrum {
     double padding() const { return double(length) / samples; }
 };
 
-/// Refuses a spacing from which no frequencies follow.
-void check_spacing(double delta);
-
 /// Measures a signal of finite samples. A complex one always has a two-sided spectrum.
 Spectrum measure(const Signal& x, const SpectrumSettings& settings);
 
