@@ -173,11 +173,13 @@ WAVKIT_API int dspfh_goertzel(const dspf *x, const dsp *frequencies, dspf *out, 
  *  |  12   | where the strongest other component shows, from 0 to 1 / (2 delta)   |
  *  |  13   | its amplitude                                                        |
  *
- *  The frequency is that of dsps_sine_fit() from `frequency` or the highest bin on. The signal is
- *  seen through the window at its own length, dsph_dft(). A window leaks every component into the
- *  bins of its main lobe, whose powers, over its noise bandwidth, add up to the component's: at
- *  whatever place between bins it lies. A lobe reaches K bins to either side for a sum of K cosines
- *  (Uniform 1, Hann 2, Gausstop 5, P601 7), 4 to 6 for Kaiser's, 5 for Gauss's, 2 otherwise.
+ *  The frequency is that of dsps_sine_fit() from `frequency` or the highest bin on, which a
+ *  stronger component elsewhere pulls aside by a part of a bin, and with it the phases. The signal
+ *  is seen through the window at its own length, dsph_dft(). A window leaks every component into
+ *  the bins of its main lobe, whose powers, over its noise bandwidth, add up to the component's:
+ *  at whatever place between bins it lies. A lobe reaches K bins to either side for a sum of K
+ *  cosines (Uniform 1, Hann 2, Gausstop 5, P601 7), 4 to 6 for Kaiser's, 5 for Gauss's, 2
+ *  otherwise.
  *  Harmonic h is looked for at h f, beyond half the sampling rate where it is folded to. What no
  *  lobe of offset, tone and harmonics holds is noise, and counts as if there were as much of it in
  *  their bins. What leaks beyond the main lobe counts as noise, too, and limits it: see
