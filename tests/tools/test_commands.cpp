@@ -63,12 +63,11 @@ TEST_F(CommandsTest, OptionsOfSeveralValuesStandBeforeTheFileToo) {
                                          {"hist", "--range 0 1", "--bins 4"},
                                          {"correlate", "--lags 0 5", "x.dsp --json"},
                                          {"scale", "--calibrate 0=1 1=3", "-o - --to csv"}};
-    for (const auto& [command, option, rest] : cases) {
-        const auto line = [&](auto first, auto second) {
-            return std::string(command) + " " + std::string(first) + " " + std::string(second) +
-                   " " + std::string(rest);
-        };
-        EXPECT_EQ(printed(line(option, "x.dsp")), printed(line("x.dsp", option))) << option;
+    for (const auto& part : cases) {
+        const std::string command(part[0]), option(part[1]), rest(part[2]);
+        EXPECT_EQ(printed(command + " " + option + " x.dsp " + rest),
+                  printed(command + " x.dsp " + option + " " + rest))
+            << option;
     }
 }
 
