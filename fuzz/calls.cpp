@@ -102,7 +102,10 @@ class Records {
             lost = true;
             if (had[i]) __lsan_ignore_object(had[i]);
         }
-        if (lost) std::ranges::for_each(latest_blocks, __lsan_ignore_object);
+        if (!lost) return;
+        for (const auto block : latest_blocks) {
+            __lsan_ignore_object(reinterpret_cast<const void*>(~block));
+        }
     }
     std::array<const void*, count> blocks() const {
         std::array<const void*, count> owned{};
