@@ -186,11 +186,12 @@ int distortion(const R* x, R* out, R* harmonics, scalar<R> frequency, int count,
     lines.take_out(0);
     lines.take_out(first.bin);
 
+    if (count == std::numeric_limits<int>::max()) return -1;
     Temporary<R> levels;
     levels->points = count + 1;
     levels->complex = 1;
     levels->delta = T(f);
-    if (count == std::numeric_limits<int>::max() || dsp_alloc(levels)) return -1;
+    if (dsp_alloc(levels)) return -1;
     const auto line = bins(levels.get());
     line[0] = {T(offset), 0};
     line[1] = {T(std::sqrt(2 * power) * std::cos(phase)),

@@ -1,4 +1,5 @@
 // Harmonics and noise of tones that are known.
+#include <climits>
 #include <cmath>
 
 #include "support/signals.hpp"
@@ -131,6 +132,7 @@ BOTH_PRECISIONS(Distortion, WhatCannotBeToldApart) {
     // rate and on the offset.
     auto in = real<R>(tone(64, 0.25L, {{1, 1}, {0.1L, 0}}));
     Signal<R> out, lines;
+    EXPECT_EQ(dsph_distortion(in, out, lines, T(0.25), INT_MAX, DSP_WINDOW_UNIFORM), -1);
     in_every_place(in, [&](const R* x, R* to) {
         ASSERT_EQ(dsph_distortion(x, to, lines, T(0.25), 4, DSP_WINDOW_UNIFORM), 0);
         EXPECT_NEAR(to->data[amplitude], 1, 50 * epsilon<R>);
