@@ -17,6 +17,7 @@ TEST_F(RefusalsTest, OneOfAKind) {
     write("z.csv", "re,im\n1,2\n3,4\n");
     write("cut.dsp", "\xBE\x30\x03\xEB\x08\x04");
     write("word.txt", "1 2 3 four");
+    write("mixed.txt", "\n\xBE\x10\x01\xEB" + std::string(11, '\xB7') + "2");
     write("zero.txt", "0\n0\n0\n0\n0\n");
     write("great.txt", "1e300\n-1e300\n2\n");
     write("five.txt", "1\n4\n2\n3\n5\n");
@@ -41,6 +42,7 @@ TEST_F(RefusalsTest, OneOfAKind) {
         {1, "spectrum none.txt", "no samples"},
         {1, "filter x.txt --taps none.txt", "none.txt: there are no taps"},
         {1, "correlate x.txt nan.txt", "nan.txt: sample 2"},
+        {1, "convert mixed.txt y.csv --from text", "signal 1 is damaged or no signal"},
         {1, "spectrum x.txt --band 0.6 0.7", "goes from 0 to 0.5"},
         {1, "response five.txt five.txt --segment 4 --band 0.3 0.4",
          "five.txt: no frequency of the spectrum lies from 0.3 to 0.4; it goes from 0 to 0.5"},

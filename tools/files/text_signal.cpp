@@ -140,6 +140,8 @@ class TextSignal final : public BlockStream {
     /// Reads all numbers of a text, or with a header as many as that declares; gives the number of
     /// characters that are left, or -1 where something else is among them.
     static long parse(std::string text, Signal& numbers) {
+        // (What would begin a binary signal is no number here.)
+        if (!text.empty() && begins_binary(static_cast<unsigned char>(text.front()))) return -1;
         std::FILE* const stream = fmemopen(text.data(), text.size(), "r");
         if (!stream) throw std::bad_alloc();
         const int result = dspf_fread(numbers, stream);
