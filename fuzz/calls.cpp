@@ -95,24 +95,11 @@ class Records {
 
     /// After a call that failed: a block that cannot grow is given up on purpose, be it one that a
     /// record came with or had of the call. Of a record that has none any more it is no leak.
-    void give_up(const std::array<const void*, count>& had) const {
-        bool lost = false;
-        for (std::size_t i = 0; i < count; ++i) {
-            if (records_[i].data) continue;
-            lost = true;
-            if (had[i]) __lsan_ignore_object(had[i]);
-        }
-        if (!lost) return;
+    void give_up() const {
+        if (std::ranges::all_of(records_, [](const R& x) { return x.data != nullptr; })) return;
         for (const auto block : latest_blocks) {
             __lsan_ignore_object(reinterpret_cast<const void*>(~block));
         }
-    }
-    std::array<const void*, count> blocks() const {
-        std::array<const void*, count> owned{};
-        for (std::size_t i = 0; i < count; ++i) {
-            if (records_[i].alloc > 0) owned[i] = records_[i].data;
-        }
-        return owned;
     }
 
     /// After a call: what it left must hold together where it succeeded. Where it did not, a record
@@ -250,9 +237,8 @@ void call(std::string_view name, int (*function)(P...), Records<R>& records, Byt
     Arguments<R> arguments(name, records, in);
     const std::tuple<P...> given{arguments.template next<P>()...};
     arguments.note_sharing();
-    const auto blocks = records.blocks();
     const int result = std::apply(function, given);
-    if (result < 0) records.give_up(blocks);
+    if (result < 0) records.give_up();
     FUZZ_REQUIRE(result == 0 || result == -1);
     FUZZ_REQUIRE(arguments.inputs_kept());
     records.settle(result == 0);
