@@ -122,7 +122,7 @@ class CsvWriter : public BlockWriter {
     }
 
     void write(std::span<const double> values) override {
-        const std::size_t width = shape_.complex ? 2 : shape_.channels;
+        const std::size_t width = shape_.width();
         const double start = shape_.facts_of(0).start;
         for (std::size_t i = 0; i < values.size(); i += width, ++point_) {
             if (time_) std::fprintf(to_, "%.15g,", start + double(point_) * shape_.delta);

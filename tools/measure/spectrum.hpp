@@ -35,7 +35,9 @@ struct Spectrum {
         if (zoomed) return -first / bins->delta;
         return two_sided ? length / 2 : 0;
     }
-    double frequency(double bin) const { return (bin - origin()) * bins->delta; }
+    double frequency(double bin) const {
+        return zoomed ? first + bin * bins->delta : (bin - origin()) * bins->delta;
+    }
     /// Whether a bin of a one-sided spectrum was doubled without a negative frequency to stand for.
     bool has_no_mirror(int bin) const {
         const double place = bin - origin();
