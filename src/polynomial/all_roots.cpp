@@ -14,7 +14,7 @@ int balance(std::span<T> c) {
     const std::size_t top = c.size() - 1;
     std::size_t low = 0;
     while (low < top && c[low] == T(0)) ++low;
-    if (low == top || !std::isfinite(c[low]) || !std::isfinite(c[top])) return 0;
+    if (low == top || c[top] == T(0) || !std::isfinite(c[low]) || !std::isfinite(c[top])) return 0;
     const int exponent = (std::ilogb(c[low]) - std::ilogb(c[top])) / int(top - low);
     const auto balanced = [&](std::size_t k) {
         constexpr std::int64_t beyond = 1 << 16;  // every exponent of a number

@@ -61,23 +61,26 @@ Tangent<Bin<T>> tangent_at_root(std::span<const T> c, Bin<T> z) {
     return {{value, 0}, {slope, 0}};
 }
 
-/// Where a division from the top coefficient down meets one from the lowest up: at the largest
-/// terms |c[k] z^k| of a root z, the first of `width` neighbours. Farther on, either would lose
-/// digits to the roots beyond z (G. Peters and J. H. Wilkinson, "Practical problems arising in the
-/// solution of polynomial equations", 1971).
+/// Where a division from the top coefficient down meets one from the lowest up: at the largest term
+/// |c[k] z^k| of a root z, and where two places are left out, at its neighbour too on the side that
+/// has the next largest. Farther on, either would lose digits to the roots beyond z (G. Peters and
+/// J. H. Wilkinson, "Practical problems arising in the solution of polynomial equations", 1971).
 template <class T>
 std::size_t meeting_place(std::span<const T> c, T modulus, std::size_t width) {
     std::size_t place = 0;
-    T largest = 0, term = 0, power = 1;
+    T largest = 0, below = 0, above = 0, power = 1;
     for (std::size_t k = 0; k < c.size(); ++k, power *= modulus) {
-        const T last = term;
-        term = std::fabs(c[k]) * power;
-        const T sum = width == 2 ? last + term : term;
-        if (k + 1 >= width && sum > largest) {
-            largest = sum;
-            place = k + 1 - width;
+        const T term = std::fabs(c[k]) * power;
+        if (term > largest) {
+            below = largest;
+            largest = term;
+            above = 0;
+            place = k;
+        } else {
+            above = std::max(above, term);
         }
     }
+    if (width == 2 && place > 0 && (below >= above || place + 1 == c.size())) --place;
     return place;
 }
 

@@ -92,6 +92,15 @@ BOTH_PRECISIONS(Roots, NoiseOfDivisionsIsNoCoefficient) {
     }
 }
 
+BOTH_PRECISIONS(Roots, CirclesFarApart) {
+    // (The quotient by the roots of x^8 + 1 lost its highest coefficient.)
+    auto far = real<R>({-3e9L, 0.75L, 0, -1e15L, 1.6875L, -3.1875L, 5.625L, 0.5L, -6.0625L,
+                        -0.1875L, 0.75L, -1e15L, 1.6875L});
+    const auto polynomial = far;
+    ASSERT_EQ(dspi_proots(far), 0);
+    EXPECT_LT(misfit<R>(polynomial, far), 64);
+}
+
 BOTH_PRECISIONS(Roots, AnyDegreeIsSorted) {
     const struct {
         List c;
