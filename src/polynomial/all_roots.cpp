@@ -54,6 +54,18 @@ void drop_noise(std::span<T> c, T* logarithms) {
     }
 }
 
+/// Whether a root z that the search takes for real is none. Its tolerance grows with the spread of
+/// the coefficients, until any direction passes for the real axis; but there the polynomial is more
+/// than rounding noise, and far less of it is left at z.
+template <class T>
+bool off_axis(std::span<const T> c, Bin<T> z) {
+    T noise = 0;
+    for (std::size_t k = c.size(); k-- > 0;) noise = noise * std::fabs(z.re) + std::fabs(c[k]);
+    noise *= 4 * T(c.size()) * std::numeric_limits<T>::epsilon();
+    const T on_axis = std::fabs(tangent(c, z.re).value);
+    return on_axis > noise && one_norm(tangent(c, z).value) < on_axis / 16;
+}
+
 /// Fills `roots`, dividing the polynomial by every root found. Complex roots come in pairs; where
 /// only one place is left, the root is the real one of a linear polynomial.
 template <Record R>
@@ -70,7 +82,8 @@ int deflate(R* polynomial, std::span<Bin<scalar<R>>> roots) {
         if (dsps_pcsolve(polynomial, found, 0, 0)) return -1;
         const Bin<T> z{found->data[0], found->data[1]};
         roots[i++] = Bin<T>{z.re, 0} * unit;
-        if (found->complex && z.im != T(0) && i < roots.size()) {
+        const bool paired = z.im != T(0) && i < roots.size();
+        if (paired && (found->complex || off_axis<T>(c, z))) {
             roots[i - 1] = z * unit;
             roots[i++] = conj(z) * unit;
             divide_by_pair(c, z);

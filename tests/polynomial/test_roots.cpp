@@ -93,6 +93,26 @@ BOTH_PRECISIONS(Roots, NoiseOfDivisionsIsNoCoefficient) {
 }
 
 BOTH_PRECISIONS(Roots, CirclesFarApart) {
+    // Factors x^m +- r^m, whose roots lie evenly on circles: each group must come out whole, with
+    // its directions, however small or large the other ones are.
+    Noise noise(6);
+    const int most_digits = std::same_as<R, dsp> ? 12 : 3;
+    for (int round = 0; round < 1000; ++round) {
+        List c{1};
+        for (int circle = 0; circle < 2 + round % 2; ++circle) {
+            const auto m = std::size_t(std::fabs(noise()) * 4) + 1;
+            const auto power = std::pow(10.0L, int(m) * most_digits * noise());
+            const auto shift = noise() < 0 ? power : -power;
+            c.resize(c.size() + m);
+            for (std::size_t k = c.size(); k-- > 0;) {
+                c[k] = (k >= m ? c[k - m] : 0) + shift * c[k];
+            }
+        }
+        const auto polynomial = real<R>(c);
+        auto roots = polynomial;
+        ASSERT_EQ(dspi_proots(roots), 0) << round;
+        EXPECT_LT(misfit<R>(polynomial, roots), 64) << round;
+    }
     // (The quotient by the roots of x^8 + 1 lost its highest coefficient.)
     auto far = real<R>({-3e9L, 0.75L, 0, -1e15L, 1.6875L, -3.1875L, 5.625L, 0.5L, -6.0625L,
                         -0.1875L, 0.75L, -1e15L, 1.6875L});
