@@ -103,25 +103,27 @@ Roots<T> solve_cubic(T b2, T b1, T b0) {
     return roots;
 }
 
-/// The root of the resolvent cubic that splits the quartic into two real quadratics; down to
-/// -noise, a square counts as 0.
+/// The root of the resolvent cubic that splits the quartic into two real quadratics: the squares of
+/// what they differ in are not negative, but for noise. Where two roots nearly are one, either may
+/// come out with less than they should have; then it is the one that comes closest.
 template <class T>
 T splitting_root(T b3, T b2, T b1, T b0, T noise) {
     const std::array resolvent{-b0 * b3 * b3 + 4 * b0 * b2 - b1 * b1, b3 * b1 - 4 * b0, -b2, T(1)};
     auto roots = solve_cubic(resolvent[2], resolvent[1], resolvent[0]);
     correct<T>(resolvent, roots.all());
-    const auto splits = [&](T y) {
-        return !(y + b3 * b3 / 4 - b2 < -noise) && !(y * y / 4 - b0 < -noise);
+    const auto smaller_square = [&](std::size_t i) {
+        const T y = roots.z[i].re;
+        return std::min(y + b3 * b3 / 4 - b2, y * y / 4 - b0);
     };
+    const auto splits = [&](std::size_t i) { return !(smaller_square(i) < -noise); };
     if (roots.complex) {
-        // A double root may come out as a pair; then it is the one that splits.
-        const T y = roots.z[0].re, of_pair = roots.z[1].re;
-        return splits(y) || !splits(of_pair) ? y : of_pair;
+        // A double root may come out as a pair.
+        return roots.z[splits(0) || smaller_square(0) >= smaller_square(1) ? 0 : 1].re;
     }
     for (const std::size_t i : {1, 2}) {
-        if (splits(roots.z[i].re)) return roots.z[i].re;
+        if (splits(i)) return roots.z[i].re;
     }
-    return roots.z[0].re;
+    return roots.z[std::ranges::max({0, 1, 2}, {}, smaller_square)].re;
 }
 
 /// x^4 + b3 x^3 + b2 x^2 + b1 x + b0 by Ferrari's method: (x^2 + g1 x + h1)(x^2 + g2 x + h2) with

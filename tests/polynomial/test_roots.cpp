@@ -186,6 +186,25 @@ BOTH_PRECISIONS(Roots, SquaresOfQuadraticsHaveTheirPairsTwice) {
     }
 }
 
+BOTH_PRECISIONS(Roots, NearlySquaresHaveAllPairs) {
+    // (x^2 + s x + b)(x^2 + t x + c) with the second ones near the first: rounding decides which
+    // root of the resolvent splits the quartic.
+    Noise noise(7);
+    for (int i = 0; i < 3000; ++i) {
+        const long double d = std::pow(10.0L, -2 - 10 * std::fabs(noise()));
+        const long double b = 1 + noise() / 2, c = b + d * noise();
+        const long double s = i % 3 ? noise() : 0, t = i % 3 == 1 ? s + d * noise() : -s;
+        Signal<R> roots;
+        ASSERT_EQ(dsps_proots(real<R>({b * c, s * c + t * b, b + c + s * t, s + t, 1}), roots), 0);
+        Samples want;
+        for (const auto& [sum, product] : {std::pair{s, b}, std::pair{t, c}}) {
+            const Z im{0, std::sqrt(product - sum * sum / 4)};
+            want.insert(want.end(), {-sum / 2 + im, -sum / 2 - im});
+        }
+        EXPECT_LT(distance<R>(roots, want), 4 * std::cbrt((long double)epsilon<R>)) << i;
+    }
+}
+
 BOTH_PRECISIONS(Roots, CoefficientsFromRoots) {
     const std::pair<Signal<R>, Signal<R>> cases[] = {
         {real<R>({2, 3}), real<R>({6, -5, 1})},
