@@ -1,11 +1,15 @@
 // All roots of a real polynomial of degree 5 at most, in closed form.
 #include <algorithm>
 #include <array>
+#include <complex>
 
 #include "polynomial/polynomial.hpp"
 
 namespace wavkit {
 namespace {
+
+template <class T>
+inline constexpr T epsilon = std::numeric_limits<T>::epsilon();
 
 template <class T>
 using Coefficients = std::span<const T>;
@@ -126,6 +130,19 @@ T splitting_root(T b3, T b2, T b1, T b0, T noise) {
     return roots.z[std::ranges::max({0, 1, 2}, {}, smaller_square)].re;
 }
 
+/// The pairs of roots of (x^2 + g x + h)^2 + a x + b where the quadratic has none that are real and
+/// the rest is small: at the quadratic's own z, sqrt(-(a z + b)) / (2 z + g) to either side.
+template <class T>
+Roots<T> solve_near_square(T g, T h, T a, T b) {
+    const Bin<T> z{-g / 2, -std::sqrt(h - g * g / 4)};
+    const auto root = std::sqrt(std::complex<T>(-(a * z.re + b), -a * z.im));
+    auto aside = ratio(Bin<T>{root.real(), root.imag()}, Bin<T>{0, 2 * z.im});
+    if (aside.re < T(0) || (aside.re == T(0) && aside.im < T(0))) aside = aside * T(-1);
+    Roots<T> roots;
+    for (const auto& place : {z - aside, z + aside}) roots.add_pair(place.re, place.im);
+    return roots;
+}
+
 /// x^4 + b3 x^3 + b2 x^2 + b1 x + b0 by Ferrari's method: (x^2 + g1 x + h1)(x^2 + g2 x + h2) with
 /// g = b3 / 2 +- r and h = y / 2 +- w, of a root y of the resolvent cubic.
 template <class T>
@@ -134,6 +151,10 @@ Roots<T> solve_quartic(T b3, T b2, T b1, T b0, T noise) {
     const T half = y / 2;
     const T w = std::sqrt(std::max(y * y / 4 - b0, T(0)));
     T r = std::sqrt(std::max(y + b3 * b3 / 4 - b2, T(0)));
+    // (The resolvent's own rounding makes up squares as large as its root's distance to the next.)
+    if (const T g = b3 / 2, h = (b2 - g * g) / 2, near = std::sqrt(std::sqrt(epsilon<T>));
+        std::max(w, r) < near && h - g * g / 4 > near)
+        return solve_near_square(g, h, b1 - 2 * g * h, b0 - h * h);
     if (half * b3 - b1 < T(0)) r = -r;
     const T h1 = half + w;
     const bool cancels = half >= T(0) && b0 != T(0) && h1 != T(0);
@@ -163,7 +184,7 @@ T unit_of(Coefficients<T> c) {
 template <class T>
 Roots<T> solve_scaled(Coefficients<T> c) {
     using W = wider<T>;
-    constexpr W noise = 8 * std::numeric_limits<T>::epsilon();
+    constexpr W noise = 8 * epsilon<T>;
     const std::size_t degree = c.size() - 1;
     std::array<W, 4> b;  // of x^0 ... x^(degree - 1)
     const W unit = unit_of(c);

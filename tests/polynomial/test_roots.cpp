@@ -201,7 +201,7 @@ BOTH_PRECISIONS(Roots, NearlySquaresHaveAllPairs) {
             const Z im{0, std::sqrt(product - sum * sum / 4)};
             want.insert(want.end(), {-sum / 2 + im, -sum / 2 - im});
         }
-        EXPECT_LT(distance<R>(roots, want), 4 * std::cbrt((long double)epsilon<R>)) << i;
+        EXPECT_LT(distance<R>(roots, want), 32 * std::sqrt((long double)epsilon<R>)) << i;
     }
 }
 
