@@ -90,8 +90,9 @@ WAVKIT_API int dspfs_pcsolve(const dspf *polynomial, dspf *out, float re0, float
  *  |        |                                          | two pairs the one with the smaller real  |
  *  |        |                                          | part first, of equal ones that with the  |
  *  |        |                                          | larger modulus                           |
- *  | 5      | dsps_psolve() from 0 and Ferrari for the | all real: ascending; else see below      |
- *  |        | quartic that remains                     |                                          |
+ *  | 5      | dsps_psolve() from 0, where that fails   | all real: ascending; else see below      |
+ *  |        | in a unit that fits the coefficients,    |                                          |
+ *  |        | and Ferrari for the quartic that remains |                                          |
  *
  *  Of a pair, the root with the negative imaginary part comes first. Among the roots of a quartic
  *  with complex ones, the fifth root r stands first if the quartic's first root is complex or lies
@@ -99,7 +100,8 @@ WAVKIT_API int dspfs_pcsolve(const dspf *polynomial, dspf *out, float re0, float
  *
  *  From degree 3 on, the roots are corrected by Newton's method on the polynomial itself, which
  *  gives back the digits that the closed forms lose where an inner square root vanishes, as in
- *  x^4 + 1.
+ *  x^4 + 1. With moduli of degree 3 to 5 more than some ten powers of ten apart, roots may be lost
+ *  in the rounding of the closed forms, which dspi_proots() does not use.
  *  @return 0, or -1 when the polynomial is complex or has more than 6 points, no root of a quintic
  *          is found (`out` is untouched in all these cases), or memory runs out */
 WAVKIT_API int dsps_proots(const dsp *polynomial, dsp *out);
@@ -117,11 +119,9 @@ WAVKIT_API int dspfs_proots(const dspf *polynomial, dspf *out);
  *  (Aberth, 1973). A polynomial of degree 0, or without coefficients other than 0, leaves a real
  *  record without points.
  *
- *  A root that dsps_pcsolve() judges real is taken as real. Where the coefficients, measured so,
- *  are still some 0.1 / (points * epsilon) apart, it judges complex roots so, and the result is of
- *  no use: in single precision this may happen when they span more than four powers of ten, in
- *  double precision more than twelve. A search may find no root of a random polynomial from degree
- *  200 on, and in single precision none of x^n + a from degree 25 on.
+ *  A root that dsps_pcsolve() judges real is taken as real, unless the polynomial is more than
+ *  rounding noise at its real part and far less at the root itself. Both precisions are computed in
+ *  double. A search may find no root of a random polynomial from degree 200 on.
  *  @return 0, or -1 when a search finds no root, as may happen with many roots close together, the
  *          record is complex, or memory runs out; the coefficients are kept in the first two cases
  */

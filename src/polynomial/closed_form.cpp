@@ -168,16 +168,16 @@ Roots<T> solve_quartic(T b3, T b2, T b1, T b0, T noise) {
     return roots;
 }
 
-/// The power of two in which x is measured so that the largest coefficients of the monic polynomial
-/// come near 1: nothing overflows then, and noise is a matter of epsilons.
+/// The exponent of the power of two in which x is measured so that the largest coefficients of the
+/// monic polynomial come near 1: nothing overflows then, and noise is a matter of epsilons.
 template <class T>
-T unit_of(Coefficients<T> c) {
+int unit_exponent(Coefficients<T> c) {
     int exponent = std::numeric_limits<int>::min();
     for (std::size_t k = 1; k < c.size(); ++k) {
         const T b = c[c.size() - 1 - k] / c.back();
         if (b != T(0) && std::isfinite(b)) exponent = std::max(exponent, std::ilogb(b) / int(k));
     }
-    return exponent == std::numeric_limits<int>::min() ? T(1) : std::ldexp(T(1), exponent);
+    return exponent == std::numeric_limits<int>::min() ? 0 : exponent;
 }
 
 /// Degrees 3 and 4 in the arithmetic of residuals, since a difference decides which roots are real.
@@ -187,7 +187,7 @@ Roots<T> solve_scaled(Coefficients<T> c) {
     constexpr W noise = 8 * epsilon<T>;
     const std::size_t degree = c.size() - 1;
     std::array<W, 4> b;  // of x^0 ... x^(degree - 1)
-    const W unit = unit_of(c);
+    const W unit = std::ldexp(W(1), unit_exponent(c));
     W power = 1;
     for (std::size_t k = degree; k-- > 0;) {
         power *= unit;
@@ -201,14 +201,37 @@ Roots<T> solve_scaled(Coefficients<T> c) {
     return roots;
 }
 
+/// A real root by search from 0: of the polynomial, or where none is accepted, of the one in a unit
+/// that fits it, since there is one.
+template <Record R>
+bool search_real_root(const R* polynomial, scalar<R>& root) {
+    Temporary<R> found, scaled;
+    int unit = 0;
+    found->points = 1;
+    if (dsp_alloc(found)) return false;  // a search that fails has found nothing then
+    if (dsps_psolve(polynomial, found, 0)) {
+        if (dsp_copy(scaled, polynomial)) return false;
+        const auto c = values(scaled.get());
+        unit = unit_exponent<scalar<R>>(c);
+        const int top = int(c.size()) - 1;
+        for (int k = 0; k < top; ++k) {
+            auto& v = c[std::size_t(k)];
+            v = std::ldexp(v / c.back(), unit * (k - top));
+        }
+        c.back() = 1;
+        if (dsps_psolve(scaled, found, 0)) return false;
+    }
+    root = std::ldexp(found->data[0], unit);
+    return true;
+}
+
 /// One real root by search, the others from the quartic that remains. Among complex roots the real
 /// one is placed by the first two alone.
 template <Record R>
 bool solve_quintic(const R* polynomial, Roots<scalar<R>>& roots) {
     using T = scalar<R>;
-    Temporary<R> found;
-    if (dsps_psolve(polynomial, found, 0)) return false;
-    const T r = found->data[0];
+    T r;
+    if (!search_real_root(polynomial, r)) return false;
     std::array<T, 6> c;
     std::ranges::copy(values(polynomial), c.begin());
     divide_by_root<T>(c, r);

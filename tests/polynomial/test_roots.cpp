@@ -205,6 +205,21 @@ BOTH_PRECISIONS(Roots, NearlySquaresHaveAllPairs) {
     }
 }
 
+BOTH_PRECISIONS(Roots, QuinticsOfAnyUnit) {
+    // x^5 - r^5 and rounding noise, from which a search takes any step that it can.
+    Noise noise(8);
+    for (int i = 0; i < 200; ++i) {
+        const long double r = (i % 2 ? -1 : 1) * std::pow(10.0L, 5 * noise());
+        List c{-std::pow(r, 5), 0, 0, 0, 0, 1};
+        for (int k = 1; k < 5; ++k) c[std::size_t(k)] = 1e-19L * noise() * std::pow(r, 5 - k);
+        Signal<R> roots;
+        ASSERT_EQ(dsps_proots(real<R>(c), roots), 0) << r;
+        Samples want;
+        for (int k = 0; k < 5; ++k) want.push_back(unit_root(k, 5) * r);
+        EXPECT_LT(distance<R>(roots, want), 16 * epsilon<R> * std::fabs(r)) << r;
+    }
+}
+
 BOTH_PRECISIONS(Roots, CoefficientsFromRoots) {
     const std::pair<Signal<R>, Signal<R>> cases[] = {
         {real<R>({2, 3}), real<R>({6, -5, 1})},
