@@ -74,18 +74,19 @@ int deflate(R* polynomial, std::span<Bin<scalar<R>>> roots) {
     Temporary<R> found, logarithms;
     logarithms->points = polynomial->points;
     if (dsp_alloc(logarithms)) return -1;
-    T unit = 1;
+    int unit = 0;  // the exponent of its power of 2
     for (std::size_t i = 0; i < roots.size();) {
         const auto c = values(polynomial);
-        unit = std::ldexp(unit, balance(c));
+        unit += balance(c);
         drop_noise(c, logarithms->data);
         if (dsps_pcsolve(polynomial, found, 0, 0)) return -1;
         const Bin<T> z{found->data[0], found->data[1]};
-        roots[i++] = Bin<T>{z.re, 0} * unit;
+        roots[i++] = times_power_of_2(Bin<T>{z.re, 0}, unit);
         const bool paired = z.im != T(0) && i < roots.size();
         if (paired && (found->complex || off_axis<T>(c, z))) {
-            roots[i - 1] = z * unit;
-            roots[i++] = conj(z) * unit;
+            roots[i - 1] = times_power_of_2(z, unit);
+            roots[i] = conj(roots[i - 1]);
+            ++i;
             divide_by_pair(c, z);
             polynomial->points -= 2;
         } else {

@@ -187,16 +187,16 @@ Roots<T> solve_scaled(Coefficients<T> c) {
     constexpr W noise = 8 * epsilon<T>;
     const std::size_t degree = c.size() - 1;
     std::array<W, 4> b;  // of x^0 ... x^(degree - 1)
-    const W unit = std::ldexp(W(1), unit_exponent(c));
-    W power = 1;
-    for (std::size_t k = degree; k-- > 0;) {
-        power *= unit;
-        b[k] = W(c[k]) / W(c[degree]) / power;
+    const int unit = unit_exponent(c);
+    for (std::size_t k = 0; k < degree; ++k) {
+        b[k] = std::ldexp(W(c[k]) / W(c[degree]), -unit * int(degree - k));
     }
     const Roots<W> wide =
         degree == 3 ? solve_cubic(b[2], b[1], b[0]) : solve_quartic(b[3], b[2], b[1], b[0], noise);
     Roots<T> roots;
-    for (const auto& z : wide.all()) roots.z[roots.count++] = convert<T>(z * unit);
+    for (const auto& z : wide.all()) {
+        roots.z[roots.count++] = convert<T>(times_power_of_2(z, unit));
+    }
     roots.complex = wide.complex;
     return roots;
 }

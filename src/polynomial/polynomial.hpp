@@ -118,6 +118,12 @@ Bin<T> ratio(Bin<T> a, Bin<T> b) {
     return a * conj(b) * (T(1) / magnitude_squared(b));
 }
 
+/// z 2^exponent, also where the power itself is beyond the range; what is real stays real.
+template <class T>
+Bin<T> times_power_of_2(Bin<T> z, int exponent) {
+    return {std::ldexp(z.re, exponent), std::ldexp(z.im, exponent)};
+}
+
 /// |re| + |im|, which neither overflows nor vanishes before its parts do.
 template <class T>
 T one_norm(Bin<T> z) {
@@ -160,7 +166,7 @@ void correct(std::span<const T> c, std::span<Bin<T>> roots) {
         moved = false;
         for (std::size_t i = 0; i < roots.size(); ++i) {
             moved |= improve<T>(c, roots, roots[i]);
-            if (roots[i].im == T(0)) continue;
+            if (roots[i].im == T(0) || i + 1 == roots.size()) continue;
             roots[i + 1] = conj(roots[i]);
             ++i;
         }

@@ -220,6 +220,16 @@ BOTH_PRECISIONS(Roots, QuinticsOfAnyUnit) {
     }
 }
 
+BOTH_PRECISIONS(Roots, OneAtTheEndOfTheRange) {
+    // In double precision, the power of two that the larger root is measured in is beyond it; in
+    // single precision there is one root.
+    auto x = real<R>({-6.25L, -6.25L, 3.4766779039195259e-308L});
+    ASSERT_EQ(dspi_proots(x), 0);
+    const auto most = std::numeric_limits<T>::max() * (1 - 5.82e-13L);
+    const bool both = std::same_as<R, dsp>;
+    EXPECT_TRUE(is_complex<R>(x, both ? Samples{-1, most} : Samples{-1}, 64));
+}
+
 BOTH_PRECISIONS(Roots, CoefficientsFromRoots) {
     const std::pair<Signal<R>, Signal<R>> cases[] = {
         {real<R>({2, 3}), real<R>({6, -5, 1})},
