@@ -186,7 +186,7 @@ Roots<T> solve_scaled(Coefficients<T> c) {
     using W = wider<T>;
     constexpr W noise = 8 * epsilon<T>;
     const std::size_t degree = c.size() - 1;
-    std::array<W, 4> b;  // of x^0 ... x^(degree - 1)
+    std::array<W, 4> b{};  // of x^0 ... x^(degree - 1)
     const int unit = unit_exponent(c);
     for (std::size_t k = 0; k < degree; ++k) {
         b[k] = std::ldexp(W(c[k]) / W(c[degree]), -unit * int(degree - k));
