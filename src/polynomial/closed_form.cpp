@@ -124,10 +124,12 @@ T splitting_root(T b3, T b2, T b1, T b0, T noise) {
         // A double root may come out as a pair.
         return roots.z[splits(0) || smaller_square(0) >= smaller_square(1) ? 0 : 1].re;
     }
+    std::size_t closest = 0;
     for (const std::size_t i : {1, 2}) {
         if (splits(i)) return roots.z[i].re;
+        if (smaller_square(i) > smaller_square(closest)) closest = i;
     }
-    return roots.z[std::ranges::max({0, 1, 2}, {}, smaller_square)].re;
+    return roots.z[closest].re;
 }
 
 /// The pairs of roots of (x^2 + g x + h)^2 + a x + b where the quadratic has none that are real and
