@@ -33,7 +33,7 @@ int balance(std::span<T> c) {
 /// of all. Left alone, the rounding noise of a division would pass for the smallest coefficient.
 template <class T>
 void drop_noise(std::span<T> c, T* logarithms) {
-    const T noise = std::log2(16 * T(c.size()) * std::numeric_limits<T>::epsilon());
+    const T noise = std::log2(16 * T(c.size()) * epsilon<T>);
     const std::size_t top = c.size() - 1;
     for (std::size_t k = 0; k <= top; ++k) logarithms[k] = std::log2(std::fabs(c[k]));
     const auto slope = [&](std::size_t from, std::size_t to) {
@@ -61,7 +61,7 @@ template <class T>
 bool off_axis(std::span<const T> c, Bin<T> z) {
     T noise = 0;
     for (std::size_t k = c.size(); k-- > 0;) noise = noise * std::fabs(z.re) + std::fabs(c[k]);
-    noise *= 4 * T(c.size()) * std::numeric_limits<T>::epsilon();
+    noise *= 4 * T(c.size()) * epsilon<T>;
     const T on_axis = std::fabs(tangent(c, z.re).value);
     return on_axis > noise && one_norm(tangent(c, z).value) < on_axis / 16;
 }
@@ -81,15 +81,15 @@ int deflate(R* polynomial, std::span<Bin<scalar<R>>> roots) {
         drop_noise(c, logarithms->data);
         if (dsps_pcsolve(polynomial, found, 0, 0)) return -1;
         const Bin<T> z{found->data[0], found->data[1]};
-        roots[i++] = times_power_of_2(Bin<T>{z.re, 0}, unit);
-        const bool paired = z.im != T(0) && i < roots.size();
-        if (paired && (found->complex || off_axis<T>(c, z))) {
-            roots[i - 1] = times_power_of_2(z, unit);
-            roots[i] = conj(roots[i - 1]);
-            ++i;
+        const auto root = times_power_of_2(z, unit);
+        const bool two_left = i + 1 < roots.size();
+        if (two_left && z.im != T(0) && (found->complex || off_axis<T>(c, z))) {
+            roots[i++] = root;
+            roots[i++] = conj(root);
             divide_by_pair(c, z);
             polynomial->points -= 2;
         } else {
+            roots[i++] = {root.re, 0};
             divide_by_root(c, z.re);
             polynomial->points -= 1;
         }

@@ -9,9 +9,6 @@ namespace wavkit {
 namespace {
 
 template <class T>
-inline constexpr T epsilon = std::numeric_limits<T>::epsilon();
-
-template <class T>
 using Coefficients = std::span<const T>;
 
 /// Roots in their order; a complex one is followed by its conjugate.
@@ -182,6 +179,12 @@ int unit_exponent(Coefficients<T> c) {
     return exponent == std::numeric_limits<int>::min() ? 0 : exponent;
 }
 
+/// Coefficient k of the monic polynomial of x / 2^unit.
+template <class W, class T>
+W in_unit(Coefficients<T> c, std::size_t k, int unit) {
+    return std::ldexp(W(c[k]) / W(c.back()), -unit * int(c.size() - 1 - k));
+}
+
 /// Degrees 3 and 4 in the arithmetic of residuals, since a difference decides which roots are real.
 template <class T>
 Roots<T> solve_scaled(Coefficients<T> c) {
@@ -190,9 +193,7 @@ Roots<T> solve_scaled(Coefficients<T> c) {
     const std::size_t degree = c.size() - 1;
     std::array<W, 4> b{};  // of x^0 ... x^(degree - 1)
     const int unit = unit_exponent(c);
-    for (std::size_t k = 0; k < degree; ++k) {
-        b[k] = std::ldexp(W(c[k]) / W(c[degree]), -unit * int(degree - k));
-    }
+    for (std::size_t k = 0; k < degree; ++k) b[k] = in_unit<W>(c, k, unit);
     const Roots<W> wide =
         degree == 3 ? solve_cubic(b[2], b[1], b[0]) : solve_quartic(b[3], b[2], b[1], b[0], noise);
     Roots<T> roots;
@@ -207,6 +208,7 @@ Roots<T> solve_scaled(Coefficients<T> c) {
 /// that fits it, since there is one.
 template <Record R>
 bool search_real_root(const R* polynomial, scalar<R>& root) {
+    using T = scalar<R>;
     Temporary<R> found, scaled;
     int unit = 0;
     found->points = 1;
@@ -214,13 +216,8 @@ bool search_real_root(const R* polynomial, scalar<R>& root) {
     if (dsps_psolve(polynomial, found, 0)) {
         if (dsp_copy(scaled, polynomial)) return false;
         const auto c = values(scaled.get());
-        unit = unit_exponent<scalar<R>>(c);
-        const int top = int(c.size()) - 1;
-        for (int k = 0; k < top; ++k) {
-            auto& v = c[std::size_t(k)];
-            v = std::ldexp(v / c.back(), unit * (k - top));
-        }
-        c.back() = 1;
+        unit = unit_exponent<T>(c);
+        for (std::size_t k = 0; k < c.size(); ++k) c[k] = in_unit<T, T>(c, k, unit);
         if (dsps_psolve(scaled, found, 0)) return false;
     }
     root = std::ldexp(found->data[0], unit);

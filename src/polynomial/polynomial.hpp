@@ -7,6 +7,9 @@
 
 namespace wavkit {
 
+template <class T>
+inline constexpr T epsilon = std::numeric_limits<T>::epsilon();
+
 /// The coefficients up to the highest that is not 0.
 template <class T>
 std::span<T> without_leading_zeros(std::span<T> c) {

@@ -10,9 +10,6 @@ namespace wavkit {
 namespace {
 
 template <class T>
-inline constexpr T epsilon = std::numeric_limits<T>::epsilon();
-
-template <class T>
 using Coefficients = std::span<const T>;
 
 /// p''(z)
